@@ -1,0 +1,18 @@
+/// Every intrinsic of the core for a program on the PC.
+///
+/// An intrinsic is one function, cstub_Km_ZNB_Orbis_R5_64k__KOR_<package>_<operation>. A single result is
+/// returned by value; register operands are const references; further results and registers that are read
+/// and written are references, first in the list; a predicate is last. Memory operands are a typed pointer
+/// and an offset in bytes. For the short names of the core's own sources include kastarri/names.h.
+#ifndef KASTARRI_H
+#define KASTARRI_H
+
+#include "kastarri/library.h"
+#include "kastarri/types.h"
+
+#include "kastarri/conversions.h"
+#include "kastarri/integer.h"
+#include "kastarri/memory.h"
+#include "kastarri/multiply.h"
+
+#endif

@@ -1,0 +1,21 @@
+/// The library itself: version and target.
+#ifndef KASTARRI_LIBRARY_H
+#define KASTARRI_LIBRARY_H
+
+/// What a declaration of the library carries: its symbol is exported.
+#define KASTARRI_API __attribute__((visibility("default")))
+
+/// The version of these headers.
+#define KASTARRI_VERSION_MAJOR 0
+#define KASTARRI_VERSION_MINOR 1
+#define KASTARRI_VERSION_PATCH 0
+#define KASTARRI_VERSION "0.1.0"
+
+/// The version of the library that is loaded, as KASTARRI_VERSION.
+KASTARRI_API const char* cstub_Km_ZNB_Orbis_R5_64k_version();
+
+/// The instruction set that the loaded library's intrinsics use on this processor: "avx512", "avx2" or
+/// "sse2".
+KASTARRI_API const char* cstub_Km_ZNB_Orbis_R5_64k_target();
+
+#endif

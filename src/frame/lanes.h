@@ -1,0 +1,128 @@
+// Lane access and the lane loop: an operation is a rule on lanes, applied to every lane here.
+#ifndef KASTARRI_FRAME_LANES_H
+#define KASTARRI_FRAME_LANES_H
+
+#include "frame/layouts.h"
+#include "frame/predicate.h"
+
+// Lane i of a result depends on lane i of what it may share memory with, and on nothing else there:
+// a destination handed in as an operand too is fine, and the compiler may take it so.
+#ifdef __clang__
+#define KASTARRI_LANES_INDEPENDENT _Pragma("clang loop vectorize(assume_safety)")
+#else
+#define KASTARRI_LANES_INDEPENDENT _Pragma("GCC ivdep")
+#endif
+
+namespace {
+
+// The lanes of an operand. Bits of a container that are not the lane's own are never seen.
+template <class L>
+class Read {
+ public:
+  explicit Read(const void* register_image)
+      : lanes_(static_cast<const in_memory<typename L::container>*>(register_image)) {}
+
+  auto operator[](int i) const { return canonical<L>(typename L::container{lanes_[i]}); }
+
+ private:
+  const in_memory<typename L::container>* lanes_;
+};
+
+// One value that stands for a lane of every index: an immediate, a replicated element.
+template <class T>
+class Same {
+ public:
+  explicit Same(T value) : value_(value) {}
+  T operator[](int) const { return value_; }
+
+ private:
+  T value_;
+};
+
+// The lanes of a result, always stored in canonical form.
+template <class L>
+class Write {
+ public:
+  explicit Write(void* register_image)
+      : lanes_(static_cast<in_memory<typename L::container>*>(register_image)) {}
+
+  template <class V>
+  void put(int i, V value) const {
+    lanes_[i] = canonical<L>(value);
+  }
+
+ private:
+  in_memory<typename L::container>* lanes_;
+};
+
+// The result of a predicated operation. A lane whose predicate bit is 0 keeps its value; in the
+// clearing form, which loads use, it becomes 0.
+template <class L, bool Clear>
+class Predicated {
+ public:
+  template <class PredicateUnit>
+  Predicated(void* register_image, const PredicateUnit* predicate)
+      : lanes_(static_cast<in_memory<typename L::container>*>(register_image)) {
+    enabled_.expand(predicate);
+  }
+
+  template <class V>
+  void put(int i, V value) const {
+    using C = typename L::container;
+    lanes_[i] = enabled_.lane[i] ? canonical<L>(value) : Clear ? C{} : C{lanes_[i]};
+  }
+
+ private:
+  in_memory<typename L::container>* lanes_;
+  LaneMask<8 * sizeof(typename L::container), L::count> enabled_;
+};
+
+// What an entry hands to a semantic function as its output: plain units, or units under a predicate.
+template <class Unit, class PredicateUnit, bool Clear>
+struct UnitsUnder {
+  Unit* units;
+  const PredicateUnit* predicate;
+};
+
+template <class Unit, class PredicateUnit>
+inline UnitsUnder<Unit, PredicateUnit, false> where(Unit* units, const PredicateUnit* predicate) {
+  return {units, predicate};
+}
+
+template <class Unit, class PredicateUnit>
+inline UnitsUnder<Unit, PredicateUnit, true> clear(Unit* units, const PredicateUnit* predicate) {
+  return {units, predicate};
+}
+
+template <class L, class Unit>
+inline Write<L> result(Unit* units) {
+  return Write<L>(units);
+}
+
+template <class L, class Unit, class PredicateUnit, bool Clear>
+inline Predicated<L, Clear> result(UnitsUnder<Unit, PredicateUnit, Clear> out) {
+  return Predicated<L, Clear>(out.units, out.predicate);
+}
+
+// result lane i = rule(operand lanes i ...), for i = 0 .. Count - 1.
+template <int Count, class Out, class Rule, class... Operands>
+inline void lanes(const Out& out, Rule rule, const Operands&... operands) {
+  KASTARRI_LANES_INDEPENDENT
+  for (int i = 0; i < Count; ++i) out.put(i, rule(operands[i]...));
+}
+
+// Bit i of the result = rule(operand lanes i ...): comparisons. The lanes are LaneBits wide.
+template <int LaneBits, int Count, class PredicateUnit, class Rule, class... Operands>
+inline void lane_bits(PredicateUnit* out, Rule rule, const Operands&... operands) {
+  LaneMask<LaneBits, Count> holds;
+  KASTARRI_LANES_INDEPENDENT
+  for (int i = 0; i < Count; ++i) {
+    using M = typename LaneMask<LaneBits, Count>::lane_type;
+    holds.lane[i] = rule(operands[i]...) ? static_cast<M>(-1) : M{0};
+  }
+  holds.collect(out);
+}
+
+}  // namespace
+
+#endif

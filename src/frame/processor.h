@@ -1,0 +1,27 @@
+// Which targets the processor runs. The build says which ones there are, best first:
+// KASTARRI_FOR_TARGETS(X, ...) in the generated build_targets.h is X(avx512, ...) X(avx2, ...) ...
+#ifndef KASTARRI_FRAME_PROCESSOR_H
+#define KASTARRI_FRAME_PROCESSOR_H
+
+#include "build_targets.h"
+
+namespace {
+
+// Called while the library is being relocated: nothing here may call out of it.
+[[maybe_unused]] bool runs_avx512() {
+  __builtin_cpu_init();
+  return __builtin_cpu_supports("avx512f") && __builtin_cpu_supports("avx512bw") && __builtin_cpu_supports("avx512dq") &&
+         __builtin_cpu_supports("avx512vl");
+}
+
+[[maybe_unused]] bool runs_avx2() {
+  __builtin_cpu_init();
+  // Every processor with AVX2 and FMA converts half precision (F16C) as well.
+  return __builtin_cpu_supports("avx2") && __builtin_cpu_supports("fma");
+}
+
+[[maybe_unused]] bool runs_sse2() { return true; }
+
+}  // namespace
+
+#endif

@@ -1,0 +1,3 @@
+KASTARRI_ENTRIES_END
+
+#include "frame/rows_end.h"

@@ -1,0 +1,29 @@
+#include <algorithm>
+
+#include "support/drivers.h"
+
+namespace model {
+
+using testing_support::Int;
+
+// floor(a / 2^n)
+constexpr Int floor_shift(Int a, int n) {
+  const Int d = Int{1} << n;
+  return (a - ((a % d) + d) % d) / d;
+}
+
+constexpr auto PACKVR = [](Int acc, int count) {
+  const int s = count < 0 || count > 32 ? 32 : count;
+  // Half up: floor(acc / 2^s + 1/2), formed on twice the number.
+  return std::clamp<Int>(s == 0 ? acc : floor_shift(2 * acc + (Int{1} << s), s + 1), -32768, 32767);
+};
+constexpr auto PACKQ = [](Int acc) { return floor_shift(2 * acc + 0x8000, 16); };
+
+}  // namespace model
+
+#define KASTARRI_TEST_SUITE "pack"
+#include "support/drivers_begin.h"
+
+#include "multiply/pack.def"
+
+#include "support/drivers_end.h"

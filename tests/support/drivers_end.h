@@ -1,0 +1,3 @@
+}  // namespace
+
+#include "frame/rows_end.h"

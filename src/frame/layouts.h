@@ -45,6 +45,9 @@ using u16x16 = Layout<std::uint16_t, 16, 16>;
 using i24x64 = Layout<std::int32_t, 24, 64>;
 using i48x32 = Layout<std::int64_t, 48, 32>;
 using i64x16 = Layout<std::int64_t, 64, 16>;
+// The whole containers of an accumulator, for rules to which the bits above a lane make no difference.
+using u32x64 = Layout<std::uint32_t, 32, 64>;
+using u64x32 = Layout<std::uint64_t, 64, 32>;
 
 // The 16-bit and 32-bit images of the accumulators.
 using i16x64 = Layout<std::int16_t, 16, 64>;

@@ -1,13 +1,4 @@
+// Closes a list of tables of rows.
 #undef ENTRY
 #undef KERNEL
 #undef DOC
-#undef ROW
-#undef PROTO
-#undef LOAD_ROWS
-#undef LOAD_ROWS_T
-#undef STORE_ROWS
-#undef STORE_ROWS_T
-#undef REGISTER
-#undef HOST
-#undef HOST_BOTH
-#undef HOST_INTS

@@ -9,7 +9,8 @@ namespace {
 constexpr auto product = [](std::int16_t x, std::int16_t y) { return std::int64_t{std::int32_t{x} * y}; };
 
 constexpr auto MUL = [](auto x, auto y) { return product(x, y); };
-constexpr auto MULA = [](auto acc, auto x, auto y) { return unsigned_bits(acc) + unsigned_bits(product(x, y)); };
+// The whole container takes part: what stands above the lane's own bits is cut from the sum.
+constexpr auto MULA = [](auto acc, auto x, auto y) { return acc + unsigned_bits(product(x, y)); };
 
 }  // namespace
 

@@ -20,7 +20,7 @@ template <class L>
 std::vector<Int> corners() {
   std::vector<Int> values;
   if (L::bits <= 8) {
-    for (Int v = 0; v < Int{1} << L::bits; ++v) values.push_back(as_lane<L>(v));
+    for (Int v = 0; v < Int{1} << L::bits % 64; ++v) values.push_back(as_lane<L>(v));
     return values;
   }
   for (Int v = -3; v <= 3; ++v) values.push_back(as_lane<L>(v));
@@ -71,9 +71,9 @@ class Operands {
 
   template <class L>
   static std::vector<Int> values() {
-    if (operands > 1 || L::bits > 16) return corners<L>();
     std::vector<Int> all;
-    for (Int v = 0; v < Int{1} << L::bits; ++v) all.push_back(as_lane<L>(v));
+    if (operands > 1 || L::bits > 16) return corners<L>();
+    for (Int v = 0; v < Int{1} << L::bits % 64; ++v) all.push_back(as_lane<L>(v));
     return all;
   }
 

@@ -1,0 +1,95 @@
+// Times every exported intrinsic by its row: a call with operands in memory, as a kernel makes it.
+// tools/performance.py runs this for each target and makes the table of docs/performance.md.
+#include <benchmark/benchmark.h>
+
+#include <cstring>
+#include <random>
+#include <tuple>
+
+#include "frame/entry.h"
+#include "frame/shapes.h"
+
+namespace {
+
+// Memory for the operands that point to it, cache-line aligned.
+struct Arena {
+  alignas(64) unsigned char bytes[4096];
+};
+
+Arena arena;
+
+// An argument of an intrinsic: a register with random lanes, a pointer into the arena, a small count.
+template <class T>
+struct alignas(64) Argument {
+  T value;
+  Argument() {
+    std::minstd_rand random(1);
+    auto* bytes = reinterpret_cast<unsigned char*>(&value);
+    for (std::size_t i = 0; i < sizeof value; ++i) bytes[i] = static_cast<unsigned char>(random());
+  }
+  T& get() { return value; }
+};
+template <>
+struct Argument<int> {
+  int value = 3;
+  int& get() { return value; }
+};
+template <>
+struct Argument<unsigned> {
+  unsigned value = 3;
+  unsigned& get() { return value; }
+};
+template <class M>
+struct Argument<M*> {
+  M* value = reinterpret_cast<M*>(arena.bytes + 1024);
+  M*& get() { return value; }
+};
+template <class M>
+struct Argument<M**> {
+  M* pointer = reinterpret_cast<M*>(arena.bytes + 1024);
+  M** value = &pointer;
+  M**& get() {
+    pointer = reinterpret_cast<M*>(arena.bytes + 1024);
+    return value;
+  }
+};
+
+template <class T>
+using bare = std::remove_cv_t<std::remove_reference_t<T>>;
+
+template <class R, class... A>
+void time_calls(benchmark::State& state, R (*f)(A...)) {
+  alignas(64) std::tuple<Argument<bare<A>>...> arguments;
+  asm volatile("" : "+r"(f));  // a call, as from another library: the compiler knows nothing of it
+  for (auto _ : state) {
+    if constexpr (std::is_void_v<R>) {
+      std::apply([&](auto&... a) { f(a.get()...); }, arguments);
+      benchmark::ClobberMemory();
+    } else {
+      alignas(64) R result = std::apply([&](auto&... a) { return f(a.get()...); }, arguments);
+      asm volatile("" : : "m"(result) : "memory");
+    }
+  }
+}
+
+}  // namespace
+
+#define ENTRY(SYMBOL, SHAPE, ...)                             \
+  const auto* const timed_##SYMBOL = benchmark::RegisterBenchmark( \
+      #SYMBOL, [](benchmark::State& state) { time_calls(state, &KASTARRI_SYMBOL(SYMBOL)); });
+
+namespace {
+
+#include "frame/rows.h"
+
+#include "rows.def"
+
+#include "frame/rows_end.h"
+
+}  // namespace
+
+int main(int argc, char** argv) {
+  benchmark::Initialize(&argc, argv);
+  benchmark::AddCustomContext("target", cstub_Km_ZNB_Orbis_R5_64k_target());
+  benchmark::RunSpecifiedBenchmarks();
+}

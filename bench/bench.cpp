@@ -74,7 +74,7 @@ void time_calls(benchmark::State& state, R (*f)(A...)) {
 
 }  // namespace
 
-#define ENTRY(SYMBOL, SHAPE, ...)                             \
+#define ENTRY(SYMBOL, SHAPE, ...)                                  \
   const auto* const timed_##SYMBOL = benchmark::RegisterBenchmark( \
       #SYMBOL, [](benchmark::State& state) { time_calls(state, &KASTARRI_SYMBOL(SYMBOL)); });
 

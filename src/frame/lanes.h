@@ -43,8 +43,7 @@ class Same {
 template <class L>
 class Write {
  public:
-  explicit Write(void* register_image)
-      : lanes_(static_cast<in_memory<typename L::container>*>(register_image)) {}
+  explicit Write(void* register_image) : lanes_(static_cast<in_memory<typename L::container>*>(register_image)) {}
 
   template <class V>
   void put(int i, V value) const {

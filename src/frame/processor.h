@@ -10,8 +10,8 @@ namespace {
 // Called while the library is being relocated: nothing here may call out of it.
 [[maybe_unused]] bool runs_avx512() {
   __builtin_cpu_init();
-  return __builtin_cpu_supports("avx512f") && __builtin_cpu_supports("avx512bw") && __builtin_cpu_supports("avx512dq") &&
-         __builtin_cpu_supports("avx512vl");
+  return __builtin_cpu_supports("avx512f") && __builtin_cpu_supports("avx512bw") &&
+         __builtin_cpu_supports("avx512dq") && __builtin_cpu_supports("avx512vl");
 }
 
 [[maybe_unused]] bool runs_avx2() {

@@ -9,16 +9,16 @@
 
 // Conversions between registers and from and to host scalars.
 #define REGISTER(FROM, TO) PROTO(FROM##_rtor_##TO, rtor, FROM, TO)
-#define HOST(NAME, TYPE, TO)                    \
+#define HOST(NAME, TYPE, TO)                   \
   PROTO(NAME##_rtor_##TO, from_host, TYPE, TO) \
   PROTO(TO##_rtor_##NAME, to_host, TO, TYPE)
 #define HOST_BOTH HOST
-#define HOST_INTS(TO)               \
-  HOST(int8, signed char, TO)       \
-  HOST(uint8, unsigned char, TO)    \
-  HOST(int16, short, TO)            \
-  HOST(uint16, unsigned short, TO)  \
-  HOST(int32, int, TO)              \
+#define HOST_INTS(TO)              \
+  HOST(int8, signed char, TO)      \
+  HOST(uint8, unsigned char, TO)   \
+  HOST(int16, short, TO)           \
+  HOST(uint16, unsigned short, TO) \
+  HOST(int32, int, TO)             \
   HOST(uint32, unsigned int, TO)
 
 #endif

@@ -18,9 +18,9 @@
 // --- Lane-wise operations ---------------------------------------------------------------------------
 
 #define SIG_ab_r(SYMBOL, T, K) T SYMBOL(const T& a, const T& b)
-#define BODY_ab_r(T, K)                    \
-  T r;                                     \
-  KASTARRI_SEMANTIC(K)(a._, b._, r._);     \
+#define BODY_ab_r(T, K)                \
+  T r;                                 \
+  KASTARRI_SEMANTIC(K)(a._, b._, r._); \
   return r;
 
 #define SIG_ab_r_T(SYMBOL, T, P, K) void SYMBOL(T& r, const T& a, const T& b, const P& p)
@@ -35,21 +35,21 @@
 #define BODY_move(T) return from;
 
 #define SIG_rtor(SYMBOL, FROM, TO) TO SYMBOL(const FROM& from)
-#define BODY_rtor(FROM, TO)                                       \
-  TO r;                                                           \
-  convert<layout_of<FROM>, layout_of<TO>>(from._, r._);           \
+#define BODY_rtor(FROM, TO)                             \
+  TO r;                                                 \
+  convert<layout_of<FROM>, layout_of<TO>>(from._, r._); \
   return r;
 
 #define SIG_from_host(SYMBOL, H, TO) TO SYMBOL(H value)
-#define BODY_from_host(H, TO)                                     \
-  TO r;                                                           \
-  convert<host_layout<H>, layout_of<TO>>(&value, r._);            \
+#define BODY_from_host(H, TO)                          \
+  TO r;                                                \
+  convert<host_layout<H>, layout_of<TO>>(&value, r._); \
   return r;
 
 #define SIG_to_host(SYMBOL, FROM, H) H SYMBOL(const FROM& from)
-#define BODY_to_host(FROM, H)                                     \
-  H value;                                                        \
-  convert<layout_of<FROM>, host_layout<H>>(from._, &value);       \
+#define BODY_to_host(FROM, H)                               \
+  H value;                                                  \
+  convert<layout_of<FROM>, host_layout<H>>(from._, &value); \
   return value;
 
 #endif

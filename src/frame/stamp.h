@@ -12,41 +12,41 @@
 #define KERNEL(OP, FORM, ...) KERNEL_##FORM(OP, __VA_ARGS__)
 
 // Lane i of the result from lane i of the operands: result layout, rule, operand layouts.
-#define KERNEL_a(OP, R, RULE, A)                                  \
-  template <class Units, class Out>                               \
+#define KERNEL_a(OP, R, RULE, A)                                    \
+  template <class Units, class Out>                                 \
   static inline void KASTARRI_SEMANTIC(OP)(const Units* a, Out r) { \
-    lanes<R::count>(result<R>(r), RULE, Read<A>(a));              \
+    lanes<R::count>(result<R>(r), RULE, Read<A>(a));                \
   }
 #define KERNEL_ab(OP, R, RULE, A, B)                                                  \
   template <class UnitsA, class UnitsB, class Out>                                    \
   static inline void KASTARRI_SEMANTIC(OP)(const UnitsA* a, const UnitsB* b, Out r) { \
     lanes<R::count>(result<R>(r), RULE, Read<A>(a), Read<B>(b));                      \
   }
-#define KERNEL_abc(OP, R, RULE, A, B, C)                                                                \
-  template <class UnitsA, class UnitsB, class UnitsC, class Out>                                        \
-  static inline void KASTARRI_SEMANTIC(OP)(const UnitsA* a, const UnitsB* b, const UnitsC* c, Out r) {  \
-    lanes<R::count>(result<R>(r), RULE, Read<A>(a), Read<B>(b), Read<C>(c));                            \
+#define KERNEL_abc(OP, R, RULE, A, B, C)                                                               \
+  template <class UnitsA, class UnitsB, class UnitsC, class Out>                                       \
+  static inline void KASTARRI_SEMANTIC(OP)(const UnitsA* a, const UnitsB* b, const UnitsC* c, Out r) { \
+    lanes<R::count>(result<R>(r), RULE, Read<A>(a), Read<B>(b), Read<C>(c));                           \
   }
 
 // Bit i of a predicate from lane i of two operands of one layout: rule, layout.
-#define KERNEL_ab_bits(OP, RULE, L)                                               \
-  template <class Units, class Bits>                                              \
+#define KERNEL_ab_bits(OP, RULE, L)                                                   \
+  template <class Units, class Bits>                                                  \
   static inline void KASTARRI_SEMANTIC(OP)(const Units* a, const Units* b, Bits* r) { \
-    lane_bits<L::bits, L::count>(r, RULE, Read<L>(a), Read<L>(b));                \
+    lane_bits<L::bits, L::count>(r, RULE, Read<L>(a), Read<L>(b));                    \
   }
 
 // Lane i of the result from lane i of a and a count that all lanes share: result layout, rule, layout.
-#define KERNEL_a_count(OP, R, RULE, A)                                         \
-  template <class Units, class Out>                                            \
+#define KERNEL_a_count(OP, R, RULE, A)                                          \
+  template <class Units, class Out>                                             \
   static inline void KASTARRI_SEMANTIC(OP)(const Units* a, word count, Out r) { \
-    lanes<R::count>(result<R>(r), RULE(count), Read<A>(a));                    \
+    lanes<R::count>(result<R>(r), RULE(count), Read<A>(a));                     \
   }
 
 // Memory: lane i of a register from lane i in memory and the other way round, lane by lane.
-#define KERNEL_load(OP, R, RULE, M)                                    \
-  template <class Memory, class Out>                                   \
+#define KERNEL_load(OP, R, RULE, M)                                     \
+  template <class Memory, class Out>                                    \
   static inline void KASTARRI_SEMANTIC(OP)(const Memory* from, Out r) { \
-    lanes<R::count>(result<R>(r), RULE, Read<M>(from));                \
+    lanes<R::count>(result<R>(r), RULE, Read<M>(from));                 \
   }
 
 #define ENTRY(SYMBOL, SHAPE, ...) \

@@ -31,15 +31,15 @@ inline void store_where(const Units* v, const PredicateUnit* p, Memory* to) {
 #include "frame/stamp.h"
 
 // Every lane of the result is the one element in memory.
-#define KERNEL_replicate(OP, R, E)                                     \
-  template <class Memory, class Out>                                   \
+#define KERNEL_replicate(OP, R, E)                                      \
+  template <class Memory, class Out>                                    \
   static inline void KASTARRI_SEMANTIC(OP)(const Memory* from, Out r) { \
-    lanes<R::count>(result<R>(r), SAME, Same(Read<E>(from)[0]));       \
+    lanes<R::count>(result<R>(r), SAME, Same(Read<E>(from)[0]));        \
   }
-#define KERNEL_store_where(OP, L)                                                                         \
-  template <class Units, class PredicateUnit, class Memory>                                               \
-  static inline void KASTARRI_SEMANTIC(OP)(const Units* v, const PredicateUnit* p, Memory* to) {          \
-    store_where<L>(v, p, to);                                                                             \
+#define KERNEL_store_where(OP, L)                                                                \
+  template <class Units, class PredicateUnit, class Memory>                                      \
+  static inline void KASTARRI_SEMANTIC(OP)(const Units* v, const PredicateUnit* p, Memory* to) { \
+    store_where<L>(v, p, to);                                                                    \
   }
 
 #include "memory/vectors.def"

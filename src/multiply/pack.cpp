@@ -11,7 +11,8 @@ namespace {
 constexpr auto low_part = [](std::uint64_t lane) {
   const auto low = static_cast<std::int32_t>(lane);
   const auto high = static_cast<std::int16_t>(lane >> 32);
-  const std::int32_t bound = high < 0 ? std::numeric_limits<std::int32_t>::min() : std::numeric_limits<std::int32_t>::max();
+  const std::int32_t bound =
+      high < 0 ? std::numeric_limits<std::int32_t>::min() : std::numeric_limits<std::int32_t>::max();
   return high == low >> 31 ? low : bound;
 };
 constexpr auto high_part = [](std::uint64_t lane) { return static_cast<std::int32_t>(lane >> 16); };
@@ -33,16 +34,17 @@ constexpr auto PACKQ = [](std::uint64_t lane) { return (2 * static_cast<word>(la
 #include "frame/stamp.h"
 
 // Shift by one count for all lanes, clamped to 32, round, saturate: result layout, rounding.
-#define KERNEL_pack48(OP, R, ROUNDING)                                                                   \
-  template <class Units, class Out>                                                                      \
-  static inline void KASTARRI_SEMANTIC(OP)(const Units* acc, word count, Out r) {                        \
-    const word s = count > 32 ? 32 : count;                                                              \
-    const ROUNDING shift(s > 16 ? s - 16 : s);                                                           \
-    const Read<u64x32> lane(acc);                                                                        \
-    const auto pack = [&](auto part) {                                                                   \
-      lanes<R::count>(result<R>(r), [=](std::uint64_t v) { return saturate<R::container>(shift(part(v))); }, lane); \
-    };                                                                                                   \
-    s > 16 ? pack(high_part) : pack(low_part);                                                           \
+#define KERNEL_pack48(OP, R, ROUNDING)                                                                  \
+  template <class Units, class Out>                                                                     \
+  static inline void KASTARRI_SEMANTIC(OP)(const Units* acc, word count, Out r) {                       \
+    const word s = count > 32 ? 32 : count;                                                             \
+    const ROUNDING shift(s > 16 ? s - 16 : s);                                                          \
+    const Read<u64x32> lane(acc);                                                                       \
+    const auto pack = [&](auto part) {                                                                  \
+      lanes<R::count>(                                                                                  \
+          result<R>(r), [=](std::uint64_t v) { return saturate<R::container>(shift(part(v))); }, lane); \
+    };                                                                                                  \
+    s > 16 ? pack(high_part) : pack(low_part);                                                          \
   }
 
 #include "multiply/pack.def"

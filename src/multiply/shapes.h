@@ -9,15 +9,15 @@
 #define BODY_acc_ab(W, A, B, K) KASTARRI_SEMANTIC(K)(acc._, a._, b._, acc._);
 
 #define SIG_w_r(SYMBOL, R, W, K) R SYMBOL(const W& acc)
-#define BODY_w_r(R, W, K)                  \
-  R r;                                     \
-  KASTARRI_SEMANTIC(K)(acc._, r._);        \
+#define BODY_w_r(R, W, K)           \
+  R r;                              \
+  KASTARRI_SEMANTIC(K)(acc._, r._); \
   return r;
 
 #define SIG_w_r_shift(SYMBOL, R, W, COUNT, K) R SYMBOL(const W& acc, COUNT shift)
-#define BODY_w_r_shift(R, W, COUNT, K)                         \
-  R r;                                                         \
-  KASTARRI_SEMANTIC(K)(acc._, static_cast<word>(shift), r._);  \
+#define BODY_w_r_shift(R, W, COUNT, K)                        \
+  R r;                                                        \
+  KASTARRI_SEMANTIC(K)(acc._, static_cast<word>(shift), r._); \
   return r;
 
 #endif

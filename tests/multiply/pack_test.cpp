@@ -22,7 +22,8 @@ constexpr auto PACKQ = [](Int acc) { return floor_shift(2 * (acc & 0xFFFFFFFF) +
 }  // namespace model
 
 #define KASTARRI_TEST_SUITE "pack"
-#define KERNEL_pack48(OP, R, ROUNDING) constexpr auto model_##OP = testing_support::model_of<R, i48x32>(model::ROUNDING);
+#define KERNEL_pack48(OP, R, ROUNDING) \
+  constexpr auto model_##OP = testing_support::model_of<R, i48x32>(model::ROUNDING);
 #include "support/drivers_begin.h"
 
 #include "multiply/pack.def"

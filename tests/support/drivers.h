@@ -46,8 +46,9 @@ void expect_lanes(const std::string& name, int round, const Int (&expected)[L::c
   if (same_bits(image, got)) return;
   for (int i = 0; i < L::count; ++i) {
     if (lane<L>(image._, i) != lane<L>(got._, i)) {
-      FAIL() << name << " [" << cstub_Km_ZNB_Orbis_R5_64k_target() << ", seed " << seed << ", round " << round << "] lane "
-             << i << ": " << operands_of(i) << " expected " << lane<L>(image._, i) << ", got " << lane<L>(got._, i);
+      FAIL() << name << " [" << cstub_Km_ZNB_Orbis_R5_64k_target() << ", seed " << seed << ", round " << round
+             << "] lane " << i << ": " << operands_of(i) << " expected " << lane<L>(image._, i) << ", got "
+             << lane<L>(got._, i);
     }
   }
   FAIL() << name << " [" << cstub_Km_ZNB_Orbis_R5_64k_target() << ", round " << round
@@ -97,9 +98,8 @@ void drive_a_r(const std::string& name, const Model& model, R (*f)(const A&)) {
 
 template <class Model, class R, class A, class B>
 void drive_ab_r(const std::string& name, const Model& model, R (*f)(const A&, const B&)) {
-  check(name, model, [f](const auto* images) {
-    return f(as_register<A>(images[0].bytes), as_register<B>(images[1].bytes));
-  });
+  check(name, model,
+        [f](const auto* images) { return f(as_register<A>(images[0].bytes), as_register<B>(images[1].bytes)); });
 }
 
 // The destination takes part as the first operand: it is read and written.
@@ -149,11 +149,14 @@ class Destination {
 template <class Model, class R, class A, class B, class P>
 void drive_ab_r_T(const std::string& name, const Model& model, void (*f)(R&, const A&, const B&, const P&)) {
   Destination<R, P> destination;
-  check(name, model, [&](const auto* images) {
-    R r = destination.old;
-    f(r, as_register<A>(images[0].bytes), as_register<B>(images[1].bytes), destination.p);
-    return r;
-  }, std::ref(destination));
+  check(
+      name, model,
+      [&](const auto* images) {
+        R r = destination.old;
+        f(r, as_register<A>(images[0].bytes), as_register<B>(images[1].bytes), destination.p);
+        return r;
+      },
+      std::ref(destination));
   // The destination handed in as both operands: a lane reads its own lane before it is written.
   if constexpr (std::is_same_v<R, A> && std::is_same_v<R, B>) {
     check(name + " in place", model, [&](const auto* images) {

@@ -8,10 +8,10 @@
 #define KERNEL_ab_bits(OP, RULE, L) \
   constexpr auto model_##OP = testing_support::model_of<Layout<word, 1, L::count, predicate_bit>, L, L>(model::RULE);
 
-#define ENTRY(SYMBOL, SHAPE, ...)                                                                         \
-  const int tested_##SYMBOL = testing_support::add_test(                                                  \
-      KASTARRI_TEST_SUITE, testing_support::operation(#SYMBOL),                                           \
-      [] { TEST_##SHAPE(testing_support::operation(#SYMBOL), &KASTARRI_SYMBOL(SYMBOL), __VA_ARGS__); });
+#define ENTRY(SYMBOL, SHAPE, ...)                                                                                      \
+  const int tested_##SYMBOL = testing_support::add_test(KASTARRI_TEST_SUITE, testing_support::operation(#SYMBOL), [] { \
+    TEST_##SHAPE(testing_support::operation(#SYMBOL), &KASTARRI_SYMBOL(SYMBOL), __VA_ARGS__);                          \
+  });
 
 #define TEST_ab_r(NAME, F, T, K) testing_support::drive_ab_r(NAME, model_##K, F)
 #define TEST_ab_r_T(NAME, F, T, P, K) testing_support::drive_ab_r_T(NAME, model_##K, F)

@@ -27,7 +27,8 @@ std::vector<Int> corners() {
   for (Int v : {-70, -40, -33, -32, -31, -20, -17, -16, -15, -8, 7, 8, 15, 16, 17, 31, 32, 33, 40, 64, 70, 1000})
     values.push_back(as_lane<L>(v));
   for (int k = 2; k < L::bits; ++k)
-    for (Int d = -1; d <= 1; ++d) values.push_back(as_lane<L>(static_cast<Int>((std::uint64_t{1} << k) + static_cast<std::uint64_t>(d))));
+    for (Int d = -1; d <= 1; ++d)
+      values.push_back(as_lane<L>(static_cast<Int>((std::uint64_t{1} << k) + static_cast<std::uint64_t>(d))));
   for (std::uint64_t pattern : {0x5555555555555555u, 0xAAAAAAAAAAAAAAAAu, 0x123456789ABCDEFu})
     values.push_back(as_lane<L>(static_cast<Int>(pattern)));
   std::sort(values.begin(), values.end());
@@ -61,7 +62,8 @@ class Operands {
 
   // The images of round n; call in order.
   const Image* round(int n) {
-    n < cross_rounds() ? fill_cross(n, std::index_sequence_for<Ls...>{}) : fill_random(std::index_sequence_for<Ls...>{});
+    n < cross_rounds() ? fill_cross(n, std::index_sequence_for<Ls...>{})
+                       : fill_random(std::index_sequence_for<Ls...>{});
     return images_;
   }
 
@@ -96,7 +98,8 @@ class Operands {
     const auto fill = [&](auto layout, int operand) {
       using L = typename decltype(layout)::type;
       for (int i = 0; i < L::count; ++i)
-        set_lane<L>(images_[operand].bytes, i, corner(operand, static_cast<std::size_t>(n) * lanes + static_cast<std::size_t>(i)));
+        set_lane<L>(images_[operand].bytes, i,
+                    corner(operand, static_cast<std::size_t>(n) * lanes + static_cast<std::size_t>(i)));
     };
     (fill(layout_tag<Ls>{}, I), ...);
   }

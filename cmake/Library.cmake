@@ -11,7 +11,9 @@ file(GLOB KASTARRI_VECTOR_SOURCES CONFIGURE_DEPENDS
   ${PROJECT_SOURCE_DIR}/src/integer/*.cpp ${PROJECT_SOURCE_DIR}/src/memory/*.cpp
   ${PROJECT_SOURCE_DIR}/src/multiply/*.cpp ${PROJECT_SOURCE_DIR}/src/float/*.cpp)
 list(APPEND KASTARRI_VECTOR_SOURCES ${PROJECT_SOURCE_DIR}/src/frame/conversions.cpp)
-set(KASTARRI_SCALAR_SOURCES ${PROJECT_SOURCE_DIR}/src/frame/library.cpp)
+set(KASTARRI_SCALAR_SOURCES
+  ${PROJECT_SOURCE_DIR}/src/frame/library.cpp ${PROJECT_SOURCE_DIR}/src/frame/failure.cpp
+  ${PROJECT_SOURCE_DIR}/src/frame/state.cpp)
 
 foreach(target IN LISTS KASTARRI_TARGETS)
   if(NOT target IN_LIST KASTARRI_KNOWN_TARGETS)

@@ -8,6 +8,7 @@
 #define KASTARRI_H
 
 #include "kastarri/library.h"
+#include "kastarri/state.h"
 #include "kastarri/types.h"
 
 #include "kastarri/conversions.h"

@@ -94,12 +94,12 @@ def read_types():
         if kind == "register":
             source, target = types[fields[0]], types[fields[1]]
             target.sources.append((f"const {source.cls}&", f"{source.name}_rtor_{target.name}"))
-            source.targets.append((target.cls, "", f"{source.name}_rtor_{target.name}"))
+            source.targets.append((target.cls, f"{source.name}_rtor_{target.name}"))
         else:
             name, host, target = fields[0], fields[1], types[fields[2]]
             target.sources.append((host, f"{name}_rtor_{target.name}"))
             if kind == "both":
-                target.targets.append((host, " const", f"{target.name}_rtor_{name}"))
+                target.targets.append((host, f"{target.name}_rtor_{name}"))
     return types
 
 
@@ -124,7 +124,9 @@ def types_header(types):
         "",
         "/* Each register type T is the class T_ in namespace T_space, named cstub_Km_ZNB_Orbis_R5_64k_T. A value is",
         "   its member array and nothing else: lanes lie in it little-endian, lane 0 in the lowest bits. A new value",
-        "   is uninitialised. Conversions are those of the library (conversions.h). */",
+        "   is uninitialised. Conversions are those of the library (conversions.h): between registers the operator",
+        "   of the source converts implicitly and the constructor is explicit, for with both implicit `To t = from`",
+        "   is ambiguous or draws warnings. */",
         "",
     ]
     body += [f"namespace {t.name}_space {{ class {t.name}_; }}" for t in types.values()]
@@ -134,9 +136,9 @@ def types_header(types):
         size = t.units * t.unit_bits // 8
         body += [f"/// {t.meaning}: {t.shape} ({size} {'byte' if size == 1 else 'bytes'}).", f"namespace {t.name}_space {{",
                  f"class {t.name}_ {{", " public:", f"  {t.name}_() = default;"]
-        body += [f"  inline {t.name}_({source} from);" for source, _ in t.sources]
+        body += [f"  {'explicit ' * source.endswith('&')}inline {t.name}_({source} from);" for source, _ in t.sources]
         body += [f"  inline {t.name}_& operator=({source} from);" for source, _ in t.sources]
-        body += [f"  inline operator {target}(){const};" for target, const, _ in t.targets]
+        body += [f"  inline operator {target}() const;" for target, _ in t.targets]
         body += ["", f"  {t.unit} _[{t.units}];", "};", "}", ""]
     return body
 
@@ -149,8 +151,8 @@ def conversion_bodies(types):
             call = f"*this = {symbol('rk_zra32_' + name)}(from);"
             body += [f"inline {t.cls}::{t.name}_({source} from) {{ {call} }}",
                      f"inline {t.cls}& {t.cls}::operator=({source} from) {{ return {call} }}"]
-        for target, const, name in t.targets:
-            body.append(f"inline {t.cls}::operator {target}(){const} {{ return {symbol('rk_zra32_' + name)}(*this); }}")
+        for target, name in t.targets:
+            body.append(f"inline {t.cls}::operator {target}() const {{ return {symbol('rk_zra32_' + name)}(*this); }}")
     return body
 
 
@@ -227,9 +229,15 @@ def tables_by_family():
     return {name: tables for name, tables in families.items() if tables}
 
 
+def all_rows():
+    """The rows of every family: header -> (title, tables, rows)."""
+    types = read_types()
+    return {name: (FAMILIES[name], tables, read_rows(tables, types)) for name, tables in tables_by_family().items()}
+
+
 def outputs():
     types = read_types()
-    families = {name: (FAMILIES[name], tables, read_rows(tables, types)) for name, tables in tables_by_family().items()}
+    families = all_rows()
     headers = {"types": header_text("types", "The register types of the core", "src/frame/types.def and conversions.def",
                                     types_header(types) + ['#include "kastarri/conversions.h"'])}
     for name, (title, tables, rows) in families.items():
@@ -242,7 +250,7 @@ def outputs():
     headers["names"] = header_text(
         "names", "The names of the core's own sources: ZRA_ADDNX16, qv_vecNx16, ...; RK_ before operations of the scalar core.\n"
         "/// They are macros; kastarri/names_undo.h takes them all back", "all tables",
-        [f"#define {a} {b}" for a, b in short])
+        ['#include "kastarri.h"', ""] + [f"#define {a} {b}" for a, b in short])
     headers["names_undo"] = "\n".join(
         ["/// Takes back the short names of kastarri/names.h, which can be included again afterwards.",
          GENERATED.format(source="all tables").rstrip(), f"#undef {guard('names')}"] + [f"#undef {a}" for a, _ in short]) + "\n"

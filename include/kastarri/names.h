@@ -4,6 +4,8 @@
 #ifndef KASTARRI_NAMES
 #define KASTARRI_NAMES
 
+#include "kastarri.h"
+
 #define qv_vec2Nx8 cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
 #define qv_vec2Nx8U cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
 #define qv_vecNx16 cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16

@@ -29,7 +29,8 @@ FAMILIES = {
     "multiply": "Multiplies, wide accumulators, packs",
     "float": "Floating point",
 }
-FRAME_TABLES = {"moves": "conversions", "conversions": "conversions"}
+FRAME_TABLES = {"moves": "conversions", "conversions": "conversions",
+                "ports": "scalar", "scalar": "scalar", "funnel": "scalar", "access": "scalar"}
 CONVERSION_TABLES = ["frame/conversions.def", "float/conversions.def"]
 
 UNITS = {"word": ("unsigned int", 32), "half": ("unsigned short", 16), "byte": ("unsigned char", 8)}
@@ -104,7 +105,8 @@ def read_types():
 
 
 def symbol(name):
-    return f"{PREFIX}_KOR_{name}"
+    """The exported symbol of a row: an intrinsic's name has its package, a helper's has none."""
+    return f"{PREFIX}_KOR_{name}" if name.startswith("rk_") else PREFIX + name
 
 
 def guard(header):
@@ -174,6 +176,7 @@ def read_rows(tables, types):
         doc = ""
         for kind, fields in records('#include "frame/shapes.h"\n#define DOC(...) @doc{__VA_ARGS__}@\n'
                                     '#define ENTRY(SYMBOL, SHAPE, ...) @row{SYMBOL@,SIG_##SHAPE(SYMBOL, __VA_ARGS__)}@\n'
+                                    '#define HELPER ENTRY\n'
                                     f'#include "frame/rows.h"\n#include "{table}"\n'):
             if kind == "doc":
                 doc = unquote(fields[0])
@@ -203,7 +206,7 @@ def family_body(rows, types):
         group = list(group)
         used = [t for t in types.values() if any(re.search(PREFIX + t.name + r"\b", prototype) for _, prototype, *_ in group)]
         body += [""] + [f"/// {line}" for line in wrap(doc + ".")]
-        if len(used) <= 8:
+        if 0 < len(used) <= 8:
             body += [f"/// {line}" for line in wrap("Lanes: " + "; ".join(f"{t.name} {t.shape}" for t in used) + ".")]
         body.append(f"/// Rule: src/{table}")
         for _, prototype, *_ in group:
@@ -213,14 +216,19 @@ def family_body(rows, types):
 
 def short_name(name):
     """ZRA_ADDNX16 of rk_zra32_ZRA_ADDNX16; moves, conversions and scalarfp_ names lose their package too."""
-    package = re.match(r"rk_[a-z0-9]+_", name).group(0)
-    rest = name[len(package):]
+    package, rest = re.match(r"(rk_[a-z0-9]+_)?(.*)", name).groups()
     return rest if package in ("rk_zra32_", "rk_zran_") or rest.startswith("uint32_") else f"RK_{rest}"
 
 
+def listed_tables():
+    """The tables that the library is made of, in their order."""
+    lists = [open(os.path.join(ROOT, "src", name), encoding="utf-8").read() for name in ("scalar_rows.def", "rows.def")]
+    return re.findall(r'^#include "(.*)"', "".join(lists), re.M)
+
+
 def tables_by_family():
-    """The tables of src/rows.def by the header that declares their rows."""
-    listed = re.findall(r'^#include "(.*)"', open(os.path.join(ROOT, "src", "rows.def"), encoding="utf-8").read(), re.M)
+    """The listed tables by the header that declares their rows."""
+    listed = listed_tables()
     families = {name: [] for name in FAMILIES}
     for table in listed + [t for t in CONVERSION_TABLES if t not in listed]:
         directory, name = os.path.splitext(table)[0].split("/")

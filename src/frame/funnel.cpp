@@ -19,9 +19,7 @@ void exchange_sar(word& r) {
   r = old;
 }
 
-word funnel(word hi, word lo, word amount) {
-  return static_cast<word>((std::uint64_t{hi} << 32 | lo) >> amount);
-}
+word funnel(word hi, word lo, word amount) { return static_cast<word>((std::uint64_t{hi} << 32 | lo) >> amount); }
 
 }  // namespace
 

@@ -114,7 +114,7 @@ class Headers(unittest.TestCase):
                 self.compile(compiler, "-x", "c++", "-", text=program)
 
 
-DEFINED_TABLES = set(re.findall(r'^#include "(.*)"', open(os.path.join(ROOT, "src", "rows.def"), encoding="utf-8").read(), re.M))
+DEFINED_TABLES = set(generate_headers.listed_tables())
 
 if __name__ == "__main__":
     unittest.main(argv=[sys.argv[0]])

@@ -34,7 +34,7 @@ def declared():
     """The names that the public headers declare as exported."""
     names = set()
     for path in glob.glob(os.path.join(ROOT, "include", "kastarri", "*.h")):
-        for declaration in re.findall(r"^(?:extern )?KASTARRI_API ([^;]*);", open(path, encoding="utf-8").read(), re.M):
+        for declaration in re.findall(r"^(?:extern |\[\[noreturn\]\] )*KASTARRI_API ([^;]*);", open(path, encoding="utf-8").read(), re.M):
             names.add(re.findall(r"\bcstub_\w+(?=\(|\[|$)", declaration)[0])
     return names
 

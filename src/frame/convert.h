@@ -7,6 +7,7 @@
 #include "frame/arithmetic.h"
 #include "frame/entry.h"
 #include "frame/lanes.h"
+#include "frame/spill.h"
 
 namespace {
 
@@ -32,38 +33,21 @@ constexpr bool is_predicate = std::is_same_v<typename L::number, predicate_bit>;
 // A value goes over as it is: wider lanes take its extension, narrower ones its low bits.
 constexpr auto same_value = [](auto value) { return value; };
 
-// A wide register and its spill image: lane k of w bits is bits wk .. wk + w - 1 of the image. Four
-// 24-bit lanes make three words, and so do the four words of two 48-bit lanes.
-using word_in_memory = in_memory<word>;
-
-template <class From>
-inline void spill(const void* from, void* to) {
-  const auto* source = static_cast<const word_in_memory*>(from);
-  auto* image = static_cast<word_in_memory*>(to);
-  KASTARRI_LANES_INDEPENDENT
-  for (int g = 0; g < 16; ++g) {
-    const word w0 = source[4 * g], w1 = source[4 * g + 1], w2 = source[4 * g + 2], w3 = source[4 * g + 3];
-    constexpr bool bytes = From::bits == 24;
-    image[3 * g] = bytes ? (w0 & 0xFFFFFF) | w1 << 24 : w0;
-    image[3 * g + 1] = bytes ? (w1 >> 8 & 0xFFFF) | w2 << 16 : (w1 & 0xFFFF) | w2 << 16;
-    image[3 * g + 2] = bytes ? (w2 >> 16 & 0xFF) | w3 << 8 : w2 >> 16 | w3 << 16;
-  }
-}
-
-template <class To>
-inline void unspill(const void* from, void* to) {
-  const auto* image = static_cast<const word_in_memory*>(from);
-  auto* target = static_cast<word_in_memory*>(to);
-  const auto lane24 = [](word w) { return static_cast<word>(canonical<i24x64>(w)); };
-  const auto high48 = [](word w) { return static_cast<word>(static_cast<std::int16_t>(w)); };
-  KASTARRI_LANES_INDEPENDENT
-  for (int g = 0; g < 16; ++g) {
-    const word w0 = image[3 * g], w1 = image[3 * g + 1], w2 = image[3 * g + 2];
-    constexpr bool bytes = To::bits == 24;
-    target[4 * g] = bytes ? lane24(w0) : w0;
-    target[4 * g + 1] = bytes ? lane24(w0 >> 24 | w1 << 8) : high48(w1);
-    target[4 * g + 2] = bytes ? lane24(w1 >> 16 | w2 << 16) : w1 >> 16 | w2 << 16;
-    target[4 * g + 3] = bytes ? lane24(w2 >> 8) : high48(w2 >> 16);
+// Every lane the same value. A lane of two words is written as words: a 64-bit scalar would reach the
+// vector registers through memory, in halves, and wait there.
+template <class L, class V>
+inline void replicate(const Write<L>& to, V value) {
+  if constexpr (std::is_integral_v<V> && sizeof(typename L::container) == 8) {
+    const auto container = static_cast<std::uint64_t>(canonical<L>(value));
+    const auto low = static_cast<word>(container), high = static_cast<word>(container >> 32);
+    auto* words = static_cast<in_memory<word>*>(to.image());
+    KASTARRI_LANES_INDEPENDENT
+    for (int i = 0; i < L::count; ++i) {
+      words[2 * i] = low;
+      words[2 * i + 1] = high;
+    }
+  } else {
+    lanes<L::count>(to, same_value, Same(value));
   }
 }
 
@@ -74,7 +58,7 @@ inline void convert_lanes(const Read<From>& from, const Write<To>& to, Rule rule
   if constexpr (From::count == To::count) {
     lanes<To::count>(to, rule, from);
   } else if constexpr (From::count == 1) {
-    lanes<To::count>(to, rule, Same(from[0]));
+    replicate(to, rule(from[0]));
   } else {
     static_assert(To::count == 1);
     to.put(0, rule(from[0]));

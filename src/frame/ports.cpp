@@ -7,6 +7,9 @@
 
 namespace {
 
+// Found once an intrinsic, where processor() would be found anew after every handler.
+cstub_Km_ZNB_Orbis_R5_64k_processor_t& core = cstub_Km_ZNB_Orbis_R5_64k_proc;
+
 // What handlers are given of a port: its internal record begins with the members of the public one.
 template <class Public, class Port>
 const Public* public_record(const Port& port) {
@@ -21,19 +24,17 @@ Handler needed(Handler handler, const char* kind, const char* name) {
 
 // --- Input queue ----------------------------------------------------------------------------------------
 
-const auto* input_queue() { return public_record<cstub_InputQueue_t>(processor().IPQ); }
+const auto* input_queue() { return public_record<cstub_InputQueue_t>(core.IPQ); }
 
-bool input_ready() {
-  return needed(processor().IPQ.entry_handler, "InputQueue", processor().IPQ.name)(input_queue()) != 0;
-}
+bool input_ready() { return needed(core.IPQ.entry_handler, "InputQueue", core.IPQ.name)(input_queue()) != 0; }
 
-auto input_data_handler() { return needed(processor().IPQ.data_handler, "InputQueue", processor().IPQ.name); }
+auto input_data_handler() { return needed(core.IPQ.data_handler, "InputQueue", core.IPQ.name); }
 
-void fetch(unsigned flag) { input_data_handler()(input_queue(), flag, processor().IPQ.data); }
+void fetch(unsigned flag) { input_data_handler()(input_queue(), flag, core.IPQ.data); }
 
 word read_input() {
   fetch(0);
-  return processor().IPQ.data[0];
+  return core.IPQ.data[0];
 }
 
 void read_input_now(unsigned& value, rkbool& ok) {
@@ -50,14 +51,12 @@ void read_input_now(unsigned& value, rkbool& ok) {
 
 // --- Output queue ---------------------------------------------------------------------------------------
 
-const auto* output_queue() { return public_record<cstub_OutputQueue_t>(processor().OPQ); }
+const auto* output_queue() { return public_record<cstub_OutputQueue_t>(core.OPQ); }
 
-bool output_ready() {
-  return needed(processor().OPQ.entry_handler, "OutputQueue", processor().OPQ.name)(output_queue()) != 0;
-}
+bool output_ready() { return needed(core.OPQ.entry_handler, "OutputQueue", core.OPQ.name)(output_queue()) != 0; }
 
 void send(unsigned flag, const word* data) {
-  needed(processor().OPQ.data_handler, "OutputQueue", processor().OPQ.name)(output_queue(), flag, data);
+  needed(core.OPQ.data_handler, "OutputQueue", core.OPQ.name)(output_queue(), flag, data);
 }
 
 rkbool write_output_now(word value) {
@@ -70,56 +69,56 @@ rkbool write_output_now(word value) {
 
 // --- Exported state -------------------------------------------------------------------------------------
 
-auto state_handler() { return needed(processor().EXPSTATE.handler, "ExportState", processor().EXPSTATE.name); }
+auto state_handler() { return needed(core.EXPSTATE.handler, "ExportState", core.EXPSTATE.name); }
 
-const auto* exported_state() { return public_record<cstub_ExportState_t>(processor().EXPSTATE); }
+const auto* exported_state() { return public_record<cstub_ExportState_t>(core.EXPSTATE); }
 
 void export_state(word value) {
   state_handler()(exported_state(), &value);
-  processor().states.EXPSTATE = value;
+  core.states.EXPSTATE = value;
 }
 
 void export_masked(word value, word mask) {
   const auto handler = state_handler();
-  const word merged = (processor().states.EXPSTATE & ~mask) | (value & mask);
-  processor().states.EXPSTATE = merged;
+  const word merged = (core.states.EXPSTATE & ~mask) | (value & mask);
+  core.states.EXPSTATE = merged;
   handler(exported_state(), &merged);
 }
 
 // --- Imported wire --------------------------------------------------------------------------------------
 
 word read_wire() {
-  const auto handler = needed(processor().IMPWIRE.handler, "ImportWire", processor().IMPWIRE.name);
+  const auto handler = needed(core.IMPWIRE.handler, "ImportWire", core.IMPWIRE.name);
   word value = 0;
-  handler(public_record<cstub_ImportWire_t>(processor().IMPWIRE), &value);
+  handler(public_record<cstub_ImportWire_t>(core.IMPWIRE), &value);
   return value;
 }
 
 }  // namespace
 
 void cstub_Km_ZNB_Orbis_R5_64k_register_EXPSTATE(void* user_object, cstub_ExportState_func_t handler) {
-  processor().EXPSTATE.user_object = user_object;
-  processor().EXPSTATE.handler = handler;
+  core.EXPSTATE.user_object = user_object;
+  core.EXPSTATE.handler = handler;
 }
 
 void cstub_Km_ZNB_Orbis_R5_64k_register_IPQ(void* user_object, cstub_InputQueue_Entry_func_t entry,
                                             cstub_InputQueue_Data_func_t data) {
-  processor().IPQ.user_object = user_object;
-  processor().IPQ.data = processor().cstub_IPQ_data;
-  processor().IPQ.entry_handler = entry;
-  processor().IPQ.data_handler = data;
+  core.IPQ.user_object = user_object;
+  core.IPQ.data = core.cstub_IPQ_data;
+  core.IPQ.entry_handler = entry;
+  core.IPQ.data_handler = data;
 }
 
 void cstub_Km_ZNB_Orbis_R5_64k_register_OPQ(void* user_object, cstub_OutputQueue_Entry_func_t entry,
                                             cstub_OutputQueue_Data_func_t data) {
-  processor().OPQ.user_object = user_object;
-  processor().OPQ.entry_handler = entry;
-  processor().OPQ.data_handler = data;
+  core.OPQ.user_object = user_object;
+  core.OPQ.entry_handler = entry;
+  core.OPQ.data_handler = data;
 }
 
 void cstub_Km_ZNB_Orbis_R5_64k_register_IMPWIRE(void* user_object, cstub_ImportWire_func_t handler) {
-  processor().IMPWIRE.user_object = user_object;
-  processor().IMPWIRE.handler = handler;
+  core.IMPWIRE.user_object = user_object;
+  core.IMPWIRE.handler = handler;
 }
 
 #include "frame/scalar_stamp.h"

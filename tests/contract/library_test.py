@@ -8,6 +8,7 @@ import os
 import re
 import subprocess
 import sys
+import tempfile
 import unittest
 
 ROOT = os.path.dirname(os.path.dirname(os.path.dirname(os.path.abspath(__file__))))
@@ -112,6 +113,18 @@ class Headers(unittest.TestCase):
         for compiler in COMPILERS:
             with self.subTest(compiler=compiler):
                 self.compile(compiler, "-x", "c++", "-", text=program)
+
+
+class Documents(unittest.TestCase):
+    def test_the_kernel_of_the_readme_prints_what_the_readme_says(self):
+        readme = open(os.path.join(ROOT, "README.md"), encoding="utf-8").read()
+        program = re.search(r"```cpp\n(.*?)```", readme, re.S)[1]
+        printed = re.search(r"It prints `(.*?)`", readme)[1]
+        with tempfile.TemporaryDirectory() as directory:
+            binary = os.path.join(directory, "kernel")
+            subprocess.run(["g++", *USER_FLAGS, "-x", "c++", "-", "-x", "none", LIBRARY, "-o", binary,
+                            "-Wl,-rpath," + os.path.dirname(LIBRARY)], input=program, text=True, check=True)
+            self.assertEqual(output(binary).strip(), printed)
 
 
 DEFINED_TABLES = set(generate_headers.listed_tables())

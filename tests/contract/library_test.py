@@ -116,6 +116,10 @@ class Headers(unittest.TestCase):
 
 
 class Documents(unittest.TestCase):
+    def test_coverage_is_that_of_the_rows(self):
+        check = subprocess.run([sys.executable, os.path.join(ROOT, "tools", "coverage.py"), "--check"], check=False)
+        self.assertEqual(check.returncode, 0, "run `make headers`")
+
     def test_the_kernel_of_the_readme_prints_what_the_readme_says(self):
         readme = open(os.path.join(ROOT, "README.md"), encoding="utf-8").read()
         program = re.search(r"```cpp\n(.*?)```", readme, re.S)[1]

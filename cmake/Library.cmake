@@ -79,7 +79,7 @@ function(kastarri_finish_library name directory)
   if(NOT KASTARRI_SANITIZE)
     # Nothing but libc at run time: no C++ library, and the compiler's own helpers from its archive.
     set_target_properties(${name} PROPERTIES LINKER_LANGUAGE C)
-    target_link_options(${name} PRIVATE -static-libgcc -Wl,--no-undefined)
+    target_link_options(${name} PRIVATE -static-libgcc -Wl,--as-needed -Wl,--no-undefined)
   endif()
 endfunction()
 

@@ -74,7 +74,7 @@ class AccessDeathTest : public testing::Test {
     for (const auto& [base_part, offset] : {std::pair{0u, 1}, {1u, 0}, {1u, -2}, {2u, 1}, {0u, 2}, {3u, 3}}) {
       const unsigned address = base + base_part + static_cast<unsigned>(offset);
       const auto* pointer = reinterpret_cast<const T*>(base + base_part);
-      if (address % sizeof(T) != 0) expect_failure(name, address, [&] { access(pointer, offset); });
+      if (address % sizeof(T) != 0) expect_failure(name, address, [&, by = offset] { access(pointer, by); });
     }
   }
 

@@ -43,7 +43,7 @@ constexpr auto ABSS = [](auto x) {
   return unsigned_bits(magnitude) + unsigned_bits(sign_fill(magnitude));
 };
 
-constexpr auto ABSSUB = [](auto x, auto y) { return x < y ? SUB(y, x) : SUB(x, y); };
+constexpr auto ABSSUB = [](auto x, auto y) { return SUB(x > y ? x : y, x > y ? y : x); };
 constexpr auto ABSSSUB = [](auto x, auto y) { return ABSS(SUBS(x, y)); };
 
 }  // namespace

@@ -14,36 +14,51 @@ constexpr auto SLL = [](auto x, auto count) {
 };
 constexpr auto SRL = [](auto x, auto count) { return SLL(x, static_cast<decltype(x)>(0u - count)); };
 
-// A signed lane shifted by a count, left and, when the count is negative, right. The product is one of
-// the lane with its sign folded away.
+// A signed lane times 2^(count mod w), all of it with the sign folded away: -1 - f stands as f. The product
+// f * p holds the shift right in its high half, and tells whether the shift left stays in range.
 template <class T>
-struct ShiftedSigned {
+struct ScaledSigned {
   using U = std::make_unsigned_t<T>;
-  constexpr ShiftedSigned(T x, U count) {
-    const U sign = unsigned_bits(sign_fill(x));
-    const Scaled<U> folded(static_cast<U>(unsigned_bits(x) ^ sign), count);
-    // -1 - f times p is -1 - f * p, less the p - 1 that the -1 lacks.
-    const U product = static_cast<U>((folded.low ^ sign) - (static_cast<U>(folded.power - 1u) & sign));
-    left = within(count) ? product : U{0};
-    right = static_cast<U>((within(count) ? folded.high : U{0}) ^ sign);
-    const U beyond = static_cast<U>(folded.high | folded.low >> (width<U> - 1));
-    fits = x == 0 || (within(count) && beyond == 0);
+  ScaledSigned(T x, U count) : sign(unsigned_bits(sign_fill(x))), folded(static_cast<U>(unsigned_bits(x) ^ sign), count) {}
+
+  // (-1 - f) * p is -1 - (f * p + p - 1).
+  U left() const { return static_cast<U>(folded.low + (static_cast<U>(folded.power - 1u) & sign)); }
+  U right() const { return folded.high; }
+  // All ones when the shift left does not stay in range, else 0.
+  U out_of_range() const {
+    return static_cast<U>(folded.high | folded.low >> (width<U> - 1)) == 0 ? U{0} : static_cast<U>(-1);
   }
-  U left, right;
-  bool fits;
+
+  U sign;
+  Scaled<U> folded;
+};
+
+// Shifting right by w - 1 leaves the same as shifting by more, the sign; shifting left by as much and
+// saturating too.
+constexpr auto at_most_the_width = [](auto count) {
+  using T = decltype(count);
+  constexpr T farthest = width<T> - 1;
+  return count < farthest ? count : farthest;
 };
 
 constexpr auto SRA = [](auto x, auto count) {
   using T = decltype(x);
-  const ShiftedSigned<T> shifted(x, static_cast<std::make_unsigned_t<T>>(0u - unsigned_bits(count)));
-  return count > 0 ? shifted.right : shifted.left;
+  using U = std::make_unsigned_t<T>;
+  const ScaledSigned<T> scaled(x, static_cast<U>(0u - unsigned_bits(at_most_the_width(count))));
+  const auto right = static_cast<U>(scaled.right() ^ scaled.sign);
+  const auto left = static_cast<U>(count > -width<T> ? scaled.left() ^ scaled.sign : 0);
+  return count > 0 ? right : left;
 };
 
+// In masks rather than choices: compilers make many more instructions of those.
 constexpr auto SLS = [](auto x, auto count) {
   using T = decltype(x);
-  const ShiftedSigned<T> shifted(x, unsigned_bits(count));
-  const auto bound = unsigned_bits(static_cast<T>(sign_fill(x) ^ std::numeric_limits<T>::max()));
-  return count < 0 ? shifted.right : shifted.fits ? shifted.left : bound;
+  using U = std::make_unsigned_t<T>;
+  const ScaledSigned<T> scaled(x, unsigned_bits(at_most_the_width(count)));
+  const U right = count >= -width<T> ? scaled.right() : U{0};
+  const U left = static_cast<U>((scaled.left() | scaled.out_of_range()) & unsigned_bits(std::numeric_limits<T>::max()));
+  const U backward = unsigned_bits(sign_fill(count));
+  return static_cast<U>(((right & backward) | (left & ~backward)) ^ scaled.sign);
 };
 
 }  // namespace

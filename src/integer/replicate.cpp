@@ -3,19 +3,14 @@
 
 #include "frame/lanes.h"
 
-namespace {
-
-constexpr auto SAME = [](auto lane) { return lane; };
-
-}  // namespace
-
 #include "frame/stamp.h"
 
 // The lane is read before any is written, for the vector may be the result.
-#define KERNEL_replicate(OP, L)                                                          \
-  template <class Units, class Out>                                                      \
-  static inline void KASTARRI_SEMANTIC(OP)(const Units* a, word number, Out r) {         \
-    lanes<L::count>(result<L>(r), SAME, Same(Read<L>(a)[number % L::count]));            \
+#define KERNEL_replicate(OP, L)                                                 \
+  template <class Units, class Out>                                             \
+  static inline void KASTARRI_SEMANTIC(OP)(const Units* a, word number, Out r) { \
+    const auto chosen = Read<L>(a)[static_cast<int>(number % L::count)];        \
+    lanes<L::count>(result<L>(r), [chosen](int) { return chosen; }, Same(0));   \
   }
 #define KERNEL_filled(OP, BYTE)                                 \
   template <class Unit, std::size_t units>                     \

@@ -136,7 +136,7 @@ void draw(const Settings& s, const Samples& taps, const Wav& before, const Wav& 
   plot.y = {"power (dB, 0 = a sine of full scale)", -140, 10};
   plot.curve("before", kilohertz, was);
   plot.curve("after", kilohertz, is);
-  plot.curve("the filter alone", kilohertz, response(taps, POINTS));
+  plot.background("the filter alone", kilohertz, response(taps, POINTS));
   plot.mark(s.cutoff / 1000, Options::brief(s.cutoff) + " Hz");
   if (s.pass == Pass::band) plot.mark(s.cutoff2 / 1000, Options::brief(s.cutoff2) + " Hz");
   write_svg(s.picture, plot);

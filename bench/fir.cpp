@@ -13,7 +13,7 @@ void time_fir(benchmark::State& state, decltype(fir)* filter) {
   constexpr int taps = 16;
   constexpr int samples = 4096;
   std::minstd_rand random(1);
-  std::vector<short> x(samples + taps - 1 + FIR_READ_AHEAD), y(samples), h(taps);
+  std::vector<short> x(samples + taps - 1 + FIR_MARGIN), y(samples + FIR_MARGIN), h(taps);
   for (auto& sample : x) sample = static_cast<short>(random());
   for (auto& tap : h) tap = static_cast<short>(random() % 4096);
   for (auto _ : state) {

@@ -26,6 +26,7 @@ void fir(const short* x, const short* taps, int tap_count, short* y, int count) 
     if (count - n >= 32) {
       ZRA_SVNX16_IP(filtered, &out, sizeof(qv_vecNx16));
     } else {
+      // The last samples only: the store reads the whole register's room and leaves the rest of it as it is.
       vboolN rest;
       rest._[0] = (1u << (count - n)) - 1;
       ZRA_SVNX16T_I(filtered, out, 0, rest);

@@ -25,7 +25,7 @@ TEST(Fir, KernelIsExactForEveryLengthAndWritesNothingElse) {
   std::mt19937 random(7);
   for (const int tap_count : {1, 2, 16, 31, 64, FIR_MAX_TAPS}) {
     for (const int count : {1, 2, 31, 32, 33, 63, 64, 65, 200}) {
-      Samples x(static_cast<std::size_t>(count + tap_count - 1 + FIR_READ_AHEAD));
+      Samples x(static_cast<std::size_t>(count + tap_count - 1 + FIR_MARGIN));
       Samples taps(static_cast<std::size_t>(tap_count));
       // Loud enough for some sums to saturate at either end, and some not.
       const unsigned shift = tap_count > 16 ? 4 : 0;

@@ -1,7 +1,10 @@
 // Sound and picture files, good and bad, and how files are written.
 #include <gtest/gtest.h>
 
+#include <csignal>
 #include <functional>
+
+#include <sys/resource.h>
 
 #include "common/pgm.h"
 #include "common/wav.h"
@@ -93,6 +96,18 @@ TEST(Files, AreWrittenWholeOrNotAtAll) {
   EXPECT_NE(complaint([&] { write_file(directory.file("none/b"), "x"); }), "");
   EXPECT_NE(complaint([&] { write_file("/dev/full", "x"); }), "");
   EXPECT_NE(complaint([&] { read_file(directory.path()); }), "");
+
+  // A disk that is full in the middle of a file.
+  struct rlimit unlimited;
+  ASSERT_EQ(::getrlimit(RLIMIT_FSIZE, &unlimited), 0);
+  struct rlimit few = unlimited;
+  few.rlim_cur = 1000;
+  std::signal(SIGXFSZ, SIG_IGN);
+  ASSERT_EQ(::setrlimit(RLIMIT_FSIZE, &few), 0);
+  const std::string told = complaint([&] { write_file(directory.file("a"), Bytes(100000)); });
+  ASSERT_EQ(::setrlimit(RLIMIT_FSIZE, &unlimited), 0);
+  EXPECT_NE(told, "");
+  EXPECT_EQ(read_file(directory.file("a")), read);
   EXPECT_EQ(directory.names(), std::set<std::string>{"a"});
 }
 

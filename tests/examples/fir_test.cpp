@@ -87,6 +87,17 @@ TEST(Fir, ProgramFiltersTheRecording) {
   EXPECT_GT(energy_after, 0);
 }
 
+TEST(Fir, ProgramKeepsSoundsWhereTheyAre) {
+  const Directory directory;
+  Wav click{8000, 1, Samples(100, 0)};
+  click.samples[40] = 20000;
+  write_wav(directory.file("click.wav"), click);
+  const Outcome run = run_example(directory, "fir", "--input click.wav --taps 63");
+  EXPECT_EQ(run.status, 0) << run.errors;
+  const Samples after = read_wav(directory.file("fir.wav")).samples;
+  EXPECT_EQ(std::max_element(after.begin(), after.end()) - after.begin(), 40);
+}
+
 TEST(Fir, ProgramRefusesWhatItCannotDo) {
   const Directory directory;
   write_file(directory.file("text.wav"), "Not a sound at all, but long enough for one.");

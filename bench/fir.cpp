@@ -24,8 +24,8 @@ void time_fir(benchmark::State& state, decltype(fir)* filter) {
 }
 
 const auto* const timed_kernel =
-    benchmark::RegisterBenchmark("fir_16_taps_kernel", [](benchmark::State& state) { time_fir(state, fir); });
+    benchmark::RegisterBenchmark("fir_kernel", [](benchmark::State& state) { time_fir(state, fir); });
 const auto* const timed_scalar =
-    benchmark::RegisterBenchmark("fir_16_taps_scalar", [](benchmark::State& state) { time_fir(state, fir_reference); });
+    benchmark::RegisterBenchmark("fir_scalar", [](benchmark::State& state) { time_fir(state, fir_reference); });
 
 }  // namespace

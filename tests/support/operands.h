@@ -26,7 +26,7 @@ std::vector<Int> corners() {
   for (Int v = -3; v <= 3; ++v) values.push_back(as_lane<L>(v));
   for (Int v : {-70, -40, -33, -32, -31, -20, -17, -16, -15, -8, 7, 8, 15, 16, 17, 31, 32, 33, 40, 64, 70, 1000})
     values.push_back(as_lane<L>(v));
-  for (int k = 2; k < L::bits; ++k)
+  for (int k = 2; k < std::min(L::bits, 64); ++k)
     for (Int d = -1; d <= 1; ++d)
       values.push_back(as_lane<L>(static_cast<Int>((std::uint64_t{1} << k) + static_cast<std::uint64_t>(d))));
   for (std::uint64_t pattern : {0x5555555555555555u, 0xAAAAAAAAAAAAAAAAu, 0x123456789ABCDEFu})

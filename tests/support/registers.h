@@ -42,7 +42,8 @@ void set_lane(void* image, int i, Int value) {
     bits %= range;
     if (std::is_signed_v<typename L::container> && bits >= range / 2) bits -= range;
   }
-  for (int b = 0; b < size; ++b) bytes[i * size + b] = static_cast<unsigned char>(bits >> (8 * b));
+  // A container of more than 64 bits holds the value over and over.
+  for (int b = 0; b < size; ++b) bytes[i * size + b] = static_cast<unsigned char>(bits >> (8 * (b % 8)));
 }
 
 // The value as a lane of the layout holds it: its low bits, extended.

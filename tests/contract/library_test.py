@@ -131,6 +131,18 @@ class Documents(unittest.TestCase):
             self.assertEqual(output(binary).strip(), printed)
 
 
+    def test_what_the_guide_quotes_stands_in_the_sources(self):
+        guide = open(os.path.join(ROOT, "docs", "adding-an-intrinsic.md"), encoding="utf-8").read()
+        quotations = 0
+        for path, blocks in re.findall(r"^`(\S+)`:\n\n((?:```\w*\n.*?```\n)+)", guide, re.S | re.M):
+            source = open(os.path.join(ROOT, path), encoding="utf-8").read()
+            for block in re.findall(r"```\w*\n(.*?)```", blocks, re.S):
+                quotations += 1
+                with self.subTest(path=path):
+                    self.assertIn(block, source)
+        self.assertGreaterEqual(quotations, 4)
+
+
 DEFINED_TABLES = set(generate_headers.listed_tables())
 
 if __name__ == "__main__":

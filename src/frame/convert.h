@@ -40,7 +40,7 @@ inline void replicate(const Write<L>& to, V value) {
   if constexpr (std::is_integral_v<V> && sizeof(typename L::container) == 8) {
     const auto container = static_cast<std::uint64_t>(canonical<L>(value));
     const auto low = static_cast<word>(container), high = static_cast<word>(container >> 32);
-    auto* words = static_cast<in_memory<word>*>(to.image());
+    in_memory<word>* words = static_cast<in_memory<word>*>(to.image());
     KASTARRI_LANES_INDEPENDENT
     for (int i = 0; i < L::count; ++i) {
       words[2 * i] = low;

@@ -53,8 +53,9 @@ inline void spill(const void* from, void* to) {
     _mm_storel_epi64(reinterpret_cast<__m128i*>(image + 180), last);
     *reinterpret_cast<word_in_memory*>(image + 188) = static_cast<word>(_mm_cvtsi128_si32(_mm_srli_si128(last, 8)));
   } else {
-    const auto* source = static_cast<const word_in_memory*>(from);
-    auto* image = static_cast<word_in_memory*>(to);
+    // Named types: `auto` would forget that they lie at any address.
+    const word_in_memory* source = static_cast<const word_in_memory*>(from);
+    word_in_memory* image = static_cast<word_in_memory*>(to);
     KASTARRI_LANES_INDEPENDENT
     for (int g = 0; g < 16; ++g) {
       const word low0 = source[4 * g], high0 = source[4 * g + 1], low1 = source[4 * g + 2], high1 = source[4 * g + 3];
@@ -74,8 +75,8 @@ inline void unspill(const void* from, void* to) {
     for (int g = 0; g < 15; ++g) store_bytes(lanes_out + 16 * g, widen_24(load_bytes(image + 12 * g)));
     store_bytes(lanes_out + 240, widen_24(_mm_srli_si128(load_bytes(image + 176), 4)));
   } else {
-    const auto* image = static_cast<const word_in_memory*>(from);
-    auto* target = static_cast<word_in_memory*>(to);
+    const word_in_memory* image = static_cast<const word_in_memory*>(from);
+    word_in_memory* target = static_cast<word_in_memory*>(to);
     const auto extended = [](word w) { return static_cast<word>(static_cast<std::int16_t>(w)); };
     KASTARRI_LANES_INDEPENDENT
     for (int g = 0; g < 16; ++g) {

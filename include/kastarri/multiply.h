@@ -2113,14 +2113,43 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSGNS16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
 
-/// lane i = acc[i] shifted right by the count (above 32, or negative: 32), rounded half up, saturated to the
-/// signed range of the lane.
+/// lane i = the low bits of acc[i], as many as the result has.
+/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits,
+/// signed; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed; qv_vecN_2x64w 16 x 64 bits,
+/// signed.
+/// Rule: src/multiply/pack.def
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKLNX48(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKL2NX24(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKLN_2X64W(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKLN_2X96(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc);
+
+/// lane k = bits 0 to 7 of acc[2k], extended by zeros.
+/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vec2Nx24 64 x 24 bits, signed.
+/// Rule: src/multiply/pack.def
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKL2NX24_0(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc);
+
+/// lane k = bits 0 to 7 of acc[2k + 1], extended by zeros.
+/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vec2Nx24 64 x 24 bits, signed.
+/// Rule: src/multiply/pack.def
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKL2NX24_1(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc);
+
+/// lane i = bits 16 to 31 of acc[i].
 /// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx48 32 x 48 bits, signed.
 /// Rule: src/multiply/pack.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNX48(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    int shift);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKMNX48(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc);
+
+/// lane k = bits 32 to 63 of acc[k].
+/// Lanes: qv_vecN_2x32v 16 x 32 bits, signed; qv_vecN_2x64w 16 x 64 bits, signed.
+/// Rule: src/multiply/pack.def
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKHN_2X64W(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc);
 
 /// lane i = bits 16 to 31 of (2 * bits 0 to 31 of acc[i] + 0x8000), modulo 2^32: a Q15 product rounded half
 /// up.
@@ -2128,5 +2157,224 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNX48(
 /// Rule: src/multiply/pack.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKQNX48(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc);
+
+/// lane i = bits 10 to 25 of (bits 0 to 31 of acc[i] + 0x200): a product less 10 fractional bits, rounded
+/// half up.
+/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx48 32 x 48 bits, signed.
+/// Rule: src/multiply/pack.def
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKPNX48(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc);
+
+/// lane i = acc[i] shifted right by shift (no more than 23 for 24-bit lanes, 32 for others; so negative),
+/// rounded half up, clamped to the range of the lane.
+/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vecNx16 32 x 16 bits, signed;
+/// qv_vecN_2x32v 16 x 32 bits, signed; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed;
+/// qv_vecN_2x64w 16 x 64 bits, signed.
+/// Rule: src/multiply/pack.def
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVR2NX24(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    int shift);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRU2NX24(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    int shift);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNX48(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    int shift);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRN_2X64W(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    unsigned int shift);
+
+/// lane k = acc[2k] shifted right by shift (no more than 23 for 24-bit lanes, 32 for others; so negative),
+/// rounded half up, clamped to the range of the lane.
+/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecN_2x32v 16 x 32 bits,
+/// signed; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed.
+/// Rule: src/multiply/pack.def
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVR2NX24_0(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    unsigned int shift);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRU2NX24_0(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    unsigned int shift);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNX48_0(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    unsigned int shift);
+
+/// lane k = acc[2k + 1] shifted right by shift (no more than 23 for 24-bit lanes, 32 for others; so
+/// negative), rounded half up, clamped to the range of the lane.
+/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecN_2x32v 16 x 32 bits,
+/// signed; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed.
+/// Rule: src/multiply/pack.def
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVR2NX24_1(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    unsigned int shift);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRU2NX24_1(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    unsigned int shift);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNX48_1(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    unsigned int shift);
+
+/// lane i = acc[i] shifted right by shift (no more than 23 for 24-bit lanes, 32 for others; so negative),
+/// truncated, clamped to the range of the lane.
+/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits,
+/// signed; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed; qv_vecN_2x64w 16 x 64 bits,
+/// signed.
+/// Rule: src/multiply/pack.def
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNR2NX24(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    unsigned int shift);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNRNX48(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    unsigned int shift);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNRN_2X64W(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    unsigned int shift);
+
+/// lane k = acc[2k] shifted right by shift (no more than 23 for 24-bit lanes, 32 for others; so negative),
+/// truncated, clamped to the range of the lane.
+/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits, signed; qv_vec2Nx24 64 x 24 bits,
+/// signed; qv_vecNx48 32 x 48 bits, signed.
+/// Rule: src/multiply/pack.def
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNR2NX24_0(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    unsigned int shift);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNRNX48_0(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    unsigned int shift);
+
+/// lane k = acc[2k + 1] shifted right by shift (no more than 23 for 24-bit lanes, 32 for others; so
+/// negative), truncated, clamped to the range of the lane.
+/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits, signed; qv_vec2Nx24 64 x 24 bits,
+/// signed; qv_vecNx48 32 x 48 bits, signed.
+/// Rule: src/multiply/pack.def
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNR2NX24_1(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    unsigned int shift);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNRNX48_1(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    unsigned int shift);
+
+/// lane i = acc[i] shifted right by shift[i] (no more than 23 for 24-bit lanes, 32 for others; so negative),
+/// rounded half up, clamped to the range of the lane.
+/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vecNx16 32 x 16 bits, signed;
+/// qv_vecN_2x32v 16 x 32 bits, signed; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed;
+/// qv_vecN_2x64w 16 x 64 bits, signed.
+/// Rule: src/multiply/pack.def
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKV2NX24(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& shift);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVU2NX24(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& shift);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNX48(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& shift);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVN_2X64W(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& shift);
+
+/// lane k = acc[2k] shifted right by shift[k] (no more than 23 for 24-bit lanes, 32 for others; so negative),
+/// rounded half up, clamped to the range of the lane.
+/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecN_2x32v 16 x 32 bits,
+/// signed; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed.
+/// Rule: src/multiply/pack.def
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKV2NX24_0(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& shift);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVU2NX24_0(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& shift);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNX48_0(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& shift);
+
+/// lane k = acc[2k + 1] shifted right by shift[k] (no more than 23 for 24-bit lanes, 32 for others; so
+/// negative), rounded half up, clamped to the range of the lane.
+/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecN_2x32v 16 x 32 bits,
+/// signed; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed.
+/// Rule: src/multiply/pack.def
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKV2NX24_1(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& shift);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVU2NX24_1(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& shift);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNX48_1(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& shift);
+
+/// lane i = acc[i] shifted right by shift[i] (no more than 23 for 24-bit lanes, 32 for others; so negative),
+/// truncated, clamped to the range of the lane.
+/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits,
+/// signed; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed; qv_vecN_2x64w 16 x 64 bits,
+/// signed.
+/// Rule: src/multiply/pack.def
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNR2NX24(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& shift);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNRNX48(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& shift);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNRN_2X64W(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& shift);
+
+/// lane k = acc[2k] shifted right by shift[k] (no more than 23 for 24-bit lanes, 32 for others; so negative),
+/// truncated, clamped to the range of the lane.
+/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits, signed; qv_vec2Nx24 64 x 24 bits,
+/// signed; qv_vecNx48 32 x 48 bits, signed.
+/// Rule: src/multiply/pack.def
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNR2NX24_0(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& shift);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNRNX48_0(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& shift);
+
+/// lane k = acc[2k + 1] shifted right by shift[k] (no more than 23 for 24-bit lanes, 32 for others; so
+/// negative), truncated, clamped to the range of the lane.
+/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits, signed; qv_vec2Nx24 64 x 24 bits,
+/// signed; qv_vecNx48 32 x 48 bits, signed.
+/// Rule: src/multiply/pack.def
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNR2NX24_1(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& shift);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNRNX48_1(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& shift);
 
 #endif

@@ -3,6 +3,7 @@
 
 #include "frame/arithmetic.h"
 #include "multiply/fractions.h"
+#include "multiply/saturated.h"
 
 namespace {
 
@@ -39,6 +40,9 @@ class All48 {
   const in_memory<word>* words_;
 };
 
+// The whole containers of 64-bit lanes, which compilers read better than signed ones.
+using u64x16 = Layout<std::uint64_t, 64, 16>;
+
 // --- Fixed packs -----------------------------------------------------------------------------------------
 
 constexpr auto LOW = [](auto lane) { return lane; };
@@ -49,43 +53,61 @@ constexpr auto Q15 = [](std::uint64_t lane) { return q15(static_cast<word>(lane)
 constexpr auto Q10 = [](std::uint64_t lane) { return q10(static_cast<word>(lane)); };
 
 // --- Shifts ----------------------------------------------------------------------------------------------
-
-// A shift right by a count within the type's width. Rounded, the last bit shifted out is added, which is
-// half up without a sum that could overflow; nothing is shifted out by 0.
-struct Rounded {
-  template <class T>
-  static T shift(T x, word s) {
-    const word last = s == 0 ? 0 : s - 1;
-    const auto mask = static_cast<T>(s == 0 ? 0 : 1);
-    return static_cast<T>(shift_right(x, s) + (static_cast<T>(unsigned_bits(x) >> last) & mask));
-  }
-};
-struct Truncated {
-  template <class T>
-  static T shift(T x, word s) {
-    return shift_right(x, s);
-  }
-};
+// The rules make words, which saturate to the result's lanes in a step of their own.
 
 // Counts are unsigned, so that a negative one counts as the largest.
 constexpr word clamped(word count, word bound) { return count > bound ? bound : count; }
 
-template <class Lane, class T>
-constexpr Lane narrowed(T x) {
-  if constexpr (sizeof(T) == 8) {
-    // In halves: no target but the newest compares 64-bit lanes.
-    const auto low = static_cast<std::int32_t>(x);
-    const auto high = static_cast<std::int32_t>(x >> 32);
-    return high == low >> 31 ? low : sign_fill(high) ^ std::numeric_limits<std::int32_t>::max();
-  } else {
-    return saturate<Lane>(x);
-  }
+// x shifted right by a count that all lanes share, or by the lane's own.
+// (A 64-bit lane is shifted as unsigned with its sign folded away.)
+constexpr auto shared = [](auto x, word s) { return shift_right(x, s); };
+constexpr std::int32_t shifted_own(std::int32_t x, word s) { return x >> s; }
+constexpr std::int64_t shifted_own(std::int64_t x, word s) {
+  const std::int64_t sign = sign_fill(x);
+  return static_cast<std::int64_t>(unsigned_bits(x ^ sign) >> std::uint64_t{s}) ^ sign;
 }
+constexpr auto own = [](auto x, word s) { return shifted_own(x, s); };
 
-// A 24 or 64-bit lane, or a 48-bit lane that is packed to 32 bits, as the integer that it is.
-template <class Shift, class Lane>
-constexpr auto pack_lane = [](auto x, word count) {
-  return narrowed<Lane>(Shift::shift(x, clamped(count, sizeof x == 4 ? 23 : 32)));
+// Half of x, rounded down: few targets shift 64-bit lanes as signed.
+constexpr std::int32_t half(std::int32_t x) { return x >> 1; }
+constexpr std::int64_t half(std::int64_t x) { return shift_right(x, 1); }
+
+// Rounded half up, x / 2^s is half of x / 2^(s-1), plus a half: the last bit shifted out is added.
+struct Rounded {
+  template <class T>
+  static constexpr T halve(T twice) {
+    return static_cast<T>(half(twice) + (twice & 1));
+  }
+};
+struct Truncated {
+  template <class T>
+  static constexpr T halve(T twice) {
+    return half(twice);
+  }
+};
+
+// A 24-bit lane, moved to the top of its word and back down to twice itself: so 0 is a count like others.
+template <class Rounding>
+constexpr auto pack24 = [](auto shift, word x, word s) {
+  return Rounding::halve(shift(static_cast<std::int32_t>(x << 8), s + 7));
+};
+
+// 48-bit lanes that are packed to 32 bits, likewise, and 64-bit lanes, which have no room to spare.
+constexpr std::int32_t narrowed(std::int64_t x) {
+  // In halves: no target but the newest compares 64-bit lanes.
+  const auto low = static_cast<std::int32_t>(x);
+  const auto high = static_cast<std::int32_t>(unsigned_bits(x) >> 32);
+  return high == low >> 31 ? low : (high >> 31) ^ std::numeric_limits<std::int32_t>::max();
+}
+template <class Rounding>
+constexpr auto pack48_wide = [](auto shift, std::uint64_t x, word s) {
+  return narrowed(Rounding::halve(shift(static_cast<std::int64_t>(x << 16), s + 15)));
+};
+template <class Rounding>
+constexpr auto pack64 = [](auto shift, std::uint64_t x, word s) {
+  const word nothing = s == 0;
+  const std::int64_t twice = shift(static_cast<std::int64_t>(x), s - 1 + nothing);
+  return narrowed(nothing ? twice : Rounding::halve(twice));
 };
 
 // A 48-bit lane packed to 16 bits needs no more than 32 bits of it: for a count up to 16 the lane
@@ -94,56 +116,72 @@ constexpr auto pack_lane = [](auto x, word count) {
 constexpr std::int32_t low_part(Words48 x) {
   const auto low = static_cast<std::int32_t>(x.low);
   const auto high = static_cast<std::int32_t>(x.high << 16);
-  const std::int32_t bound = sign_fill(high) ^ std::numeric_limits<std::int32_t>::max();
-  return static_cast<word>(sign_fill(low)) << 16 == unsigned_bits(high) ? low : bound;
+  const std::int32_t bound = (high >> 31) ^ std::numeric_limits<std::int32_t>::max();
+  return static_cast<word>(low >> 31) << 16 == unsigned_bits(high) ? low : bound;
 }
 constexpr std::int32_t high_part(Words48 x) { return static_cast<std::int32_t>(x.high << 16 | x.low >> 16); }
 
-template <class Shift>
-constexpr auto pack48_low = [](Words48 x, word s) { return saturate<std::int16_t>(Shift::shift(low_part(x), s)); };
-template <class Shift>
-constexpr auto pack48_high = [](Words48 x, word s) { return saturate<std::int16_t>(Shift::shift(high_part(x), s - 16)); };
-template <class Shift>
-constexpr auto pack48_lane = [](Words48 x, word count) {
+constexpr auto pack48_unshifted = [](Words48 x) { return low_part(x); };
+template <class Rounding>
+constexpr auto pack48_low = [](Words48 x, word s) { return Rounding::halve(shared(low_part(x), s - 1)); };
+template <class Rounding>
+constexpr auto pack48_high = [](Words48 x, word s) { return Rounding::halve(shared(high_part(x), s - 17)); };
+
+template <class Rounding>
+constexpr auto pack48_own = [](Words48 x, word count) {
   const word s = clamped(count, 32);
-  return saturate<std::int16_t>(Shift::shift(s > 16 ? high_part(x) : low_part(x), s > 16 ? s - 16 : s));
+  const std::int32_t part = s > 16 ? high_part(x) : low_part(x);
+  const word left = s > 16 ? s - 16 : s;
+  const std::int32_t twice = own(part, left - (s != 0));
+  return s == 0 ? twice : Rounding::halve(twice);
 };
+
+// Applies a rule that makes words to every lane, and saturates.
+template <class R, class Rule, class... Operands>
+inline void pack(word* r, Rule rule, const Operands&... operands) {
+  Saturated<typename R::container, R::count> words;
+  KASTARRI_LANES_INDEPENDENT
+  for (int i = 0; i < R::count; ++i) words.lane[i] = rule(operands[i]...);
+  words.collect(r);
+}
+
+template <class R, class Rounding, class Lanes>
+inline void pack48(const Lanes& lanes, word count, word* r) {
+  const word s = clamped(count, 32);
+  if (s == 0) return pack<R>(r, pack48_unshifted, lanes);
+  s > 16 ? pack<R>(r, pack48_high<Rounding>, lanes, Same(s)) : pack<R>(r, pack48_low<Rounding>, lanes, Same(s));
+}
 
 }  // namespace
 
 #include "frame/stamp.h"
 
-// KERNEL(OP, form, result layout, ..., lanes that are packed)
-#define KERNEL_fixed(OP, R, RULE, ...)                                \
-  template <class Out>                                                \
-  static inline void KASTARRI_SEMANTIC(OP)(const word* acc, Out r) {  \
-    lanes<R::count>(result<R>(r), RULE, __VA_ARGS__(acc));            \
+// KERNEL(OP, form, result layout, rule, lanes that are packed)
+#define KERNEL_fixed(OP, R, RULE, LANES)                             \
+  static inline void KASTARRI_SEMANTIC(OP)(const word* acc, word* r) { \
+    lanes<R::count>(result<R>(r), RULE, LANES(acc));                 \
   }
 
-// One count for all lanes.
-#define KERNEL_shift(OP, R, SHIFT, ...)                                                                         \
-  template <class Out>                                                                                          \
-  static inline void KASTARRI_SEMANTIC(OP)(const word* acc, word count, Out r) {                                \
-    lanes<R::count>(result<R>(r), pack_lane<SHIFT, R::container>, __VA_ARGS__(acc), Same(count));               \
+// One count for all lanes, no more than BOUND.
+#define KERNEL_shift(OP, R, RULE, BOUND, LANES)                                                              \
+  static inline void KASTARRI_SEMANTIC(OP)(const word* acc, word count, word* r) {                           \
+    const word s = clamped(count, BOUND);                                                                    \
+    pack<R>(r, [s](auto x) { return RULE(shared, x, s); }, LANES(acc));                                      \
   }
-#define KERNEL_shift48(OP, R, SHIFT, ...)                                                                       \
-  template <class Out>                                                                                          \
-  static inline void KASTARRI_SEMANTIC(OP)(const word* acc, word count, Out r) {                                \
-    const word s = clamped(count, 32);                                                                          \
-    s > 16 ? lanes<R::count>(result<R>(r), pack48_high<SHIFT>, __VA_ARGS__(acc), Same(s))                       \
-           : lanes<R::count>(result<R>(r), pack48_low<SHIFT>, __VA_ARGS__(acc), Same(s));                       \
+#define KERNEL_shift48(OP, R, ROUNDING, LANES)                                       \
+  static inline void KASTARRI_SEMANTIC(OP)(const word* acc, word count, word* r) {   \
+    pack48<R, ROUNDING>(LANES(acc), count, r);                                       \
   }
 
 // A count a lane, in layout C.
-#define KERNEL_counts(OP, R, SHIFT, C, ...)                                                                     \
-  template <class Out>                                                                                          \
-  static inline void KASTARRI_SEMANTIC(OP)(const word* acc, const word* counts, Out r) {                        \
-    lanes<R::count>(result<R>(r), pack_lane<SHIFT, R::container>, __VA_ARGS__(acc), Read<C>(counts));           \
+#define KERNEL_counts(OP, R, RULE, BOUND, LANES, C)                                                             \
+  static inline void KASTARRI_SEMANTIC(OP)(const word* acc, const word* counts, word* r) {                      \
+    const auto rule = [](auto x, auto n) { return RULE(own, x, clamped(static_cast<word>(n), BOUND)); };        \
+    pack<R>(r, rule, LANES(acc), Read<C>(counts));                                                              \
   }
-#define KERNEL_counts48(OP, R, SHIFT, C, ...)                                                                   \
-  template <class Out>                                                                                          \
-  static inline void KASTARRI_SEMANTIC(OP)(const word* acc, const word* counts, Out r) {                        \
-    lanes<R::count>(result<R>(r), pack48_lane<SHIFT>, __VA_ARGS__(acc), Read<C>(counts));                       \
+#define KERNEL_counts48(OP, R, ROUNDING, LANES, C)                                           \
+  static inline void KASTARRI_SEMANTIC(OP)(const word* acc, const word* counts, word* r) {   \
+    pack<R>(r, pack48_own<ROUNDING>, LANES(acc), Read<C>(counts));                           \
   }
 
 #include "multiply/pack.def"

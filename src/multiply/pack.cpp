@@ -12,29 +12,25 @@ namespace {
 template <class L>
 using All = Read<L>;
 
-// Every other lane.
-template <class L, int First>
-class Alternate {
+// Every other 24-bit lane: two of them are the halves of a 64-bit container.
+template <int First>
+class Alternate24 {
  public:
-  explicit Alternate(const void* acc) : lanes_(acc) {}
-  auto operator[](int k) const { return lanes_[2 * k + First]; }
+  explicit Alternate24(const void* acc) : pairs_(acc) {}
+  word operator[](int k) const { return static_cast<word>(pairs_[k] >> (32 * First)); }
 
  private:
-  Read<L> lanes_;
+  Read<u64x32> pairs_;
 };
-template <class L>
-using Even = Alternate<L, 0>;
-template <class L>
-using Odd = Alternate<L, 1>;
 
-// The two words of a 48-bit lane, the upper one as it stands in memory.
-struct Words48 {
+// The two words of a lane: of a 48-bit lane the upper one as it stands in memory.
+struct Words {
   word low, high;
 };
-class All48 {
+class InWords {
  public:
-  explicit All48(const void* acc) : words_(static_cast<const in_memory<word>*>(acc)) {}
-  Words48 operator[](int i) const { return {words_[2 * i], words_[2 * i + 1]}; }
+  explicit InWords(const void* lanes) : words_(static_cast<const in_memory<word>*>(lanes)) {}
+  Words operator[](int i) const { return {words_[2 * i], words_[2 * i + 1]}; }
 
  private:
   const in_memory<word>* words_;
@@ -60,13 +56,17 @@ constexpr word clamped(word count, word bound) { return count > bound ? bound : 
 
 // x shifted right by a count that all lanes share, or by the lane's own.
 // (A 64-bit lane is shifted as unsigned with its sign folded away.)
-constexpr auto shared = [](auto x, word s) { return shift_right(x, s); };
 constexpr std::int32_t shifted_own(std::int32_t x, word s) { return x >> s; }
 constexpr std::int64_t shifted_own(std::int64_t x, word s) {
   const std::int64_t sign = sign_fill(x);
   return static_cast<std::int64_t>(unsigned_bits(x ^ sign) >> std::uint64_t{s}) ^ sign;
 }
 constexpr auto own = [](auto x, word s) { return shifted_own(x, s); };
+// What shift_right needs of a shared count is two words long for 64-bit lanes, and slow to come by.
+constexpr auto shared = [](auto x, word s) {
+  if constexpr (sizeof x == 8 && lanes_shift_alone) return shifted_own(x, s);
+  else return shift_right(x, s);
+};
 
 // Half of x, rounded down: few targets shift 64-bit lanes as signed.
 constexpr std::int32_t half(std::int32_t x) { return x >> 1; }
@@ -93,42 +93,36 @@ constexpr auto pack24 = [](auto shift, word x, word s) {
 };
 
 // 48-bit lanes that are packed to 32 bits, likewise, and 64-bit lanes, which have no room to spare.
-constexpr std::int32_t narrowed(std::int64_t x) {
-  // In halves: no target but the newest compares 64-bit lanes.
-  const auto low = static_cast<std::int32_t>(x);
-  const auto high = static_cast<std::int32_t>(unsigned_bits(x) >> 32);
-  return high == low >> 31 ? low : (high >> 31) ^ std::numeric_limits<std::int32_t>::max();
-}
 template <class Rounding>
 constexpr auto pack48_wide = [](auto shift, std::uint64_t x, word s) {
-  return narrowed(Rounding::halve(shift(static_cast<std::int64_t>(x << 16), s + 15)));
+  return Rounding::halve(shift(static_cast<std::int64_t>(x << 16), s + 15));
 };
 template <class Rounding>
 constexpr auto pack64 = [](auto shift, std::uint64_t x, word s) {
   const word nothing = s == 0;
   const std::int64_t twice = shift(static_cast<std::int64_t>(x), s - 1 + nothing);
-  return narrowed(nothing ? twice : Rounding::halve(twice));
+  return nothing ? twice : Rounding::halve(twice);
 };
 
 // A 48-bit lane packed to 16 bits needs no more than 32 bits of it: for a count up to 16 the lane
 // clamped to 32 bits, since whatever lies beyond saturates anyway; above 16 the lane without its low 16
 // bits, of which no shift leaves a trace.
-constexpr std::int32_t low_part(Words48 x) {
+constexpr std::int32_t low_part(Words x) {
   const auto low = static_cast<std::int32_t>(x.low);
   const auto high = static_cast<std::int32_t>(x.high << 16);
   const std::int32_t bound = (high >> 31) ^ std::numeric_limits<std::int32_t>::max();
   return static_cast<word>(low >> 31) << 16 == unsigned_bits(high) ? low : bound;
 }
-constexpr std::int32_t high_part(Words48 x) { return static_cast<std::int32_t>(x.high << 16 | x.low >> 16); }
+constexpr std::int32_t high_part(Words x) { return static_cast<std::int32_t>(x.high << 16 | x.low >> 16); }
 
-constexpr auto pack48_unshifted = [](Words48 x) { return low_part(x); };
+constexpr auto pack48_unshifted = [](Words x) { return low_part(x); };
 template <class Rounding>
-constexpr auto pack48_low = [](Words48 x, word s) { return Rounding::halve(shared(low_part(x), s - 1)); };
+constexpr auto pack48_low = [](Words x, word s) { return Rounding::halve(shared(low_part(x), s - 1)); };
 template <class Rounding>
-constexpr auto pack48_high = [](Words48 x, word s) { return Rounding::halve(shared(high_part(x), s - 17)); };
+constexpr auto pack48_high = [](Words x, word s) { return Rounding::halve(shared(high_part(x), s - 17)); };
 
 template <class Rounding>
-constexpr auto pack48_own = [](Words48 x, word count) {
+constexpr auto pack48_own = [](Words x, word count) {
   const word s = clamped(count, 32);
   const std::int32_t part = s > 16 ? high_part(x) : low_part(x);
   const word left = s > 16 ? s - 16 : s;
@@ -136,13 +130,28 @@ constexpr auto pack48_own = [](Words48 x, word count) {
   return s == 0 ? twice : Rounding::halve(twice);
 };
 
-// Applies a rule that makes words to every lane, and saturates.
+// Clamps a pair of words to one, in halves: no target but the newest compares 64-bit lanes.
+constexpr auto one_word = [](Words x) {
+  const auto low = static_cast<std::int32_t>(x.low);
+  const auto high = static_cast<std::int32_t>(x.high);
+  return high == low >> 31 ? low : (high >> 31) ^ std::numeric_limits<std::int32_t>::max();
+};
+
+// Applies a rule that makes words or pairs of them to every lane, and saturates.
 template <class R, class Rule, class... Operands>
 inline void pack(word* r, Rule rule, const Operands&... operands) {
-  Saturated<typename R::container, R::count> words;
-  KASTARRI_LANES_INDEPENDENT
-  for (int i = 0; i < R::count; ++i) words.lane[i] = rule(operands[i]...);
-  words.collect(r);
+  using Result = decltype(rule(operands[0]...));
+  if constexpr (sizeof(Result) == 8) {
+    alignas(64) std::int64_t pairs[R::count];
+    KASTARRI_LANES_INDEPENDENT
+    for (int i = 0; i < R::count; ++i) pairs[i] = rule(operands[i]...);
+    lanes<R::count>(result<R>(r), one_word, InWords(pairs));
+  } else {
+    Saturated<typename R::container, R::count> words;
+    KASTARRI_LANES_INDEPENDENT
+    for (int i = 0; i < R::count; ++i) words.lane[i] = rule(operands[i]...);
+    words.collect(r);
+  }
 }
 
 template <class R, class Rounding, class Lanes>

@@ -1,5 +1,5 @@
-// Words clamped to narrower lanes. Processors have one instruction for it that compilers do not find, so
-// this is the one place that says it in vector instructions.
+// Words clamped to narrower lanes, and every other lane taken out of a register. Processors have single
+// instructions for these that compilers do not find, so this is the one place that names them.
 #ifndef KASTARRI_MULTIPLY_SATURATED_H
 #define KASTARRI_MULTIPLY_SATURATED_H
 
@@ -13,12 +13,22 @@
 
 namespace {
 
+// Whether lanes can shift by counts of their own, as fast as by one that they share.
+#if defined __AVX2__
+constexpr bool lanes_shift_alone = true;
+#else
+constexpr bool lanes_shift_alone = false;
+#endif
+
 #if defined __AVX512BW__
 using Register = __m512i;
+inline Register load(const void* from) { return _mm512_loadu_si512(static_cast<const void*>(from)); }
 inline Register pack_words(Register a, Register b) { return _mm512_packs_epi32(a, b); }
 inline Register pack_halves(Register a, Register b, std::int8_t) { return _mm512_packs_epi16(a, b); }
 inline Register pack_halves(Register a, Register b, std::uint8_t) { return _mm512_packus_epi16(a, b); }
 inline Register flip_halves(Register a) { return _mm512_xor_si512(a, _mm512_set1_epi16(-0x8000)); }
+inline Register low_pairs(Register a, Register b) { return _mm512_maskz_unpacklo_epi64(0xFF, a, b); }
+inline Register high_pairs(Register a, Register b) { return _mm512_maskz_unpackhi_epi64(0xFF, a, b); }
 inline Register less_half(Register a) { return _mm512_sub_epi32(a, _mm512_set1_epi32(0x8000)); }
 // (The forms without a mask make this compiler warn of its own header.) Packs work within 128 bits: these put pairs and fours of results back in order.
 inline Register in_order2(Register a) {
@@ -30,10 +40,13 @@ inline Register in_order4(Register a) {
 }
 #elif defined __AVX2__
 using Register = __m256i;
+inline Register load(const void* from) { return _mm256_loadu_si256(static_cast<const Register*>(from)); }
 inline Register pack_words(Register a, Register b) { return _mm256_packs_epi32(a, b); }
 inline Register pack_halves(Register a, Register b, std::int8_t) { return _mm256_packs_epi16(a, b); }
 inline Register pack_halves(Register a, Register b, std::uint8_t) { return _mm256_packus_epi16(a, b); }
 inline Register flip_halves(Register a) { return _mm256_xor_si256(a, _mm256_set1_epi16(-0x8000)); }
+inline Register low_pairs(Register a, Register b) { return _mm256_unpacklo_epi64(a, b); }
+inline Register high_pairs(Register a, Register b) { return _mm256_unpackhi_epi64(a, b); }
 inline Register less_half(Register a) { return _mm256_sub_epi32(a, _mm256_set1_epi32(0x8000)); }
 inline Register in_order2(Register a) { return _mm256_permute4x64_epi64(a, 0xD8); }
 inline Register in_order4(Register a) {
@@ -41,21 +54,41 @@ inline Register in_order4(Register a) {
 }
 #else
 using Register = __m128i;
+inline Register load(const void* from) { return _mm_loadu_si128(static_cast<const Register*>(from)); }
 inline Register pack_words(Register a, Register b) { return _mm_packs_epi32(a, b); }
 inline Register pack_halves(Register a, Register b, std::int8_t) { return _mm_packs_epi16(a, b); }
 inline Register pack_halves(Register a, Register b, std::uint8_t) { return _mm_packus_epi16(a, b); }
 inline Register flip_halves(Register a) { return _mm_xor_si128(a, _mm_set1_epi16(-0x8000)); }
+inline Register low_pairs(Register a, Register b) { return _mm_unpacklo_epi64(a, b); }
+inline Register high_pairs(Register a, Register b) { return _mm_unpackhi_epi64(a, b); }
 inline Register less_half(Register a) { return _mm_sub_epi32(a, _mm_set1_epi32(0x8000)); }
 inline Register in_order2(Register a) { return a; }
 inline Register in_order4(Register a) { return a; }
 #endif
 
+// Lanes First, First + 2, ... of 32 lanes in 64-bit containers.
+template <int First>
+class Alternate48 {
+ public:
+  explicit Alternate48(const void* acc) {
+    constexpr int in_register = sizeof(Register) / sizeof(std::uint64_t);
+    for (int k = 0; k < 16; k += in_register) {
+      const auto* from = static_cast<const unsigned char*>(acc) + 16 * k;
+      const Register a = load(from), b = load(from + sizeof(Register));
+      const Register taken = First == 0 ? low_pairs(a, b) : high_pairs(a, b);
+      *reinterpret_cast<Register*>(lanes_ + k) = in_order2(taken);
+    }
+  }
+  std::uint64_t operator[](int k) const { return lanes_[k]; }
+
+ private:
+  alignas(64) std::uint64_t lanes_[16];
+};
+
 // Count words on their way to lanes of type Lane.
 template <class Lane, int Count>
 struct Saturated {
   alignas(64) std::int32_t lane[Count];
-
-  void put(int i, std::int32_t value) { lane[i] = value; }
 
   void collect(void* r) const {
     constexpr int in_register = sizeof(Register) / sizeof(Lane);
@@ -75,14 +108,6 @@ struct Saturated {
   static Register collected(const Register* from, Byte byte) {
     return in_order4(pack_halves(pack_words(from[0], from[1]), pack_words(from[2], from[3]), byte));
   }
-};
-
-// What is a word already needs no second step.
-template <int Count>
-struct Saturated<std::int32_t, Count> {
-  alignas(64) std::int32_t lane[Count];
-  void put(int i, std::int32_t value) { lane[i] = value; }
-  void collect(void* r) const { std::memcpy(r, lane, sizeof lane); }
 };
 
 }  // namespace

@@ -31,22 +31,39 @@ class Coefficient {
   typename C::factor value_;
 };
 
+// All ones in the lanes whose number has the bit, as a table: compilers blend by it in registers, where
+// an array filled at run time would go through memory.
+template <class Lane, int Bit>
+struct LanesWithBit {
+  Lane mask[64] = {};
+  constexpr LanesWithBit() {
+    for (int i = 0; i < 64; ++i) mask[i] = static_cast<Lane>(i & Bit ? -1 : 0);
+  }
+};
+template <class Lane, int Bit>
+constexpr LanesWithBit<Lane, Bit> lanes_with_bit;
+
 template <class C>
 class Coefficient<C, false> {
  public:
-  // Lanes that take turns fill a word, and the word fills a register.
   Coefficient(const word* words, int j) {
-    constexpr int bits = 8 * sizeof(factor);
-    word turn = 0;
-    for (int i = 0; i < 32 / bits; ++i)
-      turn |= word{unsigned_bits(C::at(words[i % C::words], j))} << (bits * i);
-    for (word& w : turns_) w = turn;
+    for (int w = 0; w < C::words; ++w) values_[w] = C::at(words[w], j);
   }
-  auto operator[](int i) const { return factor{reinterpret_cast<const in_memory<factor>*>(turns_)[i]}; }
+  auto operator[](int i) const {
+    if constexpr (C::words == 2) {
+      return turn<1>(i, values_[0], values_[1]);
+    } else {
+      return turn<2>(i, turn<1>(i, values_[0], values_[1]), turn<1>(i, values_[2], values_[3]));
+    }
+  }
 
  private:
   using factor = typename C::factor;
-  alignas(64) word turns_[16];
+  template <int Bit>
+  static factor turn(int i, factor without, factor with) {
+    return static_cast<factor>(without ^ ((without ^ with) & lanes_with_bit<factor, Bit>.mask[i]));
+  }
+  factor values_[C::words];
 };
 
 // Lane i of an operand times its coefficient.

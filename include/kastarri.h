@@ -8,11 +8,13 @@
 #define KASTARRI_H
 
 #include "kastarri/library.h"
+#include "kastarri/state.h"
 #include "kastarri/types.h"
 
 #include "kastarri/conversions.h"
 #include "kastarri/integer.h"
 #include "kastarri/memory.h"
 #include "kastarri/multiply.h"
+#include "kastarri/scalar.h"
 
 #endif

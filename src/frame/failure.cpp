@@ -1,0 +1,24 @@
+#include "frame/failure.h"
+
+#include <cstdarg>
+#include <cstdio>
+#include <cstdlib>
+
+#include "kastarri/state.h"
+
+void kastarri::fail(const char* format, ...) {
+  std::va_list values;
+  va_start(values, format);
+  std::vfprintf(stderr, format, values);
+  va_end(values);
+  std::exit(1);
+}
+
+void kastarri::not_aligned(unsigned address) {
+  fail(
+      "Error: The config takes exception when the address of an load/store is unaligned. "
+      "The address 0x%x is not properly aligned.\n",
+      address);
+}
+
+void cstub_vaddr_not_aligned(unsigned address) { kastarri::not_aligned(address); }

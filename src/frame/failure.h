@@ -1,0 +1,18 @@
+// How the library fails: where the core would trap, or a port is used without its handlers, one line goes
+// to the standard error stream and the program ends with exit status 1.
+#ifndef KASTARRI_FRAME_FAILURE_H
+#define KASTARRI_FRAME_FAILURE_H
+
+namespace kastarri {
+
+// Hidden, so that a caller needs nothing set up for the call before it knows that it fails.
+#define KASTARRI_FAILURE __attribute__((cold, noreturn, visibility("hidden")))
+
+KASTARRI_FAILURE void fail(const char* format, ...) __attribute__((format(printf, 1, 2)));
+
+// What the exported cstub_vaddr_not_aligned does.
+KASTARRI_FAILURE void not_aligned(unsigned address);
+
+}  // namespace kastarri
+
+#endif

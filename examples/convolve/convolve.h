@@ -20,6 +20,7 @@ struct Mask {
 
 struct Filter {
   std::vector<Mask> masks;
+  int radius;  // beyond it all weights are 0
   int shift;
 };
 

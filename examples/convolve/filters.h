@@ -15,13 +15,13 @@ inline Filter gauss() {
   Mask mask;
   for (int y = 0; y < MASK_SIZE; ++y)
     for (int x = 0; x < MASK_SIZE; ++x) mask.weight[y][x] = static_cast<signed char>(binomial[y] * binomial[x]);
-  return {{mask}, 8};
+  return {{mask}, 2, 8};
 }
 
 // The slope from left to right and from top to bottom, up and down: the steepest of the four is the edge.
 inline Filter sobel() {
   constexpr int across[3] = {1, 2, 1}, along[3] = {-1, 0, 1};
-  Filter filter{{}, 2};
+  Filter filter{{}, 1, 2};
   for (const int sign : {1, -1}) {
     for (const bool down : {false, true}) {
       Mask mask{};

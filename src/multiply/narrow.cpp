@@ -4,7 +4,7 @@
 
 namespace {
 
-constexpr auto PACKL = [](std::uint16_t a, std::uint16_t b) { return static_cast<std::uint16_t>(std::uint32_t{a} * b); };
+constexpr auto PACKL = [](std::int16_t a, std::int16_t b) { return static_cast<std::uint16_t>(product(a, b)); };
 constexpr auto PACKQ = [](std::int16_t a, std::int16_t b) { return q15(unsigned_bits(product(a, b))); };
 constexpr auto PACKP = [](std::int16_t a, std::int16_t b) { return q10(unsigned_bits(product(a, b))); };
 

@@ -122,8 +122,8 @@ template <class Rounding>
 constexpr auto pack48_high = [](Words x, word s) { return Rounding::halve(shared(high_part(x), s - 17)); };
 
 template <class Rounding>
-constexpr auto pack48_own = [](Words x, word count) {
-  const word s = clamped(count, 32);
+constexpr auto pack48_own = [](Words x, auto count) {
+  const word s = clamped(static_cast<word>(count), 32);
   const std::int32_t part = s > 16 ? high_part(x) : low_part(x);
   const word left = s > 16 ? s - 16 : s;
   const std::int32_t twice = own(part, left - (s != 0));

@@ -7,7 +7,7 @@
 #define KASTARRI_EXAMPLES_FIR_H
 
 constexpr int FIR_MAX_TAPS = 512;
-constexpr int FIR_MARGIN = 31;
+constexpr int FIR_MARGIN = 32;
 
 void fir(const short* x, const short* taps, int tap_count, short* y, int count);
 void fir_reference(const short* x, const short* taps, int tap_count, short* y, int count);

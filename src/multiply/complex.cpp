@@ -1,0 +1,44 @@
+// Complex products: lane 2k of a vector is the real part, lane 2k + 1 the imaginary part of number k.
+#include "multiply/products.h"
+
+namespace {
+
+template <class Part>
+struct Complex {
+  Part re, im;
+};
+
+// A number of two 16-bit parts is a word, one of two 32-bit parts a pair of words.
+constexpr Complex<std::int16_t> number(std::uint32_t bits) {
+  return {static_cast<std::int16_t>(bits), static_cast<std::int16_t>(bits >> 16)};
+}
+constexpr Complex<std::int32_t> number(std::uint64_t bits) {
+  return {static_cast<std::int32_t>(bits), static_cast<std::int32_t>(bits >> 32)};
+}
+
+// The terms with the second factor's real part, those with its imaginary part, and all of them.
+constexpr auto REAL = [](auto a, auto b) {
+  const auto x = number(a), y = number(b);
+  return Both{term(x.re, y.re), term(x.im, y.re)};
+};
+constexpr auto IMAGINARY = [](auto a, auto b) {
+  const auto x = number(a), y = number(b);
+  return Both{0 - term(x.im, y.im), term(x.re, y.im)};
+};
+constexpr auto COMPLEX = [](auto a, auto b) {
+  const auto real = REAL(a, b), imaginary = IMAGINARY(a, b);
+  return Both{real.even + imaginary.even, real.odd + imaginary.odd};
+};
+// The second factor conjugated: its imaginary part changes sign.
+constexpr auto CONJUGATE = [](auto a, auto b) {
+  const auto real = REAL(a, b), imaginary = IMAGINARY(a, b);
+  return Both{real.even - imaginary.even, real.odd - imaginary.odd};
+};
+
+}  // namespace
+
+#include "frame/stamp.h"
+
+#include "multiply/complex.def"
+
+#include "frame/stamp_end.h"

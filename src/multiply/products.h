@@ -1,0 +1,163 @@
+// What all multiplies share. A multiply is three choices that do not touch each other:
+//   the factors' layouts, which carry their signedness;
+//   the arrangement, a rule that makes a lane's sum of products from the factors;
+//   the kind, which puts that sum into the result: fresh, added to the accumulator, subtracted from it.
+#ifndef KASTARRI_MULTIPLY_PRODUCTS_H
+#define KASTARRI_MULTIPLY_PRODUCTS_H
+
+#include <cstdint>
+#include <type_traits>
+
+#include "frame/arithmetic.h"
+#include "frame/lanes.h"
+
+namespace {
+
+// The whole containers of a fresh accumulator's 24 and 48-bit lanes, and of a complex number's two words.
+using i32x64 = Layout<std::int32_t, 32, 64>;
+using i64x32 = Layout<std::int64_t, 64, 32>;
+using u64x8 = Layout<std::uint64_t, 64, 8>;
+
+template <class X, class Y>
+constexpr bool both_unsigned = std::is_unsigned_v<X> && std::is_unsigned_v<Y>;
+
+// The exact product of a signed and an unsigned 32-bit factor. Processors multiply two of a kind: the
+// unsigned factor taken as signed is short of 2^32 when its top bit is set.
+constexpr std::int64_t product_of_mixed(std::int32_t x, std::uint32_t y) {
+  const std::int64_t as_signed = std::int64_t{x} * std::int64_t{static_cast<std::int32_t>(y)};
+  const std::uint32_t missing = static_cast<std::int32_t>(y) < 0 ? unsigned_bits(x) : 0;
+  return static_cast<std::int64_t>(unsigned_bits(as_signed) + (std::uint64_t{missing} << 32));
+}
+
+// The exact product of two factors, in a type as narrow as holds it: narrow types make fast loops.
+template <class X, class Y>
+constexpr auto product(X x, Y y) {
+  if constexpr (sizeof(X) == 4 && sizeof(Y) == 4) {
+    if constexpr (both_unsigned<X, Y>) {
+      return std::uint64_t{x} * y;
+    } else if constexpr (std::is_unsigned_v<X>) {
+      return product_of_mixed(y, x);
+    } else if constexpr (std::is_unsigned_v<Y>) {
+      return product_of_mixed(x, y);
+    } else {
+      return std::int64_t{x} * std::int64_t{y};
+    }
+  } else if constexpr (sizeof(X) == 1 && sizeof(Y) == 1) {
+    using Product = std::conditional_t<both_unsigned<X, Y>, std::uint16_t, std::int16_t>;
+    return static_cast<Product>(x * y);
+  } else if constexpr (both_unsigned<X, Y>) {
+    return std::uint32_t{x} * y;
+  } else {
+    return std::int32_t{x} * y;
+  }
+}
+
+// Products of bytes are summed for 24-bit lanes, in a word, others for 48 and 64-bit lanes in a pair of
+// words. Sums are unsigned: they wrap, and whatever passes the lane's top bit is cut off in the end.
+template <class X, class Y>
+using sum_of = std::conditional_t<sizeof(X) == 1 || sizeof(Y) == 1, std::uint32_t, std::uint64_t>;
+
+template <class X, class Y>
+constexpr sum_of<X, Y> term(X x, Y y) {
+  return static_cast<sum_of<X, Y>>(product(x, y));
+}
+
+constexpr auto SINGLE = [](auto a, auto b) { return term(a, b); };
+
+// What a rule returns that makes two lanes of the result, 2k and 2k + 1, from lanes k of its operands.
+template <class Sum>
+struct Both {
+  Sum even, odd;
+};
+template <class Sum>
+Both(Sum, Sum) -> Both<Sum>;
+
+// --- Kinds ------------------------------------------------------------------------------------------------
+
+// The whole containers of an accumulator: what they hold above the lane's own bits is cut from the sum.
+template <class R>
+using whole = Layout<std::make_unsigned_t<typename R::container>, 8 * sizeof(typename R::container), R::count>;
+
+struct Fresh {
+  template <class Sum>
+  Sum operator()(int, Sum sum) const {
+    return sum;
+  }
+};
+
+template <class R>
+struct Added {
+  Read<whole<R>> acc;
+  template <class Sum>
+  Sum operator()(int i, Sum sum) const {
+    return static_cast<Sum>(acc[i] + sum);
+  }
+};
+
+template <class R>
+struct Subtracted {
+  Read<whole<R>> acc;
+  template <class Sum>
+  Sum operator()(int i, Sum sum) const {
+    return static_cast<Sum>(acc[i] - sum);
+  }
+};
+
+// --- The loop ---------------------------------------------------------------------------------------------
+
+template <class Out, class Kind, class Sum>
+inline void put(const Out& out, const Kind& kind, int i, Sum sum) {
+  out.put(i, kind(i, sum));
+}
+template <class Out, class Kind, class Sum>
+inline void put(const Out& out, const Kind& kind, int k, Both<Sum> sums) {
+  const auto even = kind(2 * k, sums.even);
+  const auto odd = kind(2 * k + 1, sums.odd);
+  out.put(2 * k, even);
+  out.put(2 * k + 1, odd);
+}
+
+// Lane i (lanes 2i and 2i + 1) of the result from lanes i of the operands, for i = 0 .. Steps - 1.
+template <int Steps, class Out, class Kind, class Rule, class... Operands>
+inline void multiply(const Out& out, const Kind& kind, Rule rule, const Operands&... operands) {
+  KASTARRI_LANES_INDEPENDENT
+  for (int i = 0; i < Steps; ++i) put(out, kind, i, rule(operands[i]...));
+}
+
+template <class>
+using image = const void*;
+
+template <class L, class... Ls>
+constexpr int lanes_of = L::count;
+
+// The semantic functions: operands of layouts Ls, the accumulator before them, the result last.
+template <class R, class... Ls>
+struct Multiply {
+  template <class Rule, class Out>
+  static inline void fresh(Rule rule, image<Ls>... operands, Out r) {
+    multiply<lanes_of<Ls...>>(result<R>(r), Fresh{}, rule, Read<Ls>(operands)...);
+  }
+  template <class Rule, class Out>
+  static inline void add(Rule rule, const void* acc, image<Ls>... operands, Out r) {
+    multiply<lanes_of<Ls...>>(result<R>(r), Added<R>{Read<whole<R>>(acc)}, rule, Read<Ls>(operands)...);
+  }
+  template <class Rule, class Out>
+  static inline void subtract(Rule rule, const void* acc, image<Ls>... operands, Out r) {
+    multiply<lanes_of<Ls...>>(result<R>(r), Subtracted<R>{Read<whole<R>>(acc)}, rule, Read<Ls>(operands)...);
+  }
+};
+
+}  // namespace
+
+// KERNEL(OP, kind, result layout, rule, operand layouts ...). A fresh sum that cannot pass the lane's top bit
+// is written as a whole container, which it fills in canonical form by itself.
+#define KERNEL_OF_PRODUCTS(OP, KIND, R, RULE, ...)                  \
+  template <class... Units>                                         \
+  static inline void KASTARRI_SEMANTIC(OP)(Units... units) {        \
+    Multiply<R, __VA_ARGS__>::KIND(RULE, units...);                 \
+  }
+#define KERNEL_fresh(OP, ...) KERNEL_OF_PRODUCTS(OP, fresh, __VA_ARGS__)
+#define KERNEL_add(OP, ...) KERNEL_OF_PRODUCTS(OP, add, __VA_ARGS__)
+#define KERNEL_subtract(OP, ...) KERNEL_OF_PRODUCTS(OP, subtract, __VA_ARGS__)
+
+#endif

@@ -111,25 +111,36 @@ inline word narrow(float x, Left& left) {
   return leave >> 31 ? Half::default_nan : half;
 }
 
-// p + c for a p that is the exact product of two narrower numbers, such that rounding the sum again to
-// their format is rounding once. In a directed mode any rounding in between does. To nearest, the sum is
-// rounded to odd: of the two neighbours of an inexact sum the one with the last bit 1, so that the
-// second rounding takes it for neither a tie nor a number. That needs two bits more than the format has.
-// The error of the sum is exact (Knuth); nothing over- or underflows, the range being twice the format's.
-template <bool Nearest, class Wide>
+// p + c for a p that is the exact product of two numbers of the narrower format F, such that rounding
+// the sum again to F is rounding once. Nothing over- or underflows, the range being twice that of F.
+//
+// To nearest, the sum is rounded to odd: of the two neighbours of an inexact sum the one with the last
+// bit 1, which the second rounding takes for neither a tie nor a number of F. That needs two bits more
+// than F has. The error of the sum is exact (Knuth).
+//
+// In a directed mode any rounding in between does. But the sum may come out as a subnormal number of F,
+// and then the second rounding does not know that it is inexact; so all such are left, as a NaN.
+template <class F, bool Nearest, class Wide>
 inline Wide odd_sum(Wide p, Wide c) {
   using Bits = std::conditional_t<sizeof(Wide) == 4, std::uint32_t, std::uint64_t>;
+  constexpr bool is_double = sizeof(Wide) == 8;
+  constexpr int fraction_bits = is_double ? 52 : Single::fraction_bits;
+  constexpr Bits sign = Bits{1} << (8 * sizeof(Bits) - 1);
+  constexpr Bits infinity = sign - (Bits{1} << fraction_bits);
   const Wide s = p + c;
-  if constexpr (!Nearest) return s;
-  const Wide back = s - p;
-  const Wide error = (p - (s - back)) + (c - back);
   const auto bits = same_bits_as<Bits>(s);
-  const auto error_bits = same_bits_as<Bits>(error);
-  constexpr Bits top = Bits{1} << (8 * sizeof(Bits) - 1);
-  constexpr Bits infinity = sizeof(Wide) == 4 ? Bits{Single::infinity} : static_cast<Bits>(0x7FF0000000000000u);
-  const bool adjust = (error_bits & ~top) != 0 && (bits & 1) == 0 && (bits & infinity) != infinity;
-  const Bits step = ((bits ^ error_bits) & top) != 0 ? ~Bits{0} : Bits{1};
-  return same_bits_as<Wide>(static_cast<Bits>(bits + (adjust ? step : Bits{0})));
+  if constexpr (Nearest) {
+    const Wide back = s - p;
+    const auto error = same_bits_as<Bits>((p - (s - back)) + (c - back));
+    const bool adjust = (error & ~sign) != 0 && (bits & 1) == 0 && (bits & infinity) != infinity;
+    const Bits step = ((bits ^ error) & sign) != 0 ? ~Bits{0} : Bits{1};
+    return same_bits_as<Wide>(static_cast<Bits>(bits + (adjust ? step : Bits{0})));
+  } else {
+    constexpr int bias = is_double ? 1023 : Single::bias;
+    constexpr Bits least_normal = Bits{F::least_exponent + bias} << fraction_bits;
+    const bool subnormal = (bits & ~sign) != 0 && (bits & ~sign) < least_normal;
+    return same_bits_as<Wide>(static_cast<Bits>(bits | (subnormal ? ~sign : Bits{0})));
+  }
 }
 
 // acc + a * b in single precision, rounded once.
@@ -138,7 +149,7 @@ inline float fused(float acc, float a, float b) {
 #if defined __FMA__
   return __builtin_fmaf(a, b, acc);
 #else
-  return static_cast<float>(odd_sum<Nearest>(double{a} * double{b}, double{acc}));
+  return static_cast<float>(odd_sum<Single, Nearest>(double{a} * double{b}, double{acc}));
 #endif
 }
 

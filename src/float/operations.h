@@ -73,7 +73,7 @@ struct Fused {
   static constexpr auto host = [](float acc, float a, float b) {
     const float factor = Subtract ? -a : a;
     if constexpr (L::bits == 16) {
-      return odd_sum<Nearest>(factor * b, acc);
+      return odd_sum<Half, Nearest>(factor * b, acc);
     } else {
       return fused<Nearest>(acc, factor, b);
     }

@@ -48,17 +48,19 @@ template <class To>
 inline word truncated(float x, Left& left) {
   constexpr bool is_signed = std::is_signed_v<typename To::container>;
   const word absolute = bits_of(x) & single_magnitude;
-  const bool negative = bits_of(x) & single_sign;
-  const word bound = is_signed ? single_bits_of_power(To::bits - 1) : negative ? Single::one : single_bits_of_power(To::bits);
-  const bool within = absolute < bound;
-  left |= within ? 0 : word{0x80000000};
+  const word negative = sign_mask(bits_of(x));
+  const word bound = is_signed ? single_bits_of_power(To::bits - 1)
+                               : (negative & Single::one) | (~negative & single_bits_of_power(To::bits));
+  const word within = mask_below(absolute, bound);
+  left |= ~within;
+  const float kept = as_float(bits_of(x) & within);
   if constexpr (is_signed || To::bits < 32) {
-    return static_cast<word>(static_cast<std::int32_t>(within ? x : 0.0f));
+    return static_cast<word>(static_cast<std::int32_t>(kept));
   } else {
     // The unit converts to signed integers only: bit 31 goes over by itself.
-    const bool high = within && absolute >= single_bits_of_power(31);
-    const float low = (within ? x : 0.0f) - (high ? 0x1p31f : 0.0f);
-    return static_cast<word>(static_cast<std::int32_t>(low)) | (high ? word{0x80000000} : 0);
+    const word high = within & ~mask_below(absolute, single_bits_of_power(31));
+    const float low = kept - as_float(high & single_bits_of_power(31));
+    return static_cast<word>(static_cast<std::int32_t>(low)) | (high & single_sign);
   }
 }
 
@@ -88,14 +90,14 @@ inline void convert_register(Out* out, const Units* in, word scale) {
   } else if constexpr (!is_float<From>) {
     const float unit = as_float(single_bits_of_power(-static_cast<int>(scale)));
     convert_vector<From, To>(
-        out, in, [unit](Left& left, auto integer) { return from_host<To>(single_of(integer) * unit, left); }, exact);
+        out, in, [unit](auto integer) { return single_of(integer) * unit; }, exact);
   } else if constexpr (!is_float<To>) {
     const float power = as_float(single_bits_of_power(static_cast<int>(scale)));
     convert_vector<From, To>(
         out, in, [power](Left& left, float x) { return truncated<To>(x * power, left); }, exact);
   } else {
     convert_vector<From, To>(
-        out, in, [](Left& left, float x) { return from_host<To>(x, left); }, exact);
+        out, in, [](float x) { return x; }, exact);
   }
 }
 

@@ -12,10 +12,12 @@
 //              that is always so; to nearest since 24 >= 2 * 11 + 2; sums below the least normal half
 //              are exact;
 //   fused      the exact product, then the sum rounded to odd (odd_sum).
-// Inexact, told by either rounding, is then told rightly. Lanes that overflow, or underflow inexactly,
-// are left to the reference.
+// Inexact, told by either rounding, is then told rightly. The unit's own conversion to half precision
+// tells the rest; without it, lanes that overflow, or underflow inexactly, are left to the reference.
 #ifndef KASTARRI_FLOAT_HOST_H
 #define KASTARRI_FLOAT_HOST_H
+
+#include <immintrin.h>
 
 #include <cstdint>
 #include <cstring>
@@ -72,6 +74,22 @@ inline To same_bits_as(From from) {
 inline float as_float(word bits) { return same_bits_as<float>(bits); }
 inline word bits_of(float x) { return same_bits_as<word>(x); }
 
+// Rules for whole vectors choose between values by masks made of signs. Of a comparison the compiler
+// makes a branch when that spares it a floating-point operation, and does not vectorise the branch.
+template <class T>
+constexpr T sign_mask(T x) {
+  return static_cast<T>(static_cast<std::make_signed_t<T>>(x) >> (8 * sizeof(T) - 1));
+}
+// For x and y below the top bit: all ones where x < y, where x is not 0.
+template <class T>
+constexpr T mask_below(T x, T y) {
+  return sign_mask(static_cast<T>(x - y));
+}
+template <class T>
+constexpr T mask_not_zero(T x) {
+  return sign_mask(static_cast<T>(0 - x));
+}
+
 constexpr word single_sign = Single::sign;
 constexpr word single_magnitude = Single::sign - 1;
 
@@ -86,10 +104,9 @@ constexpr word single_bits_of_power(int exponent) { return static_cast<word>(exp
 // A half as a single. As the low bits of one it is 2^-112 times itself; only the exponent of infinity
 // and NaN has to be told.
 inline float widen(word half) {
-  const word absolute = (half & 0x7FFF) << 13;
-  const word special = absolute >= Half::infinity << 13 ? Single::infinity : 0;
-  const float number = as_float(absolute | special) * 0x1p112f;
-  return as_float(bits_of(number) | (half & 0x8000) << 16);
+  const auto spread = static_cast<word>(static_cast<std::int32_t>(half << 16) >> 3);
+  const word special = ~mask_below(spread & 0x0FFFE000, Half::infinity << 13) & Single::infinity;
+  return as_float((spread & 0x8FFFE000) | special) * 0x1p112f;
 }
 
 // A single rounded to half precision. Adding 2^13 times the power of two of its exponent, or of the
@@ -104,11 +121,11 @@ inline word narrow(float x, Left& left) {
   const float kept = (x + pull) - pull;
   const word rounded = bits_of(kept) & single_magnitude;
   const word largest = single_bits_of_power(Half::greatest_exponent + 1) - (word{1} << 13);
-  const word tiny_inexact = rounded != absolute && absolute < least_normal ? word{0x80000000} : 0;
+  const word tiny_inexact = (0 - (rounded ^ absolute)) & (absolute - least_normal);  // in bit 31
   const Left leave = left_above(rounded, largest) | tiny_inexact;
   left |= leave;
   const word half = bits_of(as_float(rounded) * 0x1p-112f) >> 13 | sign >> 16;
-  return leave >> 31 ? Half::default_nan : half;
+  return half | (sign_mask(leave) & (Half::sign - 1));
 }
 
 // p + c for a p that is the exact product of two numbers of the narrower format F, such that rounding
@@ -132,14 +149,15 @@ inline Wide odd_sum(Wide p, Wide c) {
   if constexpr (Nearest) {
     const Wide back = s - p;
     const auto error = same_bits_as<Bits>((p - (s - back)) + (c - back));
-    const bool adjust = (error & ~sign) != 0 && (bits & 1) == 0 && (bits & infinity) != infinity;
-    const Bits step = ((bits ^ error) & sign) != 0 ? ~Bits{0} : Bits{1};
-    return same_bits_as<Wide>(static_cast<Bits>(bits + (adjust ? step : Bits{0})));
+    const Bits even = (bits & 1) - 1;
+    const Bits adjust = mask_not_zero(error & ~sign) & even & mask_below(bits & ~sign, infinity);
+    const Bits step = sign_mask(bits ^ error) | 1;
+    return same_bits_as<Wide>(bits + (adjust & step));
   } else {
     constexpr int bias = is_double ? 1023 : Single::bias;
     constexpr Bits least_normal = Bits{F::least_exponent + bias} << fraction_bits;
-    const bool subnormal = (bits & ~sign) != 0 && (bits & ~sign) < least_normal;
-    return same_bits_as<Wide>(static_cast<Bits>(bits | (subnormal ? ~sign : Bits{0})));
+    const Bits subnormal = mask_not_zero(bits & ~sign) & mask_below(bits & ~sign, least_normal);
+    return same_bits_as<Wide>(bits | (subnormal & ~sign));
   }
 }
 
@@ -153,26 +171,81 @@ inline float fused(float acc, float a, float b) {
 #endif
 }
 
-// Lane i of an operand as the unit takes it, and of a result as the register does.
-template <class L>
-inline auto host_value(typename L::container lane) {
-  if constexpr (std::is_same_v<typename L::number, half_float>) {
-    return widen(lane);
-  } else if constexpr (std::is_same_v<typename L::number, single_float>) {
-    return as_float(lane);
-  } else {
-    return lane;
-  }
-}
+// --- Lanes ------------------------------------------------------------------------------------------
 
-template <class R>
-inline word from_host(float x, Left& left) {
-  if constexpr (std::is_same_v<typename R::number, half_float>) {
-    return narrow(x, left);
-  } else {
-    left |= left_above(bits_of(x) & single_magnitude, Single::infinity);
-    return bits_of(x);
+// The lanes of an operand as the unit takes them: singles and integers where they lie, halves widened.
+template <class L, class = typename L::number>
+class HostOperand {
+ public:
+  explicit HostOperand(const void* lanes) : lanes_(static_cast<const in_memory<typename L::container>*>(lanes)) {}
+  auto operator[](int i) const {
+    if constexpr (std::is_same_v<typename L::number, single_float>) {
+      return as_float(lanes_[i]);
+    } else {
+      return typename L::container{lanes_[i]};
+    }
   }
+
+ private:
+  const in_memory<typename L::container>* lanes_;
+};
+
+template <class L>
+class HostOperand<L, half_float> {
+ public:
+  explicit HostOperand(const void* lanes) {
+    const auto* halves = static_cast<const in_memory<std::uint16_t>*>(lanes);
+    if constexpr (L::count == 1) {
+      number_[0] = widen(halves[0]);
+      return;
+    }
+#if defined __AVX512F__
+    for (int i = 0; i < L::count; i += 16)
+      _mm512_store_ps(number_ + i, _mm512_maskz_cvtph_ps(0xFFFF, _mm256_loadu_si256(reinterpret_cast<const __m256i*>(halves + i))));
+#elif defined __F16C__
+    for (int i = 0; i < L::count; i += 8)
+      _mm256_store_ps(number_ + i, _mm256_cvtph_ps(_mm_loadu_si128(reinterpret_cast<const __m128i*>(halves + i))));
+#else
+    KASTARRI_LANES_INDEPENDENT
+    for (int i = 0; i < L::count; ++i) number_[i] = widen(halves[i]);
+#endif
+  }
+  float operator[](int i) const { return number_[i]; }
+
+ private:
+  alignas(64) float number_[L::count];
+};
+
+// Singles as the lanes of a result. A lane that is left is a NaN.
+template <int Count>
+inline Left narrow(const float* numbers, std::uint16_t* halves) {
+  if constexpr (Count == 1) {
+    Left left = 0;
+    halves[0] = static_cast<std::uint16_t>(narrow(numbers[0], left));
+    return left;
+  }
+#if defined __AVX512F__
+  word nans = 0;
+  for (int i = 0; i < Count; i += 16) {
+    const __m512 x = _mm512_load_ps(numbers + i);
+    nans |= _mm512_cmp_ps_mask(x, x, _CMP_UNORD_Q);
+    _mm256_storeu_si256(reinterpret_cast<__m256i*>(halves + i), _mm512_maskz_cvtps_ph(0xFFFF, x, _MM_FROUND_CUR_DIRECTION));
+  }
+  return mask_not_zero(nans);
+#elif defined __F16C__
+  __m256 nans = _mm256_setzero_ps();
+  for (int i = 0; i < Count; i += 8) {
+    const __m256 x = _mm256_load_ps(numbers + i);
+    nans = _mm256_or_ps(nans, _mm256_cmp_ps(x, x, _CMP_UNORD_Q));
+    _mm_storeu_si128(reinterpret_cast<__m128i*>(halves + i), _mm256_cvtps_ph(x, _MM_FROUND_CUR_DIRECTION));
+  }
+  return mask_not_zero(static_cast<word>(_mm256_movemask_ps(nans)));
+#else
+  Left left = 0;
+  KASTARRI_LANES_INDEPENDENT
+  for (int i = 0; i < Count; ++i) halves[i] = static_cast<std::uint16_t>(narrow(numbers[i], left));
+  return left;
+#endif
 }
 
 struct HostResult {
@@ -180,16 +253,30 @@ struct HostResult {
   bool some_left;
 };
 
-// Result lane i = rule(left, operand lanes i ...) on the unit. `results` are apart from the operands.
-template <class R, class... Ls, class Lane, class Rule, class... Units>
-inline HostResult on_host(Rounding rounding, Lane* results, Rule rule, const Units*... operands) {
-  static_assert(sizeof(Lane) == sizeof(typename R::container));
+// Result lane i = rule(operand lanes i ...) on the unit, a float; for a result of integers,
+// rule(left, operand lanes i ...). The results are apart from the operands.
+template <class R, class... Ls, class Rule, class... Units>
+inline HostResult on_host(Rounding rounding, typename R::container* results, Rule rule, const Units*... operands) {
   HostFpu fpu(rounding, results, operands...);
   Left left = 0;
-  KASTARRI_LANES_INDEPENDENT
-  for (int i = 0; i < R::count; ++i)
-    results[i] = static_cast<Lane>(rule(left, host_value<Ls>(static_cast<const in_memory<typename Ls::container>*>(
-                                                  static_cast<const void*>(operands))[i])...));
+  const auto every_lane = [=, &left](const auto&... x) {
+    if constexpr (std::is_same_v<typename R::number, half_float>) {
+      alignas(64) float numbers[R::count];
+      KASTARRI_LANES_INDEPENDENT
+      for (int i = 0; i < R::count; ++i) numbers[i] = rule(x[i]...);
+      left = narrow<R::count>(numbers, results);
+    } else if constexpr (std::is_same_v<typename R::number, single_float>) {
+      KASTARRI_LANES_INDEPENDENT
+      for (int i = 0; i < R::count; ++i) {
+        results[i] = bits_of(rule(x[i]...));
+        left |= left_above(results[i] & single_magnitude, Single::infinity);
+      }
+    } else {
+      KASTARRI_LANES_INDEPENDENT
+      for (int i = 0; i < R::count; ++i) results[i] = static_cast<typename R::container>(rule(left, x[i]...));
+    }
+  };
+  every_lane(HostOperand<Ls>(operands)...);
   return {fpu.leave(), some_left(left)};
 }
 

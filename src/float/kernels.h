@@ -32,3 +32,10 @@
   static inline void KASTARRI_SEMANTIC(OP)(word number, Out r) {                \
     lanes<L::count>(result<L>(r), [](word x) { return x; }, Same(constant<L>(number))); \
   }
+
+// Every lane by value into another layout: from, to.
+#define KERNEL_convert(OP, FROM, TO)                                          \
+  template <class Units, class Out>                                           \
+  static inline void KASTARRI_SEMANTIC(OP)(const Units* a, Out* r) {          \
+    convert_register<FROM, TO>(r, a, 0);                                      \
+  }

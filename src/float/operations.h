@@ -16,8 +16,7 @@ using same_layout = L;
 // A rule of two or three floats on the host's unit: results and flags into the register and env.
 template <class L, class Rule, class... Units>
 inline bool fast_on_host(Environment& env, typename L::container* results, Rule rule, const Units*... operands) {
-  const auto kept = [rule](Left& left, auto... x) { return from_host<L>(rule(x...), left); };
-  const HostResult host = on_host<L, same_layout<L, Units>...>(env.rounding, results, kept, operands...);
+  const HostResult host = on_host<L, same_layout<L, Units>...>(env.rounding, results, rule, operands...);
   env.raise(host.flags);
   return host.some_left;
 }
@@ -84,6 +83,13 @@ using MULS = Fused<true>;
 
 // --- Order --------------------------------------------------------------------------------------------
 
+// All ones for a NaN.
+template <class F>
+constexpr typename F::lane nan_mask(typename F::lane x) {
+  using Lane = typename F::lane;
+  return mask_below(static_cast<Lane>(F::infinity), static_cast<Lane>(x & (F::sign - 1)));
+}
+
 // The lanes of the rule on numbers; a lane with a NaN operand is left.
 template <class L, class Rule, class Units>
 inline bool fast_ordered(typename L::container* results, Rule rule, const Units* a, const Units* b) {
@@ -94,11 +100,9 @@ inline bool fast_ordered(typename L::container* results, Rule rule, const Units*
   KASTARRI_LANES_INDEPENDENT
   for (int i = 0; i < L::count; ++i) {
     const Lane a_lane = x[i], b_lane = y[i];
-    const bool nan = is_nan<F>(a_lane) || is_nan<F>(b_lane);
-    const auto chosen = static_cast<Lane>(rule(order<F>(a_lane), order<F>(b_lane)) ? a_lane : b_lane);
-    const auto lane = static_cast<Lane>(nan ? F::default_nan : chosen);
-    left = static_cast<Lane>(left | (nan ? 1 : 0));
-    results[i] = lane;
+    const auto nan = static_cast<Lane>(nan_mask<F>(a_lane) | nan_mask<F>(b_lane));
+    left = static_cast<Lane>(left | nan);
+    results[i] = static_cast<Lane>((rule(order<F>(a_lane), order<F>(b_lane)) ? a_lane : b_lane) | nan);
   }
   return left != 0;
 }
@@ -166,10 +170,10 @@ enum class Direction { away, up, down, zero, by_mode };
 inline float integral_on_host(float x) {
   const word sign = bits_of(x) & single_sign;
   const word absolute = bits_of(x) & single_magnitude;
-  const bool small = absolute < single_bits_of_power(23);
+  const word small = mask_below(absolute, single_bits_of_power(23));
   const float pull = as_float(single_bits_of_power(23) | sign);
-  const float rounded = (as_float((small ? absolute : 0) | sign) + pull) - pull;
-  return as_float((small ? bits_of(rounded) & single_magnitude : absolute) | sign);
+  const float rounded = (as_float((small & absolute) | sign) + pull) - pull;
+  return as_float((small & bits_of(rounded) & single_magnitude) | (~small & absolute) | sign);
 }
 
 // Ties away from zero, the unit truncating: one more where at least half has been cut off.
@@ -177,7 +181,7 @@ inline float away_on_host(float x) {
   const word sign = bits_of(x) & single_sign;
   const float absolute = as_float(bits_of(x) & single_magnitude);
   const float cut = integral_on_host(absolute);
-  const float rounded = absolute - cut >= 0.5f ? cut + 1.0f : cut;
+  const float rounded = cut + as_float(~mask_below(bits_of(absolute - cut), bits_of(0.5f)) & Single::one);
   return as_float(bits_of(rounded) | sign);
 }
 
@@ -196,9 +200,7 @@ struct Integral {
   }
   template <class L, class Units>
   static bool fast(Environment& env, typename L::container* r, const Units* a) {
-    const auto rule = [](Left& left, float x) {
-      return from_host<L>(D == Direction::away ? away_on_host(x) : integral_on_host(x), left);
-    };
+    constexpr auto rule = [](float x) { return D == Direction::away ? away_on_host(x) : integral_on_host(x); };
     const HostResult host = on_host<L, L>(D == Direction::away ? toward_zero : rounding(env), r, rule, a);
     // Halves are integers before they are narrowed: what is inexact is the rounding to an integer.
     if (D == Direction::by_mode) env.raise(host.flags);
@@ -219,43 +221,50 @@ template <class Holds, bool Unordered, bool Signalling>
 struct Relation {
   // Unlike order(), both zeros are 0.
   template <class F>
-  static constexpr std::int32_t key(word x) {
-    using S = std::make_signed_t<typename F::lane>;
-    const auto absolute = static_cast<S>(magnitude<F>(x));
-    return static_cast<S>(x) < 0 ? static_cast<S>(-absolute) : absolute;
+  static constexpr auto key(typename F::lane x) {
+    using Lane = typename F::lane;
+    const Lane sign = sign_mask(x);
+    return static_cast<std::make_signed_t<Lane>>(((x & (F::sign - 1)) ^ sign) - sign);
   }
   template <class F>
-  static bool on_numbers(word a, word b) {
+  static bool on_numbers(typename F::lane a, typename F::lane b) {
     return Holds()(key<F>(a), key<F>(b));
   }
   template <class F>
   static bool exact(Environment& env, word a, word b) {
-    if (!any_nan<F>(a, b)) return on_numbers<F>(a, b);
+    if (!any_nan<F>(a, b)) return on_numbers<F>(static_cast<typename F::lane>(a), static_cast<typename F::lane>(b));
     if (Signalling || is_signalling<F>(a) || is_signalling<F>(b)) env.raise(invalid);
     return Unordered;
   }
 };
 
 struct Equal {
-  constexpr bool operator()(std::int32_t x, std::int32_t y) const { return x == y; }
+  template <class T>
+  constexpr bool operator()(T x, T y) const { return x == y; }
 };
 struct Less {
-  constexpr bool operator()(std::int32_t x, std::int32_t y) const { return x < y; }
+  template <class T>
+  constexpr bool operator()(T x, T y) const { return x < y; }
 };
 struct LessOrEqual {
-  constexpr bool operator()(std::int32_t x, std::int32_t y) const { return x <= y; }
+  template <class T>
+  constexpr bool operator()(T x, T y) const { return x <= y; }
 };
 struct Greater {
-  constexpr bool operator()(std::int32_t x, std::int32_t y) const { return x > y; }
+  template <class T>
+  constexpr bool operator()(T x, T y) const { return x > y; }
 };
 struct GreaterOrEqual {
-  constexpr bool operator()(std::int32_t x, std::int32_t y) const { return x >= y; }
+  template <class T>
+  constexpr bool operator()(T x, T y) const { return x >= y; }
 };
 struct NotEqual {
-  constexpr bool operator()(std::int32_t x, std::int32_t y) const { return x != y; }
+  template <class T>
+  constexpr bool operator()(T x, T y) const { return x != y; }
 };
 struct Never {
-  constexpr bool operator()(std::int32_t, std::int32_t) const { return false; }
+  template <class T>
+  constexpr bool operator()(T, T) const { return false; }
 };
 
 using OEQ = Relation<Equal, false, false>;

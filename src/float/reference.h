@@ -12,45 +12,55 @@
 namespace {
 
 // The finite number +-significand * 2^exponent, exact; or, where its last bit is sticky, a number
-// within one unit of it that rounds to the same.
+// within one unit of it that rounds to the same. The significand leaves the top bit of S free.
+template <class S>
 struct Number {
   bool negative;
   int exponent;
-  std::uint64_t significand;  // below 2^63
+  S significand;
 };
 
+// Every sum, and every product of halves, has room in a word for all that rounding asks of it; products
+// of singles have in two.
+template <class F>
+using ProductSignificand = std::conditional_t<F::bits == 16, word, std::uint64_t>;
+
+inline int highest_bit(word x) { return 31 - __builtin_clz(x); }
 inline int highest_bit(std::uint64_t x) { return 63 - __builtin_clzll(x); }
 
-template <class F>
-inline Number unpack(word x) {
+// x shifted right by s > 0, the last bit sticky: 1 when any bit was lost.
+template <class S>
+inline S shift_right_sticky(S x, int s) {
+  if (s >= static_cast<int>(8 * sizeof(S))) return x != 0;
+  return static_cast<S>(x >> s) | ((x & ((S{1} << s) - 1)) != 0);
+}
+
+template <class F, class S = word>
+inline Number<S> unpack(word x) {
   const word field = magnitude<F>(x) >> F::fraction_bits;
   const word fraction = x & (F::unit - 1);
-  return field == 0 ? Number{is_negative<F>(x), F::least_quantum, fraction}
-                    : Number{is_negative<F>(x), F::least_quantum + static_cast<int>(field) - 1, fraction | F::unit};
+  return field == 0 ? Number<S>{is_negative<F>(x), F::least_quantum, fraction}
+                    : Number<S>{is_negative<F>(x), F::least_quantum + static_cast<int>(field) - 1, fraction | F::unit};
 }
 
 struct Integer {
-  std::uint64_t value;
+  word value;
   bool exact;
 };
 
 // |x| / 2^quantum as an integer. It must fit.
-inline Integer round_at(const Number& x, int quantum, Rounding rounding) {
-  int shift = quantum - x.exponent;
+inline Integer round_at(const Number<word>& x, int quantum, Rounding rounding) {
+  const int shift = quantum - x.exponent;
   if (shift <= 0) return {x.significand << -shift, true};
-  std::uint64_t significand = x.significand;
-  if (shift > 63) {  // less than half, but not nothing
-    significand = significand != 0;
-    shift = 2;
-  }
-  const std::uint64_t half = std::uint64_t{1} << (shift - 1);
-  const std::uint64_t rest = significand & (2 * half - 1);
-  const std::uint64_t below = significand >> shift;
+  // Twice the result with a sticky bit below: a half, and more than nothing beyond it.
+  const word doubled = shift == 1 ? x.significand << 1 : shift_right_sticky(x.significand, shift - 2);
+  const word below = doubled >> 2;
+  const word rest = doubled & 3;
   if (rest == 0) return {below, true};
   bool up = false;
   switch (rounding) {
-    case to_nearest: up = rest > half || (rest == half && (below & 1)); break;
-    case ties_away: up = rest >= half; break;
+    case to_nearest: up = rest + (below & 1) > 2; break;
+    case ties_away: up = rest >= 2; break;
     case toward_zero: break;
     case upward: up = !x.negative; break;
     case downward: up = x.negative; break;
@@ -68,7 +78,7 @@ inline word overflowed(Environment& env, bool negative) {
 // Tiny: below the least normal number when rounded as if exponents had no bound. `top` is the exponent
 // of x's highest bit.
 template <class F>
-inline bool is_tiny(const Number& x, int top, Rounding rounding) {
+inline bool is_tiny(const Number<word>& x, int top, Rounding rounding) {
   if (top >= F::least_exponent) return false;
   if (top < F::least_exponent - 1) return true;
   return round_at(x, top - F::fraction_bits, rounding).value < 2 * F::unit;
@@ -76,7 +86,7 @@ inline bool is_tiny(const Number& x, int top, Rounding rounding) {
 
 // The one rounding step: x in the format F.
 template <class F>
-inline word round_pack(Environment& env, const Number& x) {
+inline word round_pack(Environment& env, const Number<word>& x) {
   const word sign = x.negative ? F::sign : 0;
   if (x.significand == 0) return sign;
   const int top = x.exponent + highest_bit(x.significand);
@@ -85,11 +95,21 @@ inline word round_pack(Environment& env, const Number& x) {
   const Integer kept = round_at(x, quantum, env.rounding);
   // The integer holds the hidden bit: it adds one to the exponent field, or two when rounding has
   // carried into it, and none for a subnormal.
-  const word bits = static_cast<word>(kept.value) + (static_cast<word>(quantum - F::least_quantum) << F::fraction_bits);
+  const word bits = kept.value + (static_cast<word>(quantum - F::least_quantum) << F::fraction_bits);
   if (kept.exact) return sign | bits;
   if (bits >= F::infinity) return overflowed<F>(env, x.negative);
   env.raise(is_tiny<F>(x, top, env.rounding) ? inexact | underflow : inexact);
   return sign | bits;
+}
+
+// The same for more bits: all but the first 31 become the sticky one.
+template <class F>
+inline word round_pack(Environment& env, const Number<std::uint64_t>& x) {
+  const auto high = static_cast<word>(x.significand >> 31);
+  if (high == 0) return round_pack<F>(env, Number<word>{x.negative, x.exponent, static_cast<word>(x.significand)});
+  const int excess = highest_bit(high) + 1;
+  return round_pack<F>(env, Number<word>{x.negative, x.exponent + excess,
+                                         static_cast<word>(shift_right_sticky(x.significand, excess))});
 }
 
 // --- NaN ----------------------------------------------------------------------------------------------
@@ -122,15 +142,17 @@ constexpr word negated(word x) {
 
 // --- Sums and products --------------------------------------------------------------------------------
 
-// With the highest bit of the significand at bit 61: room for a carry below 2^63.
-inline Number normalised(const Number& x) {
-  const int shift = 61 - highest_bit(x.significand);
+// With the highest bit of the significand two below the top: room for a carry.
+template <class S>
+inline Number<S> normalised(const Number<S>& x) {
+  const int shift = static_cast<int>(8 * sizeof(S)) - 3 - highest_bit(x.significand);
   return {x.negative, x.exponent - shift, x.significand << shift};
 }
 
-// x + y, rounded to 61 bits at least with the last one sticky: more than twice the bits of a single. Bits
-// are lost only when the exponents lie far apart, where the sum cannot cancel.
-inline Number sum(Number x, Number y, Rounding rounding) {
+// x + y with the last bit sticky. Bits are lost only when the exponents lie two or more apart, where a
+// difference keeps all but one of its leading bits: five more, at least, than the formats have.
+template <class S>
+inline Number<S> sum(Number<S> x, Number<S> y, Rounding rounding) {
   if (x.significand == 0 && y.significand == 0)
     return {x.negative == y.negative ? x.negative : rounding == downward, x.exponent, 0};
   if (x.significand == 0) return y;
@@ -138,24 +160,20 @@ inline Number sum(Number x, Number y, Rounding rounding) {
   x = normalised(x);
   y = normalised(y);
   if (x.exponent < y.exponent) {
-    const Number swapped = x;
+    const Number<S> swapped = x;
     x = y;
     y = swapped;
   }
-  const int apart = x.exponent - y.exponent;
-  if (apart > 62) {
-    y.significand = 1;
-  } else if (apart > 0) {
-    const std::uint64_t lost = y.significand & ((std::uint64_t{1} << apart) - 1);
-    y.significand = y.significand >> apart | (lost != 0);
-  }
+  if (x.exponent > y.exponent) y.significand = shift_right_sticky(y.significand, x.exponent - y.exponent);
   if (x.negative == y.negative) return {x.negative, x.exponent, x.significand + y.significand};
   if (x.significand == y.significand) return {rounding == downward, x.exponent, 0};
   if (x.significand > y.significand) return {x.negative, x.exponent, x.significand - y.significand};
   return {y.negative, x.exponent, y.significand - x.significand};
 }
 
-inline Number product(const Number& x, const Number& y) {
+template <class F, class P = ProductSignificand<F>>
+inline Number<P> product(word a, word b) {
+  const Number<P> x = unpack<F, P>(a), y = unpack<F, P>(b);
   return {x.negative != y.negative, x.exponent + y.exponent, x.significand * y.significand};
 }
 
@@ -172,7 +190,7 @@ inline word multiply(Environment& env, word a, word b) {
   if (any_nan<F>(a, b)) return nan_of<F>(env, a, b);
   if (is_infinite<F>(a) || is_infinite<F>(b))
     return is_zero<F>(a) || is_zero<F>(b) ? invalid_result<F>(env) : ((a ^ b) & F::sign) | F::infinity;
-  return round_pack<F>(env, product(unpack<F>(a), unpack<F>(b)));
+  return round_pack<F>(env, product<F>(a, b));
 }
 
 // acc + a * b, rounded once.
@@ -185,17 +203,17 @@ inline word multiply_add(Environment& env, word acc, word a, word b) {
     return is_infinite<F>(acc) && acc != infinite ? invalid_result<F>(env) : infinite;
   }
   if (is_infinite<F>(acc)) return acc;
-  return round_pack<F>(env, sum(product(unpack<F>(a), unpack<F>(b)), unpack<F>(acc), env.rounding));
+  return round_pack<F>(env, sum(product<F>(a, b), unpack<F, ProductSignificand<F>>(acc), env.rounding));
 }
 
 // --- Order --------------------------------------------------------------------------------------------
 
 // A number whose order as an integer is that of x, a NaN aside; -0 comes just below +0.
 template <class F>
-constexpr std::int32_t order(word x) {
+constexpr auto order(word x) {
   using S = std::make_signed_t<typename F::lane>;
   const auto bits = static_cast<S>(x);
-  return bits < 0 ? bits ^ static_cast<S>(F::sign - 1) : bits;
+  return static_cast<S>(bits < 0 ? bits ^ static_cast<S>(F::sign - 1) : bits);
 }
 
 template <class F>
@@ -224,18 +242,18 @@ inline word number_of(Environment& env, word a, word b, Choose choose) {
 template <class F>
 inline word to_integral(Environment& env, word x, Rounding rounding, bool tells_inexact) {
   if (is_nan<F>(x)) return nan_of<F>(env, x);
-  const Number number = unpack<F>(x);
+  const auto number = unpack<F>(x);
   if (is_infinite<F>(x) || number.exponent >= 0) return x;
   const Integer integer = round_at(number, 0, rounding);
   if (!integer.exact && tells_inexact) env.raise(inexact);
-  return round_pack<F>(env, {number.negative, 0, integer.value});
+  return round_pack<F>(env, Number<word>{number.negative, 0, integer.value});
 }
 
 // value / 2^scale.
 template <class F>
 inline word from_integer(Environment& env, std::int64_t value, word scale) {
   const std::uint64_t bits = static_cast<std::uint64_t>(value);
-  return round_pack<F>(env, {value < 0, -static_cast<int>(scale), value < 0 ? -bits : bits});
+  return round_pack<F>(env, Number<std::uint64_t>{value < 0, -static_cast<int>(scale), value < 0 ? -bits : bits});
 }
 
 // x * 2^scale truncated, as an integer of that width and signedness; out of range, the bound. A NaN
@@ -250,11 +268,11 @@ inline std::int64_t to_integer(Environment& env, word x, word scale) {
     return negative ? low : high;
   };
   if (magnitude<F>(x) >= F::infinity) return out_of_range();
-  Number number = unpack<F>(x);
+  auto number = unpack<F>(x);
   number.exponent += static_cast<int>(scale);
-  if (number.significand != 0 && number.exponent + highest_bit(number.significand) > Bits) return out_of_range();
+  if (number.significand != 0 && number.exponent + highest_bit(number.significand) >= Bits) return out_of_range();
   const Integer integer = round_at(number, 0, toward_zero);
-  const auto absolute = static_cast<std::int64_t>(integer.value);
+  const auto absolute = std::int64_t{integer.value};
   const std::int64_t value = negative ? -absolute : absolute;
   if (value < low || value > high) return out_of_range();
   if (!integer.exact) env.raise(inexact);
@@ -288,7 +306,7 @@ constexpr bool lacks_exponent(word x) {
 template <class F>
 inline int exponent_of(word x) {
   if (lacks_exponent<F>(x)) return 0;
-  const Number number = unpack<F>(x);
+  const auto number = unpack<F>(x);
   return number.exponent + highest_bit(number.significand);
 }
 
@@ -301,7 +319,7 @@ inline word power_of_two(int exponent) {
 template <class F>
 inline word scaled(Environment& env, word x, int by) {
   if (lacks_exponent<F>(x)) return x;
-  Number number = unpack<F>(x);
+  auto number = unpack<F>(x);
   number.exponent += by;
   return round_pack<F>(env, number);
 }

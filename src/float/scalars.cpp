@@ -5,15 +5,6 @@
 namespace {
 
 template <class Op>
-struct ToNearest {
-  template <class F, class... X>
-  static word exact(Environment&, X... x) {
-    Environment nearest(to_nearest);
-    return Op::template exact<F>(nearest, x...);
-  }
-};
-
-template <class Op>
 struct WithoutFlags {
   template <class F, class... X>
   static word exact(Environment&, X... x) {
@@ -62,6 +53,12 @@ constexpr auto WRITE_STATUS = [](word value) { states.StickyFlags = value >> 7 &
   template <class Unit>                                                                             \
   static inline void KASTARRI_SCALARFP(OP)(const Unit* a, const Unit* b, const Unit* c, Unit* r) {  \
     apply<layout_of_unit<Unit>, RULE>(r, a, b, c);                                                  \
+  }
+#define KERNEL_scalar_abc_to_nearest(OP, RULE)                                                      \
+  template <class Unit>                                                                             \
+  static inline void KASTARRI_SCALARFP(OP)(const Unit* a, const Unit* b, const Unit* c, Unit* r) {  \
+    Environment env(to_nearest);                                                                    \
+    apply<layout_of_unit<Unit>, RULE>(env, r, a, b, c);                                             \
   }
 #define KERNEL_scalar_relation(OP, RULE)                                              \
   template <class Unit, class Bits>                                                   \

@@ -73,10 +73,14 @@ inline void unspill(const word* from, word* to) {
   }
 }
 
+// Numbers of different kinds convert by value: float/conversions.cpp.
+template <class From, class To, class FromUnit, class ToUnit>
+void convert_numbers(const FromUnit* from, ToUnit* to);
+template <class From, class To>
+constexpr bool are_different_numbers = !std::is_same_v<typename From::number, typename To::number> && From::bits != 1 && To::bits != 1;
+
 template <class From, class To>
 inline void convert_lanes(const Read<From>& from, const Write<To>& to) {
-  static_assert(std::is_same_v<typename From::number, typename To::number> || From::bits == 1 || To::bits == 1,
-                "numbers of different kinds convert by value");
   if constexpr (From::count == To::count) {
     lanes<To::count>(to, same_value, from);
   } else if constexpr (From::count == 1) {
@@ -100,6 +104,8 @@ inline void convert(const FromUnit* from, ToUnit* to) {
     spill<From>(from, to);
   } else if constexpr (std::is_same_v<From, packed1536>) {
     unspill<To>(from, to);
+  } else if constexpr (are_different_numbers<From, To>) {
+    convert_numbers<From, To>(from, to);
   } else if constexpr (is_predicate<To> && To::count > 1) {
     replicate_bit<To>(from, to);
   } else {

@@ -32,7 +32,20 @@
 // --- Moves and conversions --------------------------------------------------------------------------
 
 #define SIG_move(SYMBOL, T) T SYMBOL(const T& from)
-#define BODY_move(T) return from;
+#define BODY_move(T)                            \
+  T r;                                          \
+  KASTARRI_SEMANTIC(register_load)(&from, r._); \
+  return r;
+
+#define SIG_mtor(SYMBOL, REG, MEM) REG SYMBOL(const MEM* base, int offset)
+#define BODY_mtor(REG, MEM)                                                                 \
+  REG r;                                                                                    \
+  convert<memory_layout<MEM>, layout_of<REG>>(element_address(address(base, offset)), r._); \
+  return r;
+
+#define SIG_rtom(SYMBOL, REG, MEM) void SYMBOL(const REG& value, const MEM* base, int offset)
+#define BODY_rtom(REG, MEM) \
+  convert_to_memory<layout_of<REG>, memory_layout<MEM>>(value._, writable(element_address(address(base, offset))));
 
 #define SIG_rtor(SYMBOL, FROM, TO) TO SYMBOL(const FROM& from)
 #define BODY_rtor(FROM, TO)                             \

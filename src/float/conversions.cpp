@@ -33,7 +33,7 @@ inline void spread_halves(const std::uint16_t* halves, Out* vector) {
 #define KERNEL_convert_scaled(OP, FROM, TO, INTEGER)                                       \
   template <class Units, class Out>                                                        \
   static inline void KASTARRI_SEMANTIC(OP)(const Units* a, word scale, Out* r) {           \
-    convert_register<FROM, TO>(r, a, scale & (INTEGER::bits - 1));                         \
+    convert_register<FROM, TO>(r, a, scale_of<INTEGER>(scale));                         \
   }
 #define KERNEL_convert_from_every_other(OP, FIRST)                            \
   template <class Units, class Out>                                           \

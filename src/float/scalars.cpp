@@ -83,12 +83,12 @@ constexpr auto WRITE_STATUS = [](word value) { states.StickyFlags = value >> 7 &
 #define KERNEL_scalar_float(OP, I)                                                      \
   template <class Value, class Unit>                                                    \
   static inline void KASTARRI_SCALARFP(OP)(const Value* value, word scale, Unit* r) {   \
-    convert_register<I, layout_of_unit<Unit>>(r, value, scale);                         \
+    convert_register<I, layout_of_unit<Unit>>(r, value, scale_of<I>(scale));                       \
   }
 #define KERNEL_scalar_trunc(OP, I)                                                      \
   template <class Unit, class Value>                                                    \
   static inline void KASTARRI_SCALARFP(OP)(const Unit* a, word scale, Value* value) {   \
-    convert_register<layout_of_unit<Unit>, I>(value, a, scale);                         \
+    convert_register<layout_of_unit<Unit>, I>(value, a, scale_of<I>(scale));                       \
   }
 #define KERNEL_scalar_move(OP, CONDITION)                                                       \
   template <class Unit, class Condition>                                                        \

@@ -39,14 +39,28 @@ template <class L, class R>
 class FloatCheck {
  public:
   using Call = std::function<void(const Register*, Register&)>;
+  using Answers = std::vector<exact::Answer>;
 
-  FloatCheck(std::string name, int operands, Model_function model, Call call)
-      : name_(std::move(name)), operands_(operands), model_(model), call_(std::move(call)) {}
+  FloatCheck(std::string name, int operands, Call call) : name_(std::move(name)), operands_(operands), call_(std::move(call)) {}
 
-  void run() {
-    const std::vector<Case>& all = known_cases(operands_);
+  // The operation on floats that a model tells. Models are slow: each answer is found once and serves
+  // all rows of the operation.
+  void run(Model_function model) {
+    static std::map<int, std::vector<Case>> known_cases;
+    std::vector<Case>& all = known_cases[operands_];
+    if (all.empty()) all = cases(format<L>, operands_);
+    run(all, [&](int mode) -> const Answers& {
+      static std::map<std::pair<Model_function, int>, Answers> known;
+      Answers& answers = known[{model, mode}];
+      if (answers.empty())
+        for (const Case& x : all) answers.push_back(model(format<L>, mode, x.data()));
+      return answers;
+    });
+  }
+
+  void run(const std::vector<Case>& all, const std::function<const Answers&(int mode)>& answers) {
     for (int mode = 0; mode < 4; ++mode) {
-      const std::vector<exact::Answer>& expected = known_answers(all, mode);
+      const Answers& expected = answers(mode);
       for (std::size_t n = 0; n < all.size(); ++n) {
         one_lane(mode, all[n], expected[n], static_cast<int>(n % L::count));
         if (testing::Test::HasFatalFailure()) return;
@@ -59,21 +73,6 @@ class FloatCheck {
   }
 
  private:
-  // Models are slow: each answer is found once and serves all rows of the operation.
-  static const std::vector<Case>& known_cases(int operands) {
-    static std::map<int, std::vector<Case>> known;
-    std::vector<Case>& all = known[operands];
-    if (all.empty()) all = cases(format<L>, operands);
-    return all;
-  }
-  const std::vector<exact::Answer>& known_answers(const std::vector<Case>& all, int mode) const {
-    static std::map<std::pair<Model_function, int>, std::vector<exact::Answer>> known;
-    std::vector<exact::Answer>& answers = known[{model_, mode}];
-    if (answers.empty())
-      for (const Case& x : all) answers.push_back(model_(format<L>, mode, x.data()));
-    return answers;
-  }
-
   void one_lane(int mode, const Case& x, const exact::Answer& expected, int at) {
     Register images[3] = {}, result = {};
     for (int k = 0; k < operands_; ++k) set_lane<L>(images[k].bytes, at, x[static_cast<std::size_t>(k)]);
@@ -118,7 +117,6 @@ class FloatCheck {
 
   std::string name_;
   int operands_;
-  Model_function model_;
   Call call_;
   unsigned calls_ = 0;
 };
@@ -133,9 +131,9 @@ void write_image(const T& value, Register& image) {
 // f(images) gives the result register of type R from operands of type A.
 template <class A, class R, class F>
 void check_float(const char* name, int operands, Model_function model, F f) {
-  FloatCheck<layout_of<A>, layout_of<R>>(name, operands, model, [f](const Register* images, Register& result) {
+  FloatCheck<layout_of<A>, layout_of<R>>(name, operands, [f](const Register* images, Register& result) {
     write_image(f(images), result);
-  }).run();
+  }).run(model);
 }
 
 template <class R, class A>
@@ -162,6 +160,67 @@ void drive_float_acc_ab(const char* name, Model_function model, void (*f)(T&, co
     T r = as_register<T>(x[0].bytes);
     f(r, as_register<T>(x[1].bytes), as_register<T>(x[2].bytes));
     return r;
+  });
+}
+
+// A conversion of values that are lanes of L to lanes of R: answer(mode, value).
+template <class L, class R, class Answer, class Call>
+void check_conversion(const std::string& name, const std::vector<Case>& values, Answer answer, Call call) {
+  std::vector<exact::Answer> answers;
+  FloatCheck<L, R>(name, 1, call).run(values, [&](int mode) -> const std::vector<exact::Answer>& {
+    answers.clear();
+    for (const Case& x : values) answers.push_back(answer(mode, as_lane<L>(static_cast<Int>(x[0]))));
+    return answers;
+  });
+}
+
+// Numbers of a float layout, every `step`th of all when there are that many; the corners of an integer's.
+template <class L>
+std::vector<Case> values_of(std::size_t step) {
+  std::vector<Case> values;
+  if constexpr (std::is_same_v<typename L::number, integer>) {
+    for (Int v : corners<L>()) values.push_back({static_cast<Bits>(v), 0, 0});
+    std::mt19937 random(seed);
+    for (int i = 0; i < 500; ++i) values.push_back({static_cast<Bits>(random() >> random() % 32), 0, 0});
+  } else {
+    const std::vector<Case> all = cases(format<L>, 1);
+    for (std::size_t i = 0; i < all.size(); i += L::bits == 16 ? step : 1) values.push_back(all[i]);
+  }
+  return values;
+}
+
+// The value of a lane of From as a lane of To, by way of the scale.
+template <class From, class To>
+exact::Answer converted(int mode, Int value, int scale) {
+  constexpr bool from_integer = std::is_same_v<typename From::number, integer>;
+  constexpr bool to_integer = std::is_same_v<typename To::number, integer>;
+  if constexpr (from_integer) return model::from_integer(format<To>, mode, value, scale);
+  else if constexpr (!to_integer) return model::convert(format<From>, format<To>, mode, static_cast<Bits>(value));
+  else {
+    using C = typename To::container;
+    return model::to_integer(format<From>, static_cast<Bits>(value), scale, std::numeric_limits<C>::min(), std::numeric_limits<C>::max());
+  }
+}
+
+// With an immediate: a few scales, those beyond the integer's width (Bits) and negative ones masked.
+template <class From, class To, class Call>
+void check_scaled(const std::string& name, int width, Call call) {
+  for (int scale : {0, 1, 7, 15, 16, 31, 35, -1}) {
+    check_conversion<From, To>(
+        name + " scale " + std::to_string(scale), values_of<From>(scale == 0 ? 1 : 37),
+        [&](int mode, Int value) { return converted<From, To>(mode, value, ((scale % width) + width) % width); },
+        [&](const Register* x, Register& r) { call(x[0].bytes, scale, r); });
+    if (testing::Test::HasFatalFailure()) return;
+  }
+}
+
+template <class R, class A>
+void drive_float_scaled(const char* name, R (*f)(const A&, int)) {
+  using From = layout_of<A>;
+  using To = layout_of<R>;
+  constexpr int width = std::is_same_v<typename From::number, integer> ? From::bits : To::bits;
+  check_scaled<From, To>(name, width, [f](const void* x, int scale, Register& r) {
+    write_image(f(as_register<A>(x), scale), r);
   });
 }
 

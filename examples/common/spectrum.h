@@ -2,6 +2,7 @@
 #ifndef KASTARRI_EXAMPLES_SPECTRUM_H
 #define KASTARRI_EXAMPLES_SPECTRUM_H
 
+#include <algorithm>
 #include <cmath>
 #include <complex>
 #include <cstdint>
@@ -35,11 +36,15 @@ inline void fourier(std::vector<std::complex<double>>& x) {
 }
 
 // The mean power spectrum of a sound in dB, 0 dB a sine of full scale: size / 2 + 1 values from 0 Hz to
-// half the sample rate, by overlapping Hann windows of `size` samples.
+// half the sample rate, by Hann windows of `size` samples: overlapping ones, or at most MOST_WINDOWS spread
+// over a long sound.
+constexpr std::size_t MOST_WINDOWS = 1000;
+
 inline std::vector<double> power_spectrum(const std::vector<std::int16_t>& sound, std::size_t size) {
   std::vector<double> power(size / 2 + 1, 0.0);
+  const std::size_t step = std::max(size / 2, sound.size() / MOST_WINDOWS);
   std::size_t windows = 0;
-  for (std::size_t at = 0; at == 0 || at + size <= sound.size(); at += size / 2, ++windows) {
+  for (std::size_t at = 0; at == 0 || at + size <= sound.size(); at += step, ++windows) {
     std::vector<std::complex<double>> x(size);
     for (std::size_t i = 0; i < size && at + i < sound.size(); ++i) {
       const double window = 0.5 - 0.5 * std::cos(2 * PI * static_cast<double>(i) / static_cast<double>(size));
@@ -48,8 +53,8 @@ inline std::vector<double> power_spectrum(const std::vector<std::int16_t>& sound
     fourier(x);
     for (std::size_t k = 0; k < power.size(); ++k) power[k] += std::norm(x[k]);
   }
-  const double full_scale =
-      static_cast<double>(windows) * static_cast<double>(size * size) / 16;  // (1/2 * 1/2 * size)^2
+  // A sine of full scale: half its amplitude at either frequency, and half of that by the window.
+  const double full_scale = static_cast<double>(windows) * static_cast<double>(size * size) / 16;
   for (double& p : power) p = 10 * std::log10(p / full_scale + 1e-20);
   return power;
 }

@@ -34,13 +34,17 @@ class Plot {
 
   Axis x, y;
 
+  // A thin grey line through the points, behind the curves.
+  void background(const std::string& name, const std::vector<double>& xs, const std::vector<double>& ys) {
+    series_.push_back({name, xs, ys, Kind::background});
+  }
   // A line through the points.
   void curve(const std::string& name, const std::vector<double>& xs, const std::vector<double>& ys) {
-    series_.push_back({name, xs, ys, false});
+    series_.push_back({name, xs, ys, Kind::line});
   }
   // A bar at each x from the bottom of the plot (or zero, where it is inside) to y.
   void bars(const std::string& name, const std::vector<double>& xs, const std::vector<double>& ys) {
-    series_.push_back({name, xs, ys, true});
+    series_.push_back({name, xs, ys, Kind::bar});
   }
   // A dashed upright line with a word at its top.
   void mark(double at, const std::string& word) { marks_.emplace_back(at, word); }
@@ -56,7 +60,11 @@ class Plot {
     text(out, LEFT, 56, "start", "font-size='13' fill='#616e7c'", subtitle_);
     draw_axes(out);
     add(out, "<g clip-path='url(#inside)'>\n");
-    for (std::size_t i = 0; i < series_.size(); ++i) series_[i].solid ? draw_bars(out, i) : draw_curve(out, i);
+    for (const Kind kind : {Kind::background, Kind::bar, Kind::line}) {
+      for (std::size_t i = 0; i < series_.size(); ++i) {
+        if (series_[i].kind == kind) kind == Kind::bar ? draw_bars(out, i) : draw_curve(out, i);
+      }
+    }
     add(out, "</g>\n");
     draw_marks(out);
     draw_legend(out);
@@ -64,19 +72,28 @@ class Plot {
   }
 
  private:
+  enum class Kind { background, bar, line };
   struct Series {
     std::string name;
     std::vector<double> xs, ys;
-    bool solid;
+    Kind kind;
   };
 
   static constexpr double WIDTH = 960, HEIGHT = 540;
   static constexpr double LEFT = 78, RIGHT = 930, TOP = 104, BOTTOM = 478;
 
   // Colours that people with any colour vision tell apart (Okabe and Ito).
-  static const char* colour(std::size_t i) {
+  const char* colour(std::size_t which) const {
     static const char* const colours[] = {"#0072b2", "#d55e00", "#009e73", "#cc79a7", "#e69f00", "#56b4e9"};
-    return colours[i % 6];
+    if (series_[which].kind == Kind::background) return "#b8c0ca";
+    return colours[count(which, [](Kind kind) { return kind != Kind::background; }) % 6];
+  }
+  // How many of the first series are of a kind.
+  template <class Is>
+  std::size_t count(std::size_t first, Is is) const {
+    std::size_t found = 0;
+    for (std::size_t i = 0; i < first; ++i) found += is(series_[i].kind) ? 1 : 0;
+    return found;
   }
   static std::size_t bounded(std::size_t have, std::size_t want) { return std::min(have, want); }
 
@@ -167,10 +184,9 @@ class Plot {
   // Bars of several series stand side by side.
   void draw_bars(std::string& out, std::size_t which) const {
     const Series& s = series_[which];
-    const auto solid = [](const Series& one) { return one.solid; };
-    const auto groups = static_cast<double>(std::count_if(series_.begin(), series_.end(), solid));
-    const auto place = static_cast<double>(
-        std::count_if(series_.begin(), series_.begin() + static_cast<std::ptrdiff_t>(which), solid));
+    const auto is_bar = [](Kind kind) { return kind == Kind::bar; };
+    const auto groups = static_cast<double>(count(series_.size(), is_bar));
+    const auto place = static_cast<double>(count(which, is_bar));
     const double step = s.xs.size() > 1 ? std::fabs(across(s.xs[1]) - across(s.xs[0])) : (RIGHT - LEFT) / 4;
     const double width = step * 0.8 / groups;
     const double base = up(std::min(std::max(0.0, y.low), y.high));
@@ -182,15 +198,16 @@ class Plot {
     }
   }
 
+  // Words of neighbours stand on two lines, so that close marks can be read.
   void draw_marks(std::string& out) const {
-    for (const auto& mark : marks_) {
-      const double at = across(mark.first);
+    for (std::size_t i = 0; i < marks_.size(); ++i) {
+      const double at = across(marks_[i].first);
       add(out,
           "<line x1='%.1f' y1='%g' x2='%.1f' y2='%g' stroke='#323f4b' stroke-width='1.2' stroke-dasharray='5 4'/>\n",
           at, TOP, at, BOTTOM);
       const bool right = at > (LEFT + RIGHT) / 2;
-      text(out, right ? at - 6 : at + 6, TOP + 14, right ? "end" : "start", "font-size='12' fill='#323f4b'",
-           mark.second);
+      text(out, right ? at - 6 : at + 6, TOP + (i % 2 == 0 ? 14 : 32), right ? "end" : "start",
+           "font-size='12' fill='#323f4b'", marks_[i].second);
     }
   }
 
@@ -198,8 +215,8 @@ class Plot {
     double at = LEFT;
     for (std::size_t i = 0; i < series_.size(); ++i) {
       const Series& s = series_[i];
-      add(out, "<rect x='%.1f' y='%g' width='18' height='%d' rx='1.5' fill='%s'/>\n", at, s.solid ? 76.0 : 81.0,
-          s.solid ? 12 : 3, colour(i));
+      add(out, "<rect x='%.1f' y='%g' width='18' height='%d' rx='1.5' fill='%s'/>\n", at,
+          s.kind == Kind::bar ? 76.0 : 81.0, s.kind == Kind::bar ? 12 : 3, colour(i));
       text(out, at + 25, 87, "start", "font-size='13' fill='#323f4b'", s.name);
       at += 25 + 7.6 * static_cast<double>(s.name.size()) + 26;
     }

@@ -61,7 +61,7 @@ void require_below_half(const char* option, double frequency, unsigned rate) {
 Samples padded(const Samples& sound, int taps) {
   Samples x(static_cast<std::size_t>((taps - 1) / 2), 0);
   x.insert(x.end(), sound.begin(), sound.end());
-  x.resize(sound.size() + static_cast<std::size_t>(taps - 1 + FIR_READ_AHEAD), 0);
+  x.resize(sound.size() + static_cast<std::size_t>(taps - 1 + FIR_MARGIN), 0);
   return x;
 }
 
@@ -69,7 +69,7 @@ Samples padded(const Samples& sound, int taps) {
 Samples filtered(const Samples& sound, const Samples& taps, Progress& progress, double done, double total) {
   const int tap_count = static_cast<int>(taps.size());
   const Samples x = padded(sound, tap_count);
-  Samples y(sound.size());
+  Samples y(sound.size() + FIR_MARGIN);
   Samples expected(sound.size());
   for (std::size_t at = 0; at < sound.size(); at += BLOCK) {
     const int count = static_cast<int>(std::min<std::size_t>(BLOCK, sound.size() - at));
@@ -77,6 +77,7 @@ Samples filtered(const Samples& sound, const Samples& taps, Progress& progress, 
     fir_reference(&x[at], taps.data(), tap_count, &expected[at], count);
     progress.show(done + static_cast<double>(at), total);
   }
+  y.resize(sound.size());
   const auto differ = std::mismatch(y.begin(), y.end(), expected.begin());
   if (differ.first != y.end()) {
     throw std::runtime_error("sample " + std::to_string(differ.first - y.begin()) + " is " +
@@ -92,7 +93,7 @@ void tell_speed(const Samples& sound, const Samples& taps) {
   const int count = static_cast<int>(std::min<std::size_t>(BLOCK, sound.size()));
   const int rounds = std::max(1, BLOCK / count);
   const Samples x = padded(sound, tap_count);
-  Samples y(static_cast<std::size_t>(count));
+  Samples y(static_cast<std::size_t>(count + FIR_MARGIN));
   const auto run = [&](auto* filter) {
     return [&, filter] {
       for (int i = 0; i < rounds; ++i) filter(x.data(), taps.data(), tap_count, y.data(), count);
@@ -136,7 +137,7 @@ void draw(const Settings& s, const Samples& taps, const Wav& before, const Wav& 
   plot.y = {"power (dB, 0 = a sine of full scale)", -140, 10};
   plot.curve("before", kilohertz, was);
   plot.curve("after", kilohertz, is);
-  plot.curve("the filter alone", kilohertz, response(taps, POINTS));
+  plot.background("the filter alone", kilohertz, response(taps, POINTS));
   plot.mark(s.cutoff / 1000, Options::brief(s.cutoff) + " Hz");
   if (s.pass == Pass::band) plot.mark(s.cutoff2 / 1000, Options::brief(s.cutoff2) + " Hz");
   write_svg(s.picture, plot);

@@ -102,7 +102,8 @@ std::vector<double> measured(Kernel kernel, int lanes, const std::vector<Section
   x[0] = impulse;
   kernel(sections.data(), count_of(sections), x.data(), y.data(), static_cast<int>(POINTS));
   std::vector<std::complex<double>> spectrum(POINTS);
-  for (std::size_t i = 0; i < POINTS; ++i) spectrum[i] = static_cast<double>(y[i * static_cast<std::size_t>(lanes)]) / impulse;
+  for (std::size_t i = 0; i < POINTS; ++i)
+    spectrum[i] = static_cast<double>(y[i * static_cast<std::size_t>(lanes)]) / impulse;
   fourier(spectrum);
   std::vector<double> decibels;
   for (std::size_t k = 0; k <= POINTS / 2; ++k) decibels.push_back(10 * std::log10(std::norm(spectrum[k]) + 1e-20));
@@ -125,7 +126,9 @@ void draw(const Settings& s, const std::vector<Section>& sections, double rate) 
 void tell_speed(const std::vector<Section>& sections) {
   constexpr int frames = 4000;
   Samples x(frames * HALF_LANES, 1000), y(x.size());
-  const auto run = [&](Kernel kernel, int of) { return [&, kernel, of] { kernel(sections.data(), count_of(sections), x.data(), y.data(), of); }; };
+  const auto run = [&](Kernel kernel, int of) {
+    return [&, kernel, of] { kernel(sections.data(), count_of(sections), x.data(), y.data(), of); };
+  };
   const auto quiet = [](int, int) {};
   const auto rate = [](int samples, double seconds) { return samples / 1e6 / seconds; };
   const Timing single = compare(9, run(biquad_single, frames), run(biquad_reference, frames * SINGLE_LANES), quiet);

@@ -19,7 +19,8 @@ inline void every_other_half(const Units* vector, std::uint16_t* halves) {
 
 template <int First, class Out>
 inline void spread_halves(const std::uint16_t* halves, Out* vector) {
-  lanes<16>(Write<u32x16>(vector), [](word half) { return half << (16 * First); }, Read<u16x16>(halves));
+  lanes<16>(
+      Write<u32x16>(vector), [](word half) { return half << (16 * First); }, Read<u16x16>(halves));
 }
 
 }  // namespace
@@ -30,24 +31,24 @@ inline void spread_halves(const std::uint16_t* halves, Out* vector) {
 
 // A scaled conversion of every lane: from one layout to another; the scale is read modulo the width of
 // the integer among them.
-#define KERNEL_convert_scaled(OP, FROM, TO, INTEGER)                                       \
-  template <class Units, class Out>                                                        \
-  static inline void KASTARRI_SEMANTIC(OP)(const Units* a, word scale, Out* r) {           \
-    convert_register<FROM, TO>(r, a, scale_of<INTEGER>(scale));                         \
+#define KERNEL_convert_scaled(OP, FROM, TO, INTEGER)                             \
+  template <class Units, class Out>                                              \
+  static inline void KASTARRI_SEMANTIC(OP)(const Units* a, word scale, Out* r) { \
+    convert_register<FROM, TO>(r, a, scale_of<INTEGER>(scale));                  \
   }
-#define KERNEL_convert_from_every_other(OP, FIRST)                            \
-  template <class Units, class Out>                                           \
-  static inline void KASTARRI_SEMANTIC(OP)(const Units* a, Out* r) {          \
-    alignas(64) std::uint16_t halves[16];                                     \
-    every_other_half<FIRST>(a, halves);                                       \
-    convert_register<f16x16, f32x16>(r, halves, 0);                           \
+#define KERNEL_convert_from_every_other(OP, FIRST)                   \
+  template <class Units, class Out>                                  \
+  static inline void KASTARRI_SEMANTIC(OP)(const Units* a, Out* r) { \
+    alignas(64) std::uint16_t halves[16];                            \
+    every_other_half<FIRST>(a, halves);                              \
+    convert_register<f16x16, f32x16>(r, halves, 0);                  \
   }
-#define KERNEL_convert_to_every_other(OP, FIRST)                              \
-  template <class Units, class Out>                                           \
-  static inline void KASTARRI_SEMANTIC(OP)(const Units* a, Out* r) {          \
-    alignas(64) std::uint16_t halves[16];                                     \
-    convert_register<f32x16, f16x16>(halves, a, 0);                           \
-    spread_halves<FIRST>(halves, r);                                          \
+#define KERNEL_convert_to_every_other(OP, FIRST)                     \
+  template <class Units, class Out>                                  \
+  static inline void KASTARRI_SEMANTIC(OP)(const Units* a, Out* r) { \
+    alignas(64) std::uint16_t halves[16];                            \
+    convert_register<f32x16, f16x16>(halves, a, 0);                  \
+    spread_halves<FIRST>(halves, r);                                 \
   }
 
 #include "float/scaled.def"

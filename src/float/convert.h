@@ -8,7 +8,8 @@
 namespace {
 
 template <class L>
-constexpr bool is_float = std::is_same_v<typename L::number, half_float> || std::is_same_v<typename L::number, single_float>;
+constexpr bool is_float =
+    std::is_same_v<typename L::number, half_float> || std::is_same_v<typename L::number, single_float>;
 
 // Scales are read modulo the width of the integer.
 template <class Integer>
@@ -77,7 +78,8 @@ inline void convert_vector(Out* out, const Units* in, Fast fast, Exact exact) {
   } else {
     env.raise(host.flags);
   }
-  lanes<To::count>(Write<To>(out), [](auto lane) { return lane; }, Read<To>(results));
+  lanes<To::count>(
+      Write<To>(out), [](auto lane) { return lane; }, Read<To>(results));
 }
 
 template <class From, class To, class Out, class Units>
@@ -86,7 +88,8 @@ inline void convert_register(Out* out, const Units* in, word scale) {
   if constexpr (From::count == 1 || To::count == 1) {
     Environment env;
     const auto lane = exact(env, Read<From>(in)[0]);
-    lanes<To::count>(Write<To>(out), [](auto same) { return same; }, Same(lane));
+    lanes<To::count>(
+        Write<To>(out), [](auto same) { return same; }, Same(lane));
   } else if constexpr (!is_float<From>) {
     const float unit = as_float(single_bits_of_power(-static_cast<int>(scale)));
     convert_vector<From, To>(

@@ -99,7 +99,9 @@ constexpr bool some_left(Left left) { return left >> 31 != 0; }
 // All magnitudes are below 2^31, so a difference of two has its sign in bit 31.
 constexpr Left left_above(word magnitude, word bound) { return bound - magnitude; }
 
-constexpr word single_bits_of_power(int exponent) { return static_cast<word>(exponent + Single::bias) << Single::fraction_bits; }
+constexpr word single_bits_of_power(int exponent) {
+  return static_cast<word>(exponent + Single::bias) << Single::fraction_bits;
+}
 
 // A half as a single. As the low bits of one it is 2^-112 times itself; only the exponent of infinity
 // and NaN has to be told.
@@ -137,7 +139,7 @@ inline word narrow(float x, Left& left) {
 //
 // In a directed mode any rounding in between does. But the sum may come out as a subnormal number of F,
 // and then the second rounding does not know that it is inexact; so all such are left, as a NaN.
-template <class F, bool Nearest, class Wide>
+template <class F, bool Nearest, bool Alone = false, class Wide>
 inline Wide odd_sum(Wide p, Wide c) {
   using Bits = std::conditional_t<sizeof(Wide) == 4, std::uint32_t, std::uint64_t>;
   constexpr bool is_double = sizeof(Wide) == 8;
@@ -148,7 +150,9 @@ inline Wide odd_sum(Wide p, Wide c) {
   const auto bits = same_bits_as<Bits>(s);
   if constexpr (Nearest) {
     const Wide back = s - p;
-    const auto error = same_bits_as<Bits>((p - (s - back)) + (c - back));
+    const Wide rounded_off = (p - (s - back)) + (c - back);
+    if (Alone && rounded_off == 0) return s;  // one lane may branch: most sums are exact
+    const auto error = same_bits_as<Bits>(rounded_off);
     const Bits even = (bits & 1) - 1;
     const Bits adjust = mask_not_zero(error & ~sign) & even & mask_below(bits & ~sign, infinity);
     const Bits step = sign_mask(bits ^ error) | 1;
@@ -162,12 +166,12 @@ inline Wide odd_sum(Wide p, Wide c) {
 }
 
 // acc + a * b in single precision, rounded once.
-template <bool Nearest>
+template <bool Nearest, bool Alone>
 inline float fused(float acc, float a, float b) {
 #if defined __FMA__
   return __builtin_fmaf(a, b, acc);
 #else
-  return static_cast<float>(odd_sum<Single, Nearest>(double{a} * double{b}, double{acc}));
+  return static_cast<float>(odd_sum<Single, Nearest, Alone>(double{a} * double{b}, double{acc}));
 #endif
 }
 
@@ -201,7 +205,8 @@ class HostOperand<L, half_float> {
     }
 #if defined __AVX512F__
     for (int i = 0; i < L::count; i += 16)
-      _mm512_store_ps(number_ + i, _mm512_maskz_cvtph_ps(0xFFFF, _mm256_loadu_si256(reinterpret_cast<const __m256i*>(halves + i))));
+      _mm512_store_ps(number_ + i,
+                      _mm512_maskz_cvtph_ps(0xFFFF, _mm256_loadu_si256(reinterpret_cast<const __m256i*>(halves + i))));
 #elif defined __F16C__
     for (int i = 0; i < L::count; i += 8)
       _mm256_store_ps(number_ + i, _mm256_cvtph_ps(_mm_loadu_si128(reinterpret_cast<const __m128i*>(halves + i))));
@@ -229,7 +234,8 @@ inline Left narrow(const float* numbers, std::uint16_t* halves) {
   for (int i = 0; i < Count; i += 16) {
     const __m512 x = _mm512_load_ps(numbers + i);
     nans |= _mm512_cmp_ps_mask(x, x, _CMP_UNORD_Q);
-    _mm256_storeu_si256(reinterpret_cast<__m256i*>(halves + i), _mm512_maskz_cvtps_ph(0xFFFF, x, _MM_FROUND_CUR_DIRECTION));
+    _mm256_storeu_si256(reinterpret_cast<__m256i*>(halves + i),
+                        _mm512_maskz_cvtps_ph(0xFFFF, x, _MM_FROUND_CUR_DIRECTION));
   }
   return mask_not_zero(nans);
 #elif defined __F16C__

@@ -25,10 +25,10 @@ inline void load_halves(const Memory* from, UnitsUnder<Unit, PredicateUnit, true
 
 #include "float/kernels.h"
 
-#define KERNEL_load_halves(OP, UNUSED)                                                    \
-  template <class Memory, class Out>                                                      \
-  static inline void KASTARRI_SEMANTIC(OP)(const Memory* from, Out r) {                   \
-    load_halves(from, r);                                                                 \
+#define KERNEL_load_halves(OP, UNUSED)                                  \
+  template <class Memory, class Out>                                    \
+  static inline void KASTARRI_SEMANTIC(OP)(const Memory* from, Out r) { \
+    load_halves(from, r);                                               \
   }
 #define KERNEL_store_halves_where(OP, SINGLES, HALVES)                                           \
   template <class Units, class PredicateUnit, class Memory>                                      \

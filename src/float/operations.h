@@ -28,7 +28,8 @@ struct ADD {
   }
   template <class L, class... Units>
   static bool fast(Environment& env, typename L::container* r, const Units*... ab) {
-    return fast_on_host<L>(env, r, [](float a, float b) { return a + b; }, ab...);
+    return fast_on_host<L>(
+        env, r, [](float a, float b) { return a + b; }, ab...);
   }
 };
 
@@ -39,7 +40,8 @@ struct SUB {
   }
   template <class L, class... Units>
   static bool fast(Environment& env, typename L::container* r, const Units*... ab) {
-    return fast_on_host<L>(env, r, [](float a, float b) { return a - b; }, ab...);
+    return fast_on_host<L>(
+        env, r, [](float a, float b) { return a - b; }, ab...);
   }
 };
 
@@ -50,7 +52,8 @@ struct MUL {
   }
   template <class L, class... Units>
   static bool fast(Environment& env, typename L::container* r, const Units*... ab) {
-    return fast_on_host<L>(env, r, [](float a, float b) { return a * b; }, ab...);
+    return fast_on_host<L>(
+        env, r, [](float a, float b) { return a * b; }, ab...);
   }
 };
 
@@ -74,7 +77,7 @@ struct Fused {
     if constexpr (L::bits == 16) {
       return odd_sum<Half, Nearest>(factor * b, acc);
     } else {
-      return fused<Nearest>(acc, factor, b);
+      return fused<Nearest, L::count == 1>(acc, factor, b);
     }
   };
 };
@@ -116,7 +119,8 @@ struct Extreme {
   }
   template <class L, class Units>
   static bool fast(Environment&, typename L::container* r, const Units* a, const Units* b) {
-    return fast_ordered<L>(r, [](auto x, auto y) { return Less ? x < y : x > y; }, a, b);
+    return fast_ordered<L>(
+        r, [](auto x, auto y) { return Less ? x < y : x > y; }, a, b);
   }
 };
 using MIN = Extreme<true, false>;
@@ -240,31 +244,45 @@ struct Relation {
 
 struct Equal {
   template <class T>
-  constexpr bool operator()(T x, T y) const { return x == y; }
+  constexpr bool operator()(T x, T y) const {
+    return x == y;
+  }
 };
 struct Less {
   template <class T>
-  constexpr bool operator()(T x, T y) const { return x < y; }
+  constexpr bool operator()(T x, T y) const {
+    return x < y;
+  }
 };
 struct LessOrEqual {
   template <class T>
-  constexpr bool operator()(T x, T y) const { return x <= y; }
+  constexpr bool operator()(T x, T y) const {
+    return x <= y;
+  }
 };
 struct Greater {
   template <class T>
-  constexpr bool operator()(T x, T y) const { return x > y; }
+  constexpr bool operator()(T x, T y) const {
+    return x > y;
+  }
 };
 struct GreaterOrEqual {
   template <class T>
-  constexpr bool operator()(T x, T y) const { return x >= y; }
+  constexpr bool operator()(T x, T y) const {
+    return x >= y;
+  }
 };
 struct NotEqual {
   template <class T>
-  constexpr bool operator()(T x, T y) const { return x != y; }
+  constexpr bool operator()(T x, T y) const {
+    return x != y;
+  }
 };
 struct Never {
   template <class T>
-  constexpr bool operator()(T, T) const { return false; }
+  constexpr bool operator()(T, T) const {
+    return false;
+  }
 };
 
 using OEQ = Relation<Equal, false, false>;

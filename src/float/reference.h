@@ -59,11 +59,20 @@ inline Integer round_at(const Number<word>& x, int quantum, Rounding rounding) {
   if (rest == 0) return {below, true};
   bool up = false;
   switch (rounding) {
-    case to_nearest: up = rest + (below & 1) > 2; break;
-    case ties_away: up = rest >= 2; break;
-    case toward_zero: break;
-    case upward: up = !x.negative; break;
-    case downward: up = x.negative; break;
+    case to_nearest:
+      up = rest + (below & 1) > 2;
+      break;
+    case ties_away:
+      up = rest >= 2;
+      break;
+    case toward_zero:
+      break;
+    case upward:
+      up = !x.negative;
+      break;
+    case downward:
+      up = x.negative;
+      break;
   }
   return {below + up, false};
 }
@@ -108,8 +117,8 @@ inline word round_pack(Environment& env, const Number<std::uint64_t>& x) {
   const auto high = static_cast<word>(x.significand >> 31);
   if (high == 0) return round_pack<F>(env, Number<word>{x.negative, x.exponent, static_cast<word>(x.significand)});
   const int excess = highest_bit(high) + 1;
-  return round_pack<F>(env, Number<word>{x.negative, x.exponent + excess,
-                                         static_cast<word>(shift_right_sticky(x.significand, excess))});
+  return round_pack<F>(
+      env, Number<word>{x.negative, x.exponent + excess, static_cast<word>(shift_right_sticky(x.significand, excess))});
 }
 
 // --- NaN ----------------------------------------------------------------------------------------------
@@ -288,7 +297,8 @@ inline word change_format(Environment& env, word x) {
   if (is_nan<From>(x)) {
     const word fraction = nan_of<From>(env, x) & (From::unit - 1);
     constexpr int wider = To::fraction_bits - From::fraction_bits;
-    return sign | To::infinity | (wider > 0 ? fraction << (wider > 0 ? wider : 0) : fraction >> (wider > 0 ? 0 : -wider));
+    return sign | To::infinity |
+           (wider > 0 ? fraction << (wider > 0 ? wider : 0) : fraction >> (wider > 0 ? 0 : -wider));
   }
   if (is_infinite<From>(x)) return sign | To::infinity;
   return round_pack<To>(env, unpack<From>(x));

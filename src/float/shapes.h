@@ -5,9 +5,9 @@
 // --- Vectors and single lanes ---------------------------------------------------------------------------
 
 #define SIG_float_a_r(SYMBOL, T, K) T SYMBOL(const T& a)
-#define BODY_float_a_r(T, K)       \
-  T r;                             \
-  KASTARRI_SEMANTIC(K)(a._, r._);  \
+#define BODY_float_a_r(T, K)      \
+  T r;                            \
+  KASTARRI_SEMANTIC(K)(a._, r._); \
   return r;
 
 #define SIG_float_a_r_T(SYMBOL, T, P, K) void SYMBOL(T& r, const T& a, const P& p)
@@ -36,15 +36,15 @@
 #define KASTARRI_SCALARFP(K) Function_KOR_rk_zran_scalarfp_##K
 
 #define SIG_scalarfp_a_r(SYMBOL, T, K) T SYMBOL(const T& a)
-#define BODY_scalarfp_a_r(T, K)     \
-  T r;                              \
-  KASTARRI_SCALARFP(K)(a._, r._);   \
+#define BODY_scalarfp_a_r(T, K)   \
+  T r;                            \
+  KASTARRI_SCALARFP(K)(a._, r._); \
   return r;
 
 #define SIG_scalarfp_ab_r(SYMBOL, T, K) T SYMBOL(const T& a, const T& b)
-#define BODY_scalarfp_ab_r(T, K)         \
-  T r;                                   \
-  KASTARRI_SCALARFP(K)(a._, b._, r._);   \
+#define BODY_scalarfp_ab_r(T, K)       \
+  T r;                                 \
+  KASTARRI_SCALARFP(K)(a._, b._, r._); \
   return r;
 
 #define SIG_scalarfp_acc_ab(SYMBOL, T, K) void SYMBOL(T& acc, const T& a, const T& b)
@@ -54,9 +54,9 @@
 #define BODY_scalarfp_ra(T, K) KASTARRI_SCALARFP(K)(r._, a._, r._);
 
 #define SIG_scalarfp_relation(SYMBOL, T, B, K) B SYMBOL(const T& a, const T& b)
-#define BODY_scalarfp_relation(T, B, K)  \
-  B r;                                   \
-  KASTARRI_SCALARFP(K)(a._, b._, r._);   \
+#define BODY_scalarfp_relation(T, B, K) \
+  B r;                                  \
+  KASTARRI_SCALARFP(K)(a._, b._, r._);  \
   return r;
 
 #define SIG_scalarfp_const(SYMBOL, T, K) T SYMBOL(immediate number)
@@ -72,16 +72,16 @@
   return r;
 
 #define SIG_scalarfp_from_word(SYMBOL, T, K) T SYMBOL(unsigned bits)
-#define BODY_scalarfp_from_word(T, K)  \
-  T r;                                 \
-  KASTARRI_SCALARFP(K)(&bits, r._);    \
+#define BODY_scalarfp_from_word(T, K) \
+  T r;                                \
+  KASTARRI_SCALARFP(K)(&bits, r._);   \
   return r;
 
 // From and to a host integer I, and a register I.
 #define SIG_scalarfp_from_int(SYMBOL, T, I, K) T SYMBOL(I value, immediate scale)
-#define BODY_scalarfp_from_int(T, I, K)                         \
-  T r;                                                          \
-  KASTARRI_SCALARFP(K)(&value, static_cast<word>(scale), r._);  \
+#define BODY_scalarfp_from_int(T, I, K)                        \
+  T r;                                                         \
+  KASTARRI_SCALARFP(K)(&value, static_cast<word>(scale), r._); \
   return r;
 
 #define SIG_scalarfp_to_int(SYMBOL, T, I, K) I SYMBOL(const T& a, immediate scale)
@@ -105,9 +105,9 @@
 
 // The control and status registers.
 #define SIG_scalarfp_read(SYMBOL, K) unsigned SYMBOL()
-#define BODY_scalarfp_read(K)  \
-  word r;                      \
-  KASTARRI_SCALARFP(K)(&r);    \
+#define BODY_scalarfp_read(K) \
+  word r;                     \
+  KASTARRI_SCALARFP(K)(&r);   \
   return r;
 
 #define SIG_scalarfp_write(SYMBOL, K) void SYMBOL(unsigned value)

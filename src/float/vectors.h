@@ -33,7 +33,8 @@ template <class L, class Op, class Unit, class... Units>
 inline void apply(Environment& env, Unit* out, const Units*... operands) {
   alignas(64) lane_of<L> results[L::count];
   compute<L, Op>(env, results, operands...);
-  lanes<L::count>(Write<L>(out), [](auto lane) { return lane; }, Read<L>(results));
+  lanes<L::count>(
+      Write<L>(out), [](auto lane) { return lane; }, Read<L>(results));
 }
 
 template <class L, class Op, class Unit, class... Units>

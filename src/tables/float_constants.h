@@ -1,4 +1,5 @@
-// The constants of CONST: numbers that a program would otherwise load from memory, each rounded to nearest in both formats.
+// The constants of CONST: numbers that a program would otherwise load from memory, each rounded to nearest in both
+// formats.
 #ifndef KASTARRI_TABLES_FLOAT_CONSTANTS_H
 #define KASTARRI_TABLES_FLOAT_CONSTANTS_H
 

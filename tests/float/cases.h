@@ -20,12 +20,41 @@ using Case = std::array<Bits, 3>;
 inline std::vector<Bits> edges(const exact::Format& f) {
   const Bits unit = f.unit(), infinity = f.infinity(), one = static_cast<Bits>(1 - f.least) * unit;
   const Bits integer = one + static_cast<Bits>(f.precision - 1) * unit;  // from here on there are no fractions
-  std::vector<Bits> all = {0, 1, 2, 3, unit / 2 + 1, unit - 1, unit, unit + 1, 2 * unit - 1, 2 * unit, 3 * unit + 1,
-                           one - 2 * unit, one - unit - 1, one - unit, one - unit + 1, one - 1, one, one + 1,
-                           one + unit / 2, one + unit + unit / 4, one + 9 * unit + unit / 3, integer - unit - 1,
-                           integer - 1, integer, integer + 1, infinity / 3, infinity - unit - 1, infinity - unit,
-                           infinity - 2, infinity - 1, infinity, infinity + 1, infinity + f.quiet() - 1,
-                           infinity + f.quiet(), infinity + f.quiet() + 5};
+  std::vector<Bits> all = {0,
+                           1,
+                           2,
+                           3,
+                           unit / 2 + 1,
+                           unit - 1,
+                           unit,
+                           unit + 1,
+                           2 * unit - 1,
+                           2 * unit,
+                           3 * unit + 1,
+                           one - 2 * unit,
+                           one - unit - 1,
+                           one - unit,
+                           one - unit + 1,
+                           one - 1,
+                           one,
+                           one + 1,
+                           one + unit / 2,
+                           one + unit + unit / 4,
+                           one + 9 * unit + unit / 3,
+                           integer - unit - 1,
+                           integer - 1,
+                           integer,
+                           integer + 1,
+                           infinity / 3,
+                           infinity - unit - 1,
+                           infinity - unit,
+                           infinity - 2,
+                           infinity - 1,
+                           infinity,
+                           infinity + 1,
+                           infinity + f.quiet() - 1,
+                           infinity + f.quiet(),
+                           infinity + f.quiet() + 5};
   for (std::size_t i = 0, n = all.size(); i < n; ++i) all.push_back(all[i] + f.sign());
   return all;
 }
@@ -70,7 +99,9 @@ inline std::vector<Case> cases(const exact::Format& f, int operands) {
     mpfr_mul(product, p, q, MPFR_RNDN);
     const Bits rounded = exact::round(f, product, MPFR_RNDN).bits;
     all.push_back({near(f, rounded, random), x, y});
-    all.push_back({short_number(f, one, random) - static_cast<Bits>(f.precision - 1 + static_cast<int>(random() % 3)) * f.unit(), x, y});
+    all.push_back(
+        {short_number(f, one, random) - static_cast<Bits>(f.precision - 1 + static_cast<int>(random() % 3)) * f.unit(),
+         x, y});
     all.push_back({x, short_number(f, any(), random), one - static_cast<Bits>(f.precision) * f.unit()});
   }
   return all;

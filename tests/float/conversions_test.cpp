@@ -12,9 +12,8 @@ void drive_rtor(const char* name, To (*f)(const From&)) {
   using Result = Layout<typename R::container, R::bits, 1, typename R::number>;
   const auto answer = [](int mode, Int value) { return converted<L, R>(mode, value, 0); };
   if constexpr (L::count == R::count) {
-    check_conversion<L, R>(name, values_of<L>(1), answer, [f](const Register* x, Register& r) {
-      write_image(f(as_register<From>(x[0].bytes)), r);
-    });
+    check_conversion<L, R>(name, values_of<L>(1), answer,
+                           [f](const Register* x, Register& r) { write_image(f(as_register<From>(x[0].bytes)), r); });
   } else {
     check_conversion<Lane, Result>(name, values_of<L>(1), answer, [f](const Register* x, Register& r) {
       From from = filled<From>(0x7D);  // signalling NaNs in the other lanes, which are not read
@@ -46,7 +45,8 @@ void drive_from_host(const char* name, To (*f)(H)) {
       FloatState state(mode);
       const To r = f(host);
       ASSERT_EQ(state.flags(), expected.flags) << name << ' ' << value;
-      for (int i = 0; i < R::count; ++i) ASSERT_EQ(static_cast<Bits>(lane<R>(r._, i)), expected.bits) << name << ' ' << value;
+      for (int i = 0; i < R::count; ++i)
+        ASSERT_EQ(static_cast<Bits>(lane<R>(r._, i)), expected.bits) << name << ' ' << value;
     }
   }
 }
@@ -74,21 +74,23 @@ void drive_to_host(const char* name, H (*f)(const From&)) {
 template <class R, class A>
 void drive_every_other(const char* name, R (*f)(const A&), int which) {
   if constexpr (std::is_same_v<R, qv_vecN_2xf32>) {
-    check_conversion<f16x16, f32x16>(name, values_of<f16x1>(1), [](int mode, Int v) { return converted<f16x16, f32x16>(mode, v, 0); },
-                                     [=](const Register* x, Register& r) {
-      A a = filled<A>(0x7D);
-      for (int i = 0; i < 16; ++i) set_lane<f16x32>(a._, 2 * i + which, lane<f16x16>(x[0].bytes, i));
-      write_image(f(a), r);
-    });
+    check_conversion<f16x16, f32x16>(
+        name, values_of<f16x1>(1), [](int mode, Int v) { return converted<f16x16, f32x16>(mode, v, 0); },
+        [=](const Register* x, Register& r) {
+          A a = filled<A>(0x7D);
+          for (int i = 0; i < 16; ++i) set_lane<f16x32>(a._, 2 * i + which, lane<f16x16>(x[0].bytes, i));
+          write_image(f(a), r);
+        });
   } else {
-    check_conversion<f32x16, f16x16>(name, values_of<f32x1>(1), [](int mode, Int v) { return converted<f32x16, f16x16>(mode, v, 0); },
-                                     [=](const Register* x, Register& r) {
-      const R halves = f(as_register<A>(x[0].bytes));
-      for (int i = 0; i < 16; ++i) {
-        set_lane<f16x16>(r.bytes, i, lane<f16x32>(halves._, 2 * i + which));
-        ASSERT_EQ(lane<f16x32>(halves._, 2 * i + 1 - which), 0) << name;
-      }
-    });
+    check_conversion<f32x16, f16x16>(
+        name, values_of<f32x1>(1), [](int mode, Int v) { return converted<f32x16, f16x16>(mode, v, 0); },
+        [=](const Register* x, Register& r) {
+          const R halves = f(as_register<A>(x[0].bytes));
+          for (int i = 0; i < 16; ++i) {
+            set_lane<f16x16>(r.bytes, i, lane<f16x32>(halves._, 2 * i + which));
+            ASSERT_EQ(lane<f16x32>(halves._, 2 * i + 1 - which), 0) << name;
+          }
+        });
   }
 }
 
@@ -154,7 +156,9 @@ TEST(float_memory, StoresWhatIsEnabled) {
     std::memcpy(before, memory, sizeof memory);
     qv_vecN_2xf32 v;
     const bool moderate = n % 2 != 0;  // numbers that halves can be: no lane overflows
-    for (auto& x : v._) x = moderate ? (numbers[random() % numbers.size()][0] & 0x87FFFFFF) | 0x38000000 : numbers[random() % numbers.size()][0];
+    for (auto& x : v._)
+      x = moderate ? (numbers[random() % numbers.size()][0] & 0x87FFFFFF) | 0x38000000
+                   : numbers[random() % numbers.size()][0];
     vboolN_2 p;
     p._[0] = static_cast<unsigned short>(n % 5 == 0 ? 0xFFFF : random());
     auto* base = reinterpret_cast<qv_vecN_2xf16*>(memory);

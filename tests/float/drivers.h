@@ -41,7 +41,8 @@ class FloatCheck {
   using Call = std::function<void(const Register*, Register&)>;
   using Answers = std::vector<exact::Answer>;
 
-  FloatCheck(std::string name, int operands, Call call) : name_(std::move(name)), operands_(operands), call_(std::move(call)) {}
+  FloatCheck(std::string name, int operands, Call call)
+      : name_(std::move(name)), operands_(operands), call_(std::move(call)) {}
 
   // The operation on floats that a model tells. Models are slow: each answer is found once and serves
   // all rows of the operation.
@@ -103,8 +104,9 @@ class FloatCheck {
 
   void check_lane(int mode, const Case& x, const exact::Answer& expected, const Register& result, int i) {
     const Int got = lane<R>(result.bytes, i);
-    ASSERT_EQ(got, as_lane<R>(static_cast<Int>(expected.bits))) << std::hex << std::showbase << describe(mode, x, i) << " expected "
-                                                       << expected.bits << ", got " << static_cast<Bits>(got);
+    ASSERT_EQ(got, as_lane<R>(static_cast<Int>(expected.bits)))
+        << std::hex << std::showbase << describe(mode, x, i) << " expected " << expected.bits << ", got "
+        << static_cast<Bits>(got);
   }
 
   std::string describe(int mode, const Case& x, int i) const {
@@ -194,11 +196,14 @@ template <class From, class To>
 exact::Answer converted(int mode, Int value, int scale) {
   constexpr bool from_integer = std::is_same_v<typename From::number, integer>;
   constexpr bool to_integer = std::is_same_v<typename To::number, integer>;
-  if constexpr (from_integer) return model::from_integer(format<To>, mode, value, scale);
-  else if constexpr (!to_integer) return model::convert(format<From>, format<To>, mode, static_cast<Bits>(value));
+  if constexpr (from_integer)
+    return model::from_integer(format<To>, mode, value, scale);
+  else if constexpr (!to_integer)
+    return model::convert(format<From>, format<To>, mode, static_cast<Bits>(value));
   else {
     using C = typename To::container;
-    return model::to_integer(format<From>, static_cast<Bits>(value), scale, std::numeric_limits<C>::min(), std::numeric_limits<C>::max());
+    return model::to_integer(format<From>, static_cast<Bits>(value), scale, std::numeric_limits<C>::min(),
+                             std::numeric_limits<C>::max());
   }
 }
 
@@ -219,9 +224,8 @@ void drive_float_scaled(const char* name, R (*f)(const A&, int)) {
   using From = layout_of<A>;
   using To = layout_of<R>;
   constexpr int width = std::is_same_v<typename From::number, integer> ? From::bits : To::bits;
-  check_scaled<From, To>(name, width, [f](const void* x, int scale, Register& r) {
-    write_image(f(as_register<A>(x), scale), r);
-  });
+  check_scaled<From, To>(name, width,
+                         [f](const void* x, int scale, Register& r) { write_image(f(as_register<A>(x), scale), r); });
 }
 
 // Constants, of which MPFR knows the transcendental ones, in every lane; numbers beyond 15 and negative
@@ -229,15 +233,32 @@ void drive_float_scaled(const char* name, R (*f)(const A&, int)) {
 inline void constant(int number, exact::Number& x) {
   constexpr double plain[] = {0, 1, 2, 0.5, 3, 4, 0.25, 10};
   switch (const int n = (number % 16 + 16) % 16) {
-    case 8: mpfr_set_ui(x, 1, MPFR_RNDN), mpfr_div_ui(x, x, 10, MPFR_RNDN); break;
-    case 9: mpfr_const_pi(x, MPFR_RNDN); break;
-    case 10: mpfr_const_pi(x, MPFR_RNDN), mpfr_div_ui(x, x, 2, MPFR_RNDN); break;
-    case 11: mpfr_const_pi(x, MPFR_RNDN), mpfr_ui_div(x, 1, x, MPFR_RNDN); break;
-    case 12: mpfr_set_ui(x, 1, MPFR_RNDN), mpfr_exp(x, x, MPFR_RNDN); break;
-    case 13: mpfr_const_log2(x, MPFR_RNDN); break;
-    case 14: mpfr_const_log2(x, MPFR_RNDN), mpfr_ui_div(x, 1, x, MPFR_RNDN); break;
-    case 15: mpfr_sqrt_ui(x, 2, MPFR_RNDN); break;
-    default: mpfr_set_d(x, plain[n], MPFR_RNDN);
+    case 8:
+      mpfr_set_ui(x, 1, MPFR_RNDN), mpfr_div_ui(x, x, 10, MPFR_RNDN);
+      break;
+    case 9:
+      mpfr_const_pi(x, MPFR_RNDN);
+      break;
+    case 10:
+      mpfr_const_pi(x, MPFR_RNDN), mpfr_div_ui(x, x, 2, MPFR_RNDN);
+      break;
+    case 11:
+      mpfr_const_pi(x, MPFR_RNDN), mpfr_ui_div(x, 1, x, MPFR_RNDN);
+      break;
+    case 12:
+      mpfr_set_ui(x, 1, MPFR_RNDN), mpfr_exp(x, x, MPFR_RNDN);
+      break;
+    case 13:
+      mpfr_const_log2(x, MPFR_RNDN);
+      break;
+    case 14:
+      mpfr_const_log2(x, MPFR_RNDN), mpfr_ui_div(x, 1, x, MPFR_RNDN);
+      break;
+    case 15:
+      mpfr_sqrt_ui(x, 2, MPFR_RNDN);
+      break;
+    default:
+      mpfr_set_d(x, plain[n], MPFR_RNDN);
   }
 }
 template <class T>
@@ -250,7 +271,8 @@ void drive_float_const(const char* name, T (*f)(int)) {
     exact::Number x;
     constant(number, x);
     for (int i = 0; i < L::count; ++i)
-      EXPECT_EQ(static_cast<Bits>(lane<L>(r._, i)), exact::round(format<L>, x, MPFR_RNDN).bits) << name << ' ' << number;
+      EXPECT_EQ(static_cast<Bits>(lane<L>(r._, i)), exact::round(format<L>, x, MPFR_RNDN).bits)
+          << name << ' ' << number;
   }
 }
 

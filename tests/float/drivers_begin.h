@@ -8,10 +8,10 @@
 #define KERNEL_float_bits KERNEL_float_a
 #define KERNEL_float_const(OP, RULE, L)
 
-#define ENTRY(SYMBOL, SHAPE, ...)                                                                         \
-  const int tested_##SYMBOL = testing_support::add_test(                                                  \
-      KASTARRI_TEST_SUITE, testing_support::operation(#SYMBOL),                                           \
-      [] { TEST_##SHAPE(testing_support::operation(#SYMBOL), &KASTARRI_SYMBOL(SYMBOL), __VA_ARGS__); });
+#define ENTRY(SYMBOL, SHAPE, ...)                                                                                      \
+  const int tested_##SYMBOL = testing_support::add_test(KASTARRI_TEST_SUITE, testing_support::operation(#SYMBOL), [] { \
+    TEST_##SHAPE(testing_support::operation(#SYMBOL), &KASTARRI_SYMBOL(SYMBOL), __VA_ARGS__);                          \
+  });
 
 #define TEST_float_a_r(NAME, F, T, K) testing_support::drive_float_a_r(NAME, model_##K, F)
 #define TEST_float_a_r_T(NAME, F, T, P, K) testing_support::drive_float_a_r_T(NAME, model_##K, F)

@@ -62,7 +62,9 @@ inline Answer MSUBN(const Format& f, int, const Bits* x) { return fused<true>(f,
 // --- Bits -----------------------------------------------------------------------------------------------
 
 inline Answer ABS(const Format& f, int, const Bits* x) { return {x[0] % f.sign(), 0}; }
-inline Answer NEG(const Format& f, int, const Bits* x) { return {x[0] < f.sign() ? x[0] + f.sign() : x[0] - f.sign(), 0}; }
+inline Answer NEG(const Format& f, int, const Bits* x) {
+  return {x[0] < f.sign() ? x[0] + f.sign() : x[0] - f.sign(), 0};
+}
 inline Answer MOV(const Format&, int, const Bits* x) { return {x[0], 0}; }
 
 inline Answer CLSFY(const Format& f, int, const Bits* x) {

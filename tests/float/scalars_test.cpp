@@ -30,9 +30,8 @@ void drive_from_int(const char* name, T (*f)(I, int)) {
 }
 template <class T, class I>
 void drive_to_int(const char* name, I (*f)(const T&, int)) {
-  check_scaled<layout_of<T>, host_layout<I>>(name, 32, [f](const void* x, int scale, Register& r) {
-    write_image(f(as_register<T>(x), scale), r);
-  });
+  check_scaled<layout_of<T>, host_layout<I>>(
+      name, 32, [f](const void* x, int scale, Register& r) { write_image(f(as_register<T>(x), scale), r); });
 }
 
 // A move under conditions of which `moves` tells what to expect.

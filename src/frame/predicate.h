@@ -67,15 +67,24 @@ struct LaneMask<8, 64> {
 #if defined __AVX512BW__
     const std::uint64_t all = bits[0] | std::uint64_t{bits[1]} << 32;
     _mm512_store_si512(lane, _mm512_movm_epi8(all));
+#elif defined __AVX2__
+    const __m256i bit = _mm256_set1_epi64x(static_cast<long long>(0x8040201008040201u));
+    const __m256i byte_of_lane = _mm256_setr_epi64x(0, 0x0101010101010101, 0x0202020202020202, 0x0303030303030303);
+    for (int h = 0; h < 2; ++h) {
+      const __m256i v = _mm256_shuffle_epi8(_mm256_set1_epi32(static_cast<int>(bits[h])), byte_of_lane);
+      _mm256_store_si256(reinterpret_cast<__m256i*>(lane) + h, _mm256_cmpeq_epi8(_mm256_and_si256(v, bit), bit));
+    }
 #else
     const __m128i bit = _mm_set1_epi64x(static_cast<long long>(0x8040201008040201u));
-    const __m128i bytes = _mm_set_epi32(0, 0, static_cast<int>(bits[1]), static_cast<int>(bits[0]));
-    const __m128i twice = _mm_unpacklo_epi8(bytes, bytes);
-    const __m128i low = _mm_unpacklo_epi16(twice, twice);
-    const __m128i high = _mm_unpackhi_epi16(twice, twice);
-    const auto test = [bit](__m128i v) { return _mm_cmpeq_epi8(_mm_and_si128(v, bit), bit); };
-    store_quarters(test(_mm_unpacklo_epi32(low, low)), test(_mm_unpackhi_epi32(low, low)),
-                   test(_mm_unpacklo_epi32(high, high)), test(_mm_unpackhi_epi32(high, high)));
+    for (int h = 0; h < 2; ++h) {
+      const __m128i bytes = _mm_set1_epi32(static_cast<int>(bits[h]));
+      const __m128i twice = _mm_unpacklo_epi8(bytes, bytes);
+      const __m128i fourfold = _mm_unpacklo_epi16(twice, twice);
+      const auto test = [bit](__m128i v) { return _mm_cmpeq_epi8(_mm_and_si128(v, bit), bit); };
+      auto* quarter = reinterpret_cast<__m128i*>(lane) + 2 * h;
+      quarter[0] = test(_mm_unpacklo_epi32(fourfold, fourfold));
+      quarter[1] = test(_mm_unpackhi_epi32(fourfold, fourfold));
+    }
 #endif
   }
 
@@ -94,23 +103,6 @@ struct LaneMask<8, 64> {
                 static_cast<word>(_mm_movemask_epi8(quarter[2 * h + 1])) << 16;
 #endif
   }
-
- private:
-#if !defined __AVX512BW__
-  void store_quarters(__m128i q0, __m128i q1, __m128i q2, __m128i q3) {
-#if defined __AVX2__
-    // In the width in which the lanes are read back, so that the store forwards to the load.
-    _mm256_store_si256(reinterpret_cast<__m256i*>(lane), _mm256_set_m128i(q1, q0));
-    _mm256_store_si256(reinterpret_cast<__m256i*>(lane) + 1, _mm256_set_m128i(q3, q2));
-#else
-    auto* quarter = reinterpret_cast<__m128i*>(lane);
-    quarter[0] = q0;
-    quarter[1] = q1;
-    quarter[2] = q2;
-    quarter[3] = q3;
-#endif
-  }
-#endif
 };
 
 // 32 lanes of 16 bits under a vboolN.

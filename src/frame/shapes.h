@@ -17,6 +17,15 @@
 
 // --- Lane-wise operations ---------------------------------------------------------------------------
 
+#define SIG_a_r(SYMBOL, T, K) T SYMBOL(const T& a)
+#define BODY_a_r(T, K)            \
+  T r;                            \
+  KASTARRI_SEMANTIC(K)(a._, r._); \
+  return r;
+
+#define SIG_a_r_T(SYMBOL, T, P, K) void SYMBOL(T& r, const T& a, const P& p)
+#define BODY_a_r_T(T, P, K) KASTARRI_SEMANTIC(K)(a._, where(r._, p._));
+
 #define SIG_ab_r(SYMBOL, T, K) T SYMBOL(const T& a, const T& b)
 #define BODY_ab_r(T, K)                \
   T r;                                 \

@@ -107,7 +107,7 @@ constexpr word single_bits_of_power(int exponent) {
 // and NaN has to be told.
 inline float widen(word half) {
   const auto spread = static_cast<word>(static_cast<std::int32_t>(half << 16) >> 3);
-  const word special = ~mask_below(spread & 0x0FFFE000, Half::infinity << 13) & Single::infinity;
+  const word special = mask_below(word{Half::largest} << 13, spread & 0x0FFFE000) & Single::infinity;
   return as_float((spread & 0x8FFFE000) | special) * 0x1p112f;
 }
 
@@ -119,7 +119,8 @@ inline word narrow(float x, Left& left) {
   const word absolute = bits_of(x) & single_magnitude;
   const word least_normal = single_bits_of_power(Half::least_exponent);
   const word power = absolute & Single::infinity;
-  const float pull = as_float(((power > least_normal ? power : least_normal) + (word{13} << 23)) | sign);
+  const word small = mask_below(power, least_normal);
+  const float pull = as_float(((power & ~small) | (least_normal & small)) + (word{13} << 23) + sign);
   const float kept = (x + pull) - pull;
   const word rounded = bits_of(kept) & single_magnitude;
   const word largest = single_bits_of_power(Half::greatest_exponent + 1) - (word{1} << 13);
@@ -247,9 +248,13 @@ inline Left narrow(const float* numbers, std::uint16_t* halves) {
   }
   return mask_not_zero(static_cast<word>(_mm256_movemask_ps(nans)));
 #else
+  // Words first: the compiler would pack each term of the last sum by itself.
+  alignas(64) word words[Count];
   Left left = 0;
   KASTARRI_LANES_INDEPENDENT
-  for (int i = 0; i < Count; ++i) halves[i] = static_cast<std::uint16_t>(narrow(numbers[i], left));
+  for (int i = 0; i < Count; ++i) words[i] = narrow(numbers[i], left);
+  KASTARRI_LANES_INDEPENDENT
+  for (int i = 0; i < Count; ++i) halves[i] = static_cast<std::uint16_t>(words[i]);
   return left;
 #endif
 }

@@ -6,7 +6,7 @@ namespace {
 
 // The low bits of a value as the number that they stand for; both as 64 bits, so nothing overflows.
 std::uint64_t extended(const Format& format, std::uint64_t bits) {
-  if (format.bits == 64) return bits;
+  if (format.bits >= 64) return bits;
   const std::uint64_t range = std::uint64_t{1} << format.bits;
   bits %= range;
   return format.is_signed && !format.is_predicate && bits >= range / 2 ? bits - range : bits;
@@ -30,8 +30,9 @@ void set_lane(const Format& format, void* image, int i, Int value) {
     bytes[i / 8] = static_cast<unsigned char>(others | static_cast<int>(bits) << i % 8);
     return;
   }
+  // A container of more than 64 bits holds the value over and over.
   for (int b = 0; b < format.container_bytes; ++b)
-    bytes[i * format.container_bytes + b] = static_cast<unsigned char>(bits >> (8 * b));
+    bytes[i * format.container_bytes + b] = static_cast<unsigned char>(bits >> (8 * (b % 8)));
 }
 
 Int as_lane(const Format& format, Int value) {

@@ -18,6 +18,24 @@ struct Arena {
 
 Arena arena;
 
+// Random numbers from 1 to 2 of either sign in place of random bits: of those, most registers would hold
+// a NaN.
+template <class L>
+void make_numbers(void* image) {
+  auto* lanes = static_cast<typename L::container*>(image);
+  constexpr word one = L::bits == 16 ? 0x3C00 : 0x3F800000, free = L::bits == 16 ? 0x83FF : 0x807FFFFF;
+  for (int i = 0; i < L::count; ++i) lanes[i] = static_cast<typename L::container>((lanes[i] & free) | one);
+}
+template <class T, class = void>
+struct numbers {
+  static void make(T&) {}
+};
+template <class T>
+struct numbers<T, std::enable_if_t<std::is_same_v<typename layout_of<T>::number, half_float> ||
+                                   std::is_same_v<typename layout_of<T>::number, single_float>>> {
+  static void make(T& value) { make_numbers<layout_of<T>>(value._); }
+};
+
 // An argument of an intrinsic: a register with random lanes, a pointer into the arena, a small count.
 template <class T>
 struct alignas(64) Argument {
@@ -26,6 +44,7 @@ struct alignas(64) Argument {
     std::minstd_rand random(1);
     auto* bytes = reinterpret_cast<unsigned char*>(&value);
     for (std::size_t i = 0; i < sizeof value; ++i) bytes[i] = static_cast<unsigned char>(random());
+    numbers<T>::make(value);
   }
   T& get() { return value; }
 };

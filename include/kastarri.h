@@ -12,6 +12,7 @@
 #include "kastarri/types.h"
 
 #include "kastarri/conversions.h"
+#include "kastarri/float.h"
 #include "kastarri/integer.h"
 #include "kastarri/memory.h"
 #include "kastarri/multiply.h"

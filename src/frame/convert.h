@@ -51,6 +51,13 @@ inline void replicate(const Write<L>& to, V value) {
   }
 }
 
+// Numbers of different kinds convert by value: float/conversions.cpp.
+template <class From, class To, class FromUnit, class ToUnit>
+void convert_numbers(const FromUnit* from, ToUnit* to);
+template <class From, class To>
+constexpr bool are_different_numbers =
+    !std::is_same_v<typename From::number, typename To::number> && From::bits != 1 && To::bits != 1;
+
 template <class From, class To, class Rule>
 inline void convert_lanes(const Read<From>& from, const Write<To>& to, Rule rule) {
   static_assert(std::is_same_v<typename From::number, typename To::number> || From::bits == 1 || To::bits == 1,
@@ -78,6 +85,8 @@ inline void convert(const FromUnit* from, ToUnit* to) {
     spill<From>(from, to);
   } else if constexpr (std::is_same_v<From, packed1536>) {
     unspill<To>(from, to);
+  } else if constexpr (are_different_numbers<From, To>) {
+    convert_numbers<From, To>(from, to);
   } else if constexpr (is_predicate<To> && To::count > 1) {
     replicate_bit<To>(from, to);
   } else {

@@ -2,6 +2,7 @@
 #ifndef KASTARRI_FRAME_ROW_KINDS_H
 #define KASTARRI_FRAME_ROW_KINDS_H
 
+#include "float/row_kinds.h"
 #include "memory/row_kinds.h"
 
 #define ROW(OP, SHAPE, ...) ENTRY(rk_zra32_ZRA_##OP, SHAPE, __VA_ARGS__)

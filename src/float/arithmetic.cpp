@@ -1,0 +1,10 @@
+// Floating-point arithmetic on vectors and single lanes.
+#include "float/vectors.h"
+
+#include "frame/stamp.h"
+
+#include "float/kernels.h"
+
+#include "float/arithmetic.def"
+
+#include "frame/stamp_end.h"

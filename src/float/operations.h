@@ -1,0 +1,343 @@
+// The operations. Each has `exact`, one number by the reference, and may have `fast`, a whole vector at
+// once: it leaves a NaN in every lane that is not for it and says whether there is any.
+#ifndef KASTARRI_FLOAT_OPERATIONS_H
+#define KASTARRI_FLOAT_OPERATIONS_H
+
+#include <type_traits>
+
+#include "float/host.h"
+#include "float/reference.h"
+
+namespace {
+
+template <class L, class>
+using same_layout = L;
+
+// A rule of two or three floats on the host's unit: results and flags into the register and env.
+template <class L, class Rule, class... Units>
+inline bool fast_on_host(Environment& env, typename L::container* results, Rule rule, const Units*... operands) {
+  const HostResult host = on_host<L, same_layout<L, Units>...>(env.rounding, results, rule, operands...);
+  env.raise(host.flags);
+  return host.some_left;
+}
+
+struct ADD {
+  template <class F>
+  static word exact(Environment& env, word a, word b) {
+    return add<F>(env, a, b);
+  }
+  template <class L, class... Units>
+  static bool fast(Environment& env, typename L::container* r, const Units*... ab) {
+    return fast_on_host<L>(
+        env, r, [](float a, float b) { return a + b; }, ab...);
+  }
+};
+
+struct SUB {
+  template <class F>
+  static word exact(Environment& env, word a, word b) {
+    return add<F>(env, a, negated<F>(b));
+  }
+  template <class L, class... Units>
+  static bool fast(Environment& env, typename L::container* r, const Units*... ab) {
+    return fast_on_host<L>(
+        env, r, [](float a, float b) { return a - b; }, ab...);
+  }
+};
+
+struct MUL {
+  template <class F>
+  static word exact(Environment& env, word a, word b) {
+    return multiply<F>(env, a, b);
+  }
+  template <class L, class... Units>
+  static bool fast(Environment& env, typename L::container* r, const Units*... ab) {
+    return fast_on_host<L>(
+        env, r, [](float a, float b) { return a * b; }, ab...);
+  }
+};
+
+// acc +- a * b
+template <bool Subtract>
+struct Fused {
+  template <class F>
+  static word exact(Environment& env, word acc, word a, word b) {
+    return multiply_add<F>(env, acc, Subtract ? negated<F>(a) : a, b);
+  }
+  template <class L, class... Units>
+  static bool fast(Environment& env, typename L::container* r, const Units*... operands) {
+    return env.rounding == to_nearest ? fast_on_host<L>(env, r, host<L, true>, operands...)
+                                      : fast_on_host<L>(env, r, host<L, false>, operands...);
+  }
+
+ private:
+  template <class L, bool Nearest>
+  static constexpr auto host = [](float acc, float a, float b) {
+    const float factor = Subtract ? -a : a;
+    if constexpr (L::bits == 16) {
+      return odd_sum<Half, Nearest>(factor * b, acc);
+    } else {
+      return fused<Nearest, L::count == 1>(acc, factor, b);
+    }
+  };
+};
+using MULA = Fused<false>;
+using MULS = Fused<true>;
+
+// --- Order --------------------------------------------------------------------------------------------
+
+// All ones for a NaN.
+template <class F>
+constexpr typename F::lane nan_mask(typename F::lane x) {
+  using Lane = typename F::lane;
+  return mask_below(static_cast<Lane>(F::infinity), static_cast<Lane>(x & (F::sign - 1)));
+}
+
+// The lanes of the rule on numbers; a lane with a NaN operand is left.
+template <class L, class Rule, class Units>
+inline bool fast_ordered(typename L::container* results, Rule rule, const Units* a, const Units* b) {
+  using F = format_of<L>;
+  using Lane = typename F::lane;
+  const Read<L> x(a), y(b);
+  Lane left = 0;
+  KASTARRI_LANES_INDEPENDENT
+  for (int i = 0; i < L::count; ++i) {
+    const Lane a_lane = x[i], b_lane = y[i];
+    const auto nan = static_cast<Lane>(nan_mask<F>(a_lane) | nan_mask<F>(b_lane));
+    left = static_cast<Lane>(left | nan);
+    results[i] = static_cast<Lane>((rule(order<F>(a_lane), order<F>(b_lane)) ? a_lane : b_lane) | nan);
+  }
+  return left != 0;
+}
+
+template <bool Less, bool NumberWins>
+struct Extreme {
+  template <class F>
+  static word exact(Environment& env, word a, word b) {
+    constexpr auto choose = Less ? minimum<F> : maximum<F>;
+    return NumberWins ? number_of<F>(env, a, b, choose) : choose(env, a, b);
+  }
+  template <class L, class Units>
+  static bool fast(Environment&, typename L::container* r, const Units* a, const Units* b) {
+    return fast_ordered<L>(
+        r, [](auto x, auto y) { return Less ? x < y : x > y; }, a, b);
+  }
+};
+using MIN = Extreme<true, false>;
+using MAX = Extreme<false, false>;
+using MINNUM = Extreme<true, true>;
+using MAXNUM = Extreme<false, true>;
+
+// --- Bits only ----------------------------------------------------------------------------------------
+
+struct ABS {
+  template <class F>
+  static constexpr word on_bits(word a) {
+    return magnitude<F>(a);
+  }
+};
+struct NEG {
+  template <class F>
+  static constexpr word on_bits(word a) {
+    return a ^ F::sign;
+  }
+};
+struct MOV {
+  template <class F>
+  static constexpr word on_bits(word a) {
+    return a;
+  }
+};
+
+// One bit for the class: bits 0-4 -infinity, -normal, -subnormal, -0, +0, bits 5-7 +subnormal, +normal,
+// +infinity, bits 8 and 9 the signalling and the quiet NaN.
+struct CLSFY {
+  template <class F>
+  static constexpr word on_bits(word a) {
+    const word m = magnitude<F>(a);
+    const auto either = [a](word positive, word negative) { return is_negative<F>(a) ? negative : positive; };
+    return m == 0             ? either(1 << 4, 1 << 3)
+           : m < F::unit      ? either(1 << 5, 1 << 2)
+           : m < F::infinity  ? either(1 << 6, 1 << 1)
+           : m == F::infinity ? either(1 << 7, 1 << 0)
+           : m & F::quiet     ? 1 << 9
+                              : 1 << 8;
+  }
+};
+
+// --- Rounding to an integer ---------------------------------------------------------------------------
+
+enum class Direction { away, up, down, zero, by_mode };
+
+// Adding and taking away 2^23 with the number's sign rounds a single to an integer; from there on it is
+// one, and stays out of the sum lest that tell it inexact.
+inline float integral_on_host(float x) {
+  const word sign = bits_of(x) & single_sign;
+  const word absolute = bits_of(x) & single_magnitude;
+  const word small = mask_below(absolute, single_bits_of_power(23));
+  const float pull = as_float(single_bits_of_power(23) | sign);
+  const float rounded = (as_float((small & absolute) | sign) + pull) - pull;
+  return as_float((small & bits_of(rounded) & single_magnitude) | (~small & absolute) | sign);
+}
+
+// Ties away from zero, the unit truncating: one more where at least half has been cut off.
+inline float away_on_host(float x) {
+  const word sign = bits_of(x) & single_sign;
+  const float absolute = as_float(bits_of(x) & single_magnitude);
+  const float cut = integral_on_host(absolute);
+  const float rounded = cut + as_float(~mask_below(bits_of(absolute - cut), bits_of(0.5f)) & Single::one);
+  return as_float(bits_of(rounded) | sign);
+}
+
+template <Direction D>
+struct Integral {
+  static Rounding rounding(const Environment& env) {
+    return D == Direction::away   ? ties_away
+           : D == Direction::up   ? upward
+           : D == Direction::down ? downward
+           : D == Direction::zero ? toward_zero
+                                  : env.rounding;
+  }
+  template <class F>
+  static word exact(Environment& env, word a) {
+    return to_integral<F>(env, a, rounding(env), D == Direction::by_mode);
+  }
+  template <class L, class Units>
+  static bool fast(Environment& env, typename L::container* r, const Units* a) {
+    constexpr auto rule = [](float x) { return D == Direction::away ? away_on_host(x) : integral_on_host(x); };
+    const HostResult host = on_host<L, L>(D == Direction::away ? toward_zero : rounding(env), r, rule, a);
+    // Halves are integers before they are narrowed: what is inexact is the rounding to an integer.
+    if (D == Direction::by_mode) env.raise(host.flags);
+    return host.some_left;
+  }
+};
+using FIROUND = Integral<Direction::away>;
+using FICEIL = Integral<Direction::up>;
+using FIFLOOR = Integral<Direction::down>;
+using FITRUNC = Integral<Direction::zero>;
+using FIRINT = Integral<Direction::by_mode>;
+
+// --- Comparisons --------------------------------------------------------------------------------------
+
+// Holds(x, y) on integers in the order of the numbers, which for equal zeros are equal; the answer when
+// unordered; whether a quiet NaN is invalid.
+template <class Holds, bool Unordered, bool Signalling>
+struct Relation {
+  // Unlike order(), both zeros are 0.
+  template <class F>
+  static constexpr auto key(typename F::lane x) {
+    using Lane = typename F::lane;
+    const Lane sign = sign_mask(x);
+    return static_cast<std::make_signed_t<Lane>>(((x & (F::sign - 1)) ^ sign) - sign);
+  }
+  template <class F>
+  static bool on_numbers(typename F::lane a, typename F::lane b) {
+    return Holds()(key<F>(a), key<F>(b));
+  }
+  template <class F>
+  static bool exact(Environment& env, word a, word b) {
+    if (!any_nan<F>(a, b)) return on_numbers<F>(static_cast<typename F::lane>(a), static_cast<typename F::lane>(b));
+    if (Signalling || is_signalling<F>(a) || is_signalling<F>(b)) env.raise(invalid);
+    return Unordered;
+  }
+};
+
+struct Equal {
+  template <class T>
+  constexpr bool operator()(T x, T y) const {
+    return x == y;
+  }
+};
+struct Less {
+  template <class T>
+  constexpr bool operator()(T x, T y) const {
+    return x < y;
+  }
+};
+struct LessOrEqual {
+  template <class T>
+  constexpr bool operator()(T x, T y) const {
+    return x <= y;
+  }
+};
+struct Greater {
+  template <class T>
+  constexpr bool operator()(T x, T y) const {
+    return x > y;
+  }
+};
+struct GreaterOrEqual {
+  template <class T>
+  constexpr bool operator()(T x, T y) const {
+    return x >= y;
+  }
+};
+struct NotEqual {
+  template <class T>
+  constexpr bool operator()(T x, T y) const {
+    return x != y;
+  }
+};
+struct Never {
+  template <class T>
+  constexpr bool operator()(T, T) const {
+    return false;
+  }
+};
+
+using OEQ = Relation<Equal, false, false>;
+using OLT = Relation<Less, false, true>;
+using OLE = Relation<LessOrEqual, false, true>;
+using OGT = Relation<Greater, false, true>;
+using OGE = Relation<GreaterOrEqual, false, true>;
+using UEQ = Relation<Equal, true, false>;
+using ULT = Relation<Less, true, true>;
+using ULE = Relation<LessOrEqual, true, true>;
+using UN = Relation<Never, true, false>;
+using ULEQ = Relation<LessOrEqual, true, false>;
+using ULTQ = Relation<Less, true, false>;
+using UNEQ = Relation<NotEqual, true, false>;
+
+// --- Exponents ----------------------------------------------------------------------------------------
+
+struct NEXP0 {
+  template <class F>
+  static word exact(Environment& env, word a) {
+    return scaled<F>(env, a, -exponent_of<F>(a));
+  }
+};
+struct NEXP01 {
+  template <class F>
+  static word exact(Environment& env, word a) {
+    const int exponent = exponent_of<F>(a);
+    return scaled<F>(env, a, (exponent & 1) - exponent);
+  }
+};
+struct MKDADJ {
+  template <class F>
+  static word exact(Environment&, word a, word b) {
+    const int exponent = exponent_of<F>(a) - exponent_of<F>(b);
+    return power_of_two<F>(exponent < F::least_exponent      ? F::least_exponent
+                           : exponent > F::greatest_exponent ? F::greatest_exponent
+                                                             : exponent);
+  }
+};
+struct MKSADJ {
+  template <class F>
+  static word exact(Environment&, word a) {
+    const int exponent = exponent_of<F>(a);
+    return power_of_two<F>((exponent - (exponent & 1)) / 2);  // floor
+  }
+};
+
+// r times the power of two of s.
+struct ADDEXPM {
+  template <class F>
+  static word exact(Environment& env, word r, word s) {
+    return scaled<F>(env, r, exponent_of<F>(s));
+  }
+};
+
+}  // namespace
+
+#endif

@@ -1,0 +1,339 @@
+// Floating-point arithmetic in integers: every operation on one number, whatever its operands, without
+// the host's floating-point unit. Scalars and single lanes compute with it, vectors do where their fast
+// paths (vectors.h) meet a lane that is not for them. Each policy is here once: the rounding, the choice
+// of a NaN, the flags.
+#ifndef KASTARRI_FLOAT_REFERENCE_H
+#define KASTARRI_FLOAT_REFERENCE_H
+
+#include <cstdint>
+
+#include "float/formats.h"
+
+namespace {
+
+// The finite number +-significand * 2^exponent, exact; or, where its last bit is sticky, a number
+// within one unit of it that rounds to the same. The significand leaves the top bit of S free.
+template <class S>
+struct Number {
+  bool negative;
+  int exponent;
+  S significand;
+};
+
+// Every sum, and every product of halves, has room in a word for all that rounding asks of it; products
+// of singles have in two.
+template <class F>
+using ProductSignificand = std::conditional_t<F::bits == 16, word, std::uint64_t>;
+
+inline int highest_bit(word x) { return 31 - __builtin_clz(x); }
+inline int highest_bit(std::uint64_t x) { return 63 - __builtin_clzll(x); }
+
+// x shifted right by s > 0, the last bit sticky: 1 when any bit was lost.
+template <class S>
+inline S shift_right_sticky(S x, int s) {
+  if (s >= static_cast<int>(8 * sizeof(S))) return x != 0;
+  return static_cast<S>(x >> s) | ((x & ((S{1} << s) - 1)) != 0);
+}
+
+template <class F, class S = word>
+inline Number<S> unpack(word x) {
+  const word field = magnitude<F>(x) >> F::fraction_bits;
+  const word fraction = x & (F::unit - 1);
+  return field == 0 ? Number<S>{is_negative<F>(x), F::least_quantum, fraction}
+                    : Number<S>{is_negative<F>(x), F::least_quantum + static_cast<int>(field) - 1, fraction | F::unit};
+}
+
+struct Integer {
+  word value;
+  bool exact;
+};
+
+// |x| / 2^quantum as an integer. It must fit.
+inline Integer round_at(const Number<word>& x, int quantum, Rounding rounding) {
+  const int shift = quantum - x.exponent;
+  if (shift <= 0) return {x.significand << -shift, true};
+  // Twice the result with a sticky bit below: a half, and more than nothing beyond it.
+  const word doubled = shift == 1 ? x.significand << 1 : shift_right_sticky(x.significand, shift - 2);
+  const word below = doubled >> 2;
+  const word rest = doubled & 3;
+  if (rest == 0) return {below, true};
+  bool up = false;
+  switch (rounding) {
+    case to_nearest:
+      up = rest + (below & 1) > 2;
+      break;
+    case ties_away:
+      up = rest >= 2;
+      break;
+    case toward_zero:
+      break;
+    case upward:
+      up = !x.negative;
+      break;
+    case downward:
+      up = x.negative;
+      break;
+  }
+  return {below + up, false};
+}
+
+template <class F>
+inline word overflowed(Environment& env, bool negative) {
+  env.raise(overflow | inexact);
+  const bool finite = env.rounding == toward_zero || env.rounding == (negative ? upward : downward);
+  return (finite ? F::largest : F::infinity) | (negative ? F::sign : 0);
+}
+
+// Tiny: below the least normal number when rounded as if exponents had no bound. `top` is the exponent
+// of x's highest bit.
+template <class F>
+inline bool is_tiny(const Number<word>& x, int top, Rounding rounding) {
+  if (top >= F::least_exponent) return false;
+  if (top < F::least_exponent - 1) return true;
+  return round_at(x, top - F::fraction_bits, rounding).value < 2 * F::unit;
+}
+
+// The one rounding step: x in the format F.
+template <class F>
+inline word round_pack(Environment& env, const Number<word>& x) {
+  const word sign = x.negative ? F::sign : 0;
+  if (x.significand == 0) return sign;
+  const int top = x.exponent + highest_bit(x.significand);
+  if (top > F::greatest_exponent) return overflowed<F>(env, x.negative);
+  const int quantum = top < F::least_exponent ? F::least_quantum : top - F::fraction_bits;
+  const Integer kept = round_at(x, quantum, env.rounding);
+  // The integer holds the hidden bit: it adds one to the exponent field, or two when rounding has
+  // carried into it, and none for a subnormal.
+  const word bits = kept.value + (static_cast<word>(quantum - F::least_quantum) << F::fraction_bits);
+  if (kept.exact) return sign | bits;
+  if (bits >= F::infinity) return overflowed<F>(env, x.negative);
+  env.raise(is_tiny<F>(x, top, env.rounding) ? inexact | underflow : inexact);
+  return sign | bits;
+}
+
+// The same for more bits: all but the first 31 become the sticky one.
+template <class F>
+inline word round_pack(Environment& env, const Number<std::uint64_t>& x) {
+  const auto high = static_cast<word>(x.significand >> 31);
+  if (high == 0) return round_pack<F>(env, Number<word>{x.negative, x.exponent, static_cast<word>(x.significand)});
+  const int excess = highest_bit(high) + 1;
+  return round_pack<F>(
+      env, Number<word>{x.negative, x.exponent + excess, static_cast<word>(shift_right_sticky(x.significand, excess))});
+}
+
+// --- NaN ----------------------------------------------------------------------------------------------
+
+template <class F, class... X>
+constexpr bool any_nan(X... x) {
+  return (is_nan<F>(x) || ...);
+}
+
+// The one choice of a NaN: the first operand that is one, made quiet.
+template <class F, class... X>
+inline word nan_of(Environment& env, X... operands) {
+  if ((is_signalling<F>(operands) || ...)) env.raise(invalid);
+  word nan = 0;
+  (void)((is_nan<F>(operands) && (nan = operands, true)) || ...);
+  return nan | F::quiet;
+}
+
+template <class F>
+inline word invalid_result(Environment& env) {
+  env.raise(invalid);
+  return F::default_nan;
+}
+
+// The number with the other sign; a NaN as it is, for which NaN it was shows in the result.
+template <class F>
+constexpr word negated(word x) {
+  return is_nan<F>(x) ? x : x ^ F::sign;
+}
+
+// --- Sums and products --------------------------------------------------------------------------------
+
+// With the highest bit of the significand two below the top: room for a carry.
+template <class S>
+inline Number<S> normalised(const Number<S>& x) {
+  const int shift = static_cast<int>(8 * sizeof(S)) - 3 - highest_bit(x.significand);
+  return {x.negative, x.exponent - shift, x.significand << shift};
+}
+
+// x + y with the last bit sticky. Bits are lost only when the exponents lie two or more apart, where a
+// difference keeps all but one of its leading bits: five more, at least, than the formats have.
+template <class S>
+inline Number<S> sum(Number<S> x, Number<S> y, Rounding rounding) {
+  if (x.significand == 0 && y.significand == 0)
+    return {x.negative == y.negative ? x.negative : rounding == downward, x.exponent, 0};
+  if (x.significand == 0) return y;
+  if (y.significand == 0) return x;
+  x = normalised(x);
+  y = normalised(y);
+  if (x.exponent < y.exponent) {
+    const Number<S> swapped = x;
+    x = y;
+    y = swapped;
+  }
+  if (x.exponent > y.exponent) y.significand = shift_right_sticky(y.significand, x.exponent - y.exponent);
+  if (x.negative == y.negative) return {x.negative, x.exponent, x.significand + y.significand};
+  if (x.significand == y.significand) return {rounding == downward, x.exponent, 0};
+  if (x.significand > y.significand) return {x.negative, x.exponent, x.significand - y.significand};
+  return {y.negative, x.exponent, y.significand - x.significand};
+}
+
+template <class F, class P = ProductSignificand<F>>
+inline Number<P> product(word a, word b) {
+  const Number<P> x = unpack<F, P>(a), y = unpack<F, P>(b);
+  return {x.negative != y.negative, x.exponent + y.exponent, x.significand * y.significand};
+}
+
+template <class F>
+inline word add(Environment& env, word a, word b) {
+  if (any_nan<F>(a, b)) return nan_of<F>(env, a, b);
+  if (is_infinite<F>(a)) return is_infinite<F>(b) && a != b ? invalid_result<F>(env) : a;
+  if (is_infinite<F>(b)) return b;
+  return round_pack<F>(env, sum(unpack<F>(a), unpack<F>(b), env.rounding));
+}
+
+template <class F>
+inline word multiply(Environment& env, word a, word b) {
+  if (any_nan<F>(a, b)) return nan_of<F>(env, a, b);
+  if (is_infinite<F>(a) || is_infinite<F>(b))
+    return is_zero<F>(a) || is_zero<F>(b) ? invalid_result<F>(env) : ((a ^ b) & F::sign) | F::infinity;
+  return round_pack<F>(env, product<F>(a, b));
+}
+
+// acc + a * b, rounded once.
+template <class F>
+inline word multiply_add(Environment& env, word acc, word a, word b) {
+  if (any_nan<F>(a, b, acc)) return nan_of<F>(env, a, b, acc);
+  if (is_infinite<F>(a) || is_infinite<F>(b)) {
+    if (is_zero<F>(a) || is_zero<F>(b)) return invalid_result<F>(env);
+    const word infinite = ((a ^ b) & F::sign) | F::infinity;
+    return is_infinite<F>(acc) && acc != infinite ? invalid_result<F>(env) : infinite;
+  }
+  if (is_infinite<F>(acc)) return acc;
+  return round_pack<F>(env, sum(product<F>(a, b), unpack<F, ProductSignificand<F>>(acc), env.rounding));
+}
+
+// --- Order --------------------------------------------------------------------------------------------
+
+// A number whose order as an integer is that of x, a NaN aside; -0 comes just below +0.
+template <class F>
+constexpr auto order(word x) {
+  using S = std::make_signed_t<typename F::lane>;
+  const auto bits = static_cast<S>(x);
+  return static_cast<S>(bits < 0 ? bits ^ static_cast<S>(F::sign - 1) : bits);
+}
+
+template <class F>
+inline word minimum(Environment& env, word a, word b) {
+  if (any_nan<F>(a, b)) return nan_of<F>(env, a, b);
+  return order<F>(a) < order<F>(b) ? a : b;
+}
+
+template <class F>
+inline word maximum(Environment& env, word a, word b) {
+  if (any_nan<F>(a, b)) return nan_of<F>(env, a, b);
+  return order<F>(a) < order<F>(b) ? b : a;
+}
+
+// The other operand, when just one of a and b is a NaN: a number is worth more than a NaN.
+template <class F, class Choose>
+inline word number_of(Environment& env, word a, word b, Choose choose) {
+  if (is_nan<F>(a) == is_nan<F>(b)) return choose(env, a, b);
+  nan_of<F>(env, a, b);  // for its flag
+  return is_nan<F>(a) ? b : a;
+}
+
+// --- Integers -----------------------------------------------------------------------------------------
+
+// The number with its fraction rounded away. A zero keeps the operand's sign.
+template <class F>
+inline word to_integral(Environment& env, word x, Rounding rounding, bool tells_inexact) {
+  if (is_nan<F>(x)) return nan_of<F>(env, x);
+  const auto number = unpack<F>(x);
+  if (is_infinite<F>(x) || number.exponent >= 0) return x;
+  const Integer integer = round_at(number, 0, rounding);
+  if (!integer.exact && tells_inexact) env.raise(inexact);
+  return round_pack<F>(env, Number<word>{number.negative, 0, integer.value});
+}
+
+// value / 2^scale.
+template <class F>
+inline word from_integer(Environment& env, std::int64_t value, word scale) {
+  const std::uint64_t bits = static_cast<std::uint64_t>(value);
+  return round_pack<F>(env, Number<std::uint64_t>{value < 0, -static_cast<int>(scale), value < 0 ? -bits : bits});
+}
+
+// x * 2^scale truncated, as an integer of that width and signedness; out of range, the bound. A NaN
+// counts as positive.
+template <class F, int Bits, bool Signed>
+inline std::int64_t to_integer(Environment& env, word x, word scale) {
+  constexpr std::int64_t high = (std::int64_t{1} << (Signed ? Bits - 1 : Bits)) - 1;
+  constexpr std::int64_t low = Signed ? -high - 1 : 0;
+  const bool negative = is_negative<F>(x) && !is_nan<F>(x);
+  const auto out_of_range = [&] {
+    env.raise(invalid);
+    return negative ? low : high;
+  };
+  if (magnitude<F>(x) >= F::infinity) return out_of_range();
+  auto number = unpack<F>(x);
+  number.exponent += static_cast<int>(scale);
+  if (number.significand != 0 && number.exponent + highest_bit(number.significand) >= Bits) return out_of_range();
+  const Integer integer = round_at(number, 0, toward_zero);
+  const auto absolute = std::int64_t{integer.value};
+  const std::int64_t value = negative ? -absolute : absolute;
+  if (value < low || value > high) return out_of_range();
+  if (!integer.exact) env.raise(inexact);
+  return value;
+}
+
+// --- Formats ------------------------------------------------------------------------------------------
+
+// The number in the other format. The fraction of a NaN is aligned at its top.
+template <class From, class To>
+inline word change_format(Environment& env, word x) {
+  const word sign = is_negative<From>(x) ? To::sign : 0;
+  if (is_nan<From>(x)) {
+    const word fraction = nan_of<From>(env, x) & (From::unit - 1);
+    constexpr int wider = To::fraction_bits - From::fraction_bits;
+    return sign | To::infinity |
+           (wider > 0 ? fraction << (wider > 0 ? wider : 0) : fraction >> (wider > 0 ? 0 : -wider));
+  }
+  if (is_infinite<From>(x)) return sign | To::infinity;
+  return round_pack<To>(env, unpack<From>(x));
+}
+
+// --- Exponents ----------------------------------------------------------------------------------------
+
+// A number whose exponent has no bearing on the exponent operations: zero, infinity, NaN.
+template <class F>
+constexpr bool lacks_exponent(word x) {
+  return is_zero<F>(x) || magnitude<F>(x) >= F::infinity;
+}
+
+// The e of x = +-m * 2^e, 1 <= m < 2; 0 for what lacks one.
+template <class F>
+inline int exponent_of(word x) {
+  if (lacks_exponent<F>(x)) return 0;
+  const auto number = unpack<F>(x);
+  return number.exponent + highest_bit(number.significand);
+}
+
+template <class F>
+inline word power_of_two(int exponent) {
+  return static_cast<word>(exponent + F::bias) << F::fraction_bits;
+}
+
+// x * 2^by, for a by that keeps a significant number exact.
+template <class F>
+inline word scaled(Environment& env, word x, int by) {
+  if (lacks_exponent<F>(x)) return x;
+  auto number = unpack<F>(x);
+  number.exponent += by;
+  return round_pack<F>(env, number);
+}
+
+}  // namespace
+
+#endif

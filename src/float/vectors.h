@@ -1,0 +1,112 @@
+// Operations on whole registers: the fast path, then the reference for the lanes that it left.
+#ifndef KASTARRI_FLOAT_VECTORS_H
+#define KASTARRI_FLOAT_VECTORS_H
+
+#include "float/operations.h"
+#include "tables/float_constants.h"
+
+namespace {
+
+template <class L>
+using lane_of = typename L::container;
+
+// One lane is quickest by the reference, but for the fused operations on singles, whose exact sum is long.
+template <class Op, class L>
+constexpr bool is_fast_alone = false;
+template <bool Subtract>
+constexpr bool is_fast_alone<Fused<Subtract>, f32x1> = true;
+
+// results[i] = Op of lanes i of the operands. The results are apart from the operands.
+template <class L, class Op, class... Units>
+inline void compute(Environment& env, lane_of<L>* results, const Units*... operands) {
+  using F = format_of<L>;
+  if constexpr (L::count == 1 && !is_fast_alone<Op, L>) {
+    results[0] = static_cast<lane_of<L>>(Op::template exact<F>(env, Read<L>(operands)[0]...));
+  } else if (__builtin_expect(Op::template fast<L>(env, results, operands...), 0)) {
+    for (int i = 0; i < L::count; ++i)
+      if (is_nan<F>(results[i]))
+        results[i] = static_cast<lane_of<L>>(Op::template exact<F>(env, Read<L>(operands)[i]...));
+  }
+}
+
+template <class L, class Op, class Unit, class... Units>
+inline void apply(Environment& env, Unit* out, const Units*... operands) {
+  alignas(64) lane_of<L> results[L::count];
+  compute<L, Op>(env, results, operands...);
+  lanes<L::count>(
+      Write<L>(out), [](auto lane) { return lane; }, Read<L>(results));
+}
+
+template <class L, class Op, class Unit, class... Units>
+inline void apply(Unit* out, const Units*... operands) {
+  Environment env;
+  apply<L, Op>(env, out, operands...);
+}
+
+// An operand with +0 in the lanes that are not enabled. No operation here raises a flag for zeros.
+template <class L>
+struct EnabledLanes {
+  template <class Unit>
+  EnabledLanes(const Unit* operand, const LaneMask<L::bits, L::count>& enabled) {
+    const Read<L> from(operand);
+    KASTARRI_LANES_INDEPENDENT
+    for (int i = 0; i < L::count; ++i) lane[i] = static_cast<lane_of<L>>(from[i] & enabled.lane[i]);
+  }
+  alignas(64) lane_of<L> lane[L::count];
+};
+
+template <class L, class Op, class Unit, class PredicateUnit, class... Units>
+inline void apply(UnitsUnder<Unit, PredicateUnit, false> out, const Units*... operands) {
+  LaneMask<L::bits, L::count> enabled;
+  enabled.expand(out.predicate);
+  alignas(64) lane_of<L> results[L::count];
+  Environment env;
+  compute<L, Op>(env, results, EnabledLanes<L>(operands, enabled).lane...);
+  const Read<L> result(results), old(out.units);
+  const Write<L> to(out.units);
+  KASTARRI_LANES_INDEPENDENT
+  for (int i = 0; i < L::count; ++i) to.put(i, enabled.lane[i] ? result[i] : old[i]);
+}
+
+// An operation on bits alone, without flags, as a rule on lanes.
+template <class Op, class L>
+constexpr auto bits_rule = [](lane_of<L> lane) { return Op::template on_bits<format_of<L>>(lane); };
+
+// Constant `number` in the layout's format.
+template <class L>
+constexpr word constant(word number) {
+  const FloatConstant& pair = float_constants[number & 15];
+  return L::bits == 16 ? pair.half : pair.single;
+}
+
+// The layout of the scalar that a unit holds.
+template <class Unit>
+using layout_of_unit = std::conditional_t<sizeof(Unit) == 2, f16x1, f32x1>;
+
+// Bit i of the predicate = the relation of lanes i.
+template <class L, class Op, class Bits, class Units>
+inline void compare(Bits* out, const Units* a, const Units* b) {
+  using F = format_of<L>;
+  const Read<L> x(a), y(b);
+  if constexpr (L::count == 1) {
+    Environment env;
+    out[0] = static_cast<Bits>(Op::template exact<F>(env, x[0], y[0]));
+  } else {
+    LaneMask<L::bits, L::count> holds;
+    KASTARRI_LANES_INDEPENDENT
+    for (int i = 0; i < L::count; ++i)
+      holds.lane[i] = static_cast<lane_of<L>>(Op::template on_numbers<F>(x[i], y[i]) ? -1 : 0);
+    lane_of<L> left = 0;
+    for (int i = 0; i < L::count; ++i) left = static_cast<lane_of<L>>(left | nan_mask<F>(x[i]) | nan_mask<F>(y[i]));
+    if (__builtin_expect(left != 0, 0)) {
+      Environment env;
+      for (int i = 0; i < L::count; ++i)
+        holds.lane[i] = static_cast<lane_of<L>>(Op::template exact<F>(env, x[i], y[i]) ? -1 : 0);
+    }
+    holds.collect(out);
+  }
+}
+
+}  // namespace
+
+#endif

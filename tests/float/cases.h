@@ -1,0 +1,112 @@
+// Operands of floating-point operations: the edges of a format crossed, then numbers that nearly cancel,
+// that make ties, and random ones.
+#ifndef KASTARRI_TESTS_FLOAT_CASES_H
+#define KASTARRI_TESTS_FLOAT_CASES_H
+
+#include <array>
+#include <random>
+#include <vector>
+
+#include "float/exact.h"
+#include "support/operands.h"
+
+namespace testing_support {
+
+using exact::Bits;
+using Case = std::array<Bits, 3>;
+
+// Both signs of: the ends of the ranges and their neighbours, numbers about 1, patterns, an odd integer, ties
+// of rounding to an integer, NaNs with and without the quiet bit.
+inline std::vector<Bits> edges(const exact::Format& f) {
+  const Bits unit = f.unit(), infinity = f.infinity(), one = static_cast<Bits>(1 - f.least) * unit;
+  const Bits integer = one + static_cast<Bits>(f.precision - 1) * unit;  // from here on there are no fractions
+  std::vector<Bits> all = {0,
+                           1,
+                           2,
+                           3,
+                           unit / 2 + 1,
+                           unit - 1,
+                           unit,
+                           unit + 1,
+                           2 * unit - 1,
+                           2 * unit,
+                           3 * unit + 1,
+                           one - 2 * unit,
+                           one - unit - 1,
+                           one - unit,
+                           one - unit + 1,
+                           one - 1,
+                           one,
+                           one + 1,
+                           one + unit / 2,
+                           one + unit + unit / 4,
+                           one + 9 * unit + unit / 3,
+                           integer - unit - 1,
+                           integer - 1,
+                           integer,
+                           integer + 1,
+                           infinity / 3,
+                           infinity - unit - 1,
+                           infinity - unit,
+                           infinity - 2,
+                           infinity - 1,
+                           infinity,
+                           infinity + 1,
+                           infinity + f.quiet() - 1,
+                           infinity + f.quiet(),
+                           infinity + f.quiet() + 5};
+  for (std::size_t i = 0, n = all.size(); i < n; ++i) all.push_back(all[i] + f.sign());
+  return all;
+}
+
+// x moved by a few units in the last place and a few powers of two, sign and all at times turned.
+inline Bits near(const exact::Format& f, Bits x, std::mt19937& random) {
+  const int steps = static_cast<int>(random() % 5) - 2, powers = static_cast<int>(random() % 3) - 1;
+  const Bits moved = x + static_cast<Bits>(steps) + static_cast<Bits>(powers) * f.unit();
+  return (random() & 1 ? moved : moved ^ f.sign()) & (2 * f.sign() - 1);
+}
+
+// A number of few bits: its sums and products are ties often.
+inline Bits short_number(const exact::Format& f, Bits x, std::mt19937& random) {
+  return x & ~((f.unit() >> random() % 5) - 1);
+}
+
+inline std::vector<Case> cases(const exact::Format& f, int operands) {
+  std::vector<Case> all;
+  if (operands == 1 && f.width == 16) {
+    for (Bits x = 0; x < 0x10000; ++x) all.push_back({x, 0, 0});
+    return all;
+  }
+  const std::vector<Bits> edge = edges(f);
+  std::mt19937 random(seed);
+  const auto any = [&] { return static_cast<Bits>(random() & (2 * f.sign() - 1)); };
+  for (Bits a : edge) {
+    for (Bits b : edge) {
+      if (operands < 3) all.push_back({a, b, 0});
+      if (operands == 3)
+        for (int i = 0; i < 6; ++i) all.push_back({i < 4 ? edge[random() % edge.size()] : any(), a, b});
+    }
+  }
+  for (int i = 0; i < 3000; ++i) {
+    const Bits a = any(), b = any();
+    all.push_back({a, b, any()});
+    all.push_back({a, near(f, a, random), any()});
+    all.push_back({short_number(f, a, random), short_number(f, b, random), short_number(f, any(), random)});
+    // acc near the product of two factors about 1, so that the sum nearly cancels; or a tie's distance from it.
+    const Bits one = static_cast<Bits>(1 - f.least) * f.unit();
+    const Bits x = one + random() % f.unit(), y = one + random() % f.unit();
+    exact::Number p(f, x), q(f, y), product;
+    mpfr_mul(product, p, q, MPFR_RNDN);
+    const Bits rounded = exact::round(f, product, MPFR_RNDN).bits;
+    all.push_back({near(f, rounded, random), x, y});
+    all.push_back(
+        {short_number(f, one, random) - static_cast<Bits>(f.precision - 1 + static_cast<int>(random() % 3)) * f.unit(),
+         x, y});
+    all.push_back({x, short_number(f, any(), random), one - static_cast<Bits>(f.precision) * f.unit()});
+  }
+  return all;
+}
+
+}  // namespace testing_support
+
+#endif

@@ -36,7 +36,9 @@ using Lighter = Part(const std::uint8_t*, int, int);
 // Starts at the mean of all pixels and moves to the middle between the means of both parts until it stays.
 // A higher level never makes the next one lower, so levels go one way, and at most 255 steps of it.
 int find_level(Lighter* lighter_of, const std::uint8_t* pixels, int count) {
-  const auto mean = [](const Part& part, std::uint64_t otherwise) { return part.pixels ? part.sum / part.pixels : otherwise; };
+  const auto mean = [](const Part& part, std::uint64_t otherwise) {
+    return part.pixels ? part.sum / part.pixels : otherwise;
+  };
   const Part all = lighter_of(pixels, count, -1);
   std::uint64_t level = mean(all, 0);
   for (int round = 0; round < 256; ++round) {

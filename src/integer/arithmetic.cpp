@@ -30,7 +30,12 @@ constexpr auto SUBS = [](auto x, auto y) {
   const T difference = static_cast<T>(SUB(x, y));
   return ((x ^ y) & (x ^ difference)) < 0 ? bound_of(x) : difference;
 };
-constexpr auto NEGS = [](auto x) { return SUBS(decltype(x){0}, x); };
+// Only the most negative value keeps its sign when negated, and one less is the bound.
+constexpr auto NEGS = [](auto x) {
+  using T = decltype(x);
+  const T negative = static_cast<T>(NEG(x));
+  return unsigned_bits(negative) + unsigned_bits(sign_fill(static_cast<T>(negative & x)));
+};
 
 // Turning all bits of a negative number and adding 1, by its sign fill.
 constexpr auto ABS = [](auto x) {

@@ -24,7 +24,8 @@ inline sum_of<L> sum(const Units* a, const PredicateUnit* p) {
   typename L::container kept[L::count];
   const Read<L> lane(a);
   KASTARRI_LANES_INDEPENDENT
-  for (int i = 0; i < L::count; ++i) kept[i] = enabled.lane[i] ? lane[i] : typename L::container{0};
+  for (int i = 0; i < L::count; ++i)
+    kept[i] = static_cast<typename L::container>(unsigned_bits(lane[i]) & enabled.lane[i]);
   return sum<L>(kept);
 }
 

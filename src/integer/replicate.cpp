@@ -13,10 +13,16 @@
     lanes<L::count>(                                                             \
         result<L>(r), [chosen](int) { return chosen; }, Same(0));                \
   }
-#define KERNEL_filled(OP, BYTE)                               \
-  template <class Unit, std::size_t units>                    \
-  static inline void KASTARRI_SEMANTIC(OP)(Unit(&r)[units]) { \
-    std::memset(r, BYTE, sizeof r);                           \
+// In registers of 64 bytes at most: longer ones the compiler fills with a string instruction, which takes
+// longer to start than all of this.
+#define KERNEL_filled(OP, BYTE)                                          \
+  template <class Unit, std::size_t units>                               \
+  static inline void KASTARRI_SEMANTIC(OP)(Unit(&r)[units]) {            \
+    constexpr std::size_t size = sizeof r < 64 ? sizeof r : 64;          \
+    for (std::size_t at = 0; at < sizeof r; at += size) {                \
+      std::memset(reinterpret_cast<unsigned char*>(r) + at, BYTE, size); \
+      asm volatile("" : : : "memory");                                   \
+    }                                                                    \
   }
 
 #include "integer/replicate.def"

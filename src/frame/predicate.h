@@ -11,6 +11,25 @@
 
 namespace {
 
+// 64 bytes from four quarters, stored in the width in which lanes are read back, so that the store forwards
+// to the load.
+inline void store_quarters(void* to, __m128i q0, __m128i q1, __m128i q2, __m128i q3) {
+#if defined __AVX512BW__
+  const __m512i low = _mm512_castsi256_si512(_mm256_set_m128i(q1, q0));
+  _mm512_storeu_si512(to, _mm512_inserti64x4(low, _mm256_set_m128i(q3, q2), 1));
+#elif defined __AVX2__
+  auto* half = static_cast<__m256i*>(to);
+  _mm256_storeu_si256(half, _mm256_set_m128i(q1, q0));
+  _mm256_storeu_si256(half + 1, _mm256_set_m128i(q3, q2));
+#else
+  auto* quarter = static_cast<__m128i*>(to);
+  _mm_storeu_si128(quarter, q0);
+  _mm_storeu_si128(quarter + 1, q1);
+  _mm_storeu_si128(quarter + 2, q2);
+  _mm_storeu_si128(quarter + 3, q3);
+#endif
+}
+
 template <int LaneBits>
 struct mask_lane;
 template <>
@@ -74,7 +93,7 @@ struct LaneMask<8, 64> {
     const __m128i low = _mm_unpacklo_epi16(twice, twice);
     const __m128i high = _mm_unpackhi_epi16(twice, twice);
     const auto test = [bit](__m128i v) { return _mm_cmpeq_epi8(_mm_and_si128(v, bit), bit); };
-    store_quarters(test(_mm_unpacklo_epi32(low, low)), test(_mm_unpackhi_epi32(low, low)),
+    store_quarters(lane, test(_mm_unpacklo_epi32(low, low)), test(_mm_unpackhi_epi32(low, low)),
                    test(_mm_unpacklo_epi32(high, high)), test(_mm_unpackhi_epi32(high, high)));
 #endif
   }
@@ -94,23 +113,6 @@ struct LaneMask<8, 64> {
                 static_cast<word>(_mm_movemask_epi8(quarter[2 * h + 1])) << 16;
 #endif
   }
-
- private:
-#if !defined __AVX512BW__
-  void store_quarters(__m128i q0, __m128i q1, __m128i q2, __m128i q3) {
-#if defined __AVX2__
-    // In the width in which the lanes are read back, so that the store forwards to the load.
-    _mm256_store_si256(reinterpret_cast<__m256i*>(lane), _mm256_set_m128i(q1, q0));
-    _mm256_store_si256(reinterpret_cast<__m256i*>(lane) + 1, _mm256_set_m128i(q3, q2));
-#else
-    auto* quarter = reinterpret_cast<__m128i*>(lane);
-    quarter[0] = q0;
-    quarter[1] = q1;
-    quarter[2] = q2;
-    quarter[3] = q3;
-#endif
-  }
-#endif
 };
 
 // 32 lanes of 16 bits under a vboolN.

@@ -11,9 +11,8 @@ file(GLOB KASTARRI_VECTOR_SOURCES CONFIGURE_DEPENDS
   ${PROJECT_SOURCE_DIR}/src/integer/*.cpp ${PROJECT_SOURCE_DIR}/src/memory/*.cpp
   ${PROJECT_SOURCE_DIR}/src/multiply/*.cpp ${PROJECT_SOURCE_DIR}/src/float/*.cpp)
 list(APPEND KASTARRI_VECTOR_SOURCES ${PROJECT_SOURCE_DIR}/src/frame/conversions.cpp)
-set(KASTARRI_SCALAR_SOURCES
-  ${PROJECT_SOURCE_DIR}/src/frame/library.cpp ${PROJECT_SOURCE_DIR}/src/frame/failure.cpp
-  ${PROJECT_SOURCE_DIR}/src/frame/state.cpp)
+set(KASTARRI_SCALAR_SOURCES library.cpp failure.cpp state.cpp ports.cpp scalar.cpp funnel.cpp access.cpp)
+list(TRANSFORM KASTARRI_SCALAR_SOURCES PREPEND ${PROJECT_SOURCE_DIR}/src/frame/)
 
 foreach(target IN LISTS KASTARRI_TARGETS)
   if(NOT target IN_LIST KASTARRI_KNOWN_TARGETS)

@@ -15,5 +15,6 @@
 #include "kastarri/integer.h"
 #include "kastarri/memory.h"
 #include "kastarri/multiply.h"
+#include "kastarri/scalar.h"
 
 #endif

@@ -29,7 +29,8 @@ FAMILIES = {
     "multiply": "Multiplies, wide accumulators, packs",
     "float": "Floating point",
 }
-FRAME_TABLES = {"moves": "conversions", "conversions": "conversions"}
+FRAME_TABLES = {"moves": "conversions", "conversions": "conversions",
+                "ports": "scalar", "scalar": "scalar", "funnel": "scalar", "access": "scalar"}
 CONVERSION_TABLES = ["frame/conversions.def", "float/conversions.def"]
 
 UNITS = {"word": ("unsigned int", 32), "half": ("unsigned short", 16), "byte": ("unsigned char", 8)}
@@ -94,17 +95,18 @@ def read_types():
         if kind == "register":
             source, target = types[fields[0]], types[fields[1]]
             target.sources.append((f"const {source.cls}&", f"{source.name}_rtor_{target.name}"))
-            source.targets.append((target.cls, "", f"{source.name}_rtor_{target.name}"))
+            source.targets.append((target.cls, f"{source.name}_rtor_{target.name}"))
         else:
             name, host, target = fields[0], fields[1], types[fields[2]]
             target.sources.append((host, f"{name}_rtor_{target.name}"))
             if kind == "both":
-                target.targets.append((host, " const", f"{target.name}_rtor_{name}"))
+                target.targets.append((host, f"{target.name}_rtor_{name}"))
     return types
 
 
 def symbol(name):
-    return f"{PREFIX}_KOR_{name}"
+    """The exported symbol of a row: an intrinsic's name has its package, a helper's has none."""
+    return f"{PREFIX}_KOR_{name}" if name.startswith("rk_") else PREFIX + name
 
 
 def guard(header):
@@ -124,7 +126,9 @@ def types_header(types):
         "",
         "/* Each register type T is the class T_ in namespace T_space, named cstub_Km_ZNB_Orbis_R5_64k_T. A value is",
         "   its member array and nothing else: lanes lie in it little-endian, lane 0 in the lowest bits. A new value",
-        "   is uninitialised. Conversions are those of the library (conversions.h). */",
+        "   is uninitialised. Conversions are those of the library (conversions.h): between registers the operator",
+        "   of the source converts implicitly and the constructor is explicit, for with both implicit `To t = from`",
+        "   is ambiguous or draws warnings. */",
         "",
     ]
     body += [f"namespace {t.name}_space {{ class {t.name}_; }}" for t in types.values()]
@@ -134,9 +138,9 @@ def types_header(types):
         size = t.units * t.unit_bits // 8
         body += [f"/// {t.meaning}: {t.shape} ({size} {'byte' if size == 1 else 'bytes'}).", f"namespace {t.name}_space {{",
                  f"class {t.name}_ {{", " public:", f"  {t.name}_() = default;"]
-        body += [f"  inline {t.name}_({source} from);" for source, _ in t.sources]
+        body += [f"  {'explicit ' * source.endswith('&')}inline {t.name}_({source} from);" for source, _ in t.sources]
         body += [f"  inline {t.name}_& operator=({source} from);" for source, _ in t.sources]
-        body += [f"  inline operator {target}(){const};" for target, const, _ in t.targets]
+        body += [f"  inline operator {target}() const;" for target, _ in t.targets]
         body += ["", f"  {t.unit} _[{t.units}];", "};", "}", ""]
     return body
 
@@ -149,8 +153,8 @@ def conversion_bodies(types):
             call = f"*this = {symbol('rk_zra32_' + name)}(from);"
             body += [f"inline {t.cls}::{t.name}_({source} from) {{ {call} }}",
                      f"inline {t.cls}& {t.cls}::operator=({source} from) {{ return {call} }}"]
-        for target, const, name in t.targets:
-            body.append(f"inline {t.cls}::operator {target}(){const} {{ return {symbol('rk_zra32_' + name)}(*this); }}")
+        for target, name in t.targets:
+            body.append(f"inline {t.cls}::operator {target}() const {{ return {symbol('rk_zra32_' + name)}(*this); }}")
     return body
 
 
@@ -172,6 +176,7 @@ def read_rows(tables, types):
         doc = ""
         for kind, fields in records('#include "frame/shapes.h"\n#define DOC(...) @doc{__VA_ARGS__}@\n'
                                     '#define ENTRY(SYMBOL, SHAPE, ...) @row{SYMBOL@,SIG_##SHAPE(SYMBOL, __VA_ARGS__)}@\n'
+                                    '#define HELPER ENTRY\n'
                                     f'#include "frame/rows.h"\n#include "{table}"\n'):
             if kind == "doc":
                 doc = unquote(fields[0])
@@ -201,7 +206,7 @@ def family_body(rows, types):
         group = list(group)
         used = [t for t in types.values() if any(re.search(PREFIX + t.name + r"\b", prototype) for _, prototype, *_ in group)]
         body += [""] + [f"/// {line}" for line in wrap(doc + ".")]
-        if len(used) <= 8:
+        if 0 < len(used) <= 8:
             body += [f"/// {line}" for line in wrap("Lanes: " + "; ".join(f"{t.name} {t.shape}" for t in used) + ".")]
         body.append(f"/// Rule: src/{table}")
         for _, prototype, *_ in group:
@@ -211,14 +216,19 @@ def family_body(rows, types):
 
 def short_name(name):
     """ZRA_ADDNX16 of rk_zra32_ZRA_ADDNX16; moves, conversions and scalarfp_ names lose their package too."""
-    package = re.match(r"rk_[a-z0-9]+_", name).group(0)
-    rest = name[len(package):]
+    package, rest = re.match(r"(rk_[a-z0-9]+_)?(.*)", name).groups()
     return rest if package in ("rk_zra32_", "rk_zran_") or rest.startswith("uint32_") else f"RK_{rest}"
 
 
+def listed_tables():
+    """The tables that the library is made of, in their order."""
+    lists = [open(os.path.join(ROOT, "src", name), encoding="utf-8").read() for name in ("scalar_rows.def", "rows.def")]
+    return re.findall(r'^#include "(.*)"', "".join(lists), re.M)
+
+
 def tables_by_family():
-    """The tables of src/rows.def by the header that declares their rows."""
-    listed = re.findall(r'^#include "(.*)"', open(os.path.join(ROOT, "src", "rows.def"), encoding="utf-8").read(), re.M)
+    """The listed tables by the header that declares their rows."""
+    listed = listed_tables()
     families = {name: [] for name in FAMILIES}
     for table in listed + [t for t in CONVERSION_TABLES if t not in listed]:
         directory, name = os.path.splitext(table)[0].split("/")
@@ -227,9 +237,15 @@ def tables_by_family():
     return {name: tables for name, tables in families.items() if tables}
 
 
+def all_rows():
+    """The rows of every family: header -> (title, tables, rows)."""
+    types = read_types()
+    return {name: (FAMILIES[name], tables, read_rows(tables, types)) for name, tables in tables_by_family().items()}
+
+
 def outputs():
     types = read_types()
-    families = {name: (FAMILIES[name], tables, read_rows(tables, types)) for name, tables in tables_by_family().items()}
+    families = all_rows()
     headers = {"types": header_text("types", "The register types of the core", "src/frame/types.def and conversions.def",
                                     types_header(types) + ['#include "kastarri/conversions.h"'])}
     for name, (title, tables, rows) in families.items():
@@ -242,7 +258,7 @@ def outputs():
     headers["names"] = header_text(
         "names", "The names of the core's own sources: ZRA_ADDNX16, qv_vecNx16, ...; RK_ before operations of the scalar core.\n"
         "/// They are macros; kastarri/names_undo.h takes them all back", "all tables",
-        [f"#define {a} {b}" for a, b in short])
+        ['#include "kastarri.h"', ""] + [f"#define {a} {b}" for a, b in short])
     headers["names_undo"] = "\n".join(
         ["/// Takes back the short names of kastarri/names.h, which can be included again afterwards.",
          GENERATED.format(source="all tables").rstrip(), f"#undef {guard('names')}"] + [f"#undef {a}" for a, _ in short]) + "\n"

@@ -238,6 +238,6 @@ extern KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k_mask[16];
 
 /// What a load or store does at an address that it cannot use: prints the address and ends the program with
 /// exit status 1.
-[[noreturn]] KASTARRI_API void cstub_vaddr_not_aligned(unsigned address);
+KASTARRI_API void cstub_vaddr_not_aligned(unsigned address) __attribute__((noreturn));
 
 #endif

@@ -8,7 +8,9 @@ typedef int immediate;
 
 /* Each register type T is the class T_ in namespace T_space, named cstub_Km_ZNB_Orbis_R5_64k_T. A value is
    its member array and nothing else: lanes lie in it little-endian, lane 0 in the lowest bits. A new value
-   is uninitialised. Conversions are those of the library (conversions.h). */
+   is uninitialised. Conversions are those of the library (conversions.h): between registers the operator
+   of the source converts implicitly and the constructor is explicit, for with both implicit `To t = from`
+   is ambiguous or draws warnings. */
 
 namespace qv_vec2Nx8_space { class qv_vec2Nx8_; }
 namespace qv_vec2Nx8U_space { class qv_vec2Nx8U_; }
@@ -123,8 +125,8 @@ class qv_vec2Nx8_ {
   inline qv_vec2Nx8_(unsigned short from);
   inline qv_vec2Nx8_(int from);
   inline qv_vec2Nx8_(unsigned int from);
-  inline qv_vec2Nx8_(const qv_vec2Nx8U_space::qv_vec2Nx8U_& from);
-  inline qv_vec2Nx8_(const qv_int8_space::qv_int8_& from);
+  explicit inline qv_vec2Nx8_(const qv_vec2Nx8U_space::qv_vec2Nx8U_& from);
+  explicit inline qv_vec2Nx8_(const qv_int8_space::qv_int8_& from);
   inline qv_vec2Nx8_& operator=(signed char from);
   inline qv_vec2Nx8_& operator=(unsigned char from);
   inline qv_vec2Nx8_& operator=(short from);
@@ -133,8 +135,8 @@ class qv_vec2Nx8_ {
   inline qv_vec2Nx8_& operator=(unsigned int from);
   inline qv_vec2Nx8_& operator=(const qv_vec2Nx8U_space::qv_vec2Nx8U_& from);
   inline qv_vec2Nx8_& operator=(const qv_int8_space::qv_int8_& from);
-  inline operator qv_vec2Nx8U_space::qv_vec2Nx8U_();
-  inline operator qv_int8_space::qv_int8_();
+  inline operator qv_vec2Nx8U_space::qv_vec2Nx8U_() const;
+  inline operator qv_int8_space::qv_int8_() const;
 
   unsigned int _[16];
 };
@@ -151,9 +153,9 @@ class qv_vec2Nx8U_ {
   inline qv_vec2Nx8U_(unsigned short from);
   inline qv_vec2Nx8U_(int from);
   inline qv_vec2Nx8U_(unsigned int from);
-  inline qv_vec2Nx8U_(const qv_vec2Nx8_space::qv_vec2Nx8_& from);
-  inline qv_vec2Nx8U_(const qv_vec2Nx24_space::qv_vec2Nx24_& from);
-  inline qv_vec2Nx8U_(const qv_int8U_space::qv_int8U_& from);
+  explicit inline qv_vec2Nx8U_(const qv_vec2Nx8_space::qv_vec2Nx8_& from);
+  explicit inline qv_vec2Nx8U_(const qv_vec2Nx24_space::qv_vec2Nx24_& from);
+  explicit inline qv_vec2Nx8U_(const qv_int8U_space::qv_int8U_& from);
   inline qv_vec2Nx8U_& operator=(signed char from);
   inline qv_vec2Nx8U_& operator=(unsigned char from);
   inline qv_vec2Nx8U_& operator=(short from);
@@ -163,8 +165,8 @@ class qv_vec2Nx8U_ {
   inline qv_vec2Nx8U_& operator=(const qv_vec2Nx8_space::qv_vec2Nx8_& from);
   inline qv_vec2Nx8U_& operator=(const qv_vec2Nx24_space::qv_vec2Nx24_& from);
   inline qv_vec2Nx8U_& operator=(const qv_int8U_space::qv_int8U_& from);
-  inline operator qv_vec2Nx8_space::qv_vec2Nx8_();
-  inline operator qv_int8U_space::qv_int8U_();
+  inline operator qv_vec2Nx8_space::qv_vec2Nx8_() const;
+  inline operator qv_int8U_space::qv_int8U_() const;
 
   unsigned int _[16];
 };
@@ -181,11 +183,11 @@ class qv_vecNx16_ {
   inline qv_vecNx16_(unsigned short from);
   inline qv_vecNx16_(int from);
   inline qv_vecNx16_(unsigned int from);
-  inline qv_vecNx16_(const qv_vecNx16U_space::qv_vecNx16U_& from);
-  inline qv_vecNx16_(const qv_vecNx8_space::qv_vecNx8_& from);
-  inline qv_vecNx16_(const qv_vecNx8U_space::qv_vecNx8U_& from);
-  inline qv_vecNx16_(const qv_int16_space::qv_int16_& from);
-  inline qv_vecNx16_(const qv_vecNxf16_space::qv_vecNxf16_& from);
+  explicit inline qv_vecNx16_(const qv_vecNx16U_space::qv_vecNx16U_& from);
+  explicit inline qv_vecNx16_(const qv_vecNx8_space::qv_vecNx8_& from);
+  explicit inline qv_vecNx16_(const qv_vecNx8U_space::qv_vecNx8U_& from);
+  explicit inline qv_vecNx16_(const qv_int16_space::qv_int16_& from);
+  explicit inline qv_vecNx16_(const qv_vecNxf16_space::qv_vecNxf16_& from);
   inline qv_vecNx16_& operator=(signed char from);
   inline qv_vecNx16_& operator=(unsigned char from);
   inline qv_vecNx16_& operator=(short from);
@@ -197,12 +199,12 @@ class qv_vecNx16_ {
   inline qv_vecNx16_& operator=(const qv_vecNx8U_space::qv_vecNx8U_& from);
   inline qv_vecNx16_& operator=(const qv_int16_space::qv_int16_& from);
   inline qv_vecNx16_& operator=(const qv_vecNxf16_space::qv_vecNxf16_& from);
-  inline operator qv_vecNx16U_space::qv_vecNx16U_();
-  inline operator qv_vecNx8_space::qv_vecNx8_();
-  inline operator qv_vecNx8U_space::qv_vecNx8U_();
-  inline operator qv_int8_space::qv_int8_();
-  inline operator qv_int16_space::qv_int16_();
-  inline operator qv_vecNxf16_space::qv_vecNxf16_();
+  inline operator qv_vecNx16U_space::qv_vecNx16U_() const;
+  inline operator qv_vecNx8_space::qv_vecNx8_() const;
+  inline operator qv_vecNx8U_space::qv_vecNx8U_() const;
+  inline operator qv_int8_space::qv_int8_() const;
+  inline operator qv_int16_space::qv_int16_() const;
+  inline operator qv_vecNxf16_space::qv_vecNxf16_() const;
 
   unsigned int _[16];
 };
@@ -219,12 +221,12 @@ class qv_vecNx16U_ {
   inline qv_vecNx16U_(unsigned short from);
   inline qv_vecNx16U_(int from);
   inline qv_vecNx16U_(unsigned int from);
-  inline qv_vecNx16U_(const qv_vecNx16_space::qv_vecNx16_& from);
-  inline qv_vecNx16U_(const qv_vecNx8_space::qv_vecNx8_& from);
-  inline qv_vecNx16U_(const qv_vecNx8U_space::qv_vecNx8U_& from);
-  inline qv_vecNx16U_(const qv_vecNx48_space::qv_vecNx48_& from);
-  inline qv_vecNx16U_(const qv_int16U_space::qv_int16U_& from);
-  inline qv_vecNx16U_(const qv_vecNxf16_space::qv_vecNxf16_& from);
+  explicit inline qv_vecNx16U_(const qv_vecNx16_space::qv_vecNx16_& from);
+  explicit inline qv_vecNx16U_(const qv_vecNx8_space::qv_vecNx8_& from);
+  explicit inline qv_vecNx16U_(const qv_vecNx8U_space::qv_vecNx8U_& from);
+  explicit inline qv_vecNx16U_(const qv_vecNx48_space::qv_vecNx48_& from);
+  explicit inline qv_vecNx16U_(const qv_int16U_space::qv_int16U_& from);
+  explicit inline qv_vecNx16U_(const qv_vecNxf16_space::qv_vecNxf16_& from);
   inline qv_vecNx16U_& operator=(signed char from);
   inline qv_vecNx16U_& operator=(unsigned char from);
   inline qv_vecNx16U_& operator=(short from);
@@ -237,11 +239,11 @@ class qv_vecNx16U_ {
   inline qv_vecNx16U_& operator=(const qv_vecNx48_space::qv_vecNx48_& from);
   inline qv_vecNx16U_& operator=(const qv_int16U_space::qv_int16U_& from);
   inline qv_vecNx16U_& operator=(const qv_vecNxf16_space::qv_vecNxf16_& from);
-  inline operator qv_vecNx16_space::qv_vecNx16_();
-  inline operator qv_vecNx8U_space::qv_vecNx8U_();
-  inline operator qv_int8U_space::qv_int8U_();
-  inline operator qv_int16U_space::qv_int16U_();
-  inline operator qv_vecNxf16_space::qv_vecNxf16_();
+  inline operator qv_vecNx16_space::qv_vecNx16_() const;
+  inline operator qv_vecNx8U_space::qv_vecNx8U_() const;
+  inline operator qv_int8U_space::qv_int8U_() const;
+  inline operator qv_int16U_space::qv_int16U_() const;
+  inline operator qv_vecNxf16_space::qv_vecNxf16_() const;
 
   unsigned int _[16];
 };
@@ -258,11 +260,11 @@ class qv_vecN_2x32v_ {
   inline qv_vecN_2x32v_(unsigned short from);
   inline qv_vecN_2x32v_(int from);
   inline qv_vecN_2x32v_(unsigned int from);
-  inline qv_vecN_2x32v_(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from);
-  inline qv_vecN_2x32v_(const qv_vecN_2x16_space::qv_vecN_2x16_& from);
-  inline qv_vecN_2x32v_(const qv_vecN_2x16U_space::qv_vecN_2x16U_& from);
-  inline qv_vecN_2x32v_(const qv_int32v_space::qv_int32v_& from);
-  inline qv_vecN_2x32v_(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from);
+  explicit inline qv_vecN_2x32v_(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from);
+  explicit inline qv_vecN_2x32v_(const qv_vecN_2x16_space::qv_vecN_2x16_& from);
+  explicit inline qv_vecN_2x32v_(const qv_vecN_2x16U_space::qv_vecN_2x16U_& from);
+  explicit inline qv_vecN_2x32v_(const qv_int32v_space::qv_int32v_& from);
+  explicit inline qv_vecN_2x32v_(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from);
   inline qv_vecN_2x32v_& operator=(signed char from);
   inline qv_vecN_2x32v_& operator=(unsigned char from);
   inline qv_vecN_2x32v_& operator=(short from);
@@ -274,12 +276,12 @@ class qv_vecN_2x32v_ {
   inline qv_vecN_2x32v_& operator=(const qv_vecN_2x16U_space::qv_vecN_2x16U_& from);
   inline qv_vecN_2x32v_& operator=(const qv_int32v_space::qv_int32v_& from);
   inline qv_vecN_2x32v_& operator=(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from);
-  inline operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_();
-  inline operator qv_vecN_2x16_space::qv_vecN_2x16_();
-  inline operator qv_vecN_2x16U_space::qv_vecN_2x16U_();
-  inline operator qv_int16_space::qv_int16_();
-  inline operator qv_int32v_space::qv_int32v_();
-  inline operator qv_vecN_2xf32_space::qv_vecN_2xf32_();
+  inline operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_() const;
+  inline operator qv_vecN_2x16_space::qv_vecN_2x16_() const;
+  inline operator qv_vecN_2x16U_space::qv_vecN_2x16U_() const;
+  inline operator qv_int16_space::qv_int16_() const;
+  inline operator qv_int32v_space::qv_int32v_() const;
+  inline operator qv_vecN_2xf32_space::qv_vecN_2xf32_() const;
 
   unsigned int _[16];
 };
@@ -296,12 +298,12 @@ class qv_vecN_2x32Uv_ {
   inline qv_vecN_2x32Uv_(unsigned short from);
   inline qv_vecN_2x32Uv_(int from);
   inline qv_vecN_2x32Uv_(unsigned int from);
-  inline qv_vecN_2x32Uv_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);
-  inline qv_vecN_2x32Uv_(const qv_vecN_2x16_space::qv_vecN_2x16_& from);
-  inline qv_vecN_2x32Uv_(const qv_vecN_2x16U_space::qv_vecN_2x16U_& from);
-  inline qv_vecN_2x32Uv_(const qv_vecN_2x64w_space::qv_vecN_2x64w_& from);
-  inline qv_vecN_2x32Uv_(const qv_int32Uv_space::qv_int32Uv_& from);
-  inline qv_vecN_2x32Uv_(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from);
+  explicit inline qv_vecN_2x32Uv_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);
+  explicit inline qv_vecN_2x32Uv_(const qv_vecN_2x16_space::qv_vecN_2x16_& from);
+  explicit inline qv_vecN_2x32Uv_(const qv_vecN_2x16U_space::qv_vecN_2x16U_& from);
+  explicit inline qv_vecN_2x32Uv_(const qv_vecN_2x64w_space::qv_vecN_2x64w_& from);
+  explicit inline qv_vecN_2x32Uv_(const qv_int32Uv_space::qv_int32Uv_& from);
+  explicit inline qv_vecN_2x32Uv_(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from);
   inline qv_vecN_2x32Uv_& operator=(signed char from);
   inline qv_vecN_2x32Uv_& operator=(unsigned char from);
   inline qv_vecN_2x32Uv_& operator=(short from);
@@ -314,11 +316,11 @@ class qv_vecN_2x32Uv_ {
   inline qv_vecN_2x32Uv_& operator=(const qv_vecN_2x64w_space::qv_vecN_2x64w_& from);
   inline qv_vecN_2x32Uv_& operator=(const qv_int32Uv_space::qv_int32Uv_& from);
   inline qv_vecN_2x32Uv_& operator=(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from);
-  inline operator qv_vecN_2x32v_space::qv_vecN_2x32v_();
-  inline operator qv_vecN_2x16U_space::qv_vecN_2x16U_();
-  inline operator qv_int16U_space::qv_int16U_();
-  inline operator qv_int32Uv_space::qv_int32Uv_();
-  inline operator qv_vecN_2xf32_space::qv_vecN_2xf32_();
+  inline operator qv_vecN_2x32v_space::qv_vecN_2x32v_() const;
+  inline operator qv_vecN_2x16U_space::qv_vecN_2x16U_() const;
+  inline operator qv_int16U_space::qv_int16U_() const;
+  inline operator qv_int32Uv_space::qv_int32Uv_() const;
+  inline operator qv_vecN_2xf32_space::qv_vecN_2xf32_() const;
 
   unsigned int _[16];
 };
@@ -330,10 +332,10 @@ class qv_vecN_4x64_ {
  public:
   qv_vecN_4x64_() = default;
   inline qv_vecN_4x64_(long long from);
-  inline qv_vecN_4x64_(const qv_int64_space::qv_int64_& from);
+  explicit inline qv_vecN_4x64_(const qv_int64_space::qv_int64_& from);
   inline qv_vecN_4x64_& operator=(long long from);
   inline qv_vecN_4x64_& operator=(const qv_int64_space::qv_int64_& from);
-  inline operator qv_int64_space::qv_int64_();
+  inline operator qv_int64_space::qv_int64_() const;
 
   unsigned int _[16];
 };
@@ -344,7 +346,7 @@ namespace qv_vecN_8x128_space {
 class qv_vecN_8x128_ {
  public:
   qv_vecN_8x128_() = default;
-  inline operator qv_int128_space::qv_int128_();
+  inline operator qv_int128_space::qv_int128_() const;
 
   unsigned int _[16];
 };
@@ -355,7 +357,7 @@ namespace qv_vecN_16x256_space {
 class qv_vecN_16x256_ {
  public:
   qv_vecN_16x256_() = default;
-  inline operator qv_int256_space::qv_int256_();
+  inline operator qv_int256_space::qv_int256_() const;
 
   unsigned int _[16];
 };
@@ -366,15 +368,15 @@ namespace qv_vecNxf16_space {
 class qv_vecNxf16_ {
  public:
   qv_vecNxf16_() = default;
-  inline qv_vecNxf16_(const qv_f16_space::qv_f16_& from);
+  explicit inline qv_vecNxf16_(const qv_f16_space::qv_f16_& from);
   inline qv_vecNxf16_(short from);
   inline qv_vecNxf16_(unsigned short from);
   inline qv_vecNxf16_(int from);
   inline qv_vecNxf16_(unsigned int from);
   inline qv_vecNxf16_(float from);
-  inline qv_vecNxf16_(const qv_vecNx16_space::qv_vecNx16_& from);
-  inline qv_vecNxf16_(const qv_vecNx16U_space::qv_vecNx16U_& from);
-  inline qv_vecNxf16_(const rkfloat_space::rkfloat_& from);
+  explicit inline qv_vecNxf16_(const qv_vecNx16_space::qv_vecNx16_& from);
+  explicit inline qv_vecNxf16_(const qv_vecNx16U_space::qv_vecNx16U_& from);
+  explicit inline qv_vecNxf16_(const rkfloat_space::rkfloat_& from);
   inline qv_vecNxf16_& operator=(const qv_f16_space::qv_f16_& from);
   inline qv_vecNxf16_& operator=(short from);
   inline qv_vecNxf16_& operator=(unsigned short from);
@@ -384,10 +386,10 @@ class qv_vecNxf16_ {
   inline qv_vecNxf16_& operator=(const qv_vecNx16_space::qv_vecNx16_& from);
   inline qv_vecNxf16_& operator=(const qv_vecNx16U_space::qv_vecNx16U_& from);
   inline qv_vecNxf16_& operator=(const rkfloat_space::rkfloat_& from);
-  inline operator qv_f16_space::qv_f16_();
-  inline operator qv_vecNx16_space::qv_vecNx16_();
-  inline operator qv_vecNx16U_space::qv_vecNx16U_();
-  inline operator rkfloat_space::rkfloat_();
+  inline operator qv_f16_space::qv_f16_() const;
+  inline operator qv_vecNx16_space::qv_vecNx16_() const;
+  inline operator qv_vecNx16U_space::qv_vecNx16U_() const;
+  inline operator rkfloat_space::rkfloat_() const;
 
   unsigned int _[16];
 };
@@ -399,12 +401,12 @@ class qv_vecN_2xf32_ {
  public:
   qv_vecN_2xf32_() = default;
   inline qv_vecN_2xf32_(float from);
-  inline qv_vecN_2xf32_(const rkfloat_space::rkfloat_& from);
+  explicit inline qv_vecN_2xf32_(const rkfloat_space::rkfloat_& from);
   inline qv_vecN_2xf32_(int from);
   inline qv_vecN_2xf32_(unsigned int from);
-  inline qv_vecN_2xf32_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);
-  inline qv_vecN_2xf32_(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from);
-  inline qv_vecN_2xf32_(const qv_vecN_2xf16_space::qv_vecN_2xf16_& from);
+  explicit inline qv_vecN_2xf32_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);
+  explicit inline qv_vecN_2xf32_(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from);
+  explicit inline qv_vecN_2xf32_(const qv_vecN_2xf16_space::qv_vecN_2xf16_& from);
   inline qv_vecN_2xf32_& operator=(float from);
   inline qv_vecN_2xf32_& operator=(const rkfloat_space::rkfloat_& from);
   inline qv_vecN_2xf32_& operator=(int from);
@@ -412,10 +414,10 @@ class qv_vecN_2xf32_ {
   inline qv_vecN_2xf32_& operator=(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);
   inline qv_vecN_2xf32_& operator=(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from);
   inline qv_vecN_2xf32_& operator=(const qv_vecN_2xf16_space::qv_vecN_2xf16_& from);
-  inline operator rkfloat_space::rkfloat_();
-  inline operator qv_vecN_2x32v_space::qv_vecN_2x32v_();
-  inline operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_();
-  inline operator qv_vecN_2xf16_space::qv_vecN_2xf16_();
+  inline operator rkfloat_space::rkfloat_() const;
+  inline operator qv_vecN_2x32v_space::qv_vecN_2x32v_() const;
+  inline operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_() const;
+  inline operator qv_vecN_2xf16_space::qv_vecN_2xf16_() const;
 
   unsigned int _[16];
 };
@@ -429,14 +431,14 @@ class qv_vecNx8_ {
   inline qv_vecNx8_(signed char from);
   inline qv_vecNx8_(int from);
   inline qv_vecNx8_(unsigned int from);
-  inline qv_vecNx8_(const qv_vecNx16_space::qv_vecNx16_& from);
+  explicit inline qv_vecNx8_(const qv_vecNx16_space::qv_vecNx16_& from);
   inline qv_vecNx8_& operator=(signed char from);
   inline qv_vecNx8_& operator=(int from);
   inline qv_vecNx8_& operator=(unsigned int from);
   inline qv_vecNx8_& operator=(const qv_vecNx16_space::qv_vecNx16_& from);
-  inline operator qv_vecNx16_space::qv_vecNx16_();
-  inline operator qv_vecNx16U_space::qv_vecNx16U_();
-  inline operator qv_int8_space::qv_int8_();
+  inline operator qv_vecNx16_space::qv_vecNx16_() const;
+  inline operator qv_vecNx16U_space::qv_vecNx16U_() const;
+  inline operator qv_int8_space::qv_int8_() const;
 
   unsigned int _[8];
 };
@@ -450,18 +452,18 @@ class qv_vecNx8U_ {
   inline qv_vecNx8U_(unsigned char from);
   inline qv_vecNx8U_(int from);
   inline qv_vecNx8U_(unsigned int from);
-  inline qv_vecNx8U_(const qv_vecNx16_space::qv_vecNx16_& from);
-  inline qv_vecNx8U_(const qv_vecNx16U_space::qv_vecNx16U_& from);
-  inline qv_vecNx8U_(const qv_int8U_space::qv_int8U_& from);
+  explicit inline qv_vecNx8U_(const qv_vecNx16_space::qv_vecNx16_& from);
+  explicit inline qv_vecNx8U_(const qv_vecNx16U_space::qv_vecNx16U_& from);
+  explicit inline qv_vecNx8U_(const qv_int8U_space::qv_int8U_& from);
   inline qv_vecNx8U_& operator=(unsigned char from);
   inline qv_vecNx8U_& operator=(int from);
   inline qv_vecNx8U_& operator=(unsigned int from);
   inline qv_vecNx8U_& operator=(const qv_vecNx16_space::qv_vecNx16_& from);
   inline qv_vecNx8U_& operator=(const qv_vecNx16U_space::qv_vecNx16U_& from);
   inline qv_vecNx8U_& operator=(const qv_int8U_space::qv_int8U_& from);
-  inline operator qv_vecNx16_space::qv_vecNx16_();
-  inline operator qv_vecNx16U_space::qv_vecNx16U_();
-  inline operator qv_int8U_space::qv_int8U_();
+  inline operator qv_vecNx16_space::qv_vecNx16_() const;
+  inline operator qv_vecNx16U_space::qv_vecNx16U_() const;
+  inline operator qv_int8U_space::qv_int8U_() const;
 
   unsigned int _[8];
 };
@@ -475,14 +477,14 @@ class qv_vecN_2x16_ {
   inline qv_vecN_2x16_(short from);
   inline qv_vecN_2x16_(int from);
   inline qv_vecN_2x16_(unsigned int from);
-  inline qv_vecN_2x16_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);
+  explicit inline qv_vecN_2x16_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);
   inline qv_vecN_2x16_& operator=(short from);
   inline qv_vecN_2x16_& operator=(int from);
   inline qv_vecN_2x16_& operator=(unsigned int from);
   inline qv_vecN_2x16_& operator=(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);
-  inline operator qv_vecN_2x32v_space::qv_vecN_2x32v_();
-  inline operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_();
-  inline operator qv_int16_space::qv_int16_();
+  inline operator qv_vecN_2x32v_space::qv_vecN_2x32v_() const;
+  inline operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_() const;
+  inline operator qv_int16_space::qv_int16_() const;
 
   unsigned int _[8];
 };
@@ -496,18 +498,18 @@ class qv_vecN_2x16U_ {
   inline qv_vecN_2x16U_(unsigned short from);
   inline qv_vecN_2x16U_(int from);
   inline qv_vecN_2x16U_(unsigned int from);
-  inline qv_vecN_2x16U_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);
-  inline qv_vecN_2x16U_(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from);
-  inline qv_vecN_2x16U_(const qv_int16U_space::qv_int16U_& from);
+  explicit inline qv_vecN_2x16U_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);
+  explicit inline qv_vecN_2x16U_(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from);
+  explicit inline qv_vecN_2x16U_(const qv_int16U_space::qv_int16U_& from);
   inline qv_vecN_2x16U_& operator=(unsigned short from);
   inline qv_vecN_2x16U_& operator=(int from);
   inline qv_vecN_2x16U_& operator=(unsigned int from);
   inline qv_vecN_2x16U_& operator=(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);
   inline qv_vecN_2x16U_& operator=(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from);
   inline qv_vecN_2x16U_& operator=(const qv_int16U_space::qv_int16U_& from);
-  inline operator qv_vecN_2x32v_space::qv_vecN_2x32v_();
-  inline operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_();
-  inline operator qv_int16U_space::qv_int16U_();
+  inline operator qv_vecN_2x32v_space::qv_vecN_2x32v_() const;
+  inline operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_() const;
+  inline operator qv_int16U_space::qv_int16U_() const;
 
   unsigned int _[8];
 };
@@ -518,12 +520,12 @@ namespace qv_vecN_2xf16_space {
 class qv_vecN_2xf16_ {
  public:
   qv_vecN_2xf16_() = default;
-  inline qv_vecN_2xf16_(const qv_f16_space::qv_f16_& from);
-  inline qv_vecN_2xf16_(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from);
+  explicit inline qv_vecN_2xf16_(const qv_f16_space::qv_f16_& from);
+  explicit inline qv_vecN_2xf16_(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from);
   inline qv_vecN_2xf16_& operator=(const qv_f16_space::qv_f16_& from);
   inline qv_vecN_2xf16_& operator=(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from);
-  inline operator qv_f16_space::qv_f16_();
-  inline operator qv_vecN_2xf32_space::qv_vecN_2xf32_();
+  inline operator qv_f16_space::qv_f16_() const;
+  inline operator qv_vecN_2xf32_space::qv_vecN_2xf32_() const;
 
   unsigned int _[8];
 };
@@ -538,9 +540,9 @@ class qv_vec2Nx24_ {
   inline qv_vec2Nx24_(unsigned short from);
   inline qv_vec2Nx24_(int from);
   inline qv_vec2Nx24_(unsigned int from);
-  inline qv_vec2Nx24_(const qv_vec2Nx16w_space::qv_vec2Nx16w_& from);
-  inline qv_vec2Nx24_(const qv_vec2Nx16Uw_space::qv_vec2Nx16Uw_& from);
-  inline qv_vec2Nx24_(const qv_wvecspill_space::qv_wvecspill_& from);
+  explicit inline qv_vec2Nx24_(const qv_vec2Nx16w_space::qv_vec2Nx16w_& from);
+  explicit inline qv_vec2Nx24_(const qv_vec2Nx16Uw_space::qv_vec2Nx16Uw_& from);
+  explicit inline qv_vec2Nx24_(const qv_wvecspill_space::qv_wvecspill_& from);
   inline qv_vec2Nx24_& operator=(short from);
   inline qv_vec2Nx24_& operator=(unsigned short from);
   inline qv_vec2Nx24_& operator=(int from);
@@ -548,10 +550,10 @@ class qv_vec2Nx24_ {
   inline qv_vec2Nx24_& operator=(const qv_vec2Nx16w_space::qv_vec2Nx16w_& from);
   inline qv_vec2Nx24_& operator=(const qv_vec2Nx16Uw_space::qv_vec2Nx16Uw_& from);
   inline qv_vec2Nx24_& operator=(const qv_wvecspill_space::qv_wvecspill_& from);
-  inline operator qv_vec2Nx8U_space::qv_vec2Nx8U_();
-  inline operator qv_vec2Nx16w_space::qv_vec2Nx16w_();
-  inline operator qv_vec2Nx16Uw_space::qv_vec2Nx16Uw_();
-  inline operator qv_wvecspill_space::qv_wvecspill_();
+  inline operator qv_vec2Nx8U_space::qv_vec2Nx8U_() const;
+  inline operator qv_vec2Nx16w_space::qv_vec2Nx16w_() const;
+  inline operator qv_vec2Nx16Uw_space::qv_vec2Nx16Uw_() const;
+  inline operator qv_wvecspill_space::qv_wvecspill_() const;
 
   unsigned int _[64];
 };
@@ -564,18 +566,18 @@ class qv_vecNx48_ {
   qv_vecNx48_() = default;
   inline qv_vecNx48_(int from);
   inline qv_vecNx48_(unsigned int from);
-  inline qv_vecNx48_(const qv_vecNx32_space::qv_vecNx32_& from);
-  inline qv_vecNx48_(const qv_vecNx32U_space::qv_vecNx32U_& from);
-  inline qv_vecNx48_(const qv_wvecspill_space::qv_wvecspill_& from);
+  explicit inline qv_vecNx48_(const qv_vecNx32_space::qv_vecNx32_& from);
+  explicit inline qv_vecNx48_(const qv_vecNx32U_space::qv_vecNx32U_& from);
+  explicit inline qv_vecNx48_(const qv_wvecspill_space::qv_wvecspill_& from);
   inline qv_vecNx48_& operator=(int from);
   inline qv_vecNx48_& operator=(unsigned int from);
   inline qv_vecNx48_& operator=(const qv_vecNx32_space::qv_vecNx32_& from);
   inline qv_vecNx48_& operator=(const qv_vecNx32U_space::qv_vecNx32U_& from);
   inline qv_vecNx48_& operator=(const qv_wvecspill_space::qv_wvecspill_& from);
-  inline operator qv_vecNx16U_space::qv_vecNx16U_();
-  inline operator qv_vecNx32_space::qv_vecNx32_();
-  inline operator qv_vecNx32U_space::qv_vecNx32U_();
-  inline operator qv_wvecspill_space::qv_wvecspill_();
+  inline operator qv_vecNx16U_space::qv_vecNx16U_() const;
+  inline operator qv_vecNx32_space::qv_vecNx32_() const;
+  inline operator qv_vecNx32U_space::qv_vecNx32U_() const;
+  inline operator qv_wvecspill_space::qv_wvecspill_() const;
 
   unsigned int _[64];
 };
@@ -586,7 +588,7 @@ namespace qv_vecN_2x64w_space {
 class qv_vecN_2x64w_ {
  public:
   qv_vecN_2x64w_() = default;
-  inline operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_();
+  inline operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_() const;
 
   unsigned int _[32];
 };
@@ -597,9 +599,9 @@ namespace qv_vec2Nx16w_space {
 class qv_vec2Nx16w_ {
  public:
   qv_vec2Nx16w_() = default;
-  inline qv_vec2Nx16w_(const qv_vec2Nx24_space::qv_vec2Nx24_& from);
+  explicit inline qv_vec2Nx16w_(const qv_vec2Nx24_space::qv_vec2Nx24_& from);
   inline qv_vec2Nx16w_& operator=(const qv_vec2Nx24_space::qv_vec2Nx24_& from);
-  inline operator qv_vec2Nx24_space::qv_vec2Nx24_();
+  inline operator qv_vec2Nx24_space::qv_vec2Nx24_() const;
 
   unsigned int _[32];
 };
@@ -610,9 +612,9 @@ namespace qv_vec2Nx16Uw_space {
 class qv_vec2Nx16Uw_ {
  public:
   qv_vec2Nx16Uw_() = default;
-  inline qv_vec2Nx16Uw_(const qv_vec2Nx24_space::qv_vec2Nx24_& from);
+  explicit inline qv_vec2Nx16Uw_(const qv_vec2Nx24_space::qv_vec2Nx24_& from);
   inline qv_vec2Nx16Uw_& operator=(const qv_vec2Nx24_space::qv_vec2Nx24_& from);
-  inline operator qv_vec2Nx24_space::qv_vec2Nx24_();
+  inline operator qv_vec2Nx24_space::qv_vec2Nx24_() const;
 
   unsigned int _[32];
 };
@@ -623,9 +625,9 @@ namespace qv_vecNx32_space {
 class qv_vecNx32_ {
  public:
   qv_vecNx32_() = default;
-  inline qv_vecNx32_(const qv_vecNx48_space::qv_vecNx48_& from);
+  explicit inline qv_vecNx32_(const qv_vecNx48_space::qv_vecNx48_& from);
   inline qv_vecNx32_& operator=(const qv_vecNx48_space::qv_vecNx48_& from);
-  inline operator qv_vecNx48_space::qv_vecNx48_();
+  inline operator qv_vecNx48_space::qv_vecNx48_() const;
 
   unsigned int _[32];
 };
@@ -636,9 +638,9 @@ namespace qv_vecNx32U_space {
 class qv_vecNx32U_ {
  public:
   qv_vecNx32U_() = default;
-  inline qv_vecNx32U_(const qv_vecNx48_space::qv_vecNx48_& from);
+  explicit inline qv_vecNx32U_(const qv_vecNx48_space::qv_vecNx48_& from);
   inline qv_vecNx32U_& operator=(const qv_vecNx48_space::qv_vecNx48_& from);
-  inline operator qv_vecNx48_space::qv_vecNx48_();
+  inline operator qv_vecNx48_space::qv_vecNx48_() const;
 
   unsigned int _[32];
 };
@@ -649,12 +651,12 @@ namespace qv_wvecspill_space {
 class qv_wvecspill_ {
  public:
   qv_wvecspill_() = default;
-  inline qv_wvecspill_(const qv_vec2Nx24_space::qv_vec2Nx24_& from);
-  inline qv_wvecspill_(const qv_vecNx48_space::qv_vecNx48_& from);
+  explicit inline qv_wvecspill_(const qv_vec2Nx24_space::qv_vec2Nx24_& from);
+  explicit inline qv_wvecspill_(const qv_vecNx48_space::qv_vecNx48_& from);
   inline qv_wvecspill_& operator=(const qv_vec2Nx24_space::qv_vec2Nx24_& from);
   inline qv_wvecspill_& operator=(const qv_vecNx48_space::qv_vecNx48_& from);
-  inline operator qv_vec2Nx24_space::qv_vec2Nx24_();
-  inline operator qv_vecNx48_space::qv_vecNx48_();
+  inline operator qv_vec2Nx24_space::qv_vec2Nx24_() const;
+  inline operator qv_vecNx48_space::qv_vecNx48_() const;
 
   unsigned int _[48];
 };
@@ -685,7 +687,7 @@ namespace vboolN_space {
 class vboolN_ {
  public:
   vboolN_() = default;
-  inline vboolN_(const vbool1_space::vbool1_& from);
+  explicit inline vboolN_(const vbool1_space::vbool1_& from);
   inline vboolN_& operator=(const vbool1_space::vbool1_& from);
 
   unsigned int _[1];
@@ -697,7 +699,7 @@ namespace vbool2N_space {
 class vbool2N_ {
  public:
   vbool2N_() = default;
-  inline vbool2N_(const vbool1_space::vbool1_& from);
+  explicit inline vbool2N_(const vbool1_space::vbool1_& from);
   inline vbool2N_& operator=(const vbool1_space::vbool1_& from);
 
   unsigned int _[2];
@@ -709,7 +711,7 @@ namespace vboolN_2_space {
 class vboolN_2_ {
  public:
   vboolN_2_() = default;
-  inline vboolN_2_(const vbool1_space::vbool1_& from);
+  explicit inline vboolN_2_(const vbool1_space::vbool1_& from);
   inline vboolN_2_& operator=(const vbool1_space::vbool1_& from);
 
   unsigned short _[1];
@@ -725,9 +727,9 @@ class vbool1_ {
   inline vbool1_(unsigned int from);
   inline vbool1_& operator=(int from);
   inline vbool1_& operator=(unsigned int from);
-  inline operator vboolN_space::vboolN_();
-  inline operator vbool2N_space::vbool2N_();
-  inline operator vboolN_2_space::vboolN_2_();
+  inline operator vboolN_space::vboolN_() const;
+  inline operator vbool2N_space::vbool2N_() const;
+  inline operator vboolN_2_space::vboolN_2_() const;
 
   unsigned char _[1];
 };
@@ -829,11 +831,11 @@ class qv_int8_ {
   inline qv_int8_(unsigned char from);
   inline qv_int8_(int from);
   inline qv_int8_(unsigned int from);
-  inline qv_int8_(const qv_vec2Nx8_space::qv_vec2Nx8_& from);
-  inline qv_int8_(const qv_vecNx16_space::qv_vecNx16_& from);
-  inline qv_int8_(const qv_vecNx8_space::qv_vecNx8_& from);
-  inline qv_int8_(const qv_int8U_space::qv_int8U_& from);
-  inline qv_int8_(const qv_int16_space::qv_int16_& from);
+  explicit inline qv_int8_(const qv_vec2Nx8_space::qv_vec2Nx8_& from);
+  explicit inline qv_int8_(const qv_vecNx16_space::qv_vecNx16_& from);
+  explicit inline qv_int8_(const qv_vecNx8_space::qv_vecNx8_& from);
+  explicit inline qv_int8_(const qv_int8U_space::qv_int8U_& from);
+  explicit inline qv_int8_(const qv_int16_space::qv_int16_& from);
   inline qv_int8_& operator=(signed char from);
   inline qv_int8_& operator=(unsigned char from);
   inline qv_int8_& operator=(int from);
@@ -843,10 +845,10 @@ class qv_int8_ {
   inline qv_int8_& operator=(const qv_vecNx8_space::qv_vecNx8_& from);
   inline qv_int8_& operator=(const qv_int8U_space::qv_int8U_& from);
   inline qv_int8_& operator=(const qv_int16_space::qv_int16_& from);
-  inline operator qv_vec2Nx8_space::qv_vec2Nx8_();
-  inline operator qv_int8U_space::qv_int8U_();
-  inline operator qv_int16_space::qv_int16_();
-  inline operator qv_int32pr_space::qv_int32pr_();
+  inline operator qv_vec2Nx8_space::qv_vec2Nx8_() const;
+  inline operator qv_int8U_space::qv_int8U_() const;
+  inline operator qv_int16_space::qv_int16_() const;
+  inline operator qv_int32pr_space::qv_int32pr_() const;
 
   unsigned char _[1];
 };
@@ -861,11 +863,11 @@ class qv_int8U_ {
   inline qv_int8U_(unsigned char from);
   inline qv_int8U_(int from);
   inline qv_int8U_(unsigned int from);
-  inline qv_int8U_(const qv_vec2Nx8U_space::qv_vec2Nx8U_& from);
-  inline qv_int8U_(const qv_vecNx16U_space::qv_vecNx16U_& from);
-  inline qv_int8U_(const qv_vecNx8U_space::qv_vecNx8U_& from);
-  inline qv_int8U_(const qv_int8_space::qv_int8_& from);
-  inline qv_int8U_(const qv_int16U_space::qv_int16U_& from);
+  explicit inline qv_int8U_(const qv_vec2Nx8U_space::qv_vec2Nx8U_& from);
+  explicit inline qv_int8U_(const qv_vecNx16U_space::qv_vecNx16U_& from);
+  explicit inline qv_int8U_(const qv_vecNx8U_space::qv_vecNx8U_& from);
+  explicit inline qv_int8U_(const qv_int8_space::qv_int8_& from);
+  explicit inline qv_int8U_(const qv_int16U_space::qv_int16U_& from);
   inline qv_int8U_& operator=(signed char from);
   inline qv_int8U_& operator=(unsigned char from);
   inline qv_int8U_& operator=(int from);
@@ -875,12 +877,12 @@ class qv_int8U_ {
   inline qv_int8U_& operator=(const qv_vecNx8U_space::qv_vecNx8U_& from);
   inline qv_int8U_& operator=(const qv_int8_space::qv_int8_& from);
   inline qv_int8U_& operator=(const qv_int16U_space::qv_int16U_& from);
-  inline operator qv_vec2Nx8U_space::qv_vec2Nx8U_();
-  inline operator qv_vecNx8U_space::qv_vecNx8U_();
-  inline operator qv_int8_space::qv_int8_();
-  inline operator qv_int16_space::qv_int16_();
-  inline operator qv_int16U_space::qv_int16U_();
-  inline operator qv_int32pr_space::qv_int32pr_();
+  inline operator qv_vec2Nx8U_space::qv_vec2Nx8U_() const;
+  inline operator qv_vecNx8U_space::qv_vecNx8U_() const;
+  inline operator qv_int8_space::qv_int8_() const;
+  inline operator qv_int16_space::qv_int16_() const;
+  inline operator qv_int16U_space::qv_int16U_() const;
+  inline operator qv_int32pr_space::qv_int32pr_() const;
 
   unsigned char _[1];
 };
@@ -897,13 +899,13 @@ class qv_int16_ {
   inline qv_int16_(unsigned short from);
   inline qv_int16_(int from);
   inline qv_int16_(unsigned int from);
-  inline qv_int16_(const qv_vecNx16_space::qv_vecNx16_& from);
-  inline qv_int16_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);
-  inline qv_int16_(const qv_vecN_2x16_space::qv_vecN_2x16_& from);
-  inline qv_int16_(const qv_int8_space::qv_int8_& from);
-  inline qv_int16_(const qv_int8U_space::qv_int8U_& from);
-  inline qv_int16_(const qv_int16U_space::qv_int16U_& from);
-  inline qv_int16_(const qv_f16_space::qv_f16_& from);
+  explicit inline qv_int16_(const qv_vecNx16_space::qv_vecNx16_& from);
+  explicit inline qv_int16_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);
+  explicit inline qv_int16_(const qv_vecN_2x16_space::qv_vecN_2x16_& from);
+  explicit inline qv_int16_(const qv_int8_space::qv_int8_& from);
+  explicit inline qv_int16_(const qv_int8U_space::qv_int8U_& from);
+  explicit inline qv_int16_(const qv_int16U_space::qv_int16U_& from);
+  explicit inline qv_int16_(const qv_f16_space::qv_f16_& from);
   inline qv_int16_& operator=(signed char from);
   inline qv_int16_& operator=(unsigned char from);
   inline qv_int16_& operator=(short from);
@@ -917,11 +919,11 @@ class qv_int16_ {
   inline qv_int16_& operator=(const qv_int8U_space::qv_int8U_& from);
   inline qv_int16_& operator=(const qv_int16U_space::qv_int16U_& from);
   inline qv_int16_& operator=(const qv_f16_space::qv_f16_& from);
-  inline operator qv_vecNx16_space::qv_vecNx16_();
-  inline operator qv_int8_space::qv_int8_();
-  inline operator qv_int16U_space::qv_int16U_();
-  inline operator qv_int32pr_space::qv_int32pr_();
-  inline operator qv_f16_space::qv_f16_();
+  inline operator qv_vecNx16_space::qv_vecNx16_() const;
+  inline operator qv_int8_space::qv_int8_() const;
+  inline operator qv_int16U_space::qv_int16U_() const;
+  inline operator qv_int32pr_space::qv_int32pr_() const;
+  inline operator qv_f16_space::qv_f16_() const;
 
   unsigned short _[1];
 };
@@ -938,13 +940,13 @@ class qv_int16U_ {
   inline qv_int16U_(unsigned short from);
   inline qv_int16U_(int from);
   inline qv_int16U_(unsigned int from);
-  inline qv_int16U_(const qv_vecNx16U_space::qv_vecNx16U_& from);
-  inline qv_int16U_(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from);
-  inline qv_int16U_(const qv_vecN_2x16U_space::qv_vecN_2x16U_& from);
-  inline qv_int16U_(const qv_int8U_space::qv_int8U_& from);
-  inline qv_int16U_(const qv_int16_space::qv_int16_& from);
-  inline qv_int16U_(const qv_int48_space::qv_int48_& from);
-  inline qv_int16U_(const qv_f16_space::qv_f16_& from);
+  explicit inline qv_int16U_(const qv_vecNx16U_space::qv_vecNx16U_& from);
+  explicit inline qv_int16U_(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from);
+  explicit inline qv_int16U_(const qv_vecN_2x16U_space::qv_vecN_2x16U_& from);
+  explicit inline qv_int16U_(const qv_int8U_space::qv_int8U_& from);
+  explicit inline qv_int16U_(const qv_int16_space::qv_int16_& from);
+  explicit inline qv_int16U_(const qv_int48_space::qv_int48_& from);
+  explicit inline qv_int16U_(const qv_f16_space::qv_f16_& from);
   inline qv_int16U_& operator=(signed char from);
   inline qv_int16U_& operator=(unsigned char from);
   inline qv_int16U_& operator=(short from);
@@ -958,12 +960,12 @@ class qv_int16U_ {
   inline qv_int16U_& operator=(const qv_int16_space::qv_int16_& from);
   inline qv_int16U_& operator=(const qv_int48_space::qv_int48_& from);
   inline qv_int16U_& operator=(const qv_f16_space::qv_f16_& from);
-  inline operator qv_vecNx16U_space::qv_vecNx16U_();
-  inline operator qv_vecN_2x16U_space::qv_vecN_2x16U_();
-  inline operator qv_int8U_space::qv_int8U_();
-  inline operator qv_int16_space::qv_int16_();
-  inline operator qv_int32pr_space::qv_int32pr_();
-  inline operator qv_f16_space::qv_f16_();
+  inline operator qv_vecNx16U_space::qv_vecNx16U_() const;
+  inline operator qv_vecN_2x16U_space::qv_vecN_2x16U_() const;
+  inline operator qv_int8U_space::qv_int8U_() const;
+  inline operator qv_int16_space::qv_int16_() const;
+  inline operator qv_int32pr_space::qv_int32pr_() const;
+  inline operator qv_f16_space::qv_f16_() const;
 
   unsigned short _[1];
 };
@@ -974,8 +976,8 @@ namespace qv_f16_space {
 class qv_f16_ {
  public:
   qv_f16_() = default;
-  inline qv_f16_(const qv_vecNxf16_space::qv_vecNxf16_& from);
-  inline qv_f16_(const qv_vecN_2xf16_space::qv_vecN_2xf16_& from);
+  explicit inline qv_f16_(const qv_vecNxf16_space::qv_vecNxf16_& from);
+  explicit inline qv_f16_(const qv_vecN_2xf16_space::qv_vecN_2xf16_& from);
   inline qv_f16_(signed char from);
   inline qv_f16_(unsigned char from);
   inline qv_f16_(short from);
@@ -983,11 +985,11 @@ class qv_f16_ {
   inline qv_f16_(int from);
   inline qv_f16_(unsigned int from);
   inline qv_f16_(float from);
-  inline qv_f16_(const qv_int16_space::qv_int16_& from);
-  inline qv_f16_(const qv_int16U_space::qv_int16U_& from);
-  inline qv_f16_(const rkfloat_space::rkfloat_& from);
-  inline qv_f16_(const qv_int32v_space::qv_int32v_& from);
-  inline qv_f16_(const qv_int32Uv_space::qv_int32Uv_& from);
+  explicit inline qv_f16_(const qv_int16_space::qv_int16_& from);
+  explicit inline qv_f16_(const qv_int16U_space::qv_int16U_& from);
+  explicit inline qv_f16_(const rkfloat_space::rkfloat_& from);
+  explicit inline qv_f16_(const qv_int32v_space::qv_int32v_& from);
+  explicit inline qv_f16_(const qv_int32Uv_space::qv_int32Uv_& from);
   inline qv_f16_& operator=(const qv_vecNxf16_space::qv_vecNxf16_& from);
   inline qv_f16_& operator=(const qv_vecN_2xf16_space::qv_vecN_2xf16_& from);
   inline qv_f16_& operator=(signed char from);
@@ -1002,13 +1004,13 @@ class qv_f16_ {
   inline qv_f16_& operator=(const rkfloat_space::rkfloat_& from);
   inline qv_f16_& operator=(const qv_int32v_space::qv_int32v_& from);
   inline qv_f16_& operator=(const qv_int32Uv_space::qv_int32Uv_& from);
-  inline operator qv_vecNxf16_space::qv_vecNxf16_();
-  inline operator qv_vecN_2xf16_space::qv_vecN_2xf16_();
-  inline operator qv_int16_space::qv_int16_();
-  inline operator qv_int16U_space::qv_int16U_();
-  inline operator rkfloat_space::rkfloat_();
-  inline operator qv_int32v_space::qv_int32v_();
-  inline operator qv_int32Uv_space::qv_int32Uv_();
+  inline operator qv_vecNxf16_space::qv_vecNxf16_() const;
+  inline operator qv_vecN_2xf16_space::qv_vecN_2xf16_() const;
+  inline operator qv_int16_space::qv_int16_() const;
+  inline operator qv_int16U_space::qv_int16U_() const;
+  inline operator rkfloat_space::rkfloat_() const;
+  inline operator qv_int32v_space::qv_int32v_() const;
+  inline operator qv_int32Uv_space::qv_int32Uv_() const;
 
   unsigned short _[1];
 };
@@ -1020,16 +1022,16 @@ class rkfloat_ {
  public:
   rkfloat_() = default;
   inline rkfloat_(float from);
-  inline rkfloat_(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from);
-  inline rkfloat_(const qv_vecNxf16_space::qv_vecNxf16_& from);
-  inline rkfloat_(const qv_f16_space::qv_f16_& from);
+  explicit inline rkfloat_(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from);
+  explicit inline rkfloat_(const qv_vecNxf16_space::qv_vecNxf16_& from);
+  explicit inline rkfloat_(const qv_f16_space::qv_f16_& from);
   inline rkfloat_& operator=(float from);
   inline rkfloat_& operator=(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from);
   inline rkfloat_& operator=(const qv_vecNxf16_space::qv_vecNxf16_& from);
   inline rkfloat_& operator=(const qv_f16_space::qv_f16_& from);
-  inline operator qv_vecN_2xf32_space::qv_vecN_2xf32_();
-  inline operator qv_vecNxf16_space::qv_vecNxf16_();
-  inline operator qv_f16_space::qv_f16_();
+  inline operator qv_vecN_2xf32_space::qv_vecN_2xf32_() const;
+  inline operator qv_vecNxf16_space::qv_vecNxf16_() const;
+  inline operator qv_f16_space::qv_f16_() const;
 
   unsigned int _[1];
 };
@@ -1060,18 +1062,18 @@ class qv_int32v_ {
   qv_int32v_() = default;
   inline qv_int32v_(int from);
   inline qv_int32v_(unsigned int from);
-  inline qv_int32v_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);
-  inline qv_int32v_(const qv_int32Uv_space::qv_int32Uv_& from);
-  inline qv_int32v_(const qv_f16_space::qv_f16_& from);
+  explicit inline qv_int32v_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);
+  explicit inline qv_int32v_(const qv_int32Uv_space::qv_int32Uv_& from);
+  explicit inline qv_int32v_(const qv_f16_space::qv_f16_& from);
   inline qv_int32v_& operator=(int from);
   inline qv_int32v_& operator=(unsigned int from);
   inline qv_int32v_& operator=(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);
   inline qv_int32v_& operator=(const qv_int32Uv_space::qv_int32Uv_& from);
   inline qv_int32v_& operator=(const qv_f16_space::qv_f16_& from);
-  inline operator qv_vecN_2x32v_space::qv_vecN_2x32v_();
-  inline operator qv_int32Uv_space::qv_int32Uv_();
-  inline operator qv_int32pr_space::qv_int32pr_();
-  inline operator qv_f16_space::qv_f16_();
+  inline operator qv_vecN_2x32v_space::qv_vecN_2x32v_() const;
+  inline operator qv_int32Uv_space::qv_int32Uv_() const;
+  inline operator qv_int32pr_space::qv_int32pr_() const;
+  inline operator qv_f16_space::qv_f16_() const;
 
   unsigned int _[1];
 };
@@ -1084,18 +1086,18 @@ class qv_int32Uv_ {
   qv_int32Uv_() = default;
   inline qv_int32Uv_(int from);
   inline qv_int32Uv_(unsigned int from);
-  inline qv_int32Uv_(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from);
-  inline qv_int32Uv_(const qv_int32v_space::qv_int32v_& from);
-  inline qv_int32Uv_(const qv_f16_space::qv_f16_& from);
+  explicit inline qv_int32Uv_(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from);
+  explicit inline qv_int32Uv_(const qv_int32v_space::qv_int32v_& from);
+  explicit inline qv_int32Uv_(const qv_f16_space::qv_f16_& from);
   inline qv_int32Uv_& operator=(int from);
   inline qv_int32Uv_& operator=(unsigned int from);
   inline qv_int32Uv_& operator=(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from);
   inline qv_int32Uv_& operator=(const qv_int32v_space::qv_int32v_& from);
   inline qv_int32Uv_& operator=(const qv_f16_space::qv_f16_& from);
-  inline operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_();
-  inline operator qv_int32v_space::qv_int32v_();
-  inline operator qv_int32pr_space::qv_int32pr_();
-  inline operator qv_f16_space::qv_f16_();
+  inline operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_() const;
+  inline operator qv_int32v_space::qv_int32v_() const;
+  inline operator qv_int32pr_space::qv_int32pr_() const;
+  inline operator qv_f16_space::qv_f16_() const;
 
   unsigned int _[1];
 };
@@ -1112,12 +1114,12 @@ class qv_int32pr_ {
   inline qv_int32pr_(unsigned short from);
   inline qv_int32pr_(int from);
   inline qv_int32pr_(unsigned int from);
-  inline qv_int32pr_(const qv_int8_space::qv_int8_& from);
-  inline qv_int32pr_(const qv_int8U_space::qv_int8U_& from);
-  inline qv_int32pr_(const qv_int16_space::qv_int16_& from);
-  inline qv_int32pr_(const qv_int16U_space::qv_int16U_& from);
-  inline qv_int32pr_(const qv_int32v_space::qv_int32v_& from);
-  inline qv_int32pr_(const qv_int32Uv_space::qv_int32Uv_& from);
+  explicit inline qv_int32pr_(const qv_int8_space::qv_int8_& from);
+  explicit inline qv_int32pr_(const qv_int8U_space::qv_int8U_& from);
+  explicit inline qv_int32pr_(const qv_int16_space::qv_int16_& from);
+  explicit inline qv_int32pr_(const qv_int16U_space::qv_int16U_& from);
+  explicit inline qv_int32pr_(const qv_int32v_space::qv_int32v_& from);
+  explicit inline qv_int32pr_(const qv_int32Uv_space::qv_int32Uv_& from);
   inline qv_int32pr_& operator=(signed char from);
   inline qv_int32pr_& operator=(unsigned char from);
   inline qv_int32pr_& operator=(short from);
@@ -1146,7 +1148,7 @@ class qv_int48_ {
   inline qv_int48_& operator=(int from);
   inline qv_int48_& operator=(unsigned int from);
   inline qv_int48_& operator=(long long from);
-  inline operator qv_int16U_space::qv_int16U_();
+  inline operator qv_int16U_space::qv_int16U_() const;
 
   unsigned int _[2];
 };
@@ -1158,10 +1160,10 @@ class qv_int64_ {
  public:
   qv_int64_() = default;
   inline qv_int64_(long long from);
-  inline qv_int64_(const qv_vecN_4x64_space::qv_vecN_4x64_& from);
+  explicit inline qv_int64_(const qv_vecN_4x64_space::qv_vecN_4x64_& from);
   inline qv_int64_& operator=(long long from);
   inline qv_int64_& operator=(const qv_vecN_4x64_space::qv_vecN_4x64_& from);
-  inline operator qv_vecN_4x64_space::qv_vecN_4x64_();
+  inline operator qv_vecN_4x64_space::qv_vecN_4x64_() const;
 
   unsigned int _[2];
 };
@@ -1192,7 +1194,7 @@ namespace qv_int128_space {
 class qv_int128_ {
  public:
   qv_int128_() = default;
-  inline qv_int128_(const qv_vecN_8x128_space::qv_vecN_8x128_& from);
+  explicit inline qv_int128_(const qv_vecN_8x128_space::qv_vecN_8x128_& from);
   inline qv_int128_& operator=(const qv_vecN_8x128_space::qv_vecN_8x128_& from);
 
   unsigned int _[4];
@@ -1204,7 +1206,7 @@ namespace qv_int256_space {
 class qv_int256_ {
  public:
   qv_int256_() = default;
-  inline qv_int256_(const qv_vecN_16x256_space::qv_vecN_16x256_& from);
+  explicit inline qv_int256_(const qv_vecN_16x256_space::qv_vecN_16x256_& from);
   inline qv_int256_& operator=(const qv_vecN_16x256_space::qv_vecN_16x256_& from);
 
   unsigned int _[8];

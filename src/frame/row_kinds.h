@@ -6,6 +6,7 @@
 
 #define ROW(OP, SHAPE, ...) ENTRY(rk_zra32_ZRA_##OP, SHAPE, __VA_ARGS__)
 #define PROTO(NAME, SHAPE, ...) ENTRY(rk_zra32_##NAME, SHAPE, __VA_ARGS__)
+#define SCALAR(PACKAGE, NAME, ...) ENTRY(rk_##PACKAGE##_##NAME, scalar, __VA_ARGS__)
 
 // Conversions between registers and from and to host scalars.
 #define REGISTER(FROM, TO) PROTO(FROM##_rtor_##TO, rtor, FROM, TO)

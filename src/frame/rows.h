@@ -6,10 +6,15 @@
 //   KERNEL(OP, form, layout, rule)    the semantic function of OP (stamp.h)
 //   ROW(OP, shape, columns ...)       an instruction of the vector unit
 //   PROTO(name, shape, columns ...)   a move or conversion of the vector unit's registers
+//   SCALAR(package, name, result, (parameters), expression)   an instruction of the scalar core
+//   HELPER(name, shape, columns ...)  an exported function beside the instructions
 //
 // Further kinds of row, which stand for several, are in row_kinds.h here and in the families.
 #ifndef KERNEL
 #define KERNEL(...)
+#endif
+#ifndef HELPER
+#define HELPER(...)
 #endif
 #ifndef DOC
 #define DOC(TEXT)

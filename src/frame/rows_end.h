@@ -1,4 +1,5 @@
 // Closes a list of tables of rows.
 #undef ENTRY
 #undef KERNEL
+#undef HELPER
 #undef DOC

@@ -1,0 +1,62 @@
+// The scalar core's arithmetic, logic, comparisons, moves and boolean registers.
+#include "frame/entry.h"
+
+namespace {
+
+const cstub_Km_ZNB_Orbis_R5_64k_processor_t& core = cstub_Km_ZNB_Orbis_R5_64k_proc;
+
+int clamped(int v, int t) {
+  if (t < 0 || t > 31) return v;
+  const int most = static_cast<int>((word{1} << t) - 1), least = ~most;
+  return v < least ? least : v > most ? most : v;
+}
+
+int leading_zeros(word v) { return v ? __builtin_clz(v) : 32; }
+
+// As many low ones as a field is wide.
+word ones(word bits) { return (word{2} << (bits - 1) % 16) - 1; }
+
+void merge(word& r, word v, word where) { r = (r & ~where) | (v & where); }
+
+word zero_bytes(word v) {
+  word found = 0;
+  for (int i = 0; i < 4; ++i) found |= word{(v >> 8 * i & 0xFF) == 0} << i;
+  return found;
+}
+
+template <class T>
+void move_if(bool when, T& r, T v) {
+  if (when) r = v;
+}
+
+rkbool boolean(int byte) {
+  rkbool r;
+  r._[0] = static_cast<unsigned char>(byte);
+  return r;
+}
+
+template <class T>
+struct Division {
+  T quotient, remainder;
+};
+
+// The host's own instructions: they fault where the language leaves the result undefined.
+Division<unsigned> divided(unsigned a, unsigned b) {
+  Division<unsigned> r;
+  asm volatile("divl %4" : "=a"(r.quotient), "=d"(r.remainder) : "0"(a), "1"(0), "rm"(b) : "cc");
+  return r;
+}
+
+Division<int> divided(int a, int b) {
+  Division<int> r;
+  asm volatile("idivl %4" : "=a"(r.quotient), "=d"(r.remainder) : "0"(a), "1"(a >> 31), "rm"(b) : "cc");
+  return r;
+}
+
+}  // namespace
+
+#include "frame/scalar_stamp.h"
+
+#include "frame/scalar.def"
+
+#include "frame/rows_end.h"

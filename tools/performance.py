@@ -1,0 +1,135 @@
+#!/usr/bin/env python3
+"""Time every intrinsic on every target that this processor runs, and write the table.
+
+    tools/performance.py BUILD [OUTPUT] [--filter REGEX] [--repetitions N]
+
+BUILD is a build directory with the benchmarks in it. Every figure is a ratio, within one run, to an exported
+call that copies one register (qv_vecNx16_move): medians of the repetitions. bench/limits.txt says how much an
+intrinsic may cost; what is above is printed, and marked in the table.
+"""
+
+import argparse
+import csv
+import io
+import os
+import re
+import statistics
+import subprocess
+import sys
+
+ROOT = os.path.dirname(os.path.dirname(os.path.abspath(__file__)))
+sys.path.insert(0, os.path.join(ROOT, "tools"))
+import generate_headers  # noqa: E402
+
+TARGETS = ["avx512", "avx2", "sse2"]
+BASELINE = "rk_zra32_qv_vecNx16_move"
+
+
+def run(build, target, pattern, repetitions):
+    """Benchmark -> median time in nanoseconds, or None where the processor does not run the target."""
+    environment = dict(os.environ, LD_LIBRARY_PATH=os.path.join(build, "tests", "only", target))
+    command = [os.path.join(build, "bench", "kastarri_bench"), f"--benchmark_filter=^{BASELINE}$|{pattern}",
+               f"--benchmark_repetitions={repetitions}", "--benchmark_min_time=0.01", "--benchmark_format=csv",
+               "--benchmark_enable_random_interleaving=true"]
+    result = subprocess.run(command, env=environment, capture_output=True, text=True, check=False)
+    if f"target: {target}" not in result.stderr:
+        return None
+    if result.returncode != 0:
+        sys.exit(f"{' '.join(command)}\n{result.stderr}")
+    times = {}
+    table = result.stdout[result.stdout.index("name,"):]
+    for row in csv.DictReader(io.StringIO(table)):
+        if not re.search(r"_(mean|median|stddev|cv)$", row["name"]):
+            times.setdefault(row["name"], []).append(float(row["cpu_time"]))
+    return {name: statistics.median(values) for name, values in times.items()}
+
+
+def read_limits():
+    """[(pattern, {target: ratio})], the first that matches counts."""
+    limits = []
+    with open(os.path.join(ROOT, "bench", "limits.txt"), encoding="utf-8") as file:
+        for line in file:
+            if line.strip() and not line.startswith("#"):
+                pattern, *ratios = line.split()
+                limits.append((re.compile(pattern), dict(zip(TARGETS, map(float, ratios)))))
+    return limits
+
+
+def limit_of(name, target, limits):
+    for pattern, ratios in limits:
+        if pattern.fullmatch(name):
+            return ratios[target]
+    return None
+
+
+def processor():
+    with open("/proc/cpuinfo", encoding="utf-8") as file:
+        return re.search(r"model name\s*: (.*)", file.read())[1]
+
+
+def table_lines(names, ratios, limits):
+    targets = [t for t in TARGETS if t in ratios]
+    yield "| intrinsic | " + " | ".join(targets) + " |"
+    yield "|---|" + "---|" * len(targets)
+    for name in names:
+        cells = []
+        for target in targets:
+            ratio, limit = ratios[target][name], limit_of(name, target, limits)
+            cells.append(f"**{ratio:.1f}** (limit {limit:g})" if limit and ratio > limit else f"{ratio:.1f}")
+        yield f"| `{name}` | " + " | ".join(cells) + " |"
+
+
+def document(times, limits):
+    ratios = {t: {generate_headers.short_name(n) if n.startswith("rk_") else n: v / times[t][BASELINE] for n, v in found.items()}
+              for t, found in times.items()}
+    measured = next(iter(ratios.values()))
+    lines = ["# Performance", "",
+             "A call of each intrinsic, operands in memory, as a multiple of an exported call that copies one",
+             "register (`qv_vecNx16_move`, 64 bytes) in the same run. Medians. Measured on " + processor() + " by", "",
+             "    make bench", "",
+             "On that machine the copy took " +
+             ", ".join(f"{times[t][BASELINE]:.1f} ns ({t})" for t in TARGETS if t in times) + ".",
+             "Figures in bold are above the limit set in `bench/limits.txt`; the notes at the end say why.", ""]
+    if any("fir_scalar" in n for n in measured):
+        lines += ["## A whole kernel", "",
+                  "FIR filter of 16 taps (`examples/fir`), samples a second, against the scalar C loop built with",
+                  "`-O2 -fno-tree-vectorize`:", "", "| target | speed-up |", "|---|---|"]
+        lines += [f"| {t} | {ratios[t]['fir_scalar'] / ratios[t]['fir_kernel']:.2f} |" for t in TARGETS if t in ratios]
+        lines += [""]
+    for header, (title, _, rows) in generate_headers.all_rows().items():
+        names = [generate_headers.short_name(row[0]) for row in rows]
+        names = [n for n in dict.fromkeys(names) if n in measured]
+        if names:
+            lines += [f"## {title}", ""] + list(table_lines(names, ratios, limits)) + [""]
+    notes = os.path.join(ROOT, "bench", "notes.md")
+    if os.path.exists(notes):
+        lines += [open(notes, encoding="utf-8").read().rstrip(), ""]
+    above = [(n, t, r, limit_of(n, t, limits)) for t, found in ratios.items() for n, r in found.items()
+             if (limit_of(n, t, limits) or r) < r]
+    return "\n".join(lines), above
+
+
+def main():
+    parser = argparse.ArgumentParser(description=__doc__, formatter_class=argparse.RawDescriptionHelpFormatter)
+    parser.add_argument("build")
+    parser.add_argument("output", nargs="?")
+    parser.add_argument("--filter", default=".")
+    parser.add_argument("--repetitions", type=int, default=5)
+    arguments = parser.parse_args()
+    times = {}
+    for target in TARGETS:
+        found = run(arguments.build, target, arguments.filter, arguments.repetitions)
+        if found:
+            times[target] = found
+    text, above = document(times, read_limits())
+    if arguments.output:
+        with open(arguments.output, "w", encoding="utf-8") as file:
+            file.write(text)
+    else:
+        print(text)
+    for name, target, ratio, limit in above:
+        print(f"above its limit: {name} {target} {ratio:.2f} > {limit:g}")
+
+
+if __name__ == "__main__":
+    main()

@@ -16,7 +16,8 @@ namespace {
 inline void store_quarters(void* to, __m128i q0, __m128i q1, __m128i q2, __m128i q3) {
 #if defined __AVX512BW__
   const __m512i low = _mm512_castsi256_si512(_mm256_set_m128i(q1, q0));
-  _mm512_storeu_si512(to, _mm512_inserti64x4(low, _mm256_set_m128i(q3, q2), 1));
+  // The form with a mask of all ones: with the other the compiler warns of its own header.
+  _mm512_storeu_si512(to, _mm512_maskz_inserti64x4(0xFF, low, _mm256_set_m128i(q3, q2), 1));
 #elif defined __AVX2__
   auto* half = static_cast<__m256i*>(to);
   _mm256_storeu_si256(half, _mm256_set_m128i(q1, q0));

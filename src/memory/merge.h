@@ -35,11 +35,14 @@ class MergeMask {
   void look_up(const PredicateUnit* predicate) {
     const word* const table = cstub_Km_ZNB_Orbis_R5_64k_mask;
 #if defined __AVX512BW__
-    const __m512i all_lanes = _mm512_inserti64x4(_mm512_set1_epi32(disabled(predicate, 0)),
-                                                 _mm256_set1_epi32(disabled(predicate, Words / 2)), 1);
-    const __m512i lanes = _mm512_srlv_epi32(all_lanes, _mm512_load_si512(step.first_lane));
-    const __m512i bytes = LaneBytes == 1 ? lanes : _mm512_permutexvar_epi32(lanes, _mm512_load_si512(step.bytes));
-    _mm512_store_si512(of_word, _mm512_permutexvar_epi32(bytes, _mm512_loadu_si512(table)));
+    // The forms with a mask of all ones: with the others the compiler warns of its own headers.
+    const __m512i all_lanes =
+        _mm512_maskz_inserti64x4(0xFF, _mm512_set1_epi32(disabled(predicate, 0)),
+                                 _mm256_set1_epi32(disabled(predicate, Words / 2)), 1);
+    const __m512i lanes = _mm512_maskz_srlv_epi32(0xFFFF, all_lanes, _mm512_load_si512(step.first_lane));
+    const __m512i bytes =
+        LaneBytes == 1 ? lanes : _mm512_maskz_permutexvar_epi32(0xFFFF, lanes, _mm512_load_si512(step.bytes));
+    _mm512_store_si512(of_word, _mm512_maskz_permutexvar_epi32(0xFFFF, bytes, _mm512_loadu_si512(table)));
 #elif defined __AVX2__
     const auto load = [](const word* from) { return _mm256_loadu_si256(reinterpret_cast<const __m256i*>(from)); };
     const __m256i low = load(table);

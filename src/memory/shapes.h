@@ -113,7 +113,7 @@
 #define SIG_increment(SYMBOL, E, O, K) void SYMBOL(const E* base, const O& offsets)
 #define BODY_increment(E, O, K) KASTARRI_SEMANTIC(K)(offsets._, writable(base));
 
-#define SIG_wait(SYMBOL) void SYMBOL()
-#define BODY_wait()
+#define SIG_wait(SYMBOL, NOTHING) NOTHING SYMBOL()
+#define BODY_wait(NOTHING)
 
 #endif

@@ -89,7 +89,8 @@ struct LaneMask<8, 64> {
     _mm512_store_si512(lane, _mm512_movm_epi8(all));
 #else
     const __m128i bit = _mm_set1_epi64x(static_cast<long long>(0x8040201008040201u));
-    const __m128i bytes = _mm_set_epi32(0, 0, static_cast<int>(bits[1]), static_cast<int>(bits[0]));
+    const __m128i bytes =
+        _mm_unpacklo_epi32(_mm_cvtsi32_si128(static_cast<int>(bits[0])), _mm_cvtsi32_si128(static_cast<int>(bits[1])));
     const __m128i twice = _mm_unpacklo_epi8(bytes, bytes);
     const __m128i low = _mm_unpacklo_epi16(twice, twice);
     const __m128i high = _mm_unpackhi_epi16(twice, twice);

@@ -47,35 +47,50 @@ class ElementAddresses {
 
 // Eight 16-bit elements or four 32-bit ones from index i on. The compiler must not see what becomes of
 // them: an 8-bit element is read with the byte after it, used or not.
-template <class Addresses>
-inline __m128i fetch(std::integral_constant<int, 32>, const Addresses& from, int i) {
-  const auto unit = [&](int k) { return static_cast<short>(from.template element<std::uint16_t>(i + k)); };
-  __m128i units = _mm_set_epi16(unit(7), unit(6), unit(5), unit(4), unit(3), unit(2), unit(1), unit(0));
+inline __m128i fetch(const ElementAddresses<u16x32>& from, int i) {
+  __m128i units = _mm_setzero_si128();
+#define KASTARRI_INSERT(K) units = _mm_insert_epi16(units, from.element<std::int16_t>(i + K), K);
+  KASTARRI_INSERT(0)
+  KASTARRI_INSERT(1)
+  KASTARRI_INSERT(2)
+  KASTARRI_INSERT(3)
+  KASTARRI_INSERT(4)
+  KASTARRI_INSERT(5)
+  KASTARRI_INSERT(6)
+  KASTARRI_INSERT(7)
+#undef KASTARRI_INSERT
   asm("" : "+x"(units));
   return units;
 }
-template <class Addresses>
-inline __m128i fetch(std::integral_constant<int, 16>, const Addresses& from, int i) {
-  const auto unit = [&](int k) { return static_cast<int>(from.template element<std::uint32_t>(i + k)); };
+inline __m128i fetch(const ElementAddresses<u32x16>& from, int i) {
+  const auto unit = [&](int k) { return from.element<std::int32_t>(i + k); };
   return _mm_set_epi32(unit(3), unit(2), unit(1), unit(0));
 }
 
 // Gathers whole elements, of 16 bits from 32 offsets, of 32 bits from 16. A disabled one reads 0.
-template <class Addresses>
-inline void gather(const Addresses& from, word* out) {
-  constexpr std::integral_constant<int, Addresses::count> path;
-  constexpr int step = Addresses::count / 4;
-  store_quarters(out, fetch(path, from, 0), fetch(path, from, step), fetch(path, from, 2 * step),
-                 fetch(path, from, 3 * step));
+template <class O>
+inline void gather(const ElementAddresses<O>& from, word* out) {
+  constexpr int step = O::count / 4;
+  store_quarters(out, fetch(from, 0), fetch(from, step), fetch(from, 2 * step), fetch(from, 3 * step));
 }
 
-// Each element in ascending order becomes rule(element, i): a Unit is read, a Written of it written back.
-template <class Unit, class Written, class Addresses, class Rule>
-inline void scatter(const Addresses& to, Rule rule) {
-  for (int i = 0; i < Addresses::count; ++i) {
-    const Unit old = to.template element<Unit>(i);
-    if (sizeof(Written) < sizeof(Unit)) asm volatile("" : : "r"(old));  // read, whatever the rule makes of it
-    to.template element<Written>(i) = static_cast<Written>(rule(old, i));
+// Each element, in ascending order, becomes value(i). The byte after an 8-bit element is read.
+template <class Element, class O, class Value>
+inline void scatter(const ElementAddresses<O>& to, Value value) {
+  for (int i = 0; i < O::count; ++i) {
+    auto& element = to.template element<Element>(i);
+    if constexpr (sizeof(Element) == 1) asm volatile("" : : "q"((&element)[1]));
+    element = static_cast<Element>(value(i));
+  }
+}
+
+// Each element, in ascending order, is read as a unit of the offsets' width and becomes rule(unit, i).
+template <class Element, class O, class Rule>
+inline void modify(const ElementAddresses<O>& to, Rule rule) {
+  for (int i = 0; i < O::count; ++i) {
+    using Unit = typename O::container;
+    const Unit unit = to.template element<Unit>(i);
+    to.template element<Element>(i) = static_cast<Element>(rule(unit, i));
   }
 }
 

@@ -36,9 +36,8 @@ class MergeMask {
     const word* const table = cstub_Km_ZNB_Orbis_R5_64k_mask;
 #if defined __AVX512BW__
     // The forms with a mask of all ones: with the others the compiler warns of its own headers.
-    const __m512i all_lanes =
-        _mm512_maskz_inserti64x4(0xFF, _mm512_set1_epi32(disabled(predicate, 0)),
-                                 _mm256_set1_epi32(disabled(predicate, Words / 2)), 1);
+    const __m512i all_lanes = _mm512_maskz_inserti64x4(0xFF, _mm512_set1_epi32(disabled(predicate, 0)),
+                                                       _mm256_set1_epi32(disabled(predicate, Words / 2)), 1);
     const __m512i lanes = _mm512_maskz_srlv_epi32(0xFFFF, all_lanes, _mm512_load_si512(step.first_lane));
     const __m512i bytes =
         LaneBytes == 1 ? lanes : _mm512_maskz_permutexvar_epi32(0xFFFF, lanes, _mm512_load_si512(step.bytes));
@@ -50,14 +49,19 @@ class MergeMask {
     for (int w = 0; w < Words; w += 8) {
       const __m256i lanes = _mm256_srlv_epi32(_mm256_set1_epi32(disabled(predicate, w)), load(step.first_lane + w));
       const __m256i bytes = LaneBytes == 1 ? lanes : _mm256_permutevar8x32_epi32(load(step.bytes), lanes);
-      const auto entry = [bytes](__m256i half) { return _mm256_castsi256_ps(_mm256_permutevar8x32_epi32(half, bytes)); };
+      const auto entry = [bytes](__m256i half) {
+        return _mm256_castsi256_ps(_mm256_permutevar8x32_epi32(half, bytes));
+      };
       const __m256 in_high = _mm256_castsi256_ps(_mm256_slli_epi32(bytes, 28));
       _mm256_store_ps(reinterpret_cast<float*>(of_word + w), _mm256_blendv_ps(entry(low), entry(high), in_high));
     }
 #else
+    word entries[1 << lanes_a_word];
+    for (word lanes = 0; lanes < 1 << lanes_a_word; ++lanes) entries[lanes] = table[step.bytes[lanes]];
+    const word* const of_lanes = LaneBytes == 1 ? table : entries;
     const auto entry = [=](int w) {
-      const word lanes = static_cast<word>(disabled(predicate, w)) >> step.first_lane[w];
-      return static_cast<int>(table[step.bytes[lanes % (1 << lanes_a_word)]]);
+      const word lanes = static_cast<word>(disabled(predicate, w)) >> w * lanes_a_word % 32;
+      return static_cast<int>(of_lanes[lanes % (1 << lanes_a_word)]);
     };
     for (int w = 0; w < Words; w += 4)
       _mm_store_si128(reinterpret_cast<__m128i*>(of_word + w),

@@ -14,9 +14,9 @@
   return r;
 
 #define SIG_load_IP(SYMBOL, V, M, K) void SYMBOL(V& r, const M** pointer, int increment)
-#define BODY_load_IP(V, M, K)         \
-  const M* const from = *pointer;     \
-  KASTARRI_SEMANTIC(K)(from, r._);    \
+#define BODY_load_IP(V, M, K)      \
+  const M* const from = *pointer;  \
+  KASTARRI_SEMANTIC(K)(from, r._); \
   *pointer = address(from, increment);
 
 #define SIG_load_IP_aligned SIG_load_IP
@@ -47,9 +47,9 @@
 #define BODY_store_I(V, M, K) KASTARRI_SEMANTIC(K)(v._, writable(address(base, offset)));
 
 #define SIG_store_IP(SYMBOL, V, M, K) void SYMBOL(const V& v, M** pointer, int increment)
-#define BODY_store_IP(V, M, K)      \
-  M* const to = *pointer;           \
-  KASTARRI_SEMANTIC(K)(v._, to);    \
+#define BODY_store_IP(V, M, K)   \
+  M* const to = *pointer;        \
+  KASTARRI_SEMANTIC(K)(v._, to); \
   *pointer = address(to, increment);
 
 #define SIG_store_I_aligned SIG_store_I
@@ -77,15 +77,15 @@
 #define KASTARRI_EVERY_ELEMENT Same(true)
 
 #define SIG_gather(SYMBOL, E, O, K) qv_gsr SYMBOL(const E* base, const O& offsets)
-#define BODY_gather(E, O, K)                                           \
-  qv_gsr r;                                                            \
-  KASTARRI_SEMANTIC(K)(base, offsets._, KASTARRI_EVERY_ELEMENT, r._);  \
+#define BODY_gather(E, O, K)                                          \
+  qv_gsr r;                                                           \
+  KASTARRI_SEMANTIC(K)(base, offsets._, KASTARRI_EVERY_ELEMENT, r._); \
   return r;
 
 #define SIG_gather_T(SYMBOL, E, O, P, K) qv_gsr SYMBOL(const E* base, const O& offsets, const P& p)
-#define BODY_gather_T(E, O, P, K)                   \
-  qv_gsr r;                                         \
-  KASTARRI_SEMANTIC(K)(base, offsets._, p._, r._);  \
+#define BODY_gather_T(E, O, P, K)                  \
+  qv_gsr r;                                        \
+  KASTARRI_SEMANTIC(K)(base, offsets._, p._, r._); \
   return r;
 
 // With an int of which the result does not depend.
@@ -95,9 +95,9 @@
 #define BODY_gather_V_T BODY_gather_T
 
 #define SIG_gathered(SYMBOL, V, K) V SYMBOL(const qv_gsr& gathered)
-#define BODY_gathered(V, K)               \
-  V r;                                    \
-  KASTARRI_SEMANTIC(K)(gathered._, r._);  \
+#define BODY_gathered(V, K)              \
+  V r;                                   \
+  KASTARRI_SEMANTIC(K)(gathered._, r._); \
   return r;
 
 // A part of the destination keeps its lanes.

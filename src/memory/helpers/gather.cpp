@@ -17,20 +17,21 @@ struct Control {
 template <class L>
 void gather_masked(const void* base, const unsigned* offsets, const unsigned* masks, word kept, unsigned* out) {
   gather(ElementAddresses<L>(base, Read<L>(offsets), Read<L>(masks)), out);
-  lanes<L::count>(Write<L>(out), [kept](word unit, word mask) { return unit & mask & kept; }, Read<L>(out), Read<L>(masks));
+  lanes<L::count>(
+      Write<L>(out), [kept](word unit, word mask) { return unit & mask & kept; }, Read<L>(out), Read<L>(masks));
 }
 
-template <class L, class Written>
-void scatter_masked(const void* base, const unsigned* offsets, const unsigned* masks, bool increment, const unsigned* data) {
+// Elements of 8 bits are read in 16-bit units whatever becomes of the upper byte.
+template <class L, class Element>
+void scatter_masked(const void* base, const unsigned* offsets, const unsigned* masks, bool increment,
+                    const unsigned* data) {
   using Unit = typename L::container;
   const ElementAddresses<L> to(base, Read<L>(offsets), Read<L>(masks));
-  const Read<L> mask(masks);
-  if (increment) {
-    scatter<Unit, Written>(to, [&](Unit old, int i) { return old + (mask[i] & 1u); });
-  } else {
-    const Read<L> lane(data);
-    scatter<Unit, Written>(to, [&](Unit old, int i) { return old ^ (mask[i] & (lane[i] ^ old)); });
-  }
+  const Read<L> mask(masks), lane(data);
+  modify<Element>(to, [&](Unit old, int i) {
+    asm volatile("" : : "r"(old));
+    return increment ? old + (mask[i] & 1u) : old ^ (mask[i] & (lane[i] ^ old));
+  });
 }
 
 }  // namespace

@@ -23,21 +23,21 @@ constexpr auto SATURATE16 = [](Int lane) { return std::clamp<Int>(lane, -32768, 
 #define TEST_load_I_T(NAME, F, V, M, P, K) testing_support::drive_load_I(NAME, model_##K, F)
 #define TEST_load_IP(NAME, F, V, M, K) testing_support::drive_load_IP(NAME, model_##K, F)
 #define TEST_load_IP_T(NAME, F, V, M, P, K) testing_support::drive_load_IP(NAME, model_##K, F)
-#define TEST_load_IP_aligned(NAME, F, V, M, K)                                                      \
-  testing_support::drive_load_IP(NAME, model_##K, F, testing_support::alignment_of(sizeof(M)));     \
+#define TEST_load_IP_aligned(NAME, F, V, M, K)                                                  \
+  testing_support::drive_load_IP(NAME, model_##K, F, testing_support::alignment_of(sizeof(M))); \
   testing_support::expect_failures(NAME, F)
-#define TEST_load_IP_aligned_destination(NAME, F, V, M, K)  \
-  testing_support::drive_load_IP(NAME, model_##K, F);       \
+#define TEST_load_IP_aligned_destination(NAME, F, V, M, K) \
+  testing_support::drive_load_IP(NAME, model_##K, F);      \
   testing_support::expect_destination_failures(NAME, F)
 #define TEST_store_I(NAME, F, V, M, K) testing_support::drive_store_I(NAME, model_##K, F)
 #define TEST_store_I_T(NAME, F, V, M, P, K) testing_support::drive_store_I(NAME, model_##K, F)
 #define TEST_store_IP(NAME, F, V, M, K) testing_support::drive_store_IP(NAME, model_##K, F)
 #define TEST_store_IP_T(NAME, F, V, M, P, K) testing_support::drive_store_IP(NAME, model_##K, F)
-#define TEST_store_I_aligned(NAME, F, V, M, K)                                                      \
-  testing_support::drive_store_I(NAME, model_##K, F, testing_support::alignment_of(sizeof(M)));     \
+#define TEST_store_I_aligned(NAME, F, V, M, K)                                                  \
+  testing_support::drive_store_I(NAME, model_##K, F, testing_support::alignment_of(sizeof(M))); \
   testing_support::expect_failures(NAME, F)
-#define TEST_store_IP_aligned(NAME, F, V, M, K)                                                     \
-  testing_support::drive_store_IP(NAME, model_##K, F, testing_support::alignment_of(sizeof(M)));    \
+#define TEST_store_IP_aligned(NAME, F, V, M, K)                                                  \
+  testing_support::drive_store_IP(NAME, model_##K, F, testing_support::alignment_of(sizeof(M))); \
   testing_support::expect_failures(NAME, F)
 
 #include "memory/elements.def"

@@ -203,9 +203,8 @@ void expect_failures(const std::string& name, void (*f)(const V&, const M*, int)
   Memory memory;
   for (unsigned k = 1; k < alignment_of(sizeof(M)); ++k)
     for (int offset : {-1, 0, 3, 64})
-      expect_failure(name, memory.forbidden() + k, [&] {
-        f(filled<V>(0), reinterpret_cast<const M*>(memory.forbidden() + k - offset), offset);
-      });
+      expect_failure(name, memory.forbidden() + k,
+                     [&] { f(filled<V>(0), reinterpret_cast<const M*>(memory.forbidden() + k - offset), offset); });
 }
 template <class V, class M>
 void expect_failures(const std::string& name, void (*f)(V&, M**, int)) {

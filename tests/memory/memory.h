@@ -36,7 +36,8 @@ class Memory {
   std::vector<unsigned char> copy() const { return {begin(), end()}; }
   void expect(const std::vector<unsigned char>& expected, const std::string& name) const {
     for (unsigned i = 0; i < size_; ++i)
-      ASSERT_EQ(int{begin()[i]}, int{expected[i]}) << name << " [" << cstub_Km_ZNB_Orbis_R5_64k_target() << "] byte " << i;
+      ASSERT_EQ(int{begin()[i]}, int{expected[i]})
+          << name << " [" << cstub_Km_ZNB_Orbis_R5_64k_target() << "] byte " << i;
   }
 
  private:

@@ -6,6 +6,13 @@
 
 #include "frame/lanes.h"
 
+// Elements are taken one after the other: what is left to save is the counting.
+#ifdef __clang__
+#define KASTARRI_UNROLLED _Pragma("clang loop unroll_count(8)")
+#else
+#define KASTARRI_UNROLLED _Pragma("GCC unroll 8")
+#endif
+
 namespace {
 
 // The elements' addresses. A disabled element gets that of a word of no meaning, so that nothing branches
@@ -26,6 +33,10 @@ class ElementAddresses {
   ElementAddresses(const void* base, const Read<O>& offsets, Same<bool> all) { fill(base, offsets, all); }
   ElementAddresses(const ElementAddresses&) = delete;
 
+  // Has the addresses in memory, to be read one by one: compilers would rather take vectors apart, which
+  // serves gathers well and scatters badly.
+  void settle() { asm("" : "+m"(at_)); }
+
   // The element at address i, as long as a Unit.
   template <class Unit>
   in_memory<Unit>& element(int i) const {
@@ -35,10 +46,13 @@ class ElementAddresses {
  private:
   template <class Enabled>
   void fill(const void* base, const Read<O>& offsets, const Enabled& enabled) {
-    const auto from = reinterpret_cast<std::uintptr_t>(base);
     const auto nowhere = reinterpret_cast<std::uintptr_t>(&nowhere_);
+    const auto from = reinterpret_cast<std::uintptr_t>(base) - nowhere;
     KASTARRI_LANES_INDEPENDENT
-    for (int i = 0; i < count; ++i) at_[i] = enabled[i] ? from + offsets[i] : nowhere;
+    for (int i = 0; i < count; ++i) {
+      const std::uintptr_t there = from + offsets[i];
+      at_[i] = nowhere + (enabled[i] ? there : 0);
+    }
   }
 
   alignas(64) std::uintptr_t at_[count];
@@ -76,7 +90,9 @@ inline void gather(const ElementAddresses<O>& from, word* out) {
 
 // Each element, in ascending order, becomes value(i). The byte after an 8-bit element is read.
 template <class Element, class O, class Value>
-inline void scatter(const ElementAddresses<O>& to, Value value) {
+inline void scatter(ElementAddresses<O>&& to, Value value) {
+  to.settle();
+  KASTARRI_UNROLLED
   for (int i = 0; i < O::count; ++i) {
     auto& element = to.template element<Element>(i);
     if constexpr (sizeof(Element) == 1) asm volatile("" : : "q"((&element)[1]));
@@ -86,7 +102,9 @@ inline void scatter(const ElementAddresses<O>& to, Value value) {
 
 // Each element, in ascending order, is read as a unit of the offsets' width and becomes rule(unit, i).
 template <class Element, class O, class Rule>
-inline void modify(const ElementAddresses<O>& to, Rule rule) {
+inline void modify(ElementAddresses<O>&& to, Rule rule) {
+  to.settle();
+  KASTARRI_UNROLLED
   for (int i = 0; i < O::count; ++i) {
     using Unit = typename O::container;
     const Unit unit = to.template element<Unit>(i);

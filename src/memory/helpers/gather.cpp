@@ -26,9 +26,8 @@ template <class L, class Element>
 void scatter_masked(const void* base, const unsigned* offsets, const unsigned* masks, bool increment,
                     const unsigned* data) {
   using Unit = typename L::container;
-  const ElementAddresses<L> to(base, Read<L>(offsets), Read<L>(masks));
   const Read<L> mask(masks), lane(data);
-  modify<Element>(to, [&](Unit old, int i) {
+  modify<Element>(ElementAddresses<L>(base, Read<L>(offsets), mask), [&](Unit old, int i) {
     asm volatile("" : : "r"(old));
     return increment ? old + (mask[i] & 1u) : old ^ (mask[i] & (lane[i] ^ old));
   });

@@ -5,7 +5,7 @@
 #   make test      build everything and run the tests
 #   make bench     time every intrinsic and write docs/performance.md
 #   make install   install library and headers (PREFIX=/usr/local, DESTDIR=)
-#   make headers   write the public headers anew from the tables of rows
+#   make headers   write the public headers and docs/coverage.md anew from the tables of rows
 #   make format    format the sources
 #   make clean     remove build/
 
@@ -44,6 +44,7 @@ install:
 headers:
 	tools/packages.sh build
 	tools/generate_headers.py
+	tools/coverage.py
 
 format:
 	tools/packages.sh check

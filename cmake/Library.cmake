@@ -3,6 +3,12 @@
 set(KASTARRI_FLAGS_sse2 -msse2)
 set(KASTARRI_FLAGS_avx2 -mavx2 -mfma -mf16c)
 set(KASTARRI_FLAGS_avx512 -mavx512f -mavx512bw -mavx512dq -mavx512vl -mfma -mf16c -mprefer-vector-width=512)
+if(CMAKE_CXX_COMPILER_ID STREQUAL GNU)
+  # A register is stored in pieces as wide as those in which the next intrinsic loads it: narrower ones
+  # would not forward from the store to the load.
+  list(APPEND KASTARRI_FLAGS_avx2 -mmove-max=256 -mstore-max=256)
+  list(APPEND KASTARRI_FLAGS_avx512 -mmove-max=512 -mstore-max=512)
+endif()
 set(KASTARRI_KNOWN_TARGETS avx512 avx2 sse2)  # best first
 
 # A source of a vector family is compiled for every target, one of the frame once, but for the
@@ -77,7 +83,7 @@ function(kastarri_finish_library name directory)
   if(NOT KASTARRI_SANITIZE)
     # Nothing but libc at run time: no C++ library, and the compiler's own helpers from its archive.
     set_target_properties(${name} PROPERTIES LINKER_LANGUAGE C)
-    target_link_options(${name} PRIVATE -static-libgcc -Wl,--no-undefined)
+    target_link_options(${name} PRIVATE -static-libgcc -Wl,--as-needed -Wl,--no-undefined)
   endif()
 endfunction()
 

@@ -29,7 +29,7 @@ FAMILIES = {
     "multiply": "Multiplies, wide accumulators, packs",
     "float": "Floating point",
 }
-FRAME_TABLES = {"moves": "conversions", "conversions": "conversions",
+FRAME_TABLES = {"moves": "conversions", "conversions": "conversions", "memory_conversions": "conversions",
                 "ports": "scalar", "scalar": "scalar", "funnel": "scalar", "access": "scalar"}
 CONVERSION_TABLES = ["frame/conversions.def", "float/conversions.def"]
 

@@ -2,6 +2,7 @@
 #include <cstring>
 
 #include "frame/entry.h"
+#include "frame/failure.h"
 #include "frame/memory.h"
 
 namespace {
@@ -11,7 +12,7 @@ template <class T>
 const void* aligned(const T* base, int offset) {
   const T* const accessed = address(base, offset);
   const auto number = reinterpret_cast<word>(accessed);
-  if (number % sizeof(T) != 0) cstub_vaddr_not_aligned(number);
+  if (number % sizeof(T) != 0) kastarri::not_aligned(number);
   return accessed;
 }
 

@@ -4,7 +4,10 @@
 
 #include <type_traits>
 
+#include "frame/arithmetic.h"
+#include "frame/entry.h"
 #include "frame/lanes.h"
+#include "frame/spill.h"
 
 namespace {
 
@@ -30,60 +33,35 @@ constexpr bool is_predicate = std::is_same_v<typename L::number, predicate_bit>;
 // A value goes over as it is: wider lanes take its extension, narrower ones its low bits.
 constexpr auto same_value = [](auto value) { return value; };
 
-// A wide register and its spill image: lane k of w bits is bits wk .. wk + w - 1 of the image. Four
-// 24-bit lanes make three words, two 48-bit lanes likewise.
-template <class From>
-inline void spill(const word* from, word* to) {
-  if constexpr (From::bits == 24) {
-    for (int g = 0; g < 16; ++g) {
-      const word* lane = from + 4 * g;
-      to[3 * g] = (lane[0] & 0xFFFFFF) | lane[1] << 24;
-      to[3 * g + 1] = (lane[1] >> 8 & 0xFFFF) | lane[2] << 16;
-      to[3 * g + 2] = (lane[2] >> 16 & 0xFF) | lane[3] << 8;
+// Every lane the same value. A lane of two words is written as words: a 64-bit scalar would reach the
+// vector registers through memory, in halves, and wait there.
+template <class L, class V>
+inline void replicate(const Write<L>& to, V value) {
+  if constexpr (std::is_integral_v<V> && sizeof(typename L::container) == 8) {
+    const auto container = static_cast<std::uint64_t>(canonical<L>(value));
+    const auto low = static_cast<word>(container), high = static_cast<word>(container >> 32);
+    auto* words = static_cast<in_memory<word>*>(to.image());
+    KASTARRI_LANES_INDEPENDENT
+    for (int i = 0; i < L::count; ++i) {
+      words[2 * i] = low;
+      words[2 * i + 1] = high;
     }
   } else {
-    for (int g = 0; g < 16; ++g) {
-      const word* lane = from + 4 * g;
-      to[3 * g] = lane[0];
-      to[3 * g + 1] = (lane[1] & 0xFFFF) | lane[2] << 16;
-      to[3 * g + 2] = lane[2] >> 16 | lane[3] << 16;
-    }
+    lanes<L::count>(to, same_value, Same(value));
   }
 }
 
-template <class To>
-inline void unspill(const word* from, word* to) {
-  if constexpr (To::bits == 24) {
-    const Write<To> lanes_out(to);
-    for (int g = 0; g < 16; ++g) {
-      const word* image = from + 3 * g;
-      lanes_out.put(4 * g, image[0]);
-      lanes_out.put(4 * g + 1, image[0] >> 24 | image[1] << 8);
-      lanes_out.put(4 * g + 2, image[1] >> 16 | image[2] << 16);
-      lanes_out.put(4 * g + 3, image[2] >> 8);
-    }
-  } else {
-    for (int g = 0; g < 16; ++g) {
-      const word* image = from + 3 * g;
-      to[4 * g] = image[0];
-      to[4 * g + 1] = static_cast<word>(static_cast<std::int32_t>(image[1] << 16) >> 16);
-      to[4 * g + 2] = image[1] >> 16 | image[2] << 16;
-      to[4 * g + 3] = static_cast<word>(static_cast<std::int32_t>(image[2]) >> 16);
-    }
-  }
-}
-
-template <class From, class To>
-inline void convert_lanes(const Read<From>& from, const Write<To>& to) {
+template <class From, class To, class Rule>
+inline void convert_lanes(const Read<From>& from, const Write<To>& to, Rule rule) {
   static_assert(std::is_same_v<typename From::number, typename To::number> || From::bits == 1 || To::bits == 1,
                 "numbers of different kinds convert by value");
   if constexpr (From::count == To::count) {
-    lanes<To::count>(to, same_value, from);
+    lanes<To::count>(to, rule, from);
   } else if constexpr (From::count == 1) {
-    lanes<To::count>(to, same_value, Same(from[0]));
+    replicate(to, rule(from[0]));
   } else {
     static_assert(To::count == 1);
-    to.put(0, from[0]);
+    to.put(0, rule(from[0]));
   }
 }
 
@@ -103,7 +81,38 @@ inline void convert(const FromUnit* from, ToUnit* to) {
   } else if constexpr (is_predicate<To> && To::count > 1) {
     replicate_bit<To>(from, to);
   } else {
-    convert_lanes(Read<From>(from), Write<To>(to));
+    convert_lanes(Read<From>(from), Write<To>(to), same_value);
+  }
+}
+
+// Memory holds a register as the register's own array does, and a host scalar as one lane.
+template <class M, bool = std::is_class_v<M>>
+struct memory_layout_of {
+  using type = layout_of<M>;
+};
+template <class M>
+struct memory_layout_of<M, false> {
+  using type = host_layout<M>;
+};
+template <class M>
+using memory_layout = typename memory_layout_of<M>::type;
+
+// The bits of an address below a host scalar's size are ignored; a register type lies anywhere.
+template <class M>
+inline const M* element_address(const M* address) {
+  if constexpr (std::is_class_v<M>) return address;
+  return reinterpret_cast<const M*>(reinterpret_cast<std::uintptr_t>(address) & ~(sizeof(M) - 1));
+}
+
+// To memory, narrower signed lanes saturate. The images of accumulators hold their low bits instead.
+template <class From, class To, class FromUnit, class Memory>
+inline void convert_to_memory(const FromUnit* from, Memory* to) {
+  using T = typename To::container;
+  constexpr bool image = From::count > 1 && From::count == To::count && (From::bits == 24 || From::bits == 48);
+  if constexpr (To::bits < From::bits && std::is_signed_v<T> && !image) {
+    convert_lanes(Read<From>(from), Write<To>(to), [](auto lane) { return saturate<T>(lane); });
+  } else {
+    convert<From, To>(from, to);
   }
 }
 

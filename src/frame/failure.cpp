@@ -14,9 +14,11 @@ void kastarri::fail(const char* format, ...) {
   std::exit(1);
 }
 
-void cstub_vaddr_not_aligned(unsigned address) {
-  kastarri::fail(
+void kastarri::not_aligned(unsigned address) {
+  fail(
       "Error: The config takes exception when the address of an load/store is unaligned. "
       "The address 0x%x is not properly aligned.\n",
       address);
 }
+
+void cstub_vaddr_not_aligned(unsigned address) { kastarri::not_aligned(address); }

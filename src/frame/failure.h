@@ -5,7 +5,13 @@
 
 namespace kastarri {
 
-[[noreturn]] void fail(const char* format, ...) __attribute__((cold, format(printf, 1, 2)));
+// Hidden, so that a caller needs nothing set up for the call before it knows that it fails.
+#define KASTARRI_FAILURE __attribute__((cold, noreturn, visibility("hidden")))
+
+KASTARRI_FAILURE void fail(const char* format, ...) __attribute__((format(printf, 1, 2)));
+
+// What the exported cstub_vaddr_not_aligned does.
+KASTARRI_FAILURE void not_aligned(unsigned address);
 
 }  // namespace kastarri
 

@@ -50,6 +50,8 @@ class Write {
     lanes_[i] = canonical<L>(value);
   }
 
+  void* image() const { return lanes_; }
+
  private:
   in_memory<typename L::container>* lanes_;
 };

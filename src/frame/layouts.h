@@ -49,6 +49,10 @@ using i64x16 = Layout<std::int64_t, 64, 16>;
 using u32x64 = Layout<std::uint32_t, 32, 64>;
 using u64x32 = Layout<std::uint64_t, 64, 32>;
 
+// Predicates of 64 bits and 64-bit scalars as plain bits.
+using u32x2 = Layout<std::uint32_t, 32, 2>;
+using u64x1 = Layout<std::uint64_t, 64, 1>;
+
 // The 16-bit and 32-bit images of the accumulators.
 using i16x64 = Layout<std::int16_t, 16, 64>;
 using u16x64 = Layout<std::uint16_t, 16, 64>;

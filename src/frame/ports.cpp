@@ -3,9 +3,11 @@
 // reordered nor merged. A handler may register others: every call looks the handler up anew.
 #include "frame/entry.h"
 #include "frame/failure.h"
+#include "frame/state.h"
 
 namespace {
 
+// Found once an intrinsic, where processor() would be found anew after every handler.
 cstub_Km_ZNB_Orbis_R5_64k_processor_t& core = cstub_Km_ZNB_Orbis_R5_64k_proc;
 
 // What handlers are given of a port: its internal record begins with the members of the public one.

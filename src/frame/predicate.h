@@ -11,26 +11,6 @@
 
 namespace {
 
-// 64 bytes from four quarters, stored in the width in which lanes are read back, so that the store forwards
-// to the load.
-inline void store_quarters(void* to, __m128i q0, __m128i q1, __m128i q2, __m128i q3) {
-#if defined __AVX512BW__
-  const __m512i low = _mm512_castsi256_si512(_mm256_set_m128i(q1, q0));
-  // The form with a mask of all ones: with the other the compiler warns of its own header.
-  _mm512_storeu_si512(to, _mm512_maskz_inserti64x4(0xFF, low, _mm256_set_m128i(q3, q2), 1));
-#elif defined __AVX2__
-  auto* half = static_cast<__m256i*>(to);
-  _mm256_storeu_si256(half, _mm256_set_m128i(q1, q0));
-  _mm256_storeu_si256(half + 1, _mm256_set_m128i(q3, q2));
-#else
-  auto* quarter = static_cast<__m128i*>(to);
-  _mm_storeu_si128(quarter, q0);
-  _mm_storeu_si128(quarter + 1, q1);
-  _mm_storeu_si128(quarter + 2, q2);
-  _mm_storeu_si128(quarter + 3, q3);
-#endif
-}
-
 template <int LaneBits>
 struct mask_lane;
 template <>
@@ -87,16 +67,24 @@ struct LaneMask<8, 64> {
 #if defined __AVX512BW__
     const std::uint64_t all = bits[0] | std::uint64_t{bits[1]} << 32;
     _mm512_store_si512(lane, _mm512_movm_epi8(all));
+#elif defined __AVX2__
+    const __m256i bit = _mm256_set1_epi64x(static_cast<long long>(0x8040201008040201u));
+    const __m256i byte_of_lane = _mm256_setr_epi64x(0, 0x0101010101010101, 0x0202020202020202, 0x0303030303030303);
+    for (int h = 0; h < 2; ++h) {
+      const __m256i v = _mm256_shuffle_epi8(_mm256_set1_epi32(static_cast<int>(bits[h])), byte_of_lane);
+      _mm256_store_si256(reinterpret_cast<__m256i*>(lane) + h, _mm256_cmpeq_epi8(_mm256_and_si256(v, bit), bit));
+    }
 #else
     const __m128i bit = _mm_set1_epi64x(static_cast<long long>(0x8040201008040201u));
-    const __m128i bytes =
-        _mm_unpacklo_epi32(_mm_cvtsi32_si128(static_cast<int>(bits[0])), _mm_cvtsi32_si128(static_cast<int>(bits[1])));
-    const __m128i twice = _mm_unpacklo_epi8(bytes, bytes);
-    const __m128i low = _mm_unpacklo_epi16(twice, twice);
-    const __m128i high = _mm_unpackhi_epi16(twice, twice);
-    const auto test = [bit](__m128i v) { return _mm_cmpeq_epi8(_mm_and_si128(v, bit), bit); };
-    store_quarters(lane, test(_mm_unpacklo_epi32(low, low)), test(_mm_unpackhi_epi32(low, low)),
-                   test(_mm_unpacklo_epi32(high, high)), test(_mm_unpackhi_epi32(high, high)));
+    for (int h = 0; h < 2; ++h) {
+      const __m128i bytes = _mm_set1_epi32(static_cast<int>(bits[h]));
+      const __m128i twice = _mm_unpacklo_epi8(bytes, bytes);
+      const __m128i fourfold = _mm_unpacklo_epi16(twice, twice);
+      const auto test = [bit](__m128i v) { return _mm_cmpeq_epi8(_mm_and_si128(v, bit), bit); };
+      auto* quarter = reinterpret_cast<__m128i*>(lane) + 2 * h;
+      quarter[0] = test(_mm_unpacklo_epi32(fourfold, fourfold));
+      quarter[1] = test(_mm_unpackhi_epi32(fourfold, fourfold));
+    }
 #endif
   }
 

@@ -22,4 +22,26 @@
   HOST(int32, int, TO)             \
   HOST(uint32, unsigned int, TO)
 
+// Whole-register copies: a type and the kinds of copy that it has.
+#define COPIED(T)                                  \
+  PROTO(T##_loadi, load_I, T, T, register_load)    \
+  PROTO(T##_storei, store_I, T, T, register_store) \
+  PROTO(T##_move, move, T)
+#define COPIED_IP(T)                              \
+  COPIED(T)                                       \
+  PROTO(T##_loadip, load_IP, T, T, register_load) \
+  PROTO(T##_storeip, store_IP, T, T, register_store)
+#define COPIED_EVERYWHERE(T)                       \
+  COPIED_IP(T)                                     \
+  PROTO(T##_loadx, load_I, T, T, register_load)    \
+  PROTO(T##_storex, store_I, T, T, register_store) \
+  PROTO(T##_loadxp, load_IP, T, T, register_load)  \
+  PROTO(T##_storexp, store_IP, T, T, register_store)
+
+// Conversions between a register and memory of another type, or a host scalar in memory.
+#define LOADED(MEM, REG) PROTO(MEM##_mtor_##REG, mtor, REG, MEM)
+#define LOADED_HOST(NAME, TYPE, REG) PROTO(NAME##_mtor_##REG, mtor, REG, TYPE)
+#define STORED(REG, MEM) PROTO(REG##_rtom_##MEM, rtom, REG, MEM)
+#define STORED_HOST(REG, NAME, TYPE) PROTO(REG##_rtom_##NAME, rtom, REG, TYPE)
+
 #endif

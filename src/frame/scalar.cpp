@@ -1,9 +1,10 @@
 // The scalar core's arithmetic, logic, comparisons, moves and boolean registers.
+#include <emmintrin.h>
+
 #include "frame/entry.h"
+#include "frame/state.h"
 
 namespace {
-
-const cstub_Km_ZNB_Orbis_R5_64k_processor_t& core = cstub_Km_ZNB_Orbis_R5_64k_proc;
 
 int clamped(int v, int t) {
   if (t < 0 || t > 31) return v;
@@ -14,14 +15,13 @@ int clamped(int v, int t) {
 int leading_zeros(word v) { return v ? __builtin_clz(v) : 32; }
 
 // As many low ones as a field is wide.
-word ones(word bits) { return (word{2} << (bits - 1) % 16) - 1; }
+word ones(word bits) { return 0xFFFFu >> (-bits & 15); }
 
-void merge(word& r, word v, word where) { r = (r & ~where) | (v & where); }
+void deposit(word& r, word v, int shift, word field) { r = (r & ~(field << shift)) | (v & field) << shift; }
 
-word zero_bytes(word v) {
-  word found = 0;
-  for (int i = 0; i < 4; ++i) found |= word{(v >> 8 * i & 0xFF) == 0} << i;
-  return found;
+word equal_bytes(word a, word b) {
+  const __m128i x = _mm_cvtsi32_si128(static_cast<int>(a)), y = _mm_cvtsi32_si128(static_cast<int>(b));
+  return static_cast<word>(_mm_movemask_epi8(_mm_cmpeq_epi8(x, y))) & 15;
 }
 
 template <class T>

@@ -17,6 +17,15 @@
 
 // --- Lane-wise operations ---------------------------------------------------------------------------
 
+#define SIG_a_r(SYMBOL, T, K) T SYMBOL(const T& a)
+#define BODY_a_r(T, K)               \
+  T r;                               \
+  KASTARRI_SEMANTIC(K)(a._, r._);    \
+  return r;
+
+#define SIG_a_r_T(SYMBOL, T, P, K) void SYMBOL(T& r, const T& a, const P& p)
+#define BODY_a_r_T(T, P, K) KASTARRI_SEMANTIC(K)(a._, where(r._, p._));
+
 #define SIG_ab_r(SYMBOL, T, K) T SYMBOL(const T& a, const T& b)
 #define BODY_ab_r(T, K)                \
   T r;                                 \
@@ -32,7 +41,20 @@
 // --- Moves and conversions --------------------------------------------------------------------------
 
 #define SIG_move(SYMBOL, T) T SYMBOL(const T& from)
-#define BODY_move(T) return from;
+#define BODY_move(T)                            \
+  T r;                                          \
+  KASTARRI_SEMANTIC(register_load)(&from, r._); \
+  return r;
+
+#define SIG_mtor(SYMBOL, REG, MEM) REG SYMBOL(const MEM* base, int offset)
+#define BODY_mtor(REG, MEM)                                                                 \
+  REG r;                                                                                    \
+  convert<memory_layout<MEM>, layout_of<REG>>(element_address(address(base, offset)), r._); \
+  return r;
+
+#define SIG_rtom(SYMBOL, REG, MEM) void SYMBOL(const REG& value, const MEM* base, int offset)
+#define BODY_rtom(REG, MEM) \
+  convert_to_memory<layout_of<REG>, memory_layout<MEM>>(value._, writable(element_address(address(base, offset))));
 
 #define SIG_rtor(SYMBOL, FROM, TO) TO SYMBOL(const FROM& from)
 #define BODY_rtor(FROM, TO)                             \

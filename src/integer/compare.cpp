@@ -3,6 +3,11 @@
 namespace {
 
 constexpr auto EQ = [](auto x, auto y) { return x == y; };
+constexpr auto NEQ = [](auto x, auto y) { return x != y; };
+constexpr auto LT = [](auto x, auto y) { return x < y; };
+constexpr auto LE = [](auto x, auto y) { return x <= y; };
+constexpr auto GT = [](auto x, auto y) { return x > y; };
+constexpr auto GE = [](auto x, auto y) { return x >= y; };
 
 }  // namespace
 

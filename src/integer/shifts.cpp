@@ -1,39 +1,64 @@
 // Shifts by a count a lane.
-#include "frame/arithmetic.h"
+#include "integer/kernels.h"
+#include "integer/scale.h"
 
 namespace {
 
-// 2 to the power s mod 16, as a product of one factor a bit of s: the baseline target has no shift by
-// a count a lane, but it multiplies.
-constexpr auto power_of_two = [](std::int16_t s) {
-  const auto factor = [s](int bit, int power) { return s & bit ? power : 1; };
-  return static_cast<std::uint16_t>(factor(1, 2) * factor(2, 4) * factor(4, 16) * factor(8, 256));
+constexpr auto is_negative = [](auto count) { return static_cast<std::make_signed_t<decltype(count)>>(count) < 0; };
+
+constexpr auto SLL = [](auto x, auto count) {
+  using U = decltype(x);
+  const Scaled<U> product(x, count);
+  const U shifted = is_negative(count) ? product.high : product.low;
+  return within(count) ? shifted : U{0};
+};
+constexpr auto SRL = [](auto x, auto count) { return SLL(x, static_cast<decltype(x)>(0u - count)); };
+
+// A signed lane times 2^(count mod w), all of it with the sign folded away: -1 - f stands as f. The product
+// f * p holds the shift right in its high half, and tells whether the shift left stays in range.
+template <class T>
+struct ScaledSigned {
+  using U = std::make_unsigned_t<T>;
+  ScaledSigned(T x, U count) : sign(unsigned_bits(sign_fill(x))), folded(static_cast<U>(unsigned_bits(x) ^ sign), count) {}
+
+  // (-1 - f) * p is -1 - (f * p + p - 1).
+  U left() const { return static_cast<U>(folded.low + (static_cast<U>(folded.power - 1u) & sign)); }
+  U right() const { return folded.high; }
+  // All ones when the shift left does not stay in range, else 0.
+  U out_of_range() const {
+    return static_cast<U>(folded.high | folded.low >> (width<U> - 1)) == 0 ? U{0} : static_cast<U>(-1);
+  }
+
+  U sign;
+  Scaled<U> folded;
 };
 
-// A count from -16 to 15 shifts by itself; beyond, every bit leaves the lane. (-16 is among them since
-// shifting by 2^0 leaves nothing in the high half.)
-constexpr auto within = [](std::int16_t s) { return static_cast<std::uint16_t>(s + 16) < 32; };
-
-// x * 2^(s mod 16) is x shifted left by s in its low half; for a negative s it is x shifted right by
-// -s in its high half, since s mod 16 is then 16 - (-s).
-constexpr auto SLL = [](std::int16_t x, std::int16_t s) {
-  const std::uint32_t shifted = std::uint32_t{unsigned_bits(x)} * power_of_two(s);
-  const auto left = static_cast<std::uint16_t>(shifted);
-  const auto right = static_cast<std::uint16_t>(shifted >> 16);
-  return static_cast<std::uint16_t>(within(s) ? s < 0 ? right : left : 0);
+// Shifting right by w - 1 leaves the same as shifting by more, the sign; shifting left by as much and
+// saturating too.
+constexpr auto at_most_the_width = [](auto count) {
+  using T = decltype(count);
+  constexpr T farthest = width<T> - 1;
+  return count < farthest ? count : farthest;
 };
 
-// The same with the count mirrored; an arithmetic shift right is the logical one of the value with its
-// sign folded away.
-constexpr auto SRA = [](std::int16_t x, std::int16_t s) {
-  const auto sign = static_cast<std::uint16_t>(sign_fill(x));
-  const auto folded = static_cast<std::uint16_t>(x ^ sign);
-  const auto count = static_cast<std::int16_t>(-s);
-  const std::uint16_t power = power_of_two(count);
-  const auto left = static_cast<std::uint16_t>(unsigned_bits(x) * std::uint32_t{power});
-  const auto right = static_cast<std::uint16_t>(folded * std::uint32_t{power} >> 16);
-  const auto kept = [&](std::uint16_t shifted) { return static_cast<std::uint16_t>(within(count) ? shifted : 0); };
-  return static_cast<std::uint16_t>(s > 0 ? kept(right) ^ sign : kept(left));
+constexpr auto SRA = [](auto x, auto count) {
+  using T = decltype(x);
+  using U = std::make_unsigned_t<T>;
+  const ScaledSigned<T> scaled(x, static_cast<U>(0u - unsigned_bits(at_most_the_width(count))));
+  const auto right = static_cast<U>(scaled.right() ^ scaled.sign);
+  const auto left = static_cast<U>(count > -width<T> ? scaled.left() ^ scaled.sign : 0);
+  return count > 0 ? right : left;
+};
+
+// In masks rather than choices: compilers make many more instructions of those.
+constexpr auto SLS = [](auto x, auto count) {
+  using T = decltype(x);
+  using U = std::make_unsigned_t<T>;
+  const ScaledSigned<T> scaled(x, unsigned_bits(at_most_the_width(count)));
+  const U right = count >= -width<T> ? scaled.right() : U{0};
+  const U left = static_cast<U>((scaled.left() | scaled.out_of_range()) & unsigned_bits(std::numeric_limits<T>::max()));
+  const U backward = unsigned_bits(sign_fill(count));
+  return static_cast<U>(((right & backward) | (left & ~backward)) ^ scaled.sign);
 };
 
 }  // namespace

@@ -81,6 +81,26 @@ inline __m128i fetch(const ElementAddresses<u32x16>& from, int i) {
   return _mm_set_epi32(unit(3), unit(2), unit(1), unit(0));
 }
 
+// 64 bytes from four quarters, stored in the width in which lanes are read back, so that the store forwards
+// to the load.
+inline void store_quarters(void* to, __m128i q0, __m128i q1, __m128i q2, __m128i q3) {
+#if defined __AVX512BW__
+  const __m512i low = _mm512_castsi256_si512(_mm256_set_m128i(q1, q0));
+  // The form with a mask of all ones: with the other the compiler warns of its own header.
+  _mm512_storeu_si512(to, _mm512_maskz_inserti64x4(0xFF, low, _mm256_set_m128i(q3, q2), 1));
+#elif defined __AVX2__
+  auto* half = static_cast<__m256i*>(to);
+  _mm256_storeu_si256(half, _mm256_set_m128i(q1, q0));
+  _mm256_storeu_si256(half + 1, _mm256_set_m128i(q3, q2));
+#else
+  auto* quarter = static_cast<__m128i*>(to);
+  _mm_storeu_si128(quarter, q0);
+  _mm_storeu_si128(quarter + 1, q1);
+  _mm_storeu_si128(quarter + 2, q2);
+  _mm_storeu_si128(quarter + 3, q3);
+#endif
+}
+
 // Gathers whole elements, of 16 bits from 32 offsets, of 32 bits from 16. A disabled one reads 0.
 template <class O>
 inline void gather(const ElementAddresses<O>& from, word* out) {

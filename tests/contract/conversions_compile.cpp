@@ -31,16 +31,16 @@ void from_temporary() {
   take<To>(copied);
 }
 
-#define REGISTER(FROM, TO)                        \
-  template void forms<TO, FROM&>(FROM&);          \
+#define REGISTER(FROM, TO)                           \
+  template void forms<TO, FROM&>(FROM&);             \
   template void forms<TO, const FROM&>(const FROM&); \
   template void from_temporary<TO, FROM>();
-#define HOST(NAME, HOST_TYPE, TO)                           \
-  template void forms<TO, HOST_TYPE&>(HOST_TYPE&);          \
+#define HOST(NAME, HOST_TYPE, TO)                              \
+  template void forms<TO, HOST_TYPE&>(HOST_TYPE&);             \
   template void forms<TO, const HOST_TYPE&>(const HOST_TYPE&); \
   template void from_temporary<TO, HOST_TYPE>();
-#define HOST_BOTH(NAME, HOST_TYPE, TO) \
-  HOST(NAME, HOST_TYPE, TO)            \
+#define HOST_BOTH(NAME, HOST_TYPE, TO)      \
+  HOST(NAME, HOST_TYPE, TO)                 \
   template void forms<HOST_TYPE, TO&>(TO&); \
   template void forms<HOST_TYPE, const TO&>(const TO&);
 #define HOST_INTS(TO)              \

@@ -8,6 +8,7 @@ import os
 import re
 import subprocess
 import sys
+import tempfile
 import unittest
 
 ROOT = os.path.dirname(os.path.dirname(os.path.dirname(os.path.abspath(__file__))))
@@ -34,7 +35,7 @@ def declared():
     """The names that the public headers declare as exported."""
     names = set()
     for path in glob.glob(os.path.join(ROOT, "include", "kastarri", "*.h")):
-        for declaration in re.findall(r"^(?:extern )?KASTARRI_API ([^;]*);", open(path, encoding="utf-8").read(), re.M):
+        for declaration in re.findall(r"^(?:extern |\[\[noreturn\]\] )*KASTARRI_API ([^;]*);", open(path, encoding="utf-8").read(), re.M):
             names.add(re.findall(r"\bcstub_\w+(?=\(|\[|$)", declaration)[0])
     return names
 
@@ -112,6 +113,22 @@ class Headers(unittest.TestCase):
         for compiler in COMPILERS:
             with self.subTest(compiler=compiler):
                 self.compile(compiler, "-x", "c++", "-", text=program)
+
+
+class Documents(unittest.TestCase):
+    def test_coverage_is_that_of_the_rows(self):
+        check = subprocess.run([sys.executable, os.path.join(ROOT, "tools", "coverage.py"), "--check"], check=False)
+        self.assertEqual(check.returncode, 0, "run `make headers`")
+
+    def test_the_kernel_of_the_readme_prints_what_the_readme_says(self):
+        readme = open(os.path.join(ROOT, "README.md"), encoding="utf-8").read()
+        program = re.search(r"```cpp\n(.*?)```", readme, re.S)[1]
+        printed = re.search(r"It prints `(.*?)`", readme)[1]
+        with tempfile.TemporaryDirectory() as directory:
+            binary = os.path.join(directory, "kernel")
+            subprocess.run(["g++", *USER_FLAGS, "-x", "c++", "-", "-x", "none", LIBRARY, "-o", binary,
+                            "-Wl,-rpath," + os.path.dirname(LIBRARY)], input=program, text=True, check=True)
+            self.assertEqual(output(binary).strip(), printed)
 
 
 DEFINED_TABLES = set(generate_headers.listed_tables())

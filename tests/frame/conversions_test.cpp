@@ -50,8 +50,7 @@ void drive_rtor(const char* name, To (*f)(const From&)) {
   for (std::size_t n = 0; n < values.size() + 50; ++n) {
     From from;
     fill_random<layout_of<From>>(from._, random);
-    if (n < values.size() && !is_spill<layout_of<From>>)
-      set_lane<layout_of<From>>(from._, 0, values[n]);
+    if (n < values.size() && !is_spill<layout_of<From>>) set_lane<layout_of<From>>(from._, 0, values[n]);
     const To expected = expected_register<From, To>(from);
     To assigned;
     assigned = from;

@@ -8,8 +8,8 @@
 namespace {
 
 template <class T, int Size, int Align>
-constexpr bool plain = sizeof(T) == Size && alignof(T) == Align && sizeof(T{}._) == Size && std::is_trivial_v<T> &&
-                       std::is_standard_layout_v<T>;
+constexpr bool plain = sizeof(T) == Size && alignof(T) == Align &&
+                       sizeof(T{}._) == Size&& std::is_trivial_v<T>&& std::is_standard_layout_v<T>;
 
 static_assert(plain<qv_vec2Nx8, 64, 4> && plain<qv_vec2Nx8U, 64, 4> && plain<qv_vecNx16, 64, 4>);
 static_assert(plain<qv_vecNx16U, 64, 4> && plain<qv_vecN_2x32v, 64, 4> && plain<qv_vecN_2x32Uv, 64, 4>);
@@ -19,7 +19,8 @@ static_assert(plain<qv_vecNx8, 32, 4> && plain<qv_vecNx8U, 32, 4> && plain<qv_ve
 static_assert(plain<qv_vecN_2x16U, 32, 4> && plain<qv_vecN_2xf16, 32, 4>);
 static_assert(plain<qv_vec2Nx24, 256, 4> && plain<qv_vecNx48, 256, 4> && plain<qv_vecN_2x64w, 128, 4>);
 static_assert(plain<qv_vec2Nx16w, 128, 4> && plain<qv_vec2Nx16Uw, 128, 4> && plain<qv_vecNx32, 128, 4>);
-static_assert(plain<qv_vecNx32U, 128, 4> && plain<qv_wvecspill, 192, 4> && plain<valign, 64, 4> && plain<qv_gsr, 64, 4>);
+static_assert(plain<qv_vecNx32U, 128, 4> && plain<qv_wvecspill, 192, 4> && plain<valign, 64, 4> &&
+              plain<qv_gsr, 64, 4>);
 static_assert(plain<vboolN, 4, 4> && plain<vbool2N, 8, 4> && plain<vboolN_2, 2, 2> && plain<vbool1, 1, 1>);
 static_assert(plain<rkbool, 1, 1> && plain<rkbool4, 1, 1> && plain<rkbool8, 1, 1>);
 static_assert(plain<qv_int8, 1, 1> && plain<qv_int8U, 1, 1> && plain<qv_int16, 2, 2> && plain<qv_int16U, 2, 2>);

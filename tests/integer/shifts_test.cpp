@@ -1,21 +1,28 @@
-#include "support/drivers.h"
+#include "integer/drivers.h"
+#include "integer/steps.h"
 
 namespace model {
 
-using testing_support::Int;
-
-// One step at a time, as often as the count says, up to the point where nothing is left to move.
-constexpr Int left(Int x, Int count) {
-  for (Int n = 0; n < std::min<Int>(count, 16); ++n) x *= 2;
-  return x;
-}
-constexpr Int right(Int x, Int count) {
-  for (Int n = 0; n < std::min<Int>(count, 16); ++n) x = (x - (x & 1)) / 2;
-  return x;
+// Counts are signed whatever the type that they come in.
+template <int w>
+constexpr Int signed_count(Int count) {
+  return count >> (w - 1) == 1 ? count - (Int{1} << w) : count;
 }
 
-constexpr auto SLL = [](Int a, Int s) { return s >= 0 ? left(a, s) : right(a & 0xFFFF, -s); };
-constexpr auto SRA = [](Int a, Int s) { return s >= 0 ? right(a, s) : left(a, -s); };
+template <int w>
+constexpr auto SLL = [](Int a, Int b) {
+  const Int s = signed_count<w>(b);
+  return s >= 0 ? left<w>(a, s) : right<w>(a, -s);
+};
+template <int w>
+constexpr auto SRL = [](Int a, Int b) {
+  const Int s = signed_count<w>(b);
+  return s >= 0 ? right<w>(a, s) : left<w>(a, -s);
+};
+template <int w>
+constexpr auto SRA = [](Int a, Int s) { return s >= 0 ? right<w>(a, s) : left<w>(a, -s); };
+template <int w>
+constexpr auto SLS = [](Int a, Int s) { return s >= 0 ? saturating_left<w>(a, s) : right<w>(a, -s); };
 
 }  // namespace model
 

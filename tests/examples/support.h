@@ -1,0 +1,67 @@
+// A directory of one's own and programs run in it.
+#ifndef KASTARRI_TESTS_EXAMPLES_SUPPORT_H
+#define KASTARRI_TESTS_EXAMPLES_SUPPORT_H
+
+#include <cstdio>
+#include <cstdlib>
+#include <filesystem>
+#include <set>
+#include <string>
+
+#include <sys/wait.h>
+
+#include "common/files.h"
+
+// A new empty directory, gone with the object.
+class Directory {
+ public:
+  Directory() {
+    char name[] = "/tmp/kastarri-examples-XXXXXX";
+    path_ = ::mkdtemp(name);
+  }
+  Directory(const Directory&) = delete;
+  Directory& operator=(const Directory&) = delete;
+  ~Directory() { std::filesystem::remove_all(path_); }
+  std::string file(const std::string& name) const { return path_ + "/" + name; }
+  std::set<std::string> names() const {
+    std::set<std::string> all;
+    for (const auto& entry : std::filesystem::directory_iterator(path_)) all.insert(entry.path().filename());
+    return all;
+  }
+  const std::string& path() const { return path_; }
+
+ private:
+  std::string path_;
+};
+
+struct Outcome {
+  int status;
+  std::string errors;
+};
+
+// Runs an example in the directory. Arguments are words for the shell.
+inline Outcome run_example(const Directory& directory, const std::string& name, const std::string& arguments) {
+  const std::string command =
+      "cd " + directory.path() + " && " EXAMPLE_PROGRAMS "/" + name + " " + arguments + " 2>&1 >/dev/null";
+  Outcome run{-1, ""};
+  std::FILE* const pipe = ::popen(command.c_str(), "r");
+  if (!pipe) return run;
+  char block[4096];
+  while (const std::size_t got = std::fread(block, 1, sizeof block, pipe)) run.errors.append(block, got);
+  const int status = ::pclose(pipe);
+  run.status = WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+  return run;
+}
+
+// What the function complains about, "" if it does not.
+template <class F>
+std::string complaint(F&& f) {
+  try {
+    f();
+  } catch (const examples::Failure& failure) {
+    return failure.what();
+  }
+  return "";
+}
+
+#endif

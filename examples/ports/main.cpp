@@ -40,7 +40,7 @@ Samples through_ports(const char* name, unsigned (*kernel)(int), const Samples& 
   Progress progress(name);
   Host host(sound, gain, progress);
   const unsigned waits = kernel(host.entries());
-  std::printf("  %-11s %d entries, a queue was not ready %u times\n", name, host.entries(), waits);
+  std::printf("  %-9s %d entries, a queue was not ready %u times\n", name, host.entries(), waits);
   return host.output();
 }
 
@@ -55,7 +55,7 @@ void check(const char* name, const Samples& got, const Samples& expected) {
 int scale(int argc, char** argv) {
   const Settings s = parse(argc, argv);
   Wav sound = read_wav(s.input);
-  std::printf("ports: %s, %zu samples, gain %g\n", s.input.c_str(), sound.samples.size(),
+  std::printf("%s: %zu samples, gain %g\n", s.input.c_str(), sound.samples.size(),
               static_cast<double>(s.gain) / (1 << GAIN_BITS));
 
   Samples expected(sound.samples.size());
@@ -64,11 +64,11 @@ int scale(int argc, char** argv) {
   check("blocking", blocking, expected);
   const Samples polling = through_ports("polling", scale_polling, sound.samples, s.gain);
   check("polling", polling, expected);
-  std::printf("  check       every sample equals the scalar version\n");
+  std::printf("  check     all %zu samples equal those of the scalar version, both times\n", expected.size());
 
   sound.samples = polling;
   write_wav(s.output, sound);
-  std::printf("  wrote       %s\n", s.output.c_str());
+  std::printf("  written   %s\n", s.output.c_str());
   return 0;
 }
 

@@ -18,9 +18,9 @@
 // --- Lane-wise operations ---------------------------------------------------------------------------
 
 #define SIG_a_r(SYMBOL, T, K) T SYMBOL(const T& a)
-#define BODY_a_r(T, K)               \
-  T r;                               \
-  KASTARRI_SEMANTIC(K)(a._, r._);    \
+#define BODY_a_r(T, K)            \
+  T r;                            \
+  KASTARRI_SEMANTIC(K)(a._, r._); \
   return r;
 
 #define SIG_a_r_T(SYMBOL, T, P, K) void SYMBOL(T& r, const T& a, const P& p)

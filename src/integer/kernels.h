@@ -13,11 +13,11 @@
 
 // The same on whole words with several lanes in each: no target shifts bytes, and not every one takes a
 // count at run time for halves.
-#define KERNEL_packed(OP, RULE, L)                                                                                     \
-  template <class Units, class Out>                                                                                    \
-  static inline void KASTARRI_SEMANTIC(OP)(const Units* a, word count, Out r) {                                        \
-    using Whole = packed<L>;                                                                                           \
-    lanes<Whole::count>(result<Whole>(r), RULE<L::bits, typename Whole::container>(count), Read<Whole>(a));            \
+#define KERNEL_packed(OP, RULE, L)                                                                          \
+  template <class Units, class Out>                                                                         \
+  static inline void KASTARRI_SEMANTIC(OP)(const Units* a, word count, Out r) {                             \
+    using Whole = packed<L>;                                                                                \
+    lanes<Whole::count>(result<Whole>(r), RULE<L::bits, typename Whole::container>(count), Read<Whole>(a)); \
   }
 
 namespace {

@@ -18,7 +18,8 @@ constexpr Unit in_every_lane(Unit lane) {
 template <int w, class Unit>
 struct ShiftLeft {
   explicit constexpr ShiftLeft(std::uint32_t s)
-      : count(s), kept(in_every_lane<w>(static_cast<Unit>(((std::uint64_t{1} << w) - 1) & ~((std::uint64_t{1} << s) - 1)))) {}
+      : count(s),
+        kept(in_every_lane<w>(static_cast<Unit>(((std::uint64_t{1} << w) - 1) & ~((std::uint64_t{1} << s) - 1)))) {}
   constexpr Unit operator()(Unit lanes) const { return static_cast<Unit>(lanes << count & kept); }
   std::uint32_t count;
   Unit kept;

@@ -36,14 +36,14 @@ constexpr auto CLAMPED = [](auto total) { return saturate<std::int16_t>(static_c
 #include "frame/stamp.h"
 
 // The sum of all lanes, or of the enabled ones: result layout, what becomes of the sum, layout of a lane.
-#define KERNEL_sum(OP, R, RULE, L)                                                                    \
-  template <class Units, class Unit>                                                                  \
-  static inline void KASTARRI_SEMANTIC(OP)(const Units* a, Unit* r) {                                 \
-    Write<R>(r).put(0, RULE(sum<L>(a)));                                                              \
-  }                                                                                                   \
-  template <class Units, class PredicateUnit, class Unit>                                             \
-  static inline void KASTARRI_SEMANTIC(OP)(const Units* a, const PredicateUnit* p, Unit* r) {         \
-    Write<R>(r).put(0, RULE(sum<L>(a, p)));                                                           \
+#define KERNEL_sum(OP, R, RULE, L)                                                            \
+  template <class Units, class Unit>                                                          \
+  static inline void KASTARRI_SEMANTIC(OP)(const Units* a, Unit* r) {                         \
+    Write<R>(r).put(0, RULE(sum<L>(a)));                                                      \
+  }                                                                                           \
+  template <class Units, class PredicateUnit, class Unit>                                     \
+  static inline void KASTARRI_SEMANTIC(OP)(const Units* a, const PredicateUnit* p, Unit* r) { \
+    Write<R>(r).put(0, RULE(sum<L>(a, p)));                                                   \
   }
 
 #include "integer/reductions.def"

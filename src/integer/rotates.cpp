@@ -35,7 +35,9 @@ constexpr U leading_zeros(U x) {
 
 constexpr auto NSAU = [](auto x) { return leading_zeros(x); };
 // The zero bits above the highest bit that differs from the sign, less the sign itself.
-constexpr auto NSA = [](auto x) { return leading_zeros(unsigned_bits(static_cast<decltype(x)>(x ^ sign_fill(x)))) - 1; };
+constexpr auto NSA = [](auto x) {
+  return leading_zeros(unsigned_bits(static_cast<decltype(x)>(x ^ sign_fill(x)))) - 1;
+};
 
 }  // namespace
 

@@ -4,9 +4,9 @@
 
 // One immediate for all lanes.
 #define SIG_a_i_r(SYMBOL, T, K) T SYMBOL(const T& a, immediate i)
-#define BODY_a_i_r(T, K)                                  \
-  T r;                                                    \
-  KASTARRI_SEMANTIC(K)(a._, static_cast<word>(i), r._);   \
+#define BODY_a_i_r(T, K)                                \
+  T r;                                                  \
+  KASTARRI_SEMANTIC(K)(a._, static_cast<word>(i), r._); \
   return r;
 
 #define SIG_a_i_r_T(SYMBOL, T, P, K) void SYMBOL(T& r, const T& a, immediate i, const P& p)
@@ -14,9 +14,9 @@
 
 // A value that depends on nothing.
 #define SIG_value_r(SYMBOL, T, K) T SYMBOL()
-#define BODY_value_r(T, K)        \
-  T r;                            \
-  KASTARRI_SEMANTIC(K)(r._);      \
+#define BODY_value_r(T, K)   \
+  T r;                       \
+  KASTARRI_SEMANTIC(K)(r._); \
   return r;
 
 // A whole register to one value, over all lanes or over the enabled ones.
@@ -24,16 +24,16 @@
 #define BODY_reduce(R, T, K) BODY_a_r(R, K)
 
 #define SIG_reduce_T(SYMBOL, R, T, P, K) R SYMBOL(const T& a, const P& p)
-#define BODY_reduce_T(R, T, P, K)         \
-  R r;                                    \
-  KASTARRI_SEMANTIC(K)(a._, p._, r._);    \
+#define BODY_reduce_T(R, T, P, K)      \
+  R r;                                 \
+  KASTARRI_SEMANTIC(K)(a._, p._, r._); \
   return r;
 
 // A predicate from a count of lanes.
 #define SIG_n_p(SYMBOL, P, COUNT, K) P SYMBOL(COUNT n)
-#define BODY_n_p(P, COUNT, K)        \
-  P r;                               \
-  KASTARRI_SEMANTIC(K)(n, r._);      \
+#define BODY_n_p(P, COUNT, K)   \
+  P r;                          \
+  KASTARRI_SEMANTIC(K)(n, r._); \
   return r;
 
 #endif

@@ -19,7 +19,8 @@ constexpr auto SRL = [](auto x, auto count) { return SLL(x, static_cast<decltype
 template <class T>
 struct ScaledSigned {
   using U = std::make_unsigned_t<T>;
-  ScaledSigned(T x, U count) : sign(unsigned_bits(sign_fill(x))), folded(static_cast<U>(unsigned_bits(x) ^ sign), count) {}
+  ScaledSigned(T x, U count)
+      : sign(unsigned_bits(sign_fill(x))), folded(static_cast<U>(unsigned_bits(x) ^ sign), count) {}
 
   // (-1 - f) * p is -1 - (f * p + p - 1).
   U left() const { return static_cast<U>(folded.low + (static_cast<U>(folded.power - 1u) & sign)); }

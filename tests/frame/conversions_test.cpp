@@ -1,107 +1,108 @@
 // Conversions between registers and from and to host scalars: the exported function, and with it the
 // constructor, assignment and conversion operator, which all have to give the same bits.
-#include <climits>
-
+#include "frame/convert.h"
 #include "support/drivers.h"
 
 namespace {
 
 using namespace testing_support;
 
-template <class L>
-constexpr bool is_spill = std::is_same_v<L, packed1536>;
+// A conversion with its types erased: the image of the source to that of the result, by the exported function
+// and by each form that C++ offers.
+struct Conversion {
+  Format from, to;
+  bool from_spill, to_spill;
+  std::function<std::vector<Image>(const void*)> results;
+};
 
-// Lane i of a wide register, found bit by bit in its packed image.
-template <class Wide>
-void unpack(const void* image, void* wide) {
-  const auto* bytes = static_cast<const unsigned char*>(image);
-  for (int i = 0; i < Wide::count; ++i) {
-    Int value = 0;
-    for (int b = Wide::bits; b-- > 0;) {
-      const int bit = i * Wide::bits + b;
-      value = 2 * value + (bytes[bit / 8] >> (bit % 8) & 1);
+template <class To>
+Image image_of(const To& to) {
+  Image image = {};
+  std::memcpy(image.bytes, to._, sizeof to._);
+  return image;
+}
+
+// Bit b of lane i is bit w * i + b of an image without padding: found and set one by one.
+void copy_bits(const Conversion& c, const unsigned char* from, unsigned char* to) {
+  const Format& wide = c.from_spill ? c.to : c.from;
+  for (int i = 0; i < wide.count; ++i) {
+    Int value = c.from_spill ? 0 : lane(wide, from, i);
+    for (int b = 0; b < wide.bits; ++b) {
+      const int bit = i * wide.bits + b;
+      if (c.from_spill)
+        value |= Int{from[bit / 8] >> (bit % 8) & 1} << b;
+      else if (value >> b & 1)
+        to[bit / 8] = static_cast<unsigned char>(to[bit / 8] | 1 << bit % 8);
     }
-    set_lane<Wide>(wide, i, value);
+    if (c.from_spill) set_lane(wide, to, i, value);
   }
 }
 
-template <class From, class To>
-To expected_register(const From& from) {
-  using F = layout_of<From>;
-  using T = layout_of<To>;
-  To to = filled<To>(0);
-  if constexpr (is_spill<F>) {
-    unpack<T>(from._, to._);
-  } else if constexpr (is_spill<T>) {
-    auto* bytes = reinterpret_cast<unsigned char*>(to._);
-    for (int bit = 0; bit < 1536; ++bit)
-      if (lane<F>(from._, bit / F::bits) >> (bit % F::bits) & 1)
-        bytes[bit / 8] = static_cast<unsigned char>(bytes[bit / 8] | 1 << bit % 8);
-  } else {
-    for (int i = 0; i < T::count; ++i) set_lane<T>(to._, i, lane<F>(from._, F::count == T::count ? i : 0));
-  }
-  return to;
-}
-
-template <class From, class To>
-void drive_rtor(const char* name, To (*f)(const From&)) {
+void drive(const Conversion& c) {
   std::mt19937 random(seed);
-  const auto values = corners<std::conditional_t<is_spill<layout_of<From>>, i16x32, layout_of<From>>>();
+  const std::vector<Int> values = corners(c.from);
   for (std::size_t n = 0; n < values.size() + 50; ++n) {
-    From from;
-    fill_random<layout_of<From>>(from._, random);
-    if (n < values.size() && !is_spill<layout_of<From>>) set_lane<layout_of<From>>(from._, 0, values[n]);
-    const To expected = expected_register<From, To>(from);
+    Image from, expected = {};
+    fill_random(c.from, from.bytes, random);
+    if (n < values.size()) set_lane(c.from, from.bytes, 0, values[n]);
+    if (c.from_spill || c.to_spill) {
+      copy_bits(c, from.bytes, expected.bytes);
+    } else {
+      for (int i = 0; i < c.to.count; ++i)
+        set_lane(c.to, expected.bytes, i, lane(c.from, from.bytes, c.from.count == c.to.count ? i : 0));
+    }
+    for (const Image& got : c.results(from.bytes))
+      ASSERT_EQ(std::memcmp(got.bytes, expected.bytes, sizeof got.bytes), 0)
+          << "of lane 0 = " << lane(c.from, from.bytes, 0);
+  }
+}
+
+template <class From, class To>
+Conversion conversion(std::function<std::vector<Image>(const void*)> results) {
+  return {format_of<From>(), format_of<To>(), std::is_same_v<From, packed1536>, std::is_same_v<To, packed1536>,
+          std::move(results)};
+}
+
+template <class From, class To>
+void drive_rtor(To (*f)(const From&)) {
+  drive(conversion<layout_of<From>, layout_of<To>>([f](const void* image) {
+    const From from = as_register<From>(image);
     To assigned;
     assigned = from;
-    const To constructed(from);
-    ASSERT_TRUE(same_bits(f(from), expected)) << name << " of lane 0 = " << lane<layout_of<From>>(from._, 0);
-    ASSERT_TRUE(same_bits(constructed, expected) && same_bits(assigned, expected) &&
-                same_bits(static_cast<To>(from), expected) && same_bits(from.operator To(), expected))
-        << name << ": constructor, assignment and operator";
-  }
-}
-
-template <class H>
-std::vector<H> host_values() {
-  std::vector<H> values;
-  for (Int v : corners<i64x1>()) values.push_back(static_cast<H>(v));
-  return values;
+    return std::vector<Image>{image_of(f(from)), image_of(assigned), image_of(To(from)), image_of(from.operator To())};
+  }));
 }
 
 template <class H, class To>
-void drive_from_host(const char* name, To (*f)(H)) {
-  using T = layout_of<To>;
-  for (H value : host_values<H>()) {
-    To expected = filled<To>(0);
-    for (int i = 0; i < T::count; ++i) set_lane<T>(expected._, i, static_cast<Int>(value));
+void drive_from_host(To (*f)(H)) {
+  drive(conversion<host_layout<H>, layout_of<To>>([f](const void* image) {
+    H value;
+    std::memcpy(&value, image, sizeof value);
     To assigned;
     assigned = value;
-    ASSERT_TRUE(same_bits(f(value), expected) && same_bits(To(value), expected) && same_bits(assigned, expected))
-        << name << " of " << static_cast<Int>(value);
-  }
+    return std::vector<Image>{image_of(f(value)), image_of(assigned), image_of(To(value))};
+  }));
 }
 
 template <class From, class H>
-void drive_to_host(const char* name, H (*f)(const From&)) {
-  std::mt19937 random(seed);
-  for (Int value : corners<layout_of<From>>()) {
-    From from;
-    fill_random<layout_of<From>>(from._, random);
-    set_lane<layout_of<From>>(from._, 0, value);
-    ASSERT_EQ(f(from), static_cast<H>(value)) << name;
-  }
+void drive_to_host(H (*f)(const From&)) {
+  drive(conversion<layout_of<From>, host_layout<H>>([f](const void* image) {
+    const H value = f(as_register<From>(image));
+    Image result = {};
+    std::memcpy(result.bytes, &value, sizeof value);
+    return std::vector<Image>{result};
+  }));
 }
 
 // Single precision and its register hold the same bits.
 template <class From>
-void drive_to_host(const char*, float (*f)(const From&)) {
+void drive_to_host(float (*f)(const From&)) {
   From from = filled<From>(0);
   from._[0] = 0xC2280000;
   EXPECT_EQ(f(from), -42.0f);
 }
 template <class To>
-void drive_from_host(const char*, To (*f)(float)) {
+void drive_from_host(To (*f)(float)) {
   const To to = f(-42.0f);
   for (unsigned bits : to._) EXPECT_EQ(bits, 0xC2280000);
 }
@@ -109,9 +110,9 @@ void drive_from_host(const char*, To (*f)(float)) {
 }  // namespace
 
 #define KASTARRI_TEST_SUITE "conversions"
-#define TEST_rtor(NAME, F, FROM, TO) drive_rtor(NAME, F)
-#define TEST_from_host(NAME, F, H, TO) drive_from_host(NAME, F)
-#define TEST_to_host(NAME, F, FROM, H) drive_to_host(NAME, F)
+#define TEST_rtor(NAME, F, FROM, TO) drive_rtor(F)
+#define TEST_from_host(NAME, F, H, TO) drive_from_host(F)
+#define TEST_to_host(NAME, F, FROM, H) drive_to_host(F)
 #include "support/drivers_begin.h"
 
 #include "frame/conversions.def"

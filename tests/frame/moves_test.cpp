@@ -34,57 +34,63 @@ constexpr int offsets[] = {0, 1, 3, 64, -64, -37};
 
 // A pointer as the core has it: any address, whatever the type says.
 template <class M>
-M* pointer_to(unsigned char* address) {
+M* pointer_to(const void* address) {
   return reinterpret_cast<M*>(reinterpret_cast<std::uintptr_t>(address));
 }
 
+// An access under test with its types erased: base, offset or increment, register image. Post-increment
+// forms return where the pointer is afterwards.
+using Access = std::function<const void*(const void* base, int offset, void* value)>;
+
 template <class V, class M>
-void drive_load(V (*f)(const M*, int)) {
+Access access(V (*load)(const M*, int)) {
+  return [load](const void* base, int offset, void* value) {
+    const V v = load(pointer_to<const M>(base), offset);
+    std::memcpy(value, v._, sizeof v._);
+    return base;
+  };
+}
+template <class V, class M>
+Access access(void (*load)(V&, const M**, int)) {
+  return [load](const void* base, int increment, void* value) {
+    const auto* pointer = pointer_to<const M>(base);
+    V v;
+    load(v, &pointer, increment);
+    std::memcpy(value, v._, sizeof v._);
+    return static_cast<const void*>(pointer);
+  };
+}
+template <class V, class M>
+Access access(void (*store)(const V&, const M*, int)) {
+  return [store](const void* base, int offset, void* value) {
+    store(as_register<V>(value), pointer_to<const M>(base), offset);
+    return base;
+  };
+}
+template <class V, class M>
+Access access(void (*store)(const V&, M**, int)) {
+  return [store](const void* base, int increment, void* value) {
+    auto* pointer = pointer_to<M>(base);
+    store(as_register<V>(value), &pointer, increment);
+    return static_cast<const void*>(pointer);
+  };
+}
+
+// Copies `bytes` bytes at every misalignment, for offsets and increments of either sign.
+void drive_copy(std::size_t bytes, bool stores, bool increments, const Access& copy) {
   for (int misalignment = 0; misalignment < 8; ++misalignment)
     for (int offset : offsets) {
       Memory memory;
-      const V v = f(pointer_to<const M>(memory.at(misalignment)), offset);
-      ASSERT_EQ(std::memcmp(v._, memory.old(misalignment + offset), sizeof v._), 0) << misalignment << " " << offset;
-      ASSERT_TRUE(memory.unchanged_but(0, 0));
-    }
-}
-
-template <class V, class M>
-void drive_load_IP(void (*f)(V&, const M**, int)) {
-  for (int misalignment = 0; misalignment < 8; ++misalignment)
-    for (int increment : offsets) {
-      Memory memory;
-      const M* pointer = pointer_to<const M>(memory.at(misalignment));
-      V v;
-      f(v, &pointer, increment);
-      ASSERT_EQ(std::memcmp(v._, memory.old(misalignment), sizeof v._), 0);
-      ASSERT_EQ(static_cast<const void*>(pointer), memory.at(misalignment + increment));
-    }
-}
-
-template <class V, class M>
-void drive_store(void (*f)(const V&, const M*, int)) {
-  for (int misalignment = 0; misalignment < 8; ++misalignment)
-    for (int offset : offsets) {
-      Memory memory;
-      const V v = filled<V>(0xA5);
-      f(v, pointer_to<const M>(memory.at(misalignment)), offset);
-      ASSERT_EQ(std::memcmp(v._, memory.at(misalignment + offset), sizeof v._), 0);
-      ASSERT_TRUE(memory.unchanged_but(misalignment + offset, sizeof v._));
-    }
-}
-
-template <class V, class M>
-void drive_store_IP(void (*f)(const V&, M**, int)) {
-  for (int misalignment = 0; misalignment < 8; ++misalignment)
-    for (int increment : offsets) {
-      Memory memory;
-      const V v = filled<V>(0xA5);
-      M* pointer = pointer_to<M>(memory.at(misalignment));
-      f(v, &pointer, increment);
-      ASSERT_EQ(std::memcmp(v._, memory.at(misalignment), sizeof v._), 0);
-      ASSERT_TRUE(memory.unchanged_but(misalignment, sizeof v._));
-      ASSERT_EQ(static_cast<const void*>(pointer), memory.at(misalignment + increment));
+      Image value;
+      std::memset(value.bytes, 0xA5, sizeof value.bytes);
+      const void* after = copy(memory.at(misalignment), offset, value.bytes);
+      const int place = increments ? misalignment : misalignment + offset;
+      const void* expected = stores ? memory.at(place) : memory.old(place);
+      ASSERT_EQ(std::memcmp(value.bytes, expected, bytes), 0) << "at " << misalignment << " + " << offset;
+      ASSERT_TRUE(memory.unchanged_but(place, stores ? bytes : 0));
+      if (increments) {
+        ASSERT_EQ(after, memory.at(misalignment + offset));
+      }
     }
 }
 
@@ -96,114 +102,97 @@ void drive_move(T (*f)(const T&)) {
   EXPECT_TRUE(same_bits(f(from), from));
 }
 
-// Where a conversion finds its element: a host scalar's address is rounded down to its size.
+// What lies on one side of a conversion: the format of its lanes, or bits packed without padding.
+struct Side {
+  Format format;
+  int bytes;
+  bool is_register;
+  bool is_spill;
+
+  // Where a conversion finds it: a host scalar's address is rounded down to its size.
+  int rounded(int offset) const { return is_register ? offset : offset - ((offset % bytes) + bytes) % bytes; }
+};
+
 template <class M>
-int element_offset(int offset) {
-  const int size = sizeof(M);
-  return std::is_class_v<M> ? offset : offset - ((offset % size) + size) % size;
+constexpr Side side_of() {
+  using L = memory_layout<M>;
+  return {format_of<L>(), sizeof(M), std::is_class_v<M>, std::is_same_v<L, packed1536>};
 }
 
-template <class Packed>
-constexpr bool is_spill = std::is_same_v<Packed, packed1536>;
+// Lane i of w bits in an image without padding.
+Int packed_lane(const unsigned char* image, int w, int i) {
+  Int value = 0;
+  for (int bit = (i + 1) * w; bit-- > i * w;) value = 2 * value + (image[bit / 8] >> (bit % 8) & 1);
+  return value;
+}
 
-template <class Reg, class Mem>
-void drive_mtor(const char* name, Reg (*f)(const Mem*, int)) {
-  using R = layout_of<Reg>;
-  using M = memory_layout<Mem>;
+void drive_mtor(const Side& reg, const Side& mem, const Access& load) {
   for (int offset = -9; offset <= 9; ++offset) {
     Memory memory;
-    const Reg got = f(pointer_to<const Mem>(memory.at(offset / 2)), offset - offset / 2);
-    const unsigned char* element = memory.old(element_offset<Mem>(offset));
-    Reg expected = filled<Reg>(0);
-    for (int i = 0; i < R::count; ++i) {
-      Int value = 0;
-      if constexpr (is_spill<M>) {
-        for (int b = 0; b < R::bits; ++b) {
-          const int bit = i * R::bits + b;
-          value |= Int{element[bit / 8] >> (bit % 8) & 1} << b;
-        }
-      } else {
-        value = lane<M>(element, M::count == R::count ? i : 0);
-      }
-      if constexpr (!is_spill<R>) set_lane<R>(expected._, i, value);
+    Image got = {}, expected = {};
+    load(memory.at(offset / 2), offset - offset / 2, got.bytes);
+    const unsigned char* element = memory.old(mem.rounded(offset));
+    for (int i = 0; i < reg.format.count; ++i) {
+      const Int value = mem.is_spill ? packed_lane(element, reg.format.bits, i)
+                                     : lane(mem.format, element, mem.format.count == reg.format.count ? i : 0);
+      set_lane(reg.format, expected.bytes, i, value);
     }
-    ASSERT_TRUE(same_bits(got, expected)) << name << " at " << offset;
-    ASSERT_TRUE(memory.unchanged_but(0, 0)) << name;
-  }
-}
-
-// Lanes of 128 and 256 bits are no numbers; they are copied.
-template <class Reg, class Mem>
-void drive_whole_lane(void (*store)(const Reg&, const Mem*, int), Reg (*load)(const Mem*, int)) {
-  Memory memory;
-  if (load) {
-    const Reg got = load(pointer_to<const Mem>(memory.at(3)), 2);
-    EXPECT_EQ(std::memcmp(got._, memory.old(5), sizeof got._), 0);
-  } else {
-    const Reg value = filled<Reg>(0x3C);
-    store(value, pointer_to<const Mem>(memory.at(3)), 2);
-    EXPECT_EQ(std::memcmp(value._, memory.at(5), std::min(sizeof(Reg), sizeof(Mem))), 0);
-    EXPECT_TRUE(memory.unchanged_but(5, sizeof(Mem)));
+    ASSERT_EQ(std::memcmp(got.bytes, expected.bytes, sizeof got.bytes), 0) << "at " << offset;
+    ASSERT_TRUE(memory.unchanged_but(0, 0));
   }
 }
 
 // What a lane becomes in memory. Narrower signed memory saturates, but for the images of accumulators.
-template <class R, class M>
-Int stored_value(Int value) {
-  constexpr bool image = R::count > 1 && R::count == M::count && (R::bits == 24 || R::bits == 48);
-  if (image || M::bits >= R::bits || !std::is_signed_v<typename M::container>) return value;
-  using Limits = std::numeric_limits<typename M::container>;
-  return std::clamp<Int>(value, Limits::min(), Limits::max());
+Int stored_value(const Format& reg, const Format& mem, Int value) {
+  const bool image = reg.count > 1 && reg.count == mem.count && (reg.bits == 24 || reg.bits == 48);
+  if (image || mem.bits >= reg.bits || !mem.is_signed) return value;
+  const Int bound = Int{1} << (mem.bits - 1);
+  return std::clamp(value, -bound, bound - 1);
 }
 
-template <class Reg, class Mem>
-void drive_rtom(const char* name, void (*f)(const Reg&, const Mem*, int)) {
-  using R = layout_of<Reg>;
-  using M = memory_layout<Mem>;
+void drive_rtom(const Side& reg, const Side& mem, const Access& store) {
   std::mt19937 random(seed);
-  for (Int corner : corners<R>()) {
+  for (Int corner : corners(reg.format)) {
     const int offset = static_cast<int>(random() % 19) - 9;
     Memory memory;
-    Reg value;
-    fill_random<R>(value._, random);
-    set_lane<R>(value._, 0, corner);
-    f(value, pointer_to<const Mem>(memory.at(offset / 2)), offset - offset / 2);
-    const int element = element_offset<Mem>(offset);
-    if constexpr (is_spill<M>) {
-      for (int bit = 0; bit < 1536; ++bit)
-        ASSERT_EQ(memory.at(element)[bit / 8] >> (bit % 8) & 1, lane<R>(value._, bit / R::bits) >> (bit % R::bits) & 1)
-            << name;
-    } else {
-      for (int i = 0; i < M::count; ++i) {
-        const Int expected = as_lane<M>(stored_value<R, M>(lane<R>(value._, i)));
-        ASSERT_EQ(lane<M>(memory.at(element), i), expected) << name << " lane " << i << " = " << lane<R>(value._, i);
-      }
+    Image value;
+    fill_random(reg.format, value.bytes, random);
+    set_lane(reg.format, value.bytes, 0, corner);
+    store(memory.at(offset / 2), offset - offset / 2, value.bytes);
+    const int element = mem.rounded(offset);
+    for (int i = 0; i < (mem.is_spill ? reg.format.count : mem.format.count); ++i) {
+      const Int from = lane(reg.format, value.bytes, i);
+      const Int got = mem.is_spill ? as_lane(reg.format, packed_lane(memory.at(element), reg.format.bits, i))
+                                   : lane(mem.format, memory.at(element), i);
+      const Int expected = mem.is_spill ? from : as_lane(mem.format, stored_value(reg.format, mem.format, from));
+      ASSERT_EQ(got, expected) << "lane " << i << " = " << from;
     }
-    ASSERT_TRUE(memory.unchanged_but(element, sizeof(Mem))) << name << " at " << offset;
+    ASSERT_TRUE(memory.unchanged_but(element, static_cast<std::size_t>(mem.bytes))) << "at " << offset;
   }
 }
 
-template <class T>
-constexpr bool is_wide_lane = layout_of<T>::bits > 64;
+// Lanes of 128 and 256 bits are no numbers: the bytes of the first one are copied.
+void drive_whole_lane(const Side& reg, const Side& mem, bool stores, const Access& copy) {
+  drive_copy(static_cast<std::size_t>(std::min(reg.bytes, mem.bytes)), stores, false, copy);
+}
+
+template <class Reg, class Mem>
+void drive_conversion(bool stores, const Access& copy) {
+  constexpr Side reg = side_of<Reg>(), mem = side_of<Mem>();
+  if (layout_of<Reg>::bits > 64) return drive_whole_lane(reg, mem, stores, copy);
+  stores ? drive_rtom(reg, mem, copy) : drive_mtor(reg, mem, copy);
+}
 
 }  // namespace
 
 #define KASTARRI_TEST_SUITE "moves"
-#define TEST_load_I(NAME, F, V, M, K) drive_load(F)
-#define TEST_load_IP(NAME, F, V, M, K) drive_load_IP(F)
-#define TEST_store_I(NAME, F, V, M, K) drive_store(F)
-#define TEST_store_IP(NAME, F, V, M, K) drive_store_IP(F)
+#define TEST_load_I(NAME, F, V, M, K) drive_copy(sizeof(V), false, false, access(F))
+#define TEST_load_IP(NAME, F, V, M, K) drive_copy(sizeof(V), false, true, access(F))
+#define TEST_store_I(NAME, F, V, M, K) drive_copy(sizeof(V), true, false, access(F))
+#define TEST_store_IP(NAME, F, V, M, K) drive_copy(sizeof(V), true, true, access(F))
 #define TEST_move(NAME, F, T) drive_move(F)
-#define TEST_mtor(NAME, F, REG, MEM)        \
-  if constexpr (is_wide_lane<REG>)          \
-    drive_whole_lane<REG, MEM>(nullptr, F); \
-  else                                      \
-    drive_mtor(NAME, F)
-#define TEST_rtom(NAME, F, REG, MEM)        \
-  if constexpr (is_wide_lane<REG>)          \
-    drive_whole_lane<REG, MEM>(F, nullptr); \
-  else                                      \
-    drive_rtom(NAME, F)
+#define TEST_mtor(NAME, F, REG, MEM) drive_conversion<REG, MEM>(false, access(F))
+#define TEST_rtom(NAME, F, REG, MEM) drive_conversion<REG, MEM>(true, access(F))
 #include "support/drivers_begin.h"
 
 #include "frame/memory_conversions.def"

@@ -45,8 +45,10 @@ void drive_whole(const std::string& name, Rule rule, R (*f)(const P&)) {
   for (int n = -1; n < L::count + 100; ++n) {
     for (unsigned char fill : {0, 0xFF}) {
       P p = filled<P>(fill);
-      if (n >= L::count) fill_random<L>(p._, random);
-      else if (n >= 0) set_lane<L>(p._, n, !fill);
+      if (n >= L::count)
+        fill_random<L>(p._, random);
+      else if (n >= 0)
+        set_lane<L>(p._, n, !fill);
       int ones = 0;
       for (int i = 0; i < L::count; ++i) ones += static_cast<int>(lane<L>(p._, i));
       ASSERT_EQ(f(p)._[0], rule(ones, L::count)) << name << " of " << ones << " ones, round " << n;

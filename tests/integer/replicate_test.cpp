@@ -6,7 +6,8 @@ namespace testing_support {
 template <class L, class T, class Call>
 void drive_replicate(const std::string& name, Call call) {
   std::mt19937 random(seed);
-  std::vector<int> numbers = {-1, -L::count, -L::count - 1, 1000003, std::numeric_limits<int>::min(), std::numeric_limits<int>::max()};
+  std::vector<int> numbers = {
+      -1, -L::count, -L::count - 1, 1000003, std::numeric_limits<int>::min(), std::numeric_limits<int>::max()};
   for (int i = 0; i <= 2 * L::count; ++i) numbers.push_back(i);
   for (int number : numbers) {
     T a;

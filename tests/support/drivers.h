@@ -30,58 +30,48 @@ constexpr Model<R, Rule, Ls...> model_of(Rule rule) {
   return {rule};
 }
 
-template <class T>
-T as_register(const void* image) {
-  T v;
-  std::memcpy(v._, image, sizeof v._);
-  return v;
-}
+// Compares lanes, then the whole image of `bytes` bytes: nothing but the lanes may differ from the canonical
+// form. `operands_of(i)` says what lane i was computed from.
+void expect_image(const std::string& name, int round, const Format& format, const Int* expected, const void* got,
+                  std::size_t bytes, const std::function<std::string(int)>& operands_of);
 
-// Compares lanes, then the whole image: nothing but the lanes may differ from the canonical form.
 template <class L, class T>
 void expect_lanes(const std::string& name, int round, const Int (&expected)[L::count], const T& got,
                   const std::function<std::string(int)>& operands_of) {
-  T image = filled<T>(0);
-  for (int i = 0; i < L::count; ++i) set_lane<L>(image._, i, expected[i]);
-  if (same_bits(image, got)) return;
-  for (int i = 0; i < L::count; ++i) {
-    if (lane<L>(image._, i) != lane<L>(got._, i)) {
-      FAIL() << name << " [" << cstub_Km_ZNB_Orbis_R5_64k_target() << ", seed " << seed << ", round " << round
-             << "] lane " << i << ": " << operands_of(i) << " expected " << lane<L>(image._, i) << ", got "
-             << lane<L>(got._, i);
-    }
-  }
-  FAIL() << name << " [" << cstub_Km_ZNB_Orbis_R5_64k_target() << ", round " << round
-         << "]: lanes are right, bits outside them are not";
+  expect_image(name, round, format_of<L>(), expected, got._, sizeof got._, operands_of);
 }
+
+// An operation to check: formats, the model's rule on the operands' lanes, the call, and what replaces
+// expected lanes afterwards (predicated forms keep some of their destination's).
+struct Operation {
+  std::string name;
+  Format result;
+  std::vector<Format> operands;
+  std::function<Int(const Int*)> rule;
+  std::function<std::size_t(const Image*, void*)> call;  // writes the result's image, returns its size
+  std::function<void(int, Int*)> adjust;
+};
+
+// Calls the operation for every round of operands and compares every lane.
+void check(const Operation& operation);
 
 template <class Rule, std::size_t... I>
 Int apply(const Rule& rule, const Int* values, std::index_sequence<I...>) {
   return static_cast<Int>(rule(values[I]...));
 }
 
-// Calls `call(images)`, which returns the result register, for every round of operands. `adjust` may
-// replace expected lanes: predicated forms keep some of their destination's.
 template <class R, class Rule, class... Ls, class Call, class Adjust>
 void check(const std::string& name, const Model<R, Rule, Ls...>& model, Call call, Adjust adjust) {
-  Operands<Ls...> operands;
-  for (int n = 0; n < operands.rounds(); ++n) {
-    const auto* images = operands.round(n);
-    Int expected[R::count];
-    for (int i = 0; i < R::count; ++i) {
-      const auto* image = images;
-      const Int values[] = {lane<Ls>((image++)->bytes, i)...};
-      expected[i] = apply(model.rule, values, std::index_sequence_for<Ls...>{});
-    }
-    adjust(n, expected);
-    expect_lanes<R>(name, n, expected, call(images), [&](int i) {
-      const auto* image = images;
-      std::string text;
-      ((text += (text.empty() ? "(" : ", ") + std::to_string(lane<Ls>((image++)->bytes, i))), ...);
-      return text + ")";
-    });
-    if (testing::Test::HasFatalFailure()) return;
-  }
+  check(Operation{name,
+                  format_of<R>(),
+                  {format_of<Ls>()...},
+                  [&model](const Int* values) { return apply(model.rule, values, std::index_sequence_for<Ls...>{}); },
+                  [&call](const Image* images, void* result) {
+                    const auto r = call(images);
+                    std::memcpy(result, r._, sizeof r._);
+                    return sizeof r._;
+                  },
+                  adjust});
 }
 
 template <class Model, class Call>
@@ -172,25 +162,10 @@ void drive_ab_r_T(const std::string& name, const Model& model, void (*f)(R&, con
 }
 
 // The operation of a symbol: ADDNX16 of rk_zra32_ZRA_ADDNX16, and any other name as it is.
-inline const char* operation(const char* symbol) {
-  const char* found = std::strstr(symbol, "_ZRA_");
-  return found ? found + 5 : symbol;
-}
+const char* operation(const char* symbol);
 
 // Registers a test of an exported function by its operation's name.
-inline int add_test(const char* suite, const char* name, std::function<void()> body) {
-  class Row : public testing::Test {
-   public:
-    explicit Row(std::function<void()> body) : body_(std::move(body)) {}
-    void TestBody() override { body_(); }
-
-   private:
-    std::function<void()> body_;
-  };
-  testing::RegisterTest(suite, name, nullptr, nullptr, __FILE__, __LINE__,
-                        [body = std::move(body)]() -> testing::Test* { return new Row(body); });
-  return 0;
-}
+int add_test(const char* suite, const char* name, std::function<void()> body);
 
 }  // namespace testing_support
 

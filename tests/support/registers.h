@@ -1,4 +1,5 @@
-// Registers as numbers: lanes read and written byte by byte, by another route than the library's.
+// Registers as numbers: lanes read and written byte by byte, by another route than the library's. What can be
+// is compiled once, for a format known at run time: there are thousands of intrinsics to test.
 #ifndef KASTARRI_TESTS_REGISTERS_H
 #define KASTARRI_TESTS_REGISTERS_H
 
@@ -12,24 +13,39 @@ namespace testing_support {
 
 using Int = std::int64_t;
 
-// Lane i of a register image as a number of the layout. A predicate's lanes are its bits.
+// A layout as a value.
+struct Format {
+  int bits;             // a lane's own
+  int container_bytes;  // what it takes in memory; a predicate's lanes are packed bits
+  int count;
+  bool is_signed;
+  bool is_predicate;
+};
+
 template <class L>
-Int lane(const void* image, int i) {
-  const auto* bytes = static_cast<const unsigned char*>(image);
-  if (std::is_same_v<typename L::number, predicate_bit>) return bytes[i / 8] >> (i % 8) & 1;
-  constexpr int size = sizeof(typename L::container);
-  std::uint64_t bits = 0;
-  for (int b = size; b-- > 0;) bits = bits << 8 | bytes[i * size + b];
-  if (L::bits < 64) {
-    bits %= std::uint64_t{1} << L::bits % 64;
-    if (std::is_signed_v<typename L::container> && bits >> (L::bits - 1)) bits -= std::uint64_t{1} << L::bits % 64;
-  }
-  return static_cast<Int>(bits);
+constexpr Format format_of() {
+  return {L::bits, sizeof(typename L::container), L::count, std::is_signed_v<typename L::container>,
+          std::is_same_v<typename L::number, predicate_bit>};
 }
 
+// Lane i of a register image as a number.
+Int lane(const Format& format, const void* image, int i);
+
 // Writes a lane in the form that the library has to leave it in: extended to its container.
+void set_lane(const Format& format, void* image, int i, Int value);
+
+// The value as a lane of the format holds it: its low bits, extended.
+Int as_lane(const Format& format, Int value);
+
+template <class L>
+Int lane(const void* image, int i) {
+  return lane(format_of<L>(), image, i);
+}
 template <class L>
 void set_lane(void* image, int i, Int value) {
+<<<<<<< HEAD
+  set_lane(format_of<L>(), image, i, value);
+=======
   auto* bytes = static_cast<unsigned char*>(image);
   if (std::is_same_v<typename L::number, predicate_bit>) {
     bytes[i / 8] = static_cast<unsigned char>((bytes[i / 8] & ~(1 << i % 8)) | static_cast<int>(value & 1) << i % 8);
@@ -42,15 +58,13 @@ void set_lane(void* image, int i, Int value) {
     bits %= range;
     if (std::is_signed_v<typename L::container> && bits >= range / 2) bits -= range;
   }
-  for (int b = 0; b < size; ++b) bytes[i * size + b] = static_cast<unsigned char>(bits >> (8 * b));
+  // A container of more than 64 bits holds the value over and over.
+  for (int b = 0; b < size; ++b) bytes[i * size + b] = static_cast<unsigned char>(bits >> (8 * (b % 8)));
+>>>>>>> scalar
 }
-
-// The value as a lane of the layout holds it: its low bits, extended.
 template <class L>
 Int as_lane(Int value) {
-  unsigned char image[sizeof(typename L::container)] = {};
-  set_lane<Layout<typename L::container, L::bits, 1, typename L::number>>(image, 0, value);
-  return lane<Layout<typename L::container, L::bits, 1, typename L::number>>(image, 0);
+  return as_lane(format_of<L>(), value);
 }
 
 template <class T>
@@ -62,6 +76,13 @@ template <class T>
 T filled(unsigned char byte) {
   T v;
   std::memset(v._, byte, sizeof v._);
+  return v;
+}
+
+template <class T>
+T as_register(const void* image) {
+  T v;
+  std::memcpy(v._, image, sizeof v._);
   return v;
 }
 

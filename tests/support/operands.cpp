@@ -20,7 +20,7 @@ std::vector<Int> corners(const Format& format) {
   for (Int v = -3; v <= 3; ++v) values.push_back(as_lane(format, v));
   for (Int v : {-70, -40, -33, -32, -31, -20, -17, -16, -15, -8, 7, 8, 15, 16, 17, 31, 32, 33, 40, 64, 70, 1000})
     values.push_back(as_lane(format, v));
-  for (int k = 2; k < format.bits; ++k)
+  for (int k = 2; k < std::min(format.bits, 64); ++k)
     for (std::uint64_t neighbour : {std::uint64_t{1} << k, (std::uint64_t{1} << k) - 1, (std::uint64_t{1} << k) + 1})
       values.push_back(as_lane(format, static_cast<Int>(neighbour)));
   for (std::uint64_t pattern : {0x5555555555555555u, 0xAAAAAAAAAAAAAAAAu, 0x123456789ABCDEFu})

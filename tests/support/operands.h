@@ -21,26 +21,7 @@ void fill_random(const Format& format, void* image, std::mt19937& random);
 
 template <class L>
 std::vector<Int> corners() {
-<<<<<<< HEAD
   return corners(format_of<L>());
-=======
-  std::vector<Int> values;
-  if (L::bits <= 8) {
-    for (Int v = 0; v < Int{1} << L::bits % 64; ++v) values.push_back(as_lane<L>(v));
-    return values;
-  }
-  for (Int v = -3; v <= 3; ++v) values.push_back(as_lane<L>(v));
-  for (Int v : {-70, -40, -33, -32, -31, -20, -17, -16, -15, -8, 7, 8, 15, 16, 17, 31, 32, 33, 40, 64, 70, 1000})
-    values.push_back(as_lane<L>(v));
-  for (int k = 2; k < std::min(L::bits, 64); ++k)
-    for (Int d = -1; d <= 1; ++d)
-      values.push_back(as_lane<L>(static_cast<Int>((std::uint64_t{1} << k) + static_cast<std::uint64_t>(d))));
-  for (std::uint64_t pattern : {0x5555555555555555u, 0xAAAAAAAAAAAAAAAAu, 0x123456789ABCDEFu})
-    values.push_back(as_lane<L>(static_cast<Int>(pattern)));
-  std::sort(values.begin(), values.end());
-  values.erase(std::unique(values.begin(), values.end()), values.end());
-  return values;
->>>>>>> scalar
 }
 template <class L>
 void fill_random(void* image, std::mt19937& random) {

@@ -31,7 +31,7 @@ void set_lane(const Format& format, void* image, int i, Int value) {
     return;
   }
   for (int b = 0; b < format.container_bytes; ++b)
-    bytes[i * format.container_bytes + b] = static_cast<unsigned char>(bits >> (8 * b));
+    bytes[i * format.container_bytes + b] = static_cast<unsigned char>(bits >> (8 * (b % 8)));
 }
 
 Int as_lane(const Format& format, Int value) {

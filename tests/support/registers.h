@@ -43,24 +43,7 @@ Int lane(const void* image, int i) {
 }
 template <class L>
 void set_lane(void* image, int i, Int value) {
-<<<<<<< HEAD
   set_lane(format_of<L>(), image, i, value);
-=======
-  auto* bytes = static_cast<unsigned char*>(image);
-  if (std::is_same_v<typename L::number, predicate_bit>) {
-    bytes[i / 8] = static_cast<unsigned char>((bytes[i / 8] & ~(1 << i % 8)) | static_cast<int>(value & 1) << i % 8);
-    return;
-  }
-  constexpr int size = sizeof(typename L::container);
-  std::uint64_t bits = static_cast<std::uint64_t>(value);
-  if (L::bits < 64) {
-    const std::uint64_t range = std::uint64_t{1} << L::bits % 64;
-    bits %= range;
-    if (std::is_signed_v<typename L::container> && bits >= range / 2) bits -= range;
-  }
-  // A container of more than 64 bits holds the value over and over.
-  for (int b = 0; b < size; ++b) bytes[i * size + b] = static_cast<unsigned char>(bits >> (8 * (b % 8)));
->>>>>>> scalar
 }
 template <class L>
 Int as_lane(Int value) {

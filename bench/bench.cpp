@@ -74,13 +74,17 @@ struct Argument<M**> {
   }
 };
 
-template <class... Arguments>
-void set_offsets(std::tuple<Arguments...>& arguments) {
-  const auto set = [](auto& argument) {
-    if constexpr (std::is_same_v<decltype(argument.value), int>) argument.value = 64;
-  };
-  std::apply([&](auto&... argument) { (set(argument), ...); }, arguments);
+// What an access to memory takes is made to lie in the arena, aligned as in most programs: vectors of
+// offsets and the offset or increment.
+template <class T>
+void place_in_arena(T&) {}
+void place_in_arena(qv_vecNx16U& offsets) {
+  for (auto& pair : offsets._) pair &= 0x03FE03FE;
 }
+void place_in_arena(qv_vecN_2x32Uv& offsets) {
+  for (auto& offset : offsets._) offset &= 0x3FC;
+}
+void place_in_arena(int& offset) { offset = 64; }
 
 template <class T>
 using bare = std::remove_cv_t<std::remove_reference_t<T>>;
@@ -88,7 +92,8 @@ using bare = std::remove_cv_t<std::remove_reference_t<T>>;
 template <class R, class... A>
 void time_calls(benchmark::State& state, R (*f)(A...)) {
   alignas(64) std::tuple<Argument<bare<A>>...> arguments;
-  if constexpr ((std::is_pointer_v<A> || ...)) set_offsets(arguments);
+  if constexpr ((std::is_pointer_v<A> || ...))
+    std::apply([](auto&... a) { (place_in_arena(a.get()), ...); }, arguments);
   asm volatile("" : "+r"(f));  // a call, as from another library: the compiler knows nothing of it
   for (auto _ : state) {
     if constexpr (std::is_void_v<R>) {

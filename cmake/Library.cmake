@@ -19,6 +19,10 @@ file(GLOB KASTARRI_VECTOR_SOURCES CONFIGURE_DEPENDS
 list(APPEND KASTARRI_VECTOR_SOURCES ${PROJECT_SOURCE_DIR}/src/frame/conversions.cpp)
 set(KASTARRI_SCALAR_SOURCES library.cpp failure.cpp state.cpp ports.cpp scalar.cpp funnel.cpp access.cpp)
 list(TRANSFORM KASTARRI_SCALAR_SOURCES PREPEND ${PROJECT_SOURCE_DIR}/src/frame/)
+# Tables, and what families export beside their intrinsics, once too.
+file(GLOB KASTARRI_HELPER_SOURCES CONFIGURE_DEPENDS
+  ${PROJECT_SOURCE_DIR}/src/tables/*.cpp ${PROJECT_SOURCE_DIR}/src/*/helpers/*.cpp)
+list(APPEND KASTARRI_SCALAR_SOURCES ${KASTARRI_HELPER_SOURCES})
 
 foreach(target IN LISTS KASTARRI_TARGETS)
   if(NOT target IN_LIST KASTARRI_KNOWN_TARGETS)

@@ -7,8 +7,10 @@
 #ifndef KASTARRI_H
 #define KASTARRI_H
 
+#include "kastarri/gather.h"
 #include "kastarri/library.h"
 #include "kastarri/state.h"
+#include "kastarri/tables.h"
 #include "kastarri/types.h"
 
 #include "kastarri/conversions.h"

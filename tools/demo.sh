@@ -10,7 +10,7 @@ mkdir -p "$1/demo-output"
 cd "$1/demo-output"
 shift
 
-for example in fir mixer biquad convolve threshold ports; do
+for example in fir mixer biquad convolve threshold histogram ports; do
   printf '\n'
   "$@" "$examples/$example"
 done

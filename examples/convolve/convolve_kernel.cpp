@@ -21,7 +21,8 @@ std::vector<Quad> quads_of(const Mask& mask, int stride) {
       if (mask.weight[y][x] == 0) continue;
       if (used == 4) quads.emplace_back(), used = 0;
       quads.back().offset[used] = (y - MASK_RADIUS) * stride + x - MASK_RADIUS;
-      quads.back().weights._[0] |= static_cast<unsigned>(static_cast<unsigned char>(mask.weight[y][x])) << (24 - 8 * used);
+      quads.back().weights._[0] |= static_cast<unsigned>(static_cast<unsigned char>(mask.weight[y][x]))
+                                   << (24 - 8 * used);
       ++used;
     }
   }
@@ -57,7 +58,8 @@ void convolve(const std::uint8_t* in, int in_stride, const Filter& filter, std::
         alignas(64) const qv_vec2Nx8U one = response(pixel, quads, filter.shift);
         most = ZRA_MAXU2NX8U(most, one);
       }
-      qv_vec2Nx8U_storei(most, reinterpret_cast<qv_vec2Nx8U*>(out + static_cast<std::ptrdiff_t>(y) * out_stride + x), 0);
+      qv_vec2Nx8U_storei(most, reinterpret_cast<qv_vec2Nx8U*>(out + static_cast<std::ptrdiff_t>(y) * out_stride + x),
+                         0);
     }
   }
 }

@@ -27,7 +27,8 @@ inline Filter sobel() {
       Mask mask{};
       for (int y = 0; y < 3; ++y)
         for (int x = 0; x < 3; ++x)
-          mask.weight[y + 1][x + 1] = static_cast<signed char>(sign * (down ? along[y] * across[x] : across[y] * along[x]));
+          mask.weight[y + 1][x + 1] =
+              static_cast<signed char>(sign * (down ? along[y] * across[x] : across[y] * along[x]));
       filter.masks.push_back(mask);
     }
   }
@@ -57,7 +58,9 @@ using Convolution = void(const std::uint8_t*, int, const Filter&, std::uint8_t*,
 // A convolved picture. The result is made in rows with a margin, and cut.
 struct Convolved {
   Convolved(int columns, int rows)
-      : width(columns), height(rows), stride(columns + CONVOLVE_MARGIN),
+      : width(columns),
+        height(rows),
+        stride(columns + CONVOLVE_MARGIN),
         pixels(static_cast<std::size_t>(stride) * static_cast<std::size_t>(rows)) {}
   void make(Convolution* convolution, const Framed& in, const Filter& filter) {
     convolution(in.first(), in.stride, filter, pixels.data(), stride, width, height);

@@ -45,8 +45,8 @@ int convolve_picture(int argc, char** argv) {
   std::printf("convolve: %s, %d x %d pixels, %s\n", input.c_str(), photograph.width, photograph.height, name.c_str());
   std::printf("  target    %s\n", cstub_Km_ZNB_Orbis_R5_64k_target());
   std::printf("  checked   all %zu pixels equal those of the scalar version\n", photograph.pixels.size());
-  std::printf("  speed     %.1f million pixels a second, %.2f times the scalar version (%.1f)\n", pixels / timing.kernel,
-              timing.ratio(), pixels / timing.scalar);
+  std::printf("  speed     %.1f million pixels a second, %.2f times the scalar version (%.1f)\n",
+              pixels / timing.kernel, timing.ratio(), pixels / timing.scalar);
   write_pgm(output, got.picture());
   std::printf("  wrote     %s\n", output.c_str());
   return 0;

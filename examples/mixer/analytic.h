@@ -11,10 +11,13 @@
 
 namespace examples {
 
-inline short to_q15(double value) { return static_cast<short>(std::lround(std::min(std::max(value, -32768.0), 32767.0))); }
+inline short to_q15(double value) {
+  return static_cast<short>(std::lround(std::min(std::max(value, -32768.0), 32767.0)));
+}
 
 // Numbers follow each other, real part first; zeros fill them up to a multiple of `block`.
-inline std::vector<short> interleaved(const std::vector<std::complex<double>>& numbers, std::size_t count, std::size_t block) {
+inline std::vector<short> interleaved(const std::vector<std::complex<double>>& numbers, std::size_t count,
+                                      std::size_t block) {
   std::vector<short> parts(2 * ((count + block - 1) / block * block), 0);
   for (std::size_t n = 0; n < count; ++n) {
     parts[2 * n] = to_q15(numbers[n].real());

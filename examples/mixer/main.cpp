@@ -59,7 +59,10 @@ Samples moved(const Samples& sound, const Samples& w) {
 }
 
 void tell_speed(const Samples& sound, const Samples& w) {
-  const Samples x = analytic(Samples(sound.begin(), sound.begin() + std::min<std::ptrdiff_t>(TIMED, static_cast<std::ptrdiff_t>(sound.size()))), MIXER_BLOCK);
+  const Samples x =
+      analytic(Samples(sound.begin(),
+                       sound.begin() + std::min<std::ptrdiff_t>(TIMED, static_cast<std::ptrdiff_t>(sound.size()))),
+               MIXER_BLOCK);
   const int count = static_cast<int>(x.size() / 2);
   Samples y(x.size());
   const auto run = [&](auto* mixer) {

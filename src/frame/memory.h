@@ -5,6 +5,8 @@
 #include <cstdint>
 #include <cstring>
 
+#include "kastarri/state.h"
+
 namespace {
 
 template <class M>
@@ -16,6 +18,16 @@ inline M* address(M* base, int offset) {
 template <class M>
 inline M* writable(const M* memory) {
   return const_cast<M*>(memory);
+}
+
+// The core's test of an address: bit 0 is clear for an object of 16 bits, bits 0 and 1 for a wider one. The
+// compiler must not see where the address comes from: it may take objects to be aligned, and would drop the test.
+template <class M>
+inline void require_aligned(const M* memory) {
+  constexpr std::uintptr_t low_bits = sizeof(M) < 4 ? sizeof(M) - 1 : 3;
+  auto at = reinterpret_cast<std::uintptr_t>(memory);
+  asm("" : "+r"(at));
+  if (at & low_bits) cstub_vaddr_not_aligned(at);
 }
 
 }  // namespace

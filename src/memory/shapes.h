@@ -5,6 +5,8 @@
 
 // A post-increment access uses the pointer as it stands, and moves it when all else is done.
 
+// --- Loads ------------------------------------------------------------------------------------------
+
 #define SIG_load_I(SYMBOL, V, M, K) V SYMBOL(const M* base, int offset)
 #define BODY_load_I(V, M, K)                        \
   V r;                                              \
@@ -16,6 +18,16 @@
   const M* const from = *pointer;  \
   KASTARRI_SEMANTIC(K)(from, r._); \
   *pointer = address(from, increment);
+
+#define SIG_load_IP_aligned SIG_load_IP
+#define BODY_load_IP_aligned(V, M, K) \
+  require_aligned(*pointer);          \
+  BODY_load_IP(V, M, K)
+
+#define SIG_load_IP_aligned_destination SIG_load_IP
+#define BODY_load_IP_aligned_destination(V, M, K) \
+  require_aligned(&r);                            \
+  BODY_load_IP(V, M, K)
 
 #define SIG_load_I_T(SYMBOL, V, M, P, K) V SYMBOL(const M* base, int offset, const P& p)
 #define BODY_load_I_T(V, M, P, K)                               \
@@ -29,6 +41,8 @@
   KASTARRI_SEMANTIC(K)(from, clear(r._, p._)); \
   *pointer = address(from, increment);
 
+// --- Stores -----------------------------------------------------------------------------------------
+
 #define SIG_store_I(SYMBOL, V, M, K) void SYMBOL(const V& v, const M* base, int offset)
 #define BODY_store_I(V, M, K) KASTARRI_SEMANTIC(K)(v._, writable(address(base, offset)));
 
@@ -38,6 +52,16 @@
   KASTARRI_SEMANTIC(K)(v._, to); \
   *pointer = address(to, increment);
 
+#define SIG_store_I_aligned SIG_store_I
+#define BODY_store_I_aligned(V, M, K)     \
+  require_aligned(address(base, offset)); \
+  BODY_store_I(V, M, K)
+
+#define SIG_store_IP_aligned SIG_store_IP
+#define BODY_store_IP_aligned(V, M, K) \
+  require_aligned(*pointer);           \
+  BODY_store_IP(V, M, K)
+
 #define SIG_store_I_T(SYMBOL, V, M, P, K) void SYMBOL(const V& v, const M* base, int offset, const P& p)
 #define BODY_store_I_T(V, M, P, K) KASTARRI_SEMANTIC(K)(v._, p._, writable(address(base, offset)));
 
@@ -46,5 +70,50 @@
   M* const to = *pointer;             \
   KASTARRI_SEMANTIC(K)(v._, p._, to); \
   *pointer = address(to, increment);
+
+// --- Gather and scatter: E the element, O the vector of offsets -------------------------------------
+
+// What enables the elements of a form without a predicate.
+#define KASTARRI_EVERY_ELEMENT Same(true)
+
+#define SIG_gather(SYMBOL, E, O, K) qv_gsr SYMBOL(const E* base, const O& offsets)
+#define BODY_gather(E, O, K)                                          \
+  qv_gsr r;                                                           \
+  KASTARRI_SEMANTIC(K)(base, offsets._, KASTARRI_EVERY_ELEMENT, r._); \
+  return r;
+
+#define SIG_gather_T(SYMBOL, E, O, P, K) qv_gsr SYMBOL(const E* base, const O& offsets, const P& p)
+#define BODY_gather_T(E, O, P, K)                  \
+  qv_gsr r;                                        \
+  KASTARRI_SEMANTIC(K)(base, offsets._, p._, r._); \
+  return r;
+
+// With an int of which the result does not depend.
+#define SIG_gather_V(SYMBOL, E, O, K) qv_gsr SYMBOL(const E* base, const O& offsets, int)
+#define BODY_gather_V BODY_gather
+#define SIG_gather_V_T(SYMBOL, E, O, P, K) qv_gsr SYMBOL(const E* base, const O& offsets, int, const P& p)
+#define BODY_gather_V_T BODY_gather_T
+
+#define SIG_gathered(SYMBOL, V, K) V SYMBOL(const qv_gsr& gathered)
+#define BODY_gathered(V, K)              \
+  V r;                                   \
+  KASTARRI_SEMANTIC(K)(gathered._, r._); \
+  return r;
+
+// A part of the destination keeps its lanes.
+#define SIG_gathered_part(SYMBOL, V, K) void SYMBOL(V& r, const qv_gsr& gathered)
+#define BODY_gathered_part(V, K) KASTARRI_SEMANTIC(K)(gathered._, r._);
+
+#define SIG_scatter(SYMBOL, V, E, O, K) void SYMBOL(const V& v, const E* base, const O& offsets)
+#define BODY_scatter(V, E, O, K) KASTARRI_SEMANTIC(K)(v._, offsets._, KASTARRI_EVERY_ELEMENT, writable(base));
+
+#define SIG_scatter_T(SYMBOL, V, E, O, P, K) void SYMBOL(const V& v, const E* base, const O& offsets, const P& p)
+#define BODY_scatter_T(V, E, O, P, K) KASTARRI_SEMANTIC(K)(v._, offsets._, p._, writable(base));
+
+#define SIG_increment(SYMBOL, E, O, K) void SYMBOL(const E* base, const O& offsets)
+#define BODY_increment(E, O, K) KASTARRI_SEMANTIC(K)(offsets._, writable(base));
+
+#define SIG_wait(SYMBOL, NOTHING) NOTHING SYMBOL()
+#define BODY_wait(NOTHING)
 
 #endif

@@ -64,8 +64,10 @@ constexpr std::int64_t shifted_own(std::int64_t x, word s) {
 constexpr auto own = [](auto x, word s) { return shifted_own(x, s); };
 // What shift_right needs of a shared count is two words long for 64-bit lanes, and slow to come by.
 constexpr auto shared = [](auto x, word s) {
-  if constexpr (sizeof x == 8 && lanes_shift_alone) return shifted_own(x, s);
-  else return shift_right(x, s);
+  if constexpr (sizeof x == 8 && lanes_shift_alone)
+    return shifted_own(x, s);
+  else
+    return shift_right(x, s);
 };
 
 // Half of x, rounded down: few targets shift 64-bit lanes as signed.
@@ -88,9 +90,8 @@ struct Truncated {
 
 // A 24-bit lane, moved to the top of its word and back down to twice itself: so 0 is a count like others.
 template <class Rounding>
-constexpr auto pack24 = [](auto shift, word x, word s) {
-  return Rounding::halve(shift(static_cast<std::int32_t>(x << 8), s + 7));
-};
+constexpr auto pack24 =
+    [](auto shift, word x, word s) { return Rounding::halve(shift(static_cast<std::int32_t>(x << 8), s + 7)); };
 
 // 48-bit lanes that are packed to 32 bits, likewise, and 64-bit lanes, which have no room to spare.
 template <class Rounding>
@@ -166,31 +167,32 @@ inline void pack48(const Lanes& lanes, word count, word* r) {
 #include "frame/stamp.h"
 
 // KERNEL(OP, form, result layout, rule, lanes that are packed)
-#define KERNEL_fixed(OP, R, RULE, LANES)                             \
+#define KERNEL_fixed(OP, R, RULE, LANES)                               \
   static inline void KASTARRI_SEMANTIC(OP)(const word* acc, word* r) { \
-    lanes<R::count>(result<R>(r), RULE, LANES(acc));                 \
+    lanes<R::count>(result<R>(r), RULE, LANES(acc));                   \
   }
 
 // One count for all lanes, no more than BOUND.
-#define KERNEL_shift(OP, R, RULE, BOUND, LANES)                                                              \
-  static inline void KASTARRI_SEMANTIC(OP)(const word* acc, word count, word* r) {                           \
-    const word s = clamped(count, BOUND);                                                                    \
-    pack<R>(r, [s](auto x) { return RULE(shared, x, s); }, LANES(acc));                                      \
+#define KERNEL_shift(OP, R, RULE, BOUND, LANES)                                    \
+  static inline void KASTARRI_SEMANTIC(OP)(const word* acc, word count, word* r) { \
+    const word s = clamped(count, BOUND);                                          \
+    pack<R>(                                                                       \
+        r, [s](auto x) { return RULE(shared, x, s); }, LANES(acc));                \
   }
-#define KERNEL_shift48(OP, R, ROUNDING, LANES)                                       \
-  static inline void KASTARRI_SEMANTIC(OP)(const word* acc, word count, word* r) {   \
-    pack48<R, ROUNDING>(LANES(acc), count, r);                                       \
+#define KERNEL_shift48(OP, R, ROUNDING, LANES)                                     \
+  static inline void KASTARRI_SEMANTIC(OP)(const word* acc, word count, word* r) { \
+    pack48<R, ROUNDING>(LANES(acc), count, r);                                     \
   }
 
 // A count a lane, in layout C.
-#define KERNEL_counts(OP, R, RULE, BOUND, LANES, C)                                                             \
-  static inline void KASTARRI_SEMANTIC(OP)(const word* acc, const word* counts, word* r) {                      \
-    const auto rule = [](auto x, auto n) { return RULE(own, x, clamped(static_cast<word>(n), BOUND)); };        \
-    pack<R>(r, rule, LANES(acc), Read<C>(counts));                                                              \
+#define KERNEL_counts(OP, R, RULE, BOUND, LANES, C)                                                      \
+  static inline void KASTARRI_SEMANTIC(OP)(const word* acc, const word* counts, word* r) {               \
+    const auto rule = [](auto x, auto n) { return RULE(own, x, clamped(static_cast<word>(n), BOUND)); }; \
+    pack<R>(r, rule, LANES(acc), Read<C>(counts));                                                       \
   }
-#define KERNEL_counts48(OP, R, ROUNDING, LANES, C)                                           \
-  static inline void KASTARRI_SEMANTIC(OP)(const word* acc, const word* counts, word* r) {   \
-    pack<R>(r, pack48_own<ROUNDING>, LANES(acc), Read<C>(counts));                           \
+#define KERNEL_counts48(OP, R, ROUNDING, LANES, C)                                         \
+  static inline void KASTARRI_SEMANTIC(OP)(const word* acc, const word* counts, word* r) { \
+    pack<R>(r, pack48_own<ROUNDING>, LANES(acc), Read<C>(counts));                         \
   }
 
 #include "multiply/pack.def"

@@ -19,7 +19,7 @@ using i64x32 = Layout<std::int64_t, 64, 32>;
 using u64x8 = Layout<std::uint64_t, 64, 8>;
 
 template <class X, class Y>
-constexpr bool both_unsigned = std::is_unsigned_v<X> && std::is_unsigned_v<Y>;
+constexpr bool both_unsigned = std::is_unsigned_v<X>&& std::is_unsigned_v<Y>;
 
 // The exact product of a signed and an unsigned 32-bit factor. Processors multiply two of a kind: the
 // unsigned factor taken as signed is short of 2^32 when its top bit is set.
@@ -151,10 +151,10 @@ struct Multiply {
 
 // KERNEL(OP, kind, result layout, rule, operand layouts ...). A fresh sum that cannot pass the lane's top bit
 // is written as a whole container, which it fills in canonical form by itself.
-#define KERNEL_OF_PRODUCTS(OP, KIND, R, RULE, ...)                  \
-  template <class... Units>                                         \
-  static inline void KASTARRI_SEMANTIC(OP)(Units... units) {        \
-    Multiply<R, __VA_ARGS__>::KIND(RULE, units...);                 \
+#define KERNEL_OF_PRODUCTS(OP, KIND, R, RULE, ...)           \
+  template <class... Units>                                  \
+  static inline void KASTARRI_SEMANTIC(OP)(Units... units) { \
+    Multiply<R, __VA_ARGS__>::KIND(RULE, units...);          \
   }
 #define KERNEL_fresh(OP, ...) KERNEL_OF_PRODUCTS(OP, fresh, __VA_ARGS__)
 #define KERNEL_add(OP, ...) KERNEL_OF_PRODUCTS(OP, add, __VA_ARGS__)

@@ -30,13 +30,14 @@ inline Register flip_halves(Register a) { return _mm512_xor_si512(a, _mm512_set1
 inline Register low_pairs(Register a, Register b) { return _mm512_maskz_unpacklo_epi64(0xFF, a, b); }
 inline Register high_pairs(Register a, Register b) { return _mm512_maskz_unpackhi_epi64(0xFF, a, b); }
 inline Register less_half(Register a) { return _mm512_sub_epi32(a, _mm512_set1_epi32(0x8000)); }
-// (The forms without a mask make this compiler warn of its own header.) Packs work within 128 bits: these put pairs and fours of results back in order.
+// (The forms without a mask make this compiler warn of its own header.) Packs work within 128 bits: these put pairs and
+// fours of results back in order.
 inline Register in_order2(Register a) {
   return _mm512_maskz_permutexvar_epi64(0xFF, _mm512_setr_epi64(0, 2, 4, 6, 1, 3, 5, 7), a);
 }
 inline Register in_order4(Register a) {
-  return _mm512_maskz_permutexvar_epi32(
-      0xFFFF, _mm512_setr_epi32(0, 4, 8, 12, 1, 5, 9, 13, 2, 6, 10, 14, 3, 7, 11, 15), a);
+  return _mm512_maskz_permutexvar_epi32(0xFFFF, _mm512_setr_epi32(0, 4, 8, 12, 1, 5, 9, 13, 2, 6, 10, 14, 3, 7, 11, 15),
+                                        a);
 }
 #elif defined __AVX2__
 using Register = __m256i;

@@ -26,9 +26,9 @@
 #define SIG_acc_abcd(SYMBOL, W, A, B, K) void SYMBOL(W& acc, const A& a, const B& b, const A& c, const B& d)
 #define BODY_acc_abcd(W, A, B, K) KASTARRI_SEMANTIC(K)(acc._, a._, b._, c._, d._, acc._);
 
-#define FRESH(W, K, ...)                   \
-  W r;                                     \
-  KASTARRI_SEMANTIC(K)(__VA_ARGS__, r._);  \
+#define FRESH(W, K, ...)                  \
+  W r;                                    \
+  KASTARRI_SEMANTIC(K)(__VA_ARGS__, r._); \
   return r;
 
 // --- Vectors of type V and words of coefficients -----------------------------------------------------
@@ -65,23 +65,23 @@
 // --- Packs -------------------------------------------------------------------------------------------
 
 #define SIG_w_r(SYMBOL, R, W, K) R SYMBOL(const W& acc)
-#define BODY_w_r(R, W, K)                  \
-  R r;                                     \
-  KASTARRI_SEMANTIC(K)(acc._, r._);        \
+#define BODY_w_r(R, W, K)           \
+  R r;                              \
+  KASTARRI_SEMANTIC(K)(acc._, r._); \
   return r;
 
 // One count for all lanes, of the scalar type COUNT.
 #define SIG_w_r_shift(SYMBOL, R, W, COUNT, K) R SYMBOL(const W& acc, COUNT shift)
-#define BODY_w_r_shift(R, W, COUNT, K)                         \
-  R r;                                                         \
-  KASTARRI_SEMANTIC(K)(acc._, static_cast<word>(shift), r._);  \
+#define BODY_w_r_shift(R, W, COUNT, K)                        \
+  R r;                                                        \
+  KASTARRI_SEMANTIC(K)(acc._, static_cast<word>(shift), r._); \
   return r;
 
 // A count a lane, in the vector COUNTS.
 #define SIG_w_r_counts(SYMBOL, R, W, COUNTS, K) R SYMBOL(const W& acc, const COUNTS& shift)
-#define BODY_w_r_counts(R, W, COUNTS, K)             \
-  R r;                                               \
-  KASTARRI_SEMANTIC(K)(acc._, shift._, r._);         \
+#define BODY_w_r_counts(R, W, COUNTS, K)     \
+  R r;                                       \
+  KASTARRI_SEMANTIC(K)(acc._, shift._, r._); \
   return r;
 
 #endif

@@ -17,7 +17,9 @@ struct Coefficients {
   static constexpr int words = Words;
   static constexpr int in_a_word = 4 / sizeof(Stored);
 
-  static Factor at(word w, int j) { return static_cast<Stored>(w >> (8 * static_cast<int>(sizeof(Stored)) * (j % in_a_word))); }
+  static Factor at(word w, int j) {
+    return static_cast<Stored>(w >> (8 * static_cast<int>(sizeof(Stored)) * (j % in_a_word)));
+  }
 };
 
 // One coefficient of every lane: the same one, or those of several words in turn.
@@ -123,10 +125,10 @@ using u16_in_2 = Coefficients<std::uint16_t, 2>;
 }  // namespace
 
 // A semantic function whose operands, all arrays of words, go to CALL as `units`.
-#define KERNEL_OF_WORDS(OP, CALL)                             \
-  template <class... Units>                                   \
-  static inline void KASTARRI_SEMANTIC(OP)(Units*... units) { \
-    CALL;                                                     \
+#define KERNEL_OF_WORDS(OP, CALL)                               \
+  template <class... Units>                                     \
+  static inline void KASTARRI_SEMANTIC(OP)(Units * ... units) { \
+    CALL;                                                       \
   }
 
 #endif

@@ -29,7 +29,8 @@ TEST(Mixer, KernelMultipliesAndSaturates) {
 TEST(Mixer, MovesATone) {
   constexpr std::size_t size = 4096;
   std::vector<short> tone(size);
-  for (std::size_t n = 0; n < size; ++n) tone[n] = to_q15(10000 * std::cos(2 * PI * 300 * static_cast<double>(n) / size));
+  for (std::size_t n = 0; n < size; ++n)
+    tone[n] = to_q15(10000 * std::cos(2 * PI * 300 * static_cast<double>(n) / size));
   const std::vector<short> x = analytic(tone, MIXER_BLOCK), w = carrier(500.0 / size, size, MIXER_BLOCK);
   std::vector<short> y(x.size());
   mix(x.data(), w.data(), y.data(), static_cast<int>(size));

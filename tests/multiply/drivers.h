@@ -76,11 +76,16 @@ class MultiplyModel {
 
   Bits sum(const Factors& f, int i) const {
     switch (form_) {
-      case bytes_and_halves: return f.at(0, i, 8, n_.first_unsigned) * f.at(1 + i % 2, i / 2, 16, false);
-      case channels: return channel_sum(f, i);
-      case coefficients: return coefficient_sum(f, i);
-      case complex: return complex_sum(f, i);
-      default: return plain_sum(f, i);
+      case bytes_and_halves:
+        return f.at(0, i, 8, n_.first_unsigned) * f.at(1 + i % 2, i / 2, 16, false);
+      case channels:
+        return channel_sum(f, i);
+      case coefficients:
+        return coefficient_sum(f, i);
+      case complex:
+        return complex_sum(f, i);
+      default:
+        return plain_sum(f, i);
     }
   }
 
@@ -153,7 +158,8 @@ template <class L>
 void dirty(void* image, std::mt19937& random) {
   constexpr int size = sizeof(typename L::container);
   for (int i = 0; i < L::count; ++i)
-    for (int b = L::bits / 8; b < size; ++b) static_cast<unsigned char*>(image)[size * i + b] = static_cast<unsigned char>(random());
+    for (int b = L::bits / 8; b < size; ++b)
+      static_cast<unsigned char*>(image)[size * i + b] = static_cast<unsigned char>(random());
 }
 
 template <class T>
@@ -195,8 +201,8 @@ void drive_multiply(const std::string& op, Call call) {
     if (same_bits(expected, got)) continue;
     for (int i = 0; i < L::count; ++i)
       if (lane<L>(expected._, i) != lane<L>(got._, i))
-        FAIL() << op << " [" << cstub_Km_ZNB_Orbis_R5_64k_target() << ", seed " << seed << ", round " << n << "] lane " << i
-               << ": sum " << static_cast<Int>(model.sum(f, i)) << ", accumulator " << lane<L>(before._, i)
+        FAIL() << op << " [" << cstub_Km_ZNB_Orbis_R5_64k_target() << ", seed " << seed << ", round " << n << "] lane "
+               << i << ": sum " << static_cast<Int>(model.sum(f, i)) << ", accumulator " << lane<L>(before._, i)
                << ", expected " << lane<L>(expected._, i) << ", got " << lane<L>(got._, i);
     FAIL() << op << ": lanes are right, bits outside them are not";
   }
@@ -216,7 +222,8 @@ void drive_multiply(const std::string& op, void (*function)(W&, const A&...), st
 }
 // The accumulator handed in as a factor too: it is read before it is written.
 template <class W, class B, class... A>
-void expect_in_place(const std::string& op, void (*function)(W&, const W&, const B&, const A&...), const A&... predicate) {
+void expect_in_place(const std::string& op, void (*function)(W&, const W&, const B&, const A&...),
+                     const A&... predicate) {
   std::mt19937 random(seed);
   W apart, in_place, b;
   fill_random<layout_of<W>>(in_place._, random);

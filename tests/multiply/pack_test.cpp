@@ -26,12 +26,18 @@ class PackModel {
   // What a result of `bits` bits gets of the lane.
   Int packed(Int acc, Int count, int bits) const {
     switch (letter_) {
-      case 'L': return half_ < 0 ? acc : acc & 0xFF;
-      case 'M': return floor_shift(acc, 16);
-      case 'H': return floor_shift(acc, 32);
-      case 'Q': return floor_shift(2 * (acc & 0xFFFFFFFF) + 0x8000, 16);
-      case 'P': return floor_shift((acc & 0xFFFFFFFF) + 0x200, 10);
-      default: return shifted(acc, count, bits);
+      case 'L':
+        return half_ < 0 ? acc : acc & 0xFF;
+      case 'M':
+        return floor_shift(acc, 16);
+      case 'H':
+        return floor_shift(acc, 32);
+      case 'Q':
+        return floor_shift(2 * (acc & 0xFFFFFFFF) + 0x8000, 16);
+      case 'P':
+        return floor_shift((acc & 0xFFFFFFFF) + 0x200, 10);
+      default:
+        return shifted(acc, count, bits);
     }
   }
 
@@ -67,7 +73,8 @@ void drive_pack(const std::string& op, Call call, CountOf count_of) {
       expected[i] = model.packed(lane<layout_of<W>>(acc._, model.source(i)), count_of(images[1].bytes, i), L::bits);
     dirty<layout_of<W>>(acc._, random);
     expect_lanes<L>(op, n, expected, call(acc, images[1].bytes), [&](int i) {
-      return std::to_string(lane<layout_of<W>>(acc._, model.source(i))) + " by " + std::to_string(count_of(images[1].bytes, i));
+      return std::to_string(lane<layout_of<W>>(acc._, model.source(i))) + " by " +
+             std::to_string(count_of(images[1].bytes, i));
     });
     if (testing::Test::HasFatalFailure()) return;
   }
@@ -75,7 +82,8 @@ void drive_pack(const std::string& op, Call call, CountOf count_of) {
 
 template <class R, class W>
 void drive_pack(const std::string& op, R (*f)(const W&)) {
-  drive_pack<R, W, i8x1>(op, [f](const W& acc, const void*) { return f(acc); }, [](const void*, int) { return Int{0}; });
+  drive_pack<R, W, i8x1>(
+      op, [f](const W& acc, const void*) { return f(acc); }, [](const void*, int) { return Int{0}; });
 }
 template <class R, class W, class Counts>
 void drive_pack(const std::string& op, R (*f)(const W&, const Counts&)) {
@@ -96,10 +104,10 @@ void drive_pack(const std::string& op, R (*f)(const W&, Count)) {
 
 }  // namespace testing_support
 
-#define ENTRY(SYMBOL, SHAPE, ...)                                     \
-  const int tested_##SYMBOL = testing_support::add_test(              \
-      "pack", testing_support::operation(#SYMBOL),                    \
-      [] { testing_support::drive_pack(testing_support::operation(#SYMBOL), &KASTARRI_SYMBOL(SYMBOL)); });
+#define ENTRY(SYMBOL, SHAPE, ...)                                                                         \
+  const int tested_##SYMBOL = testing_support::add_test("pack", testing_support::operation(#SYMBOL), [] { \
+    testing_support::drive_pack(testing_support::operation(#SYMBOL), &KASTARRI_SYMBOL(SYMBOL));           \
+  });
 
 namespace {
 

@@ -1,10 +1,10 @@
 // Every multiply, by its name.
 #include "multiply/drivers.h"
 
-#define ENTRY(SYMBOL, SHAPE, ...)                                                         \
-  const int tested_##SYMBOL = testing_support::add_test(                                  \
-      "multiply", testing_support::operation(#SYMBOL),                                    \
-      [] { testing_support::drive_multiply(testing_support::operation(#SYMBOL), &KASTARRI_SYMBOL(SYMBOL)); });
+#define ENTRY(SYMBOL, SHAPE, ...)                                                                             \
+  const int tested_##SYMBOL = testing_support::add_test("multiply", testing_support::operation(#SYMBOL), [] { \
+    testing_support::drive_multiply(testing_support::operation(#SYMBOL), &KASTARRI_SYMBOL(SYMBOL));           \
+  });
 
 namespace {
 

@@ -1,0 +1,24 @@
+// Forms of semantic functions that several sources of the memory family stamp (frame/stamp.h).
+#ifndef KASTARRI_MEMORY_KERNELS_H
+#define KASTARRI_MEMORY_KERNELS_H
+
+#include "frame/arithmetic.h"
+#include "memory/merge.h"
+
+namespace {
+
+// Bits go over as they are: extended by the layout they are read from, cut to the one they are written to.
+constexpr auto SAME = [](auto lane) { return lane; };
+constexpr auto SATURATE8 = [](std::int16_t lane) { return saturate<std::int8_t>(lane); };
+constexpr auto SATURATE16 = [](std::int32_t lane) { return saturate<std::int16_t>(lane); };
+
+}  // namespace
+
+// A predicated store: layout in memory, rule, layout in the register.
+#define KERNEL_store_where(OP, M, RULE, A)                                                       \
+  template <class Units, class PredicateUnit, class Memory>                                      \
+  static inline void KASTARRI_SEMANTIC(OP)(const Units* v, const PredicateUnit* p, Memory* to) { \
+    store_where<M>(Read<A>(v), RULE, p, to);                                                     \
+  }
+
+#endif

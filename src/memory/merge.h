@@ -1,0 +1,113 @@
+// Predicated stores: bytes of memory that no enabled lane governs keep what they hold.
+#ifndef KASTARRI_MEMORY_MERGE_H
+#define KASTARRI_MEMORY_MERGE_H
+
+#include <immintrin.h>
+
+#include "frame/lanes.h"
+#include "kastarri/state.h"
+
+namespace {
+
+// How a word of a merging store is governed by lanes_a_word bits of a predicate.
+template <int lanes_a_word>
+struct MergeStep {
+  alignas(64) word first_lane[16] = {};  // of word w, within the predicate's unit
+  alignas(64) word bytes[16] = {};       // the set of bytes that a set of lanes governs
+
+  constexpr MergeStep() {
+    for (int i = 0; i < 16; ++i) {
+      first_lane[i] = static_cast<word>(i * lanes_a_word % 32);
+      for (int byte = 0; byte < 4; ++byte) bytes[i] |= static_cast<word>(i >> byte * lanes_a_word / 4 & 1) << byte;
+    }
+  }
+};
+
+// For every word of a merging store, the entry of the byte-merge table that the word's disabled bytes
+// select. Each lane governs LaneBytes bytes of memory. The table is the program's to change, so it is
+// looked up in every store; vector registers hold it whole and look up all words at once.
+template <int LaneBytes, int Words>
+class MergeMask {
+ public:
+  alignas(64) word of_word[16];
+
+  template <class PredicateUnit>
+  void look_up(const PredicateUnit* predicate) {
+    const word* const table = cstub_Km_ZNB_Orbis_R5_64k_mask;
+#if defined __AVX512BW__
+    // The forms with a mask of all ones: with the others the compiler warns of its own headers.
+    const __m512i all_lanes = _mm512_maskz_inserti64x4(0xFF, _mm512_set1_epi32(disabled(predicate, 0)),
+                                                       _mm256_set1_epi32(disabled(predicate, Words / 2)), 1);
+    const __m512i lanes = _mm512_maskz_srlv_epi32(0xFFFF, all_lanes, _mm512_load_si512(step.first_lane));
+    const __m512i bytes =
+        LaneBytes == 1 ? lanes : _mm512_maskz_permutexvar_epi32(0xFFFF, lanes, _mm512_load_si512(step.bytes));
+    _mm512_store_si512(of_word, _mm512_maskz_permutexvar_epi32(0xFFFF, bytes, _mm512_loadu_si512(table)));
+#elif defined __AVX2__
+    const auto load = [](const word* from) { return _mm256_loadu_si256(reinterpret_cast<const __m256i*>(from)); };
+    const __m256i low = load(table);
+    const __m256i high = load(table + 8);
+    for (int w = 0; w < Words; w += 8) {
+      const __m256i lanes = _mm256_srlv_epi32(_mm256_set1_epi32(disabled(predicate, w)), load(step.first_lane + w));
+      const __m256i bytes = LaneBytes == 1 ? lanes : _mm256_permutevar8x32_epi32(load(step.bytes), lanes);
+      const auto entry = [bytes](__m256i half) {
+        return _mm256_castsi256_ps(_mm256_permutevar8x32_epi32(half, bytes));
+      };
+      const __m256 in_high = _mm256_castsi256_ps(_mm256_slli_epi32(bytes, 28));
+      _mm256_store_ps(reinterpret_cast<float*>(of_word + w), _mm256_blendv_ps(entry(low), entry(high), in_high));
+    }
+#else
+    word entries[1 << lanes_a_word];
+    for (word lanes = 0; lanes < 1 << lanes_a_word; ++lanes) entries[lanes] = table[step.bytes[lanes]];
+    const word* const of_lanes = LaneBytes == 1 ? table : entries;
+    const auto entry = [=](int w) {
+      const word lanes = static_cast<word>(disabled(predicate, w)) >> w * lanes_a_word % 32;
+      return static_cast<int>(of_lanes[lanes % (1 << lanes_a_word)]);
+    };
+    for (int w = 0; w < Words; w += 4)
+      _mm_store_si128(reinterpret_cast<__m128i*>(of_word + w),
+                      _mm_set_epi32(entry(w + 3), entry(w + 2), entry(w + 1), entry(w)));
+#endif
+  }
+
+ private:
+  static constexpr int lanes_a_word = 4 / LaneBytes;
+
+  // The predicate's unit that holds the lanes of a word, with 1 for a disabled lane. Bits above those lanes
+  // make no difference anywhere.
+  template <class PredicateUnit>
+  static int disabled(const PredicateUnit* predicate, int w) {
+    return ~static_cast<int>(predicate[w * lanes_a_word / (8 * static_cast<int>(sizeof(PredicateUnit)))]);
+  }
+
+  static constexpr MergeStep<lanes_a_word> step{};
+};
+
+// Stores lane i of v by the rule where the predicate enables it. Memory is not touched when no lane is
+// enabled; else, unless all are, every word of it is read and written back.
+template <class M, class Rule, class Operand, class PredicateUnit>
+inline void store_where(const Operand& v, Rule rule, const PredicateUnit* predicate, void* to) {
+  bool any = false;
+  bool all = true;
+  for (int bit = 0; bit < M::count; bit += 8 * sizeof(PredicateUnit)) {
+    const PredicateUnit unit = predicate[bit / (8 * static_cast<int>(sizeof unit))];
+    any = any || unit != 0;
+    all = all && unit == static_cast<PredicateUnit>(-1);
+  }
+  if (!any) return;
+  if (all) {
+    lanes<M::count>(Write<M>(to), rule, v);
+    return;
+  }
+  using Bits = std::make_unsigned_t<typename M::container>;
+  using MaskLanes = Layout<Bits, M::bits, M::count>;
+  MergeMask<sizeof(Bits), M::count * sizeof(Bits) / 4> mask;
+  mask.look_up(predicate);
+  const auto merge = [rule](auto lane, Bits old, Bits enabled) {
+    return static_cast<Bits>(old ^ ((static_cast<Bits>(rule(lane)) ^ old) & enabled));
+  };
+  lanes<M::count>(Write<MaskLanes>(to), merge, v, Read<MaskLanes>(to), Read<MaskLanes>(mask.of_word));
+}
+
+}  // namespace
+
+#endif

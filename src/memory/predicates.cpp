@@ -1,0 +1,8 @@
+// Loads and stores of predicates.
+#include "memory/kernels.h"
+
+#include "frame/stamp.h"
+
+#include "memory/predicates.def"
+
+#include "frame/stamp_end.h"

@@ -1,0 +1,66 @@
+// Memory that an access can be caught in: the pages around it may not be touched.
+#ifndef KASTARRI_TESTS_MEMORY_H
+#define KASTARRI_TESTS_MEMORY_H
+
+#include <sys/mman.h>
+
+#include <random>
+#include <vector>
+
+#include "support/drivers.h"
+
+namespace testing_support {
+
+// A child process shares it, so that one sees what the child did before it ended.
+class Memory {
+ public:
+  static constexpr unsigned page = 4096;
+
+  explicit Memory(unsigned pages = 1)
+      : size_(pages * page),
+        all_(static_cast<unsigned char*>(
+            mmap(nullptr, size_ + 2 * page, PROT_NONE, MAP_SHARED | MAP_ANONYMOUS, -1, 0))) {
+    mprotect(begin(), size_, PROT_READ | PROT_WRITE);
+  }
+  Memory(const Memory&) = delete;
+  ~Memory() { munmap(all_, size_ + 2 * page); }
+
+  unsigned size() const { return size_; }
+  unsigned char* begin() const { return all_ + page; }
+  unsigned char* end() const { return begin() + size_; }
+  unsigned char* forbidden() const { return all_ + page / 2; }
+
+  void fill(std::mt19937& random) {
+    for (unsigned i = 0; i < size_; ++i) begin()[i] = static_cast<unsigned char>(random() >> 7);
+  }
+  std::vector<unsigned char> copy() const { return {begin(), end()}; }
+  void expect(const std::vector<unsigned char>& expected, const std::string& name) const {
+    for (unsigned i = 0; i < size_; ++i)
+      ASSERT_EQ(int{begin()[i]}, int{expected[i]})
+          << name << " [" << cstub_Km_ZNB_Orbis_R5_64k_target() << "] byte " << i;
+  }
+
+ private:
+  unsigned size_;
+  unsigned char* all_;
+};
+
+inline unsigned address_of(const void* p) { return reinterpret_cast<unsigned>(p); }
+
+// p moved by a step that may wrap.
+template <class M>
+M* moved(const void* p, int step) {
+  return reinterpret_cast<M*>(address_of(p) + static_cast<unsigned>(step));
+}
+
+// Predicates of all zeros, all ones, then random bits.
+template <class P>
+P predicate(int n, std::mt19937& random) {
+  P p = filled<P>(n % 6 == 0 ? 0 : 0xFF);
+  if (n % 6 > 1) fill_random<layout_of<P>>(p._, random);
+  return p;
+}
+
+}  // namespace testing_support
+
+#endif

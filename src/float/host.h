@@ -199,7 +199,7 @@ template <class L>
 class HostOperand<L, half_float> {
  public:
   explicit HostOperand(const void* lanes) {
-    const auto* halves = static_cast<const in_memory<std::uint16_t>*>(lanes);
+    const in_memory<std::uint16_t>* halves = static_cast<const in_memory<std::uint16_t>*>(lanes);
     if constexpr (L::count == 1) {
       number_[0] = widen(halves[0]);
       return;

@@ -114,7 +114,7 @@ inline void scatter(ElementAddresses<O>&& to, Value value) {
   to.settle();
   KASTARRI_UNROLLED
   for (int i = 0; i < O::count; ++i) {
-    auto& element = to.template element<Element>(i);
+    in_memory<Element>& element = to.template element<Element>(i);
     if constexpr (sizeof(Element) == 1) asm volatile("" : : "q"((&element)[1]));
     element = static_cast<Element>(value(i));
   }

@@ -1,7 +1,7 @@
 #!/usr/bin/env python3
 """Time every intrinsic on every target that this processor runs, and write the table.
 
-    tools/performance.py BUILD [OUTPUT] [--filter REGEX] [--repetitions N]
+    tools/performance.py BUILD [OUTPUT] [--filter REGEX] [--repetitions N] [--seconds S]
 
 BUILD is a build directory with the benchmarks in it. Every figure is a ratio, within one run, to an exported
 call that copies one register (qv_vecNx16_move): medians of the repetitions. bench/limits.txt says how much an
@@ -25,11 +25,11 @@ TARGETS = ["avx512", "avx2", "sse2"]
 BASELINE = "rk_zra32_qv_vecNx16_move"
 
 
-def run(build, target, pattern, repetitions):
+def run(build, target, pattern, repetitions, seconds):
     """Benchmark -> median time in nanoseconds, or None where the processor does not run the target."""
     environment = dict(os.environ, LD_LIBRARY_PATH=os.path.join(build, "tests", "only", target))
     command = [os.path.join(build, "bench", "kastarri_bench"), f"--benchmark_filter=^{BASELINE}$|{pattern}",
-               f"--benchmark_repetitions={repetitions}", "--benchmark_min_time=0.01", "--benchmark_format=csv",
+               f"--benchmark_repetitions={repetitions}", f"--benchmark_min_time={seconds}", "--benchmark_format=csv",
                "--benchmark_enable_random_interleaving=true"]
     result = subprocess.run(command, env=environment, capture_output=True, text=True, check=False)
     if f"target: {target}" not in result.stderr:
@@ -115,10 +115,11 @@ def main():
     parser.add_argument("output", nargs="?")
     parser.add_argument("--filter", default=".")
     parser.add_argument("--repetitions", type=int, default=5)
+    parser.add_argument("--seconds", type=float, default=0.005, help="the least time of one repetition")
     arguments = parser.parse_args()
     times = {}
     for target in TARGETS:
-        found = run(arguments.build, target, arguments.filter, arguments.repetitions)
+        found = run(arguments.build, target, arguments.filter, arguments.repetitions, arguments.seconds)
         if found:
             times[target] = found
     text, above = document(times, read_limits())

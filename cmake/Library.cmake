@@ -104,3 +104,6 @@ else()
   target_compile_options(kastarri PRIVATE ${KASTARRI_FLAGS_${KASTARRI_TARGETS}})
 endif()
 add_library(kastarri::kastarri ALIAS kastarri)
+
+install(TARGETS kastarri LIBRARY DESTINATION lib)
+install(DIRECTORY ${PROJECT_SOURCE_DIR}/include/ DESTINATION include)

@@ -22,11 +22,6 @@
   static inline void KASTARRI_SEMANTIC(OP)(const UnitsA* a, const UnitsB* b, Out r) { \
     lanes<R::count>(result<R>(r), RULE, Read<A>(a), Read<B>(b));                      \
   }
-#define KERNEL_abc(OP, R, RULE, A, B, C)                                                               \
-  template <class UnitsA, class UnitsB, class UnitsC, class Out>                                       \
-  static inline void KASTARRI_SEMANTIC(OP)(const UnitsA* a, const UnitsB* b, const UnitsC* c, Out r) { \
-    lanes<R::count>(result<R>(r), RULE, Read<A>(a), Read<B>(b), Read<C>(c));                           \
-  }
 
 // Bit i of a predicate from lane i of two operands of one layout: rule, layout.
 #define KERNEL_ab_bits(OP, RULE, L)                                                   \
@@ -40,13 +35,6 @@
   template <class Units, class Out>                                             \
   static inline void KASTARRI_SEMANTIC(OP)(const Units* a, word count, Out r) { \
     lanes<R::count>(result<R>(r), RULE(count), Read<A>(a));                     \
-  }
-
-// Memory: lane i of a register from lane i in memory and the other way round, lane by lane.
-#define KERNEL_load(OP, R, RULE, M)                                     \
-  template <class Memory, class Out>                                    \
-  static inline void KASTARRI_SEMANTIC(OP)(const Memory* from, Out r) { \
-    lanes<R::count>(result<R>(r), RULE, Read<M>(from));                 \
   }
 
 #define ENTRY(SYMBOL, SHAPE, ...) \

@@ -3,8 +3,6 @@
 #define KERNEL(OP, FORM, ...) KERNEL_##FORM(OP, __VA_ARGS__)
 #define KERNEL_a(OP, R, RULE, A) constexpr auto model_##OP = testing_support::model_of<R, A>(model::RULE);
 #define KERNEL_ab(OP, R, RULE, A, B) constexpr auto model_##OP = testing_support::model_of<R, A, B>(model::RULE);
-#define KERNEL_abc(OP, R, RULE, A, B, C) constexpr auto model_##OP = testing_support::model_of<R, A, B, C>(model::RULE);
-#define KERNEL_a_count KERNEL_a
 #define KERNEL_ab_bits(OP, RULE, L) \
   constexpr auto model_##OP = testing_support::model_of<Layout<word, 1, L::count, predicate_bit>, L, L>(model::RULE);
 

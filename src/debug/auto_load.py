@@ -1,5 +1,5 @@
 # gdb runs this when it loads the library beside which it lies, as <library>-gdb.py. The printers are modules in
-# kastarri/gdb below the library: imported once, they keep their settings when the program is run again.
+# kastarri/gdb below it: imported once, they keep their settings when the program is run again.
 import os
 import sys
 
@@ -7,13 +7,11 @@ import gdb
 
 
 def _load_kastarri():
-    objfile = gdb.current_objfile()  # none if a user sources this file
-    directory = os.path.dirname(os.path.realpath(objfile.filename if objfile else __file__))
-    modules = os.path.join(directory, "kastarri", "gdb")
+    modules = os.path.join(os.path.dirname(os.path.realpath(__file__)), "kastarri", "gdb")
     if modules not in sys.path:
         sys.path.append(modules)
     import kastarri_printers
-    kastarri_printers.register(objfile)
+    kastarri_printers.register(gdb.current_objfile())  # none if a user sources this file
 
 
 _load_kastarri()

@@ -141,7 +141,7 @@ def gdb(program, *commands, arguments=()):
         ["gdb", "-nx", "-q", "-batch", "-iex", "add-auto-load-safe-path " + os.path.dirname(LIBRARY), "-ex", "set width 0",
          "-ex", "set debuginfod enabled off", "-ex", "break stop_here", "-ex", f"run {' '.join(arguments)} > {os.devnull}",
          *(word for command in commands for word in ("-ex", command)), path(program)],
-        capture_output=True, text=True, timeout=100, check=False)
+        capture_output=True, text=True, timeout=600, check=False)
     return result.stdout, result.stderr
 
 

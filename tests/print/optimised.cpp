@@ -6,7 +6,7 @@ __attribute__((noinline)) void stop_here(const void* pointer) { asm volatile("" 
 __attribute__((noinline)) unsigned kernel(unsigned k, const qv_vecNx48* nothing) {
   vboolN gone;
   gone._[0] = k * 3;
-  qv_int48 half_gone;
+  qv_vecNx48 half_gone;  // the upper word of its lane 0
   half_gone._[0] = k;
   qv_vecNx16 part;
   part._[0] = k;

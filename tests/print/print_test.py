@@ -258,6 +258,7 @@ for name in {list(TYPES)}:
                 self.assertIn("part = 32 x int16 q15 = {0.00003, 0.00000, 0.00015, 0.00000, ", output)
                 if compiler == "g++":  # clang says that what was never written is 0
                     self.assertRegex(output, r"part = .* 0.00000, <optimized out>, <optimized out>")
+                    self.assertIn("half_gone = 32 x int48 = {<optimized out>, <optimized out>, ", output)
                 self.assertIn("^done,variables=", output)
                 self.assertNotIn("Python", output + errors)
 

@@ -79,10 +79,13 @@ class Scalar:
         self.unit_bits = 8 * self.units[0].type.sizeof
         self.share = 8 * value.type.sizeof // count
 
+    def units_with(self, position, bits):
+        """The units in which so many bits from bit `position` lie."""
+        return [self.units[k] for k in range(position // self.unit_bits, (position + bits - 1) // self.unit_bits + 1)]
+
     def pattern(self, position, bits):
-        """That many bits of the register from bit `position`. Raises gdb.error where they cannot be read."""
-        first, last = position // self.unit_bits, (position + bits - 1) // self.unit_bits
-        units = sum(int(self.units[k]) << self.unit_bits * (k - first) for k in range(first, last + 1))
+        """So many bits of the register from bit `position`. Raises gdb.error where they cannot be read."""
+        units = sum(int(unit) << self.unit_bits * k for k, unit in enumerate(self.units_with(position, bits)))
         return units >> position % self.unit_bits & (1 << bits) - 1
 
     def lane(self, index):
@@ -136,7 +139,7 @@ class Vector(Scalar):
         try:
             lane = self.lane(index)
         except gdb.error:
-            return self.units[index * self.share // self.unit_bits]  # gdb says why it cannot be read
+            return next(filter(cannot_be_read, self.units_with(index * self.share, self.bits)))  # gdb says why
         if isinstance(lane, float):
             return gdb.Value(lane).cast(gdb.lookup_type("float"))
         if isinstance(lane, int):
@@ -162,6 +165,14 @@ class LaneText(Scalar):
 
     def to_string(self):
         return self.lane(0)
+
+
+def cannot_be_read(unit):
+    try:
+        int(unit)
+    except gdb.error:
+        return True
+    return False
 
 
 def unreadable(error):

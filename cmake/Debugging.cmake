@@ -1,0 +1,12 @@
+# The printers for gdb: a script that gdb loads with the library beside which it lies, and its modules. The
+# build tree is laid out as the installed one.
+set(script libkastarri.so.${PROJECT_VERSION}-gdb.py)
+set(modules kastarri_printers.py kastarri_register_types.py)
+
+configure_file(${PROJECT_SOURCE_DIR}/src/debug/auto_load.py ${CMAKE_CURRENT_BINARY_DIR}/${script} COPYONLY)
+foreach(module IN LISTS modules)
+  configure_file(${PROJECT_SOURCE_DIR}/src/debug/gdb/${module} ${CMAKE_CURRENT_BINARY_DIR}/kastarri/gdb/${module} COPYONLY)
+endforeach()
+
+install(FILES ${CMAKE_CURRENT_BINARY_DIR}/${script} DESTINATION lib)
+install(DIRECTORY ${CMAKE_CURRENT_BINARY_DIR}/kastarri/gdb DESTINATION lib/kastarri FILES_MATCHING PATTERN "*.py")

@@ -11,9 +11,11 @@
 
 namespace {
 
-// Memory for the operands that point to it, cache-line aligned.
+// Memory for the operands that point to it. Where it and the operands lie within their pages is settled here:
+// processors take a load that follows a store to the same place of another page for one that depends on it.
+constexpr int page = 4096;
 struct Arena {
-  alignas(64) unsigned char bytes[4096];
+  alignas(page) unsigned char bytes[page];
 };
 
 Arena arena;
@@ -91,7 +93,7 @@ using bare = std::remove_cv_t<std::remove_reference_t<T>>;
 
 template <class R, class... A>
 void time_calls(benchmark::State& state, R (*f)(A...)) {
-  alignas(64) std::tuple<Argument<bare<A>>...> arguments;
+  alignas(page) std::tuple<Argument<bare<A>>...> arguments;
   if constexpr ((std::is_pointer_v<A> || ...))
     std::apply([](auto&... a) { (place_in_arena(a.get()), ...); }, arguments);
   asm volatile("" : "+r"(f));  // a call, as from another library: the compiler knows nothing of it

@@ -21,4 +21,6 @@ void kastarri::not_aligned(unsigned address) {
       address);
 }
 
+void kastarri::end_not_aligned(unsigned address) { not_aligned(address); }
+
 void cstub_vaddr_not_aligned(unsigned address) { kastarri::not_aligned(address); }

@@ -5,7 +5,7 @@
 #include <cstdint>
 #include <cstring>
 
-#include "kastarri/state.h"
+#include "frame/failure.h"
 
 namespace {
 
@@ -23,12 +23,15 @@ inline M* writable(const M* memory) {
 // The core's test of an address: bit 0 is clear for an object of 16 bits, bits 0 and 1 for a wider one. The
 // compiler must not see where the address comes from: it may take objects to be aligned, and would drop the test.
 template <class M>
-inline void require_aligned(const M* memory) {
+inline bool is_aligned(const M* memory) {
   constexpr std::uintptr_t low_bits = sizeof(M) < 4 ? sizeof(M) - 1 : 3;
   auto at = reinterpret_cast<std::uintptr_t>(memory);
   asm("" : "+r"(at));
-  if (at & low_bits) cstub_vaddr_not_aligned(at);
+  return (at & low_bits) == 0;
 }
+
+// For a function that returns nothing to end in: return not_aligned(memory);
+inline void not_aligned(const void* memory) { kastarri::end_not_aligned(reinterpret_cast<std::uintptr_t>(memory)); }
 
 }  // namespace
 

@@ -149,27 +149,30 @@ struct LaneMask<16, 32> {
   }
 };
 
+// 16 lanes of 32 bits from the low 16 bits.
+inline void expand_to_words(std::uint32_t* lane, word bits) {
+#if defined __AVX512BW__
+  _mm512_store_si512(lane, _mm512_movm_epi32(static_cast<__mmask16>(bits)));
+#elif defined __AVX2__
+  const __m256i v = _mm256_set1_epi32(static_cast<int>(bits));
+  __m256i bit = _mm256_set_epi32(0x80, 0x40, 0x20, 0x10, 8, 4, 2, 1);
+  for (int h = 0; h < 2; ++h, bit = _mm256_slli_epi32(bit, 8))
+    _mm256_store_si256(reinterpret_cast<__m256i*>(lane) + h, _mm256_cmpeq_epi32(_mm256_and_si256(v, bit), bit));
+#else
+  const __m128i v = _mm_set1_epi32(static_cast<int>(bits));
+  __m128i bit = _mm_set_epi32(8, 4, 2, 1);
+  for (int q = 0; q < 4; ++q, bit = _mm_slli_epi32(bit, 4))
+    reinterpret_cast<__m128i*>(lane)[q] = _mm_cmpeq_epi32(_mm_and_si128(v, bit), bit);
+#endif
+}
+
 // 16 lanes of 32 bits under a vboolN_2.
 template <>
 struct LaneMask<32, 16> {
   using lane_type = std::uint32_t;
   alignas(64) lane_type lane[16];
 
-  void expand(const std::uint16_t* bits) {
-#if defined __AVX512BW__
-    _mm512_store_si512(lane, _mm512_movm_epi32(*bits));
-#elif defined __AVX2__
-    const __m256i v = _mm256_set1_epi32(*bits);
-    __m256i bit = _mm256_set_epi32(0x80, 0x40, 0x20, 0x10, 8, 4, 2, 1);
-    for (int h = 0; h < 2; ++h, bit = _mm256_slli_epi32(bit, 8))
-      _mm256_store_si256(reinterpret_cast<__m256i*>(lane) + h, _mm256_cmpeq_epi32(_mm256_and_si256(v, bit), bit));
-#else
-    const __m128i v = _mm_set1_epi32(*bits);
-    __m128i bit = _mm_set_epi32(8, 4, 2, 1);
-    for (int q = 0; q < 4; ++q, bit = _mm_slli_epi32(bit, 4))
-      reinterpret_cast<__m128i*>(lane)[q] = _mm_cmpeq_epi32(_mm_and_si128(v, bit), bit);
-#endif
-  }
+  void expand(const std::uint16_t* bits) { expand_to_words(lane, *bits); }
 
   void collect(std::uint16_t* bits) const {
 #if defined __AVX512BW__
@@ -180,6 +183,18 @@ struct LaneMask<32, 16> {
     const __m128i high = _mm_packs_epi32(quarter[2], quarter[3]);
     *bits = static_cast<std::uint16_t>(_mm_movemask_epi8(_mm_packs_epi16(low, high)));
 #endif
+  }
+};
+
+// 32 lanes of 32 bits under a vboolN: addresses of 16-bit elements.
+template <>
+struct LaneMask<32, 32> {
+  using lane_type = std::uint32_t;
+  alignas(64) lane_type lane[32];
+
+  void expand(const word* bits) {
+    expand_to_words(lane, *bits);
+    expand_to_words(lane + 16, *bits >> 16);
   }
 };
 

@@ -25,12 +25,16 @@ class ElementAddresses {
   // Enabled are the elements whose predicate bit is 1, or whose mask is not 0, or all: Same(true).
   template <class PredicateUnit>
   ElementAddresses(const void* base, const Read<O>& offsets, const PredicateUnit* predicate) {
-    LaneMask<O::bits, count> mask;
+    LaneMask<8 * sizeof(std::uintptr_t), count> mask;
     mask.expand(predicate);
-    fill(base, offsets, mask.lane);
+    fill(base, offsets, [&](int i) { return mask.lane[i]; });
   }
-  ElementAddresses(const void* base, const Read<O>& offsets, const Read<O>& masks) { fill(base, offsets, masks); }
-  ElementAddresses(const void* base, const Read<O>& offsets, Same<bool> all) { fill(base, offsets, all); }
+  ElementAddresses(const void* base, const Read<O>& offsets, const Read<O>& masks) {
+    fill(base, offsets, [&](int i) { return masks[i] ? ~std::uintptr_t{0} : std::uintptr_t{0}; });
+  }
+  ElementAddresses(const void* base, const Read<O>& offsets, Same<bool>) {
+    fill(base, offsets, [](int) { return ~std::uintptr_t{0}; });
+  }
   ElementAddresses(const ElementAddresses&) = delete;
 
   // Has the addresses in memory, to be read one by one: compilers would rather take vectors apart, which
@@ -44,14 +48,15 @@ class ElementAddresses {
   }
 
  private:
-  template <class Enabled>
-  void fill(const void* base, const Read<O>& offsets, const Enabled& enabled) {
+  // An element's mask is all ones, or 0 when it is disabled.
+  template <class MaskOf>
+  void fill(const void* base, const Read<O>& offsets, MaskOf mask_of) {
     const auto nowhere = reinterpret_cast<std::uintptr_t>(&nowhere_);
     const auto from = reinterpret_cast<std::uintptr_t>(base) - nowhere;
     KASTARRI_LANES_INDEPENDENT
     for (int i = 0; i < count; ++i) {
       const std::uintptr_t there = from + offsets[i];
-      at_[i] = nowhere + (enabled[i] ? there : 0);
+      at_[i] = nowhere + (there & mask_of(i));
     }
   }
 

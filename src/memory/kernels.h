@@ -10,7 +10,11 @@ namespace {
 // Bits go over as they are: extended by the layout they are read from, cut to the one they are written to.
 constexpr auto SAME = [](auto lane) { return lane; };
 constexpr auto SATURATE8 = [](std::int16_t lane) { return saturate<std::int8_t>(lane); };
-constexpr auto SATURATE16 = [](std::int32_t lane) { return saturate<std::int16_t>(lane); };
+// A lane fits if its upper 17 bits are alike: one comparison, where SSE2 has no 32-bit minimum and maximum.
+constexpr auto SATURATE16 = [](std::int32_t lane) {
+  const std::int32_t sign = sign_fill(lane);
+  return static_cast<std::int16_t>((lane >> 15) == sign ? lane : sign ^ 0x7FFF);
+};
 
 }  // namespace
 

@@ -20,13 +20,13 @@
   *pointer = address(from, increment);
 
 #define SIG_load_IP_aligned SIG_load_IP
-#define BODY_load_IP_aligned(V, M, K) \
-  require_aligned(*pointer);          \
+#define BODY_load_IP_aligned(V, M, K)                      \
+  if (!is_aligned(*pointer)) return not_aligned(*pointer); \
   BODY_load_IP(V, M, K)
 
 #define SIG_load_IP_aligned_destination SIG_load_IP
 #define BODY_load_IP_aligned_destination(V, M, K) \
-  require_aligned(&r);                            \
+  if (!is_aligned(&r)) return not_aligned(&r);    \
   BODY_load_IP(V, M, K)
 
 #define SIG_load_I_T(SYMBOL, V, M, P, K) V SYMBOL(const M* base, int offset, const P& p)
@@ -53,13 +53,13 @@
   *pointer = address(to, increment);
 
 #define SIG_store_I_aligned SIG_store_I
-#define BODY_store_I_aligned(V, M, K)     \
-  require_aligned(address(base, offset)); \
+#define BODY_store_I_aligned(V, M, K)                                                \
+  if (!is_aligned(address(base, offset))) return not_aligned(address(base, offset)); \
   BODY_store_I(V, M, K)
 
 #define SIG_store_IP_aligned SIG_store_IP
-#define BODY_store_IP_aligned(V, M, K) \
-  require_aligned(*pointer);           \
+#define BODY_store_IP_aligned(V, M, K)                     \
+  if (!is_aligned(*pointer)) return not_aligned(*pointer); \
   BODY_store_IP(V, M, K)
 
 #define SIG_store_I_T(SYMBOL, V, M, P, K) void SYMBOL(const V& v, const M* base, int offset, const P& p)

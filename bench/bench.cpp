@@ -110,19 +110,24 @@ void time_calls(benchmark::State& state, R (*f)(A...)) {
 
 }  // namespace
 
-#define ENTRY(SYMBOL, SHAPE, ...)                                  \
-  const auto* const timed_##SYMBOL = benchmark::RegisterBenchmark( \
-      #SYMBOL, [](benchmark::State& state) { time_calls(state, &KASTARRI_SYMBOL(SYMBOL)); });
-#define HELPER(NAME, SHAPE, ...)                                 \
-  const auto* const timed_##NAME = benchmark::RegisterBenchmark( \
-      "RK_" #NAME, [](benchmark::State& state) { time_calls(state, &cstub_Km_ZNB_Orbis_R5_64k_##NAME); });
-
 namespace {
+
+struct Timed {
+  const char* name;
+  void (*run)(benchmark::State&);
+};
+
+#define ENTRY(SYMBOL, SHAPE, ...) \
+  {#SYMBOL, [](benchmark::State& state) { time_calls(state, &KASTARRI_SYMBOL(SYMBOL)); }},
+#define HELPER(NAME, SHAPE, ...) \
+  {"RK_" #NAME, [](benchmark::State& state) { time_calls(state, &cstub_Km_ZNB_Orbis_R5_64k_##NAME); }},
 
 #include "frame/rows.h"
 
+constexpr Timed timed[] = {
 #include "scalar_rows.def"
 #include "rows.def"
+};
 
 #include "frame/rows_end.h"
 
@@ -143,5 +148,6 @@ int main(int argc, char** argv) {
   benchmark::Initialize(&argc, argv);
   benchmark::AddCustomContext("target", cstub_Km_ZNB_Orbis_R5_64k_target());
   open_ports();
+  for (const Timed& intrinsic : timed) benchmark::RegisterBenchmark(intrinsic.name, intrinsic.run);
   benchmark::RunSpecifiedBenchmarks();
 }

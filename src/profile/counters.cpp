@@ -63,7 +63,9 @@ Counters* free_counters;  // of threads that ended: the next ones go on counting
   std::abort();
 }
 
-[[noreturn]] void missing() { fail("the program's libkastarri lacks this intrinsic: it is not the profiler's version"); }
+[[noreturn]] void missing() {
+  fail("the program's libkastarri lacks this intrinsic: it is not the profiler's version");
+}
 
 // Done at the first call: a constructor of this library would come too late for calls from those of others, and
 // the program may load libkastarri while it runs. Several threads may do it at once: all write the same. A lock

@@ -55,9 +55,17 @@ void in_threads(int threads, int times) {
 // Parent and child count at the same time, and so does a thread of the child that begins when another has ended.
 void in_fork() {
   add(1);
+  int child_runs[2];
+  if (pipe(child_runs) != 0) std::abort();
   const pid_t child = fork();
-  if (child == 0) in_threads(1, 10);
-  add(200000);
+  char byte = 0;
+  if (child == 0) {
+    in_threads(1, 10);
+    if (write(child_runs[1], &byte, 1) != 1) std::abort();
+  } else if (read(child_runs[0], &byte, 1) != 1) {
+    std::abort();
+  }
+  add(5000000);
   if (child == 0) _exit(0);
   int status;
   waitpid(child, &status, 0);

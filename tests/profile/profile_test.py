@@ -62,7 +62,7 @@ class Counts(ProfileTest):
         self.assert_added(self.counts(CALLS, "many-threads"), 3000)
 
     def test_forked_and_executed_processes_are_counted(self):
-        self.assert_added(self.counts(CALLS, "fork"), 1 + 10 + 2 * 200000)
+        self.assert_added(self.counts(CALLS, "fork"), 1 + 10 + 2 * 5000000)
         for mode in ("exec", "fork-exec"):
             with self.subTest(mode=mode):
                 both = {name: RESULTS.get(name, 0) + BEFORE_MAIN.get(name, 0) for name in RESULTS}

@@ -1,0 +1,36 @@
+# kastarri-profile: the counting library, the list of intrinsics beside it, and the program, which finds both by
+# their place relative to its own. The build tree is laid out as the installed one.
+include(GNUInstallDirs)
+find_package(Python3 REQUIRED COMPONENTS Interpreter)
+enable_language(ASM)
+
+file(RELATIVE_PATH KASTARRI_PROFILE_FILES
+  ${CMAKE_INSTALL_FULL_BINDIR} ${CMAKE_INSTALL_FULL_LIBDIR}/kastarri)
+set(programs ${PROJECT_BINARY_DIR}/bin)
+cmake_path(ABSOLUTE_PATH KASTARRI_PROFILE_FILES BASE_DIRECTORY ${programs} NORMALIZE OUTPUT_VARIABLE files)
+file(MAKE_DIRECTORY ${files})
+configure_file(${PROJECT_SOURCE_DIR}/tools/kastarri-profile.in ${programs}/kastarri-profile @ONLY
+  FILE_PERMISSIONS OWNER_READ OWNER_WRITE OWNER_EXECUTE GROUP_READ GROUP_EXECUTE WORLD_READ WORLD_EXECUTE)
+
+set(tools ${PROJECT_SOURCE_DIR}/tools)
+add_custom_command(OUTPUT ${files}/intrinsics.inc ${files}/intrinsics.csv
+  COMMAND Python3::Interpreter ${tools}/list_intrinsics.py $<TARGET_FILE:kastarri> ${files}
+  DEPENDS kastarri ${tools}/list_intrinsics.py ${tools}/generate_headers.py
+  COMMENT "Listing the intrinsics for kastarri-profile" VERBATIM)
+
+set(source ${PROJECT_SOURCE_DIR}/src/profile)
+add_library(kastarri-profile MODULE ${source}/counters.cpp ${source}/entries.S
+  ${files}/intrinsics.inc ${files}/intrinsics.csv)
+set_property(SOURCE ${source}/counters.cpp ${source}/entries.S APPEND PROPERTY OBJECT_DEPENDS ${files}/intrinsics.inc)
+set_target_properties(kastarri-profile PROPERTIES LIBRARY_OUTPUT_DIRECTORY ${files} LINKER_LANGUAGE C)
+target_include_directories(kastarri-profile PRIVATE ${files})
+target_compile_definitions(kastarri-profile PRIVATE
+  _FILE_OFFSET_BITS=64 KASTARRI_SONAME="libkastarri.so.${PROJECT_VERSION_MAJOR}")
+target_compile_options(kastarri-profile PRIVATE $<$<COMPILE_LANGUAGE:CXX>:
+  -O2 -fno-exceptions -fno-rtti -fno-threadsafe-statics -fvisibility=hidden -mstackrealign>)
+target_link_options(kastarri-profile PRIVATE -static-libgcc -Wl,-z,text -Wl,-z,noexecstack -Wl,--no-undefined)
+target_link_libraries(kastarri-profile PRIVATE pthread ${CMAKE_DL_LIBS})
+
+install(PROGRAMS ${programs}/kastarri-profile DESTINATION ${CMAKE_INSTALL_BINDIR})
+install(TARGETS kastarri-profile LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR}/kastarri)
+install(FILES ${files}/intrinsics.csv DESTINATION ${CMAKE_INSTALL_LIBDIR}/kastarri)

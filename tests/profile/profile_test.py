@@ -1,0 +1,191 @@
+"""kastarri-profile: counts that are exact, programs that notice nothing, tables that outlive a crash.
+
+Run as: profile_test.py BUILD CMAKE
+"""
+
+import csv
+import os
+import signal
+import subprocess
+import sys
+import tempfile
+import unittest
+import xml.etree.ElementTree
+
+BUILD, CMAKE = sys.argv[1:3]
+PROFILER = os.path.join(BUILD, "bin", "kastarri-profile")
+PROGRAMS = os.path.join(BUILD, "tests", "profile")
+CALLS = os.path.join(PROGRAMS, "calls_lazy")
+BUILDS = [os.path.join(PROGRAMS, name) for name in ("calls_lazy", "calls_now", "calls_no_plt", "calls_fixed")]
+HOST, PLUGIN = os.path.join(PROGRAMS, "host"), os.path.join(PROGRAMS, "libplugin.so")
+
+BEFORE_MAIN = {"RK_CLAMPS": 1, "int32_rtor_qv_vecNx16": 1}
+RESULTS = {"RK_CLAMPS": 2, "int32_rtor_qv_vecNx16": 1, "ZRA_LVNX16_IP": 1, "ZRA_MULNX16": 1, "ZRA_MULANX16": 1,
+           "float_rtor_qv_vecN_2xf32": 1}
+SVG = "{http://www.w3.org/2000/svg}"
+
+
+class ProfileTest(unittest.TestCase):
+    def setUp(self):
+        directory = tempfile.TemporaryDirectory()
+        self.addCleanup(directory.cleanup)
+        self.directory = directory.name
+
+    def path(self, name):
+        return os.path.join(self.directory, name)
+
+    def run_profiler(self, *arguments, profiler=PROFILER, **options):
+        return subprocess.run([profiler, *arguments], capture_output=True, text=True, check=False, timeout=60, **options)
+
+    def counts(self, *command, status=0):
+        """Name -> calls of a program's run, which has to end with `status`."""
+        result = self.run_profiler("--csv", self.path("counts.csv"), *command)
+        self.assertEqual(result.returncode, status, result.stderr)
+        with open(self.path("counts.csv"), encoding="utf-8", newline="") as file:
+            return {row["name"]: int(row["calls"]) for row in csv.DictReader(file)}
+
+    def assert_added(self, counts, calls):
+        self.assertEqual(counts, dict(BEFORE_MAIN, ZRA_ADDNX16=calls))
+
+
+class Counts(ProfileTest):
+    def test_calls_are_counted_however_the_program_is_linked(self):
+        for program in BUILDS:
+            with self.subTest(program=program):
+                self.assertEqual(self.counts(program, "results"), RESULTS)
+                self.assertEqual(self.counts(program, "pointers"), dict(BEFORE_MAIN, ZRA_ADDNX16=3, ZRA_SUBNX16=3))
+
+    def test_no_thread_loses_a_call(self):
+        self.assert_added(self.counts(CALLS, "threads"), 400000)
+
+    def test_counters_of_ended_threads_are_used_again(self):
+        self.assert_added(self.counts(CALLS, "many-threads"), 3000)
+
+    def test_forked_and_executed_processes_are_counted(self):
+        self.assert_added(self.counts(CALLS, "fork"), 1 + 10 + 2 * 5000000)
+        for mode in ("exec", "fork-exec"):
+            with self.subTest(mode=mode):
+                both = {name: RESULTS.get(name, 0) + BEFORE_MAIN.get(name, 0) for name in RESULTS}
+                self.assertEqual(self.counts(CALLS, mode), dict(both, ZRA_ADDNX16=3))
+
+    def test_plugins_are_counted(self):
+        self.assertEqual(self.counts("--anyway", HOST, PLUGIN, PLUGIN), {"RK_MAX": 2, "RK_MIN": 2})
+
+    def test_what_the_library_calls_itself_is_not_counted(self):
+        self.assertEqual(self.counts(CALLS, "unaligned", status=1), dict(BEFORE_MAIN, ZRA_SBN_I=1))
+
+
+class Transparency(ProfileTest):
+    def test_results_input_output_and_arguments_are_those_of_the_program(self):
+        for program in BUILDS:
+            for arguments, text in ((["results"], ""), (["copy"], "a line\nanother"), (["arguments", "--top", "-h", "a b"], "")):
+                with self.subTest(program=program, arguments=arguments):
+                    plain = subprocess.run([program, *arguments], capture_output=True, text=True, input=text, check=True)
+                    profiled = self.run_profiler("--output", self.path("table"), program, *arguments, input=text)
+                    self.assertEqual((profiled.stdout, profiled.stderr, profiled.returncode), (plain.stdout, "", 0))
+                    self.assertNotEqual(plain.stdout, "")
+
+    def test_status_is_passed_on_and_the_table_written_however_the_program_ends(self):
+        for mode, argument, status in (("exit", 3, 3), ("_exit", 4, 4), ("fault", 16, -signal.SIGSEGV),
+                                       ("signal", int(signal.SIGABRT), -signal.SIGABRT),
+                                       ("signal", int(signal.SIGKILL), -signal.SIGKILL)):
+            with self.subTest(mode=mode, argument=argument):
+                self.assert_added(self.counts(CALLS, mode, str(argument), status=status), 5)
+
+    def test_the_message_of_an_alignment_failure_comes_before_the_table(self):
+        result = self.run_profiler(CALLS, "unaligned")
+        self.assertEqual(result.returncode, 1)
+        self.assertRegex(result.stderr, r"\AError: .* is not properly aligned\.\n\ncalls_lazy: 3 calls of 3 intrinsics\n")
+
+    def test_signals_reach_the_program(self):
+        for number in (signal.SIGTERM, signal.SIGINT):
+            with self.subTest(signal=number):
+                with subprocess.Popen([PROFILER, CALLS, "wait"], stdout=subprocess.PIPE, stderr=subprocess.PIPE,
+                                      text=True) as running:
+                    self.assertEqual(running.stdout.readline(), "ready\n")
+                    running.send_signal(number)
+                    table = running.communicate(timeout=60)[1]
+                self.assertEqual(running.returncode, -number)
+                self.assertRegex(table, r" 4 .* ZRA_ADDNX16\n")
+
+
+class Output(ProfileTest):
+    def test_table_names_the_most_called_and_the_families(self):
+        table = self.run_profiler("--top", "2", CALLS, "pointers").stderr
+        self.assertEqual([line.split() for line in table.splitlines() if line], [
+            ["calls_lazy:", "8", "calls", "of", "4", "intrinsics"],
+            ["calls", "share", "family", "intrinsic"],
+            ["3", "37.5%", "integer", "ZRA_ADDNX16"],
+            ["3", "37.5%", "integer", "ZRA_SUBNX16"],
+            ["2", "25.0%", "2", "more"],
+            ["calls", "share", "family"],
+            ["6", "75.0%", "integer"],
+            ["1", "12.5%", "conversions"],
+            ["1", "12.5%", "scalar"]])
+
+    def test_picture_is_well_formed_and_inside_its_frame(self):
+        program = self.path("a<b&c")
+        os.symlink(CALLS, program)
+        for top, bars in ((1, 1), (25, 6)):
+            with self.subTest(top=top):
+                self.run_profiler("--svg", self.path("p.svg"), "--top", str(top), program, "results")
+                picture = xml.etree.ElementTree.parse(self.path("p.svg")).getroot()
+                width, height = float(picture.get("width")), float(picture.get("height"))
+                self.assertEqual(picture.get("viewBox"), f"0 0 {picture.get('width')} {picture.get('height')}")
+                rectangles = picture.findall(SVG + "rect")
+                families = 4
+                self.assertEqual(len(rectangles), 1 + 2 * families + bars)
+                for r in rectangles[1:]:
+                    self.assertLessEqual(float(r.get("x")) + float(r.get("width")), width)
+                    self.assertLessEqual(float(r.get("y")) + float(r.get("height")), height)
+                texts = [t.text for t in picture.findall(SVG + "text")]
+                self.assertIn("Intrinsics called by a<b&c", texts)
+                self.assertIn("2 (28.6%)", texts)
+                self.assertEqual("and 5 more: 5 (71.4%)" in texts, top == 1)
+
+    def test_a_program_that_calls_nothing_has_empty_tables(self):
+        result = self.run_profiler("--anyway", "--csv", self.path("counts.csv"), "--svg", self.path("p.svg"), HOST)
+        self.assertEqual(result.stderr, "\nhost: 0 calls of 0 intrinsics\n")
+        with open(self.path("counts.csv"), encoding="utf-8") as file:
+            self.assertEqual(file.read(), "name,family,calls\n")
+        xml.etree.ElementTree.parse(self.path("p.svg"))
+
+    def test_the_installed_profiler_works(self):
+        subprocess.run([CMAKE, "--install", BUILD, "--prefix", self.path("installed")], check=True, capture_output=True)
+        os.symlink(self.path("installed/bin/kastarri-profile"), self.path("link"))
+        result = self.run_profiler(CALLS, "results", profiler=self.path("link"))
+        self.assertIn("7 calls of 6 intrinsics", result.stderr)
+
+
+class Errors(ProfileTest):
+    def program(self, name, content, mode=0o755):
+        with open(self.path(name), "wb") as file:
+            file.write(content)
+        os.chmod(self.path(name), mode)
+        return self.path(name)
+
+    def test_what_cannot_be_profiled_is_named(self):
+        x86 = b"\x7fELF\x01\x01\x01" + bytes(9) + b"\x02\x00\x03\x00" + bytes(32)
+        x86_64 = b"\x7fELF\x02\x01\x01" + bytes(9) + b"\x02\x00\x3e\x00" + bytes(44)
+        for command, status, message in (
+                (["no-such-program"], 127, "there is no program no-such-program"),
+                ([self.path("absent")], 127, "there is no program"),
+                ([self.directory], 126, "not an executable file"),
+                ([self.program("plain", x86, mode=0o644)], 126, "not an executable file"),
+                ([self.program("script", b"#!/bin/sh\n")], 126, "not a program but a script"),
+                ([self.program("empty", b"")], 126, "not a program"),
+                ([self.program("wide", x86_64)], 126, "not a 32-bit x86 program"),
+                ([self.program("static", x86)], 126, "linked statically"),
+                ([HOST], 126, "not linked with libkastarri.so"),
+                (["--csv", self.path("no/such.csv"), CALLS], 125, "cannot write .*no/such.csv: No such file"),
+                (["--top", "0", CALLS], 2, "--top: '0' is not a number above 0"),
+                ([], 2, "which program")):
+            with self.subTest(command=command):
+                result = self.run_profiler(*command)
+                self.assertEqual(result.returncode, status, result.stderr)
+                self.assertRegex(result.stderr, "kastarri-profile: .*" + message)
+                self.assertNotIn("Traceback", result.stderr)
+
+
+if __name__ == "__main__":
+    unittest.main(argv=[sys.argv[0]])

@@ -92,7 +92,7 @@ template <class T>
 using bare = std::remove_cv_t<std::remove_reference_t<T>>;
 
 template <class R, class... A>
-void time_calls(benchmark::State& state, R (*f)(A...)) {
+[[gnu::noinline]] void time_calls(benchmark::State& state, R (*f)(A...)) {
   alignas(page) std::tuple<Argument<bare<A>>...> arguments;
   if constexpr ((std::is_pointer_v<A> || ...))
     std::apply([](auto&... a) { (place_in_arena(a.get()), ...); }, arguments);

@@ -4,15 +4,17 @@
 #   make demo      build the library and the examples and run them on the recording that is shipped
 #   make test      build everything and run the tests
 #   make bench     time every intrinsic and write docs/performance.md
-#   make install   install library and headers (PREFIX=/usr/local, DESTDIR=)
+#   make install   install libraries and headers (PREFIX=/usr/local, DESTDIR=, LIBDIR=lib)
+#   make package   make Debian packages in build/packages
 #   make headers   write the public headers and docs/coverage.md anew from the tables of rows
 #   make format    format the sources
 #   make clean     remove build/
 
 PREFIX ?= /usr/local
+LIBDIR ?= lib
 CMAKE_BUILD = cmake --build --parallel --preset
 
-.PHONY: help demo test bench install headers format clean
+.PHONY: help demo test bench install package headers format clean
 
 help:
 	@sed -n 's/^#   //p' Makefile
@@ -37,9 +39,15 @@ bench:
 
 install:
 	tools/packages.sh build
-	cmake --preset demo
-	$(CMAKE_BUILD) demo
-	DESTDIR=$(DESTDIR) cmake --install build/demo --prefix $(PREFIX)
+	cmake --preset install -DCMAKE_INSTALL_LIBDIR=$(LIBDIR)
+	$(CMAKE_BUILD) install
+	DESTDIR=$(DESTDIR) cmake --install build/install --prefix $(PREFIX)
+
+package:
+	tools/packages.sh build
+	cmake --preset install -DCMAKE_INSTALL_LIBDIR=lib/i386-linux-gnu
+	$(CMAKE_BUILD) install
+	cpack --config build/install/CPackConfig.cmake -B build/packages
 
 headers:
 	tools/packages.sh build

@@ -75,7 +75,7 @@ class Installation(Directory):
 
     def configure(self, *arguments):
         return run("cmake", "-S", os.path.join(HERE, "consumer"), "-B", self.path("build"),
-                   f"-DCMAKE_PREFIX_PATH={self.prefix}", *arguments)
+                   "-DCMAKE_BUILD_TYPE=Release", f"-DCMAKE_PREFIX_PATH={self.prefix}", *arguments)
 
     def check_answer(self, program, **environment):
         answer = output(program, env=dict(os.environ, **environment)).split()

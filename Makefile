@@ -1,18 +1,21 @@
 # The front door: a thin face over CMake. Every target builds below build/ and installs the Debian packages
 # that it needs and does not find (tools/packages.sh).
 #
-#   make demo      build the library and the examples and run them on the recording that is shipped
-#   make test      build everything and run the tests
-#   make bench     time every intrinsic and write docs/performance.md
-#   make install   install library and headers (PREFIX=/usr/local, DESTDIR=)
-#   make headers   write the public headers and docs/coverage.md anew from the tables of rows
-#   make format    format the sources
-#   make clean     remove build/
+#   make demo          build the library and the examples and run them on the recording that is shipped
+#   make test          build everything and run the tests
+#   make bench         time every intrinsic and write docs/performance.md
+#   make bench-static  time kernels with the static library against the shared one
+#   make install       install libraries and headers (PREFIX=/usr/local, DESTDIR=, LIBDIR=lib)
+#   make package       make Debian packages in build/packages
+#   make headers       write the public headers and docs/coverage.md anew from the tables of rows
+#   make format        format the sources
+#   make clean         remove build/
 
 PREFIX ?= /usr/local
+LIBDIR ?= lib
 CMAKE_BUILD = cmake --build --parallel --preset
 
-.PHONY: help demo test bench install headers format clean
+.PHONY: help demo test bench bench-static install package headers format clean
 
 help:
 	@sed -n 's/^#   //p' Makefile
@@ -35,11 +38,23 @@ bench:
 	$(CMAKE_BUILD) test
 	tools/performance.py build/test docs/performance.md
 
+bench-static:
+	tools/packages.sh build test
+	cmake --preset test
+	$(CMAKE_BUILD) test --target static_bench
+	cd build/test/bench/static && ./static_bench ./libstatic_bench_shared.so ./libstatic_bench_static.so ./libstatic_bench_plain.so
+
 install:
 	tools/packages.sh build
-	cmake --preset demo
-	$(CMAKE_BUILD) demo
-	DESTDIR=$(DESTDIR) cmake --install build/demo --prefix $(PREFIX)
+	cmake --preset install -DCMAKE_INSTALL_LIBDIR=$(LIBDIR)
+	$(CMAKE_BUILD) install
+	DESTDIR=$(DESTDIR) cmake --install build/install --prefix $(PREFIX)
+
+package:
+	tools/packages.sh build
+	cmake --preset install -DCMAKE_INSTALL_LIBDIR=lib/i386-linux-gnu
+	$(CMAKE_BUILD) install
+	cpack --config build/install/CPackConfig.cmake -B build/packages
 
 headers:
 	tools/packages.sh build

@@ -8,5 +8,5 @@ foreach(module IN LISTS modules)
   configure_file(${PROJECT_SOURCE_DIR}/src/debug/gdb/${module} ${CMAKE_CURRENT_BINARY_DIR}/kastarri/gdb/${module} COPYONLY)
 endforeach()
 
-install(FILES ${CMAKE_CURRENT_BINARY_DIR}/${script} DESTINATION lib)
-install(DIRECTORY ${CMAKE_CURRENT_BINARY_DIR}/kastarri/gdb DESTINATION lib/kastarri FILES_MATCHING PATTERN "*.py")
+install(FILES ${CMAKE_CURRENT_BINARY_DIR}/${script} DESTINATION ${CMAKE_INSTALL_LIBDIR})
+install(DIRECTORY ${CMAKE_CURRENT_BINARY_DIR}/kastarri/gdb DESTINATION ${CMAKE_INSTALL_LIBDIR}/kastarri FILES_MATCHING PATTERN "*.py")

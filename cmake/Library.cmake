@@ -36,11 +36,15 @@ endif()
 
 # What every source of the library is compiled with.
 function(kastarri_compile_library target)
-  target_include_directories(${target} PRIVATE ${PROJECT_SOURCE_DIR}/src ${PROJECT_SOURCE_DIR}/include)
+  target_include_directories(${target} PRIVATE ${PROJECT_SOURCE_DIR}/src)
+  target_include_directories(${target} PUBLIC $<BUILD_INTERFACE:${PROJECT_SOURCE_DIR}/include>)
   target_compile_options(${target} PRIVATE
     -O3 -mfpmath=sse -ffp-contract=off -fno-exceptions -fno-rtti -fno-threadsafe-statics
     -fvisibility=hidden -mno-mmx -mstackrealign -Wconversion -Wmissing-declarations -Wno-psabi
     $<$<CXX_COMPILER_ID:Clang>:-Wmissing-prototypes>)
+  # A program that forgets that everything is 32-bit gets it right nevertheless.
+  target_compile_options(${target} INTERFACE -m32)
+  target_link_options(${target} INTERFACE -m32)
   set_target_properties(${target} PROPERTIES POSITION_INDEPENDENT_CODE ON)
 endfunction()
 
@@ -73,8 +77,6 @@ endfunction()
 function(kastarri_finish_library name directory)
   kastarri_compile_library(${name})
   target_include_directories(${name} PRIVATE ${directory})
-  target_include_directories(${name} PUBLIC
-    $<BUILD_INTERFACE:${PROJECT_SOURCE_DIR}/include> $<INSTALL_INTERFACE:include>)
   set_target_properties(${name} PROPERTIES
     OUTPUT_NAME kastarri VERSION ${PROJECT_VERSION} SOVERSION ${PROJECT_VERSION_MAJOR}
     LINK_DEPENDS ${PROJECT_SOURCE_DIR}/cmake/exports.map)
@@ -105,5 +107,6 @@ else()
 endif()
 add_library(kastarri::kastarri ALIAS kastarri)
 
-install(TARGETS kastarri LIBRARY DESTINATION lib)
-install(DIRECTORY ${PROJECT_SOURCE_DIR}/include/ DESTINATION include)
+if(KASTARRI_BUILD_STATIC)
+  include(${CMAKE_CURRENT_LIST_DIR}/Static.cmake)
+endif()

@@ -7,7 +7,7 @@ set -euo pipefail
 
 declare -A packages=(
   [build]="g++-multilib cmake ninja-build python3"
-  [test]="clang gdb libgtest-dev:i386 libbenchmark-dev:i386 libmpfr-dev:i386"
+  [test]="clang gdb pkg-config libgtest-dev:i386 libbenchmark-dev:i386 libmpfr-dev:i386"
   [check]="clang-format valgrind libc6-dbg:i386"
 )
 

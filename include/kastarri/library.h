@@ -5,11 +5,11 @@
 /// What a declaration of the library carries: its symbol is exported.
 #define KASTARRI_API __attribute__((visibility("default")))
 
-/// The version of these headers.
+/// The version of these headers, "0.1.0". The build and the packages take theirs from here.
 #define KASTARRI_VERSION_MAJOR 0
 #define KASTARRI_VERSION_MINOR 1
 #define KASTARRI_VERSION_PATCH 0
-#define KASTARRI_VERSION "0.1.0"
+#define KASTARRI_VERSION KASTARRI_DOTTED(KASTARRI_VERSION_MAJOR, KASTARRI_VERSION_MINOR, KASTARRI_VERSION_PATCH)
 
 /// The version of the library that is loaded, as KASTARRI_VERSION.
 KASTARRI_API const char* cstub_Km_ZNB_Orbis_R5_64k_version();
@@ -17,5 +17,12 @@ KASTARRI_API const char* cstub_Km_ZNB_Orbis_R5_64k_version();
 /// The instruction set that the loaded library's intrinsics use on this processor: "avx512", "avx2" or
 /// "sse2".
 KASTARRI_API const char* cstub_Km_ZNB_Orbis_R5_64k_target();
+
+#define KASTARRI_DOTTED(MAJOR, MINOR, PATCH) KASTARRI_DOTTED_AS_IS(MAJOR, MINOR, PATCH)
+#define KASTARRI_DOTTED_AS_IS(MAJOR, MINOR, PATCH) #MAJOR "." #MINOR "." #PATCH
+
+#ifndef __i386__
+#error "kastarri is a library for 32-bit x86: compile with -m32"
+#endif
 
 #endif

@@ -40,4 +40,12 @@ using layout_of = typename layout_of_type<T>::type;
 
 }  // namespace
 
+// What an entry is declared with besides. The static library's are inlined into kernels whatever their size:
+// most of it is in loops over lanes that go with vectorisation, which comes after inlining.
+#ifdef KASTARRI_INLINE_ENTRIES
+#define KASTARRI_ENTRY __attribute__((always_inline, flatten))
+#else
+#define KASTARRI_ENTRY
+#endif
+
 #endif

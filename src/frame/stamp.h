@@ -38,7 +38,7 @@
   }
 
 #define ENTRY(SYMBOL, SHAPE, ...) \
-  SIG_##SHAPE(KASTARRI_SYMBOL(SYMBOL), __VA_ARGS__) { BODY_##SHAPE(__VA_ARGS__) }
+  KASTARRI_ENTRY SIG_##SHAPE(KASTARRI_SYMBOL(SYMBOL), __VA_ARGS__) { BODY_##SHAPE(__VA_ARGS__) }
 
 #include "frame/rows.h"
 

@@ -1,0 +1,41 @@
+# find_package(kastarri CONFIG [COMPONENTS shared static]): the targets kastarri::kastarri, the shared library,
+# and kastarri::static. Without components, those that are installed. Both make what links them 32-bit (-m32).
+
+set(kastarri_installed)
+foreach(component IN ITEMS shared static)
+  if(EXISTS ${CMAKE_CURRENT_LIST_DIR}/kastarri-${component}.cmake)
+    list(APPEND kastarri_installed ${component})
+    set(kastarri_${component}_FOUND TRUE)
+  endif()
+endforeach()
+
+foreach(component IN LISTS kastarri_FIND_COMPONENTS)
+  if(kastarri_FIND_REQUIRED_${component} AND NOT kastarri_${component}_FOUND)
+    list(JOIN kastarri_installed ", " kastarri_installed)
+    set(kastarri_NOT_FOUND_MESSAGE "kastarri: component '${component}' is not there; installed: ${kastarri_installed}.")
+    set(kastarri_FOUND FALSE)
+    return()
+  endif()
+endforeach()
+
+if(NOT CMAKE_SIZEOF_VOID_P EQUAL 4)
+  include(CheckCXXSourceCompiles)
+  include(CMakePushCheckState)
+  cmake_push_check_state(RESET)
+  set(CMAKE_REQUIRED_FLAGS -m32)
+  set(CMAKE_REQUIRED_LINK_OPTIONS -m32)
+  check_cxx_source_compiles("#include <cstdlib>\nint main() { return std::atoi(\"0\"); }" kastarri_COMPILER_MAKES_32_BIT)
+  cmake_pop_check_state()
+  if(NOT kastarri_COMPILER_MAKES_32_BIT)
+    set(kastarri_NOT_FOUND_MESSAGE
+      "kastarri is a 32-bit x86 library, and ${CMAKE_CXX_COMPILER} -m32 makes no programs. Debian has what it needs in g++-multilib.")
+    set(kastarri_FOUND FALSE)
+    return()
+  endif()
+endif()
+
+foreach(component IN LISTS kastarri_installed)
+  if(NOT kastarri_FIND_COMPONENTS OR component IN_LIST kastarri_FIND_COMPONENTS)
+    include(${CMAKE_CURRENT_LIST_DIR}/kastarri-${component}.cmake)
+  endif()
+endforeach()

@@ -39,9 +39,11 @@ Series integers(const Format& format, const std::string& name) {
   if (name == "b") return {2, 5, sign * 7, middle, 1, sign, half, 0};
   if (name == "c") return {3, sign, 10, sign * 2, 1, 2, sign * 5, 4};
   if (name == "d") return {1, 2, 3, 4, sign, sign * 2, sign * 3, sign * 4};
-  if (name == "old") return {10, sign * 20, 30, sign * 40, highest, lowest, 70, sign * 80};
+  const bool is_wide = format.bits >= 24 && format.bits != 32;
+  if (name == "old" && is_wide) return {10, sign * 20, 30, sign * 40, highest, lowest, 70, sign * 80};
+  if (name == "old") return {10, sign * 20, 30, sign * 40, 50, sign * 60, 70, sign * 80};
   // What a wide lane holds is packed: some numbers are halfway between two when they are shifted by 4.
-  if (format.bits >= 24 && format.bits != 32) return {1, 24, sign * 24, middle, highest, lowest, half, sign * 40};
+  if (is_wide) return {1, 24, sign * 24, middle, highest, lowest, half, sign * 40};
   return {1, sign * 2, middle, middle, highest, lowest, half, is_signed ? -1 : 5};
 }
 

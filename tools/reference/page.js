@@ -123,7 +123,7 @@ function prose(text) {
 
 // --- The list: entries are added as they come into view ------------------------------------------------
 
-const CHUNK = 60;
+const CHUNK = 40;
 let found = [];
 
 function item(entry) {
@@ -153,8 +153,8 @@ function showList() {
     found = [];
     showMessage(`This is not a regular expression: ${error.message}`, true);
   }
-  $('results').replaceChildren();
   $('list').scrollTop = 0;
+  $('results').replaceChildren();
   showMore();
   markOpen();
 }
@@ -173,7 +173,7 @@ const linkAt = (index) => $('results').children[index].firstChild;
 const entryNamed = (name) => byName.get(name) || byName.get(name.replace(/^ZRA_/, ''));
 
 function section(title, ...children) {
-  return [element('h3', null, title), ...children.flat()];
+  return [element('h3', null, title), ...children.flat().filter((child) => child !== null)];
 }
 
 function tags(entry) {
@@ -210,7 +210,7 @@ function laneRow(kind, [name, values], columns, before) {
   const old = before && !first ? before.split(' ') : cells;
   const row = element('tr', {class: kind}, element('th', {scope: 'row'}, title));
   if (cells.length === 1 && columns > 1) {
-    row.append(element('td', {colspan: columns, style: 'text-align: left'}, cells[0]));
+    row.append(element('td', {colspan: columns, class: 'alone'}, cells[0]));
     return row;
   }
   for (let i = 0; i < columns; ++i)

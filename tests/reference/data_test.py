@@ -187,7 +187,8 @@ class Facts(unittest.TestCase):
         facts = {e.id: e.facts for e in ENTRIES}
         for name, expected in {"ADDSNX16": ["saturates"], "ADDNX16": ["wraps"], "MULNX16": ["exact"],
                                "PACKVRNX48": ["saturates", "rounds"], "PACKVNRNX48": ["saturates", "truncates"],
-                               "ANDNX16": [], "int16_mtor_qv_vecNx16": [], "MULNX16PACKQ": ["wraps", "rounds"]}.items():
+                               "ANDNX16": [], "ADDNXF16": ["rounds", "flags"], "SUBF16T": ["rounds", "flags"],
+                               "int16_mtor_qv_vecNx16": [], "MULNX16PACKQ": ["wraps", "rounds"]}.items():
             self.assertEqual(facts[name], expected, name)
 
     def test_short_names_lead_to_one_entry(self):

@@ -14,7 +14,7 @@ def main():
     parser = argparse.ArgumentParser(description=__doc__, formatter_class=argparse.RawDescriptionHelpFormatter)
     parser.add_argument("page", type=pathlib.Path)
     parser.add_argument("picture", type=pathlib.Path)
-    parser.add_argument("--at", default="ADDSNX16T&q=saturated 16", help="what stands behind # in the address")
+    parser.add_argument("--at", default="ADDSNX16T&q=adds", help="what stands behind # in the address")
     parser.add_argument("--size", default="1280x860")
     parser.add_argument("--dark", action="store_true")
     arguments = parser.parse_args()

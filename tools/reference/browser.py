@@ -22,6 +22,7 @@ class Browser:
         options = {"args": ARGUMENTS}
         asked = {"browserName": "chrome", "goog:chromeOptions": options, "goog:loggingPrefs": {"browser": "ALL"}}
         self.root += "/" + self.post("", capabilities={"alwaysMatch": asked})["sessionId"]
+        self.post("/timeouts", script=1000 * START, pageLoad=1000 * START)
 
     def close(self):
         self.request("DELETE", "")

@@ -5,6 +5,8 @@
 #   make test          build everything and run the tests
 #   make bench         time every intrinsic and write docs/performance.md
 #   make bench-static  time kernels with the static library against the shared one
+#   make docs          write build/docs/reference.html, all intrinsics on one page
+#   make picture       take docs/pictures/reference.png of that page
 #   make install       install libraries and headers (PREFIX=/usr/local, DESTDIR=, LIBDIR=lib)
 #   make package       make Debian packages in build/packages
 #   make headers       write the public headers and docs/coverage.md anew from the tables of rows
@@ -15,7 +17,7 @@ PREFIX ?= /usr/local
 LIBDIR ?= lib
 CMAKE_BUILD = cmake --build --parallel --preset
 
-.PHONY: help demo test bench bench-static install package headers format clean
+.PHONY: help demo test bench bench-static docs picture install package headers format clean
 
 help:
 	@sed -n 's/^#   //p' Makefile
@@ -43,6 +45,15 @@ bench-static:
 	cmake --preset test
 	$(CMAKE_BUILD) test --target static_bench
 	cd build/test/bench/static && ./static_bench ./libstatic_bench_shared.so ./libstatic_bench_static.so ./libstatic_bench_plain.so
+
+docs:
+	tools/packages.sh build
+	cmake --preset docs
+	$(CMAKE_BUILD) docs --target reference
+
+picture: docs
+	tools/packages.sh picture
+	tools/reference/picture.py build/docs/reference.html docs/pictures/reference.png
 
 install:
 	tools/packages.sh build

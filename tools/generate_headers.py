@@ -10,6 +10,7 @@ preprocessor reads the tables, so a prototype here is the prototype that the lib
 """
 
 import argparse
+import collections
 import itertools
 import os
 import re
@@ -199,23 +200,26 @@ def wrap(text, width=106):
     return lines + [line]
 
 
+Row = collections.namedtuple("Row", "name prototype doc table shape")
+
+
 def read_rows(tables, types):
-    """(symbol, prototype, doc, table) of every row, in order."""
+    """The rows, in order."""
     names = re.compile(r"\b(" + "|".join(types) + r")\b")
     rows = []
     for table in tables:
         doc = ""
         for kind, fields in records('#include "frame/shapes.h"\n#define DOC(...) @doc{__VA_ARGS__}@\n'
-                                    '#define ENTRY(SYMBOL, SHAPE, ...) @row{SYMBOL@,SIG_##SHAPE(SYMBOL, __VA_ARGS__)}@\n'
+                                    '#define ENTRY(SYMBOL, SHAPE, ...) @row{SYMBOL@,SHAPE@,SIG_##SHAPE(SYMBOL, __VA_ARGS__)}@\n'
                                     '#define HELPER ENTRY\n'
                                     f'#include "frame/rows.h"\n#include "{table}"\n'):
             if kind == "doc":
                 doc = unquote(fields[0])
                 continue
-            name, prototype = fields
+            name, shape, prototype = fields
             prototype = re.sub(rf"\b{name}\b", symbol(name), names.sub(lambda m: PREFIX + m.group(1), prototype))
             prototype = re.sub(r"\s+([,()])", r"\1", re.sub(r"\(\s+", "(", prototype))
-            rows.append((name, prototype, doc, table))
+            rows.append(Row(name, prototype, doc, table, shape))
     return rows
 
 
@@ -233,7 +237,7 @@ def declaration(prototype):
 
 def family_body(rows, types):
     body = []
-    for (doc, table), group in itertools.groupby(rows, key=lambda row: row[2:]):
+    for (doc, table), group in itertools.groupby(rows, key=lambda row: (row.doc, row.table)):
         group = list(group)
         used = [t for t in types.values() if any(re.search(PREFIX + t.name + r"\b", prototype) for _, prototype, *_ in group)]
         body += [""] + [f"/// {line}" for line in wrap(doc + ".")]

@@ -2,12 +2,13 @@
 # Installs the Debian packages that are missing for the named purposes, as root or through sudo; where
 # neither works, prints the command that does it and fails.
 #
-#   tools/packages.sh PURPOSE...     build, test, check
+#   tools/packages.sh PURPOSE...     build, test, picture, check
 set -euo pipefail
 
 declare -A packages=(
   [build]="g++-multilib cmake ninja-build python3"
-  [test]="clang gdb pkg-config libgtest-dev:i386 libbenchmark-dev:i386 libmpfr-dev:i386"
+  [test]="clang gdb pkg-config chromium chromium-driver libgtest-dev:i386 libbenchmark-dev:i386 libmpfr-dev:i386"
+  [picture]="chromium chromium-driver"
   [check]="clang-format valgrind libc6-dbg:i386"
 )
 

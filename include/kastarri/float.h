@@ -502,7 +502,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_WFR_H(unsigned bits);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_WFR_S(unsigned bits);
 
-/// lane i = a[i] + b[i]. A NaN among the operands is the result, the first one, made quiet.
+/// lane i = a[i] + b[i], rounded by RoundMode, with flags. The first NaN operand is the result, made quiet.
 /// Lanes: qv_vecNxf16 32 x 16 bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point; vboolN 32 x 1
 /// bit; vboolN_2 16 x 1 bit; vbool1 1 x 1 bit; qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits,
 /// floating point.
@@ -640,8 +640,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULF32T(
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
-/// lane i of acc = acc[i] + a[i] * b[i], rounded once. Of several NaNs, a[i] goes before b[i], b[i] before
-/// acc[i].
+/// lane i of acc = acc[i] + a[i] * b[i], rounded once, by RoundMode, with flags. Of several NaNs, a[i] goes
+/// before b[i], b[i] before acc[i].
 /// Lanes: qv_vecNxf16 32 x 16 bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point; vboolN 32 x 1
 /// bit; vboolN_2 16 x 1 bit; vbool1 1 x 1 bit; qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits,
 /// floating point.

@@ -1,0 +1,108 @@
+#!/usr/bin/env python3
+"""Write the reference of all intrinsics as one page that needs nothing else.
+
+    tools/reference/build.py EXAMPLES OUTPUT [--version VERSION]
+
+EXAMPLES is what kastarri_examples prints. All else comes from the tables of rows and from docs/choices.md.
+"""
+
+import argparse
+import json
+import os
+import re
+import sys
+
+HERE = os.path.dirname(os.path.abspath(__file__))
+sys.path.insert(0, os.path.dirname(HERE))
+sys.path.insert(0, HERE)
+import choices  # noqa: E402
+import entries  # noqa: E402
+import generate_headers  # noqa: E402
+
+FLAG_NAMES = ["inexact", "underflow", "overflow", "division-by-zero", "invalid"]
+
+# States that are shown before a call where a rule speaks of them.
+STATES = {"SAR": r"\bSAR\b", "EXPSTATE": r"exported state", "RoundMode": r"\bRoundMode\b", "PRID": r"processor's number"}
+
+
+class Texts:
+    """Texts that many entries share, each kept once."""
+
+    def __init__(self):
+        self.numbers = {}
+
+    def __call__(self, text):
+        return None if text is None else self.numbers.setdefault(text, len(self.numbers))
+
+    def all(self):
+        return list(self.numbers)
+
+
+def flags_text(values):
+    """StickyFlags in words: "1 0 20" as "inexact none overflow+invalid"."""
+    def words(value):
+        return "+".join(name for bit, name in enumerate(FLAG_NAMES) if value >> bit & 1) or "none"
+    return " ".join(words(int(value)) for value in values.split())
+
+
+def example_data(example, initial, rule, text):
+    """What goes in and what comes out, without what only stays as it is."""
+    given, got = example["in"], example["out"]
+    given = given + [[name, str(initial[name])] for name, pattern in STATES.items() if re.search(pattern, rule)]
+    before = dict(map(tuple, given))
+    got = [[name, flags_text(values) if name == "StickyFlags" else values] for name, values in got
+           if not (name == "memory" and before.get(name) == values)]
+    return [example["calls"]] + [[number for name, values in table for number in (text(name), text(values))]
+                                 for table in (given, got)]
+
+
+def entry_data(entry, examples, text):
+    """An entry as the page reads it (page.js names the columns); $ stands for the prefix of all names."""
+    row = entry.row
+    prototype = row.prototype.replace(generate_headers.PREFIX, "$")
+    operands = [number for o in entry.operands
+                for number in (text(o.name), text(o.type), text(o.role), text(o.shape))]
+    rule = " ".join([row.doc] + entry.context)
+    return [entry.short, entry.symbol.replace(generate_headers.PREFIX, "$"), list(generate_headers.FAMILIES).index(entry.family),
+            text(row.table), text(row.doc), [text(t) for t in entry.context], prototype, operands, entry.lane_bits,
+            entry.register_bits, int(entry.predicated), int(entry.keeps_lanes), entry.facts, text(entry.alignment),
+            entry.choices, example_data(examples["examples"][row.name], examples["initial"], rule, text)]
+
+
+def page_data(examples, version):
+    text = Texts()
+    all_choices = choices.read_choices()
+    found = entries.read_entries(all_choices)
+    rows = [entry_data(entry, examples, text) for entry in found]
+    tables = {text(table): entries.about_table(table) for table in dict.fromkeys(entry.row.table for entry in found)}
+    return {"version": version, "prefix": generate_headers.PREFIX, "families": list(generate_headers.FAMILIES.items()),
+            "choices": [choice.text for choice in all_choices], "tables": tables, "texts": text.all(), "entries": rows}
+
+
+def read(name):
+    with open(os.path.join(HERE, name), encoding="utf-8") as file:
+        return file.read()
+
+
+def page(data):
+    # A script may hold anything but its own end tag.
+    json_text = json.dumps(data, ensure_ascii=False, separators=(",", ":")).replace("</", "<\\/")
+    parts = {"style": read("page.css"), "script": read("page.js"), "data": json_text, "version": data["version"],
+             "count": f"{len(data['entries']):,}"}
+    return re.sub(r"\{\{(\w+)\}\}", lambda match: parts[match[1]], read("page.html"))
+
+
+def main():
+    parser = argparse.ArgumentParser(description=__doc__, formatter_class=argparse.RawDescriptionHelpFormatter)
+    parser.add_argument("examples")
+    parser.add_argument("output")
+    parser.add_argument("--version", default="")
+    arguments = parser.parse_args()
+    with open(arguments.examples, encoding="utf-8") as file:
+        data = page_data(json.load(file), arguments.version)
+    with open(arguments.output, "w", encoding="utf-8") as file:
+        file.write(page(data))
+
+
+if __name__ == "__main__":
+    main()

@@ -1,0 +1,150 @@
+"""What the reference says of each intrinsic, from its row: nothing here knows an intrinsic by name."""
+
+import os
+import re
+
+import generate_headers
+from generate_headers import PREFIX, ROOT
+
+# Host types: bits, and how they are shown.
+HOST_TYPES = {
+    "signed char": (8, "8 bits, signed"), "unsigned char": (8, "8 bits, unsigned"), "char": (8, "8 bits, signed"),
+    "short": (16, "16 bits, signed"), "unsigned short": (16, "16 bits, unsigned"),
+    "int": (32, "32 bits, signed"), "unsigned": (32, "32 bits, unsigned"), "unsigned int": (32, "32 bits, unsigned"),
+    "immediate": (32, "an int"), "long long": (64, "64 bits, signed"), "float": (32, "32 bits, floating point"),
+    "bool": (8, "true or false"),
+}
+
+# What a rule does to numbers, told by its words.
+FACTS = {
+    "saturates": r"clamp|(?<!not )saturat|the bound of",
+    "wraps": r"modulo 2\^|\bwrap|low (\d+ )?bits",
+    "exact": r"\bexact\b",
+    "rounds": r"\brounded\b(?! down to its size)",
+    "truncates": r"truncat",
+    "flags": r"(?<!without )\bflags\b|\binvalid\b|\binexact\b",
+}
+
+
+class Operand:
+    """A parameter, or the result, of a prototype."""
+
+    def __init__(self, text, types, name=None):
+        text = text.replace(PREFIX, "").strip()
+        match = re.fullmatch(r"(const )?([\w ]+?)\s*(\*\*|\*|&)?\s*(?<=[ *&])(\w+)", text) if name is None else None
+        if match:
+            const, self.type, mark, self.name = match.groups()
+        else:
+            const, self.type, mark, self.name = None, text, None, name or ""
+        self.register = types.get(self.type)
+        self.in_memory = bool(mark) and "*" in mark
+        self.role = ("result" if name == "result" else "in memory" if self.in_memory
+                     else "written" if mark == "&" and not const else "read")
+        self.bytes = self.register.units * self.register.unit_bits // 8 if self.register else HOST_TYPES[self.type][0] // 8
+
+    @property
+    def shape(self):
+        return self.register.shape if self.register else HOST_TYPES[self.type][1]
+
+    @property
+    def lane_bits(self):
+        match = re.fullmatch(r"[iufw](\d+)x\d+", self.register.layout) if self.register else None
+        return int(match[1]) if match else None
+
+
+def operands_of(row, types):
+    result, parameters = re.fullmatch(r"(.*?)\s*\bcstub\w+\((.*)\)", row.prototype).groups()
+    operands = [Operand(text, types) for text in parameters.split(",") if text.strip()]
+    return operands if result == "void" else operands + [Operand(result, types, "result")]
+
+
+def alignment(row, operands):
+    """Who tests the address of a memory operand, or None where there is none."""
+    places = [o for o in operands if o.in_memory]
+    if not places:
+        return None
+    tested = next((o for o in operands if o.role == "written"), None) if "aligned_destination" in row.shape else places[0]
+    step = min(tested.bytes, 4)
+    if row.shape in ("mtor", "rtom"):
+        return f"The address is rounded down to a multiple of {tested.bytes}." if not tested.register and step > 1 \
+            else "Any address: none is tested or rounded."
+    if step == 1 or not ("aligned" in row.shape or row.shape == "scalar"):
+        return "Any address: none is tested."
+    if tested.in_memory:
+        return f"The address accessed is tested: unless it is a multiple of {step}, the program ends with an error."
+    return (f"The address of the destination {tested.name} is tested: unless it is a multiple of {step}, the program ends with "
+            "an error. What the pointer says is not tested.")
+
+
+def operation(name):
+    """The short name without the package of the vector unit: what a choice names, and the link to the entry."""
+    return re.sub(r"^ZRA_", "", generate_headers.short_name(name))
+
+
+class Rules:
+    """The rules of a table, and which others a rule's words refer to."""
+
+    def __init__(self, rows):
+        self.texts = list(dict.fromkeys(row.doc for row in rows))
+        self.rows = rows
+
+    def context(self, text):
+        """The rules without which this one cannot be read: that before it, or those of the operations it names."""
+        if re.match(r"the same\b", text) or "as above" in text:
+            before = self.texts[self.texts.index(text) - 1]
+            return self.context(before) + [before] if "the same" in before[:8] else [before]
+        named = re.search(r"\bas ([A-Z]\w+)(?: and ([A-Z]\w+))?", text)
+        found = [row.doc for name in (named.groups() if named else ()) if name for row in self.rows
+                 if re.match(rf"(\w+fp_|RK_)?{name}(?![A-Z])|{name}N", operation(row.name))]
+        return list(dict.fromkeys(doc for doc in found if doc != text))
+
+
+def facts(texts):
+    joined = ". ".join(texts)
+    return [name for name, pattern in FACTS.items() if re.search(pattern, joined)]
+
+
+def about_table(table):
+    """The comment at the head of a table, without the kinds of row that it lists."""
+    with open(os.path.join(ROOT, "src", table), encoding="utf-8") as file:
+        head = re.match(r"(//.*\n)*", file.read())[0]
+    lines = [line[3:] for line in head.splitlines() if not line.startswith("//  ")]
+    return " ".join(lines)
+
+
+class Entry:
+    def __init__(self, family, row, types, rules, choices):
+        self.row, self.family = row, family
+        self.id = operation(row.name)
+        self.short = generate_headers.short_name(row.name)
+        self.symbol = generate_headers.symbol(row.name)
+        self.operands = operands_of(row, types)
+        self.context = rules.context(row.doc)
+        self.facts = facts([row.doc] + self.context)
+        self.alignment = alignment(row, self.operands)
+        self.choices = [i for i, choice in enumerate(choices) if choice.family == family and choice.names(self.id)]
+        self.predicated = "_T" in row.shape
+
+    @property
+    def keeps_lanes(self):
+        """Whether a predicated form leaves the lanes of its destination that are not enabled."""
+        return self.predicated and any(o.role == "written" for o in self.operands) and self.alignment is None
+
+    @property
+    def lane_bits(self):
+        """The widths of the lanes; without registers, of the numbers."""
+        widths = {o.lane_bits for o in self.operands if o.register} - {None}
+        return sorted(widths or {8 * o.bytes for o in self.operands if not o.register})
+
+    @property
+    def register_bits(self):
+        return max((8 * o.bytes for o in self.operands if o.register), default=0)
+
+
+def read_entries(choices):
+    types = generate_headers.read_types()
+    entries = []
+    for family, (_, tables, rows) in generate_headers.all_rows().items():
+        rules = {table: Rules([row for row in rows if row.table == table]) for table in tables}
+        entries += [Entry(family, row, types, rules[row.table], choices) for row in rows]
+    return entries

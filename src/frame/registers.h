@@ -73,8 +73,8 @@ inline Vector<std::uint32_t> repeated(const std::uint32_t* words) {
 template <int Half, class Lane, std::size_t... I>
 inline Vector<Lane> interleaved(Vector<Lane> a, Vector<Lane> b, std::index_sequence<I...>) {
   constexpr int in_block = 16 / sizeof(Lane), all = lanes_in_register<Lane>;
-  return __builtin_shufflevector(
-      a, b, (I / in_block * in_block + Half * in_block / 2 + I % in_block / 2 + I % 2 * all)...);
+  return __builtin_shufflevector(a, b,
+                                 (I / in_block * in_block + Half * in_block / 2 + I % in_block / 2 + I % 2 * all)...);
 }
 template <int Half, class Lane>
 inline Vector<Lane> interleaved(Vector<std::uint8_t> a, Vector<std::uint8_t> b) {

@@ -1,7 +1,7 @@
 // Lanes of 64 bits shifted right by counts of their own where the target has no such shift: they are scaled as
 // floating-point numbers, which is exact. A power of two, by its exponent, times a lane that the number holds; then a
-// half that it holds besides. What is beyond a word is clamped to it, and the truncation of negative numbers made a floor.
-// Compilers make jumps of the clamps in a loop over lanes, so this is written out, in registers of 128 bits.
+// half that it holds besides. What is beyond a word is clamped to it, and the truncation of negative numbers made a
+// floor. Compilers make jumps of the clamps in a loop over lanes, so this is written out, in registers of 128 bits.
 #ifndef KASTARRI_MULTIPLY_SCALED_H
 #define KASTARRI_MULTIPLY_SCALED_H
 

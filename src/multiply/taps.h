@@ -132,8 +132,9 @@ struct Sums<L, C, Count, false> {
     even_bias = bias(even);
   }
   static Vector<word> bias(Vector<std::int16_t> coefficient) {
+    if (is_signed) return Vector<word>{};
     const auto half = sums_of_products(coefficient, Vector<std::int16_t>{} + 0x4000);
-    return reinterpret_cast<Vector<word>>(half) * 2;
+    return reinterpret_cast<Vector<word>>(half) << (split && pairs == 2 ? 2 : 1);
   }
   static Vector<std::int16_t> made_signed(Vector<std::uint16_t> v) {
     return reinterpret_cast<Vector<std::int16_t>>(is_signed ? v : v ^ 0x8000);
@@ -141,17 +142,11 @@ struct Sums<L, C, Count, false> {
 
   template <int Quarter>
   Vector<std::uint64_t> sum(const Pairs<C, Count>& operands) const {
-    Vector<word> by_odd{}, by_even{};
+    Vector<word> by_odd = odd_bias, by_even = even_bias;
     for (int p = 0; p < pairs; ++p) {
       const auto both = made_signed(interleaved<Quarter / 2, std::uint16_t>(operands.lower[p], operands.upper[p]));
-      if (split || p == 0) {
-        by_odd += reinterpret_cast<Vector<word>>(sums_of_products(both, odd));
-        if (!is_signed) by_odd += odd_bias;
-      }
-      if (split || p == 1) {
-        by_even += reinterpret_cast<Vector<word>>(sums_of_products(both, even));
-        if (!is_signed) by_even += even_bias;
-      }
+      if (split || p == 0) by_odd += reinterpret_cast<Vector<word>>(sums_of_products(both, odd));
+      if (split || p == 1) by_even += reinterpret_cast<Vector<word>>(sums_of_products(both, even));
     }
     if constexpr (split) {
       const auto high = reinterpret_cast<Vector<std::int32_t>>(by_odd);

@@ -4,6 +4,7 @@
 #include "frame/arithmetic.h"
 #include "multiply/fractions.h"
 #include "multiply/saturated.h"
+#include "multiply/scaled.h"
 
 namespace {
 
@@ -49,65 +50,127 @@ constexpr auto Q15 = [](std::uint64_t lane) { return q15(static_cast<word>(lane)
 constexpr auto Q10 = [](std::uint64_t lane) { return q10(static_cast<word>(lane)); };
 
 // --- Shifts ----------------------------------------------------------------------------------------------
-// The rules make words, which saturate to the result's lanes in a step of their own.
+// The rules make words, or pairs of them, which saturate to the result's lanes in a step of their own.
 
 // Counts are unsigned, so that a negative one counts as the largest.
-constexpr word clamped(word count, word bound) { return count > bound ? bound : count; }
+template <class Count>
+constexpr Count clamped(Count count, Count bound) {
+  return count > bound ? bound : count;
+}
+
+// Lanes of 64 bits are shifted as unsigned, moved up by half their range, since few targets shift them as
+// signed: this is where that half goes.
+constexpr std::uint64_t half_range = std::uint64_t{1} << 63;
+struct ShiftedHalf {
+  std::uint64_t by[64] = {};
+  constexpr ShiftedHalf() {
+    for (int s = 0; s < 64; ++s) by[s] = half_range >> s;
+  }
+};
+constexpr ShiftedHalf shifted_half;
 
 // x shifted right by a count that all lanes share, or by the lane's own.
-// (A 64-bit lane is shifted as unsigned with its sign folded away.)
-constexpr std::int32_t shifted_own(std::int32_t x, word s) { return x >> s; }
-constexpr std::int64_t shifted_own(std::int64_t x, word s) {
-  const std::int64_t sign = sign_fill(x);
-  return static_cast<std::int64_t>(unsigned_bits(x ^ sign) >> std::uint64_t{s}) ^ sign;
-}
-constexpr auto own = [](auto x, word s) { return shifted_own(x, s); };
-// What shift_right needs of a shared count is two words long for 64-bit lanes, and slow to come by.
-constexpr auto shared = [](auto x, word s) {
-  if constexpr (sizeof x == 8 && lanes_shift_alone)
-    return shifted_own(x, s);
-  else
-    return shift_right(x, s);
+struct Shared {
+  static constexpr bool scales = false, is_signed = false;
+  static constexpr std::int32_t shift(std::int32_t x, word s) { return shift_right(x, s); }
+  static constexpr std::uint64_t shift(std::uint64_t x, word s) { return x >> s; }
+  // Out of a table: to shift two words by a run-time count the compiler goes through memory in two halves.
+  static std::uint64_t half_range_by(word s) { return shifted_half.by[s]; }
 };
+class Own {
+ public:
+  static constexpr bool scales = !lanes_shift_alone, is_signed = pairs_shift_signed;
+  static constexpr std::int32_t shift(std::int32_t x, word s) { return x >> s; }
+  static constexpr std::int64_t shift(std::int64_t x, word s) { return x >> std::int64_t{s}; }
+  static constexpr std::uint64_t shift(std::uint64_t x, word s) { return x >> std::uint64_t{s}; }
+  std::uint64_t half_range_by(word s) const { return half_range_ >> std::uint64_t{s}; }
 
-// Half of x, rounded down: few targets shift 64-bit lanes as signed.
-constexpr std::int32_t half(std::int32_t x) { return x >> 1; }
-constexpr std::int64_t half(std::int64_t x) { return shift_right(x, 1); }
+ private:
+  // Compilers do not vectorise shifts of what they know to be constant.
+  static std::uint64_t unknown_half_range() {
+    const std::uint64_t* at = shifted_half.by;
+    asm("" : "+r"(at));
+    return *at;
+  }
+  std::uint64_t half_range_ = unknown_half_range();
+};
 
 // Rounded half up, x / 2^s is half of x / 2^(s-1), plus a half: the last bit shifted out is added.
 struct Rounded {
-  template <class T>
-  static constexpr T halve(T twice) {
-    return static_cast<T>(half(twice) + (twice & 1));
+  [[maybe_unused]] static constexpr double added = 0.5;
+  template <class Shift, class T>
+  static constexpr T down(Shift, T x, word s) {
+    const T twice = Shift::shift(x, s - 1);
+    return static_cast<T>(twice - (twice >> 1));
+  }
+  // For a count that may be 0.
+  template <class Shift, class T>
+  static constexpr T down_from_zero(Shift, T x, word s) {
+    const auto bits = unsigned_bits(x);
+    return static_cast<T>(Shift::shift(x, s) + static_cast<T>(Shift::shift(bits + bits, s) & 1));
   }
 };
 struct Truncated {
-  template <class T>
-  static constexpr T halve(T twice) {
-    return half(twice);
+  [[maybe_unused]] static constexpr double added = 0;
+  template <class Shift, class T>
+  static constexpr T down(Shift, T x, word s) {
+    return Shift::shift(x, s);
+  }
+  template <class Shift, class T>
+  static constexpr T down_from_zero(Shift, T x, word s) {
+    return Shift::shift(x, s);
   }
 };
 
-// A 24-bit lane, moved to the top of its word and back down to twice itself: so 0 is a count like others.
+// A lane of at most 24 bits shifted right by its own count where the target has no such shift: scaled as a number,
+// as in scaled.h.
 template <class Rounding>
-constexpr auto pack24 =
-    [](auto shift, word x, word s) { return Rounding::halve(shift(static_cast<std::int32_t>(x << 8), s + 7)); };
+inline std::int32_t scaled(float x, word s) {
+  const float y = x * __builtin_bit_cast(float, (127 - s) << 23) + static_cast<float>(Rounding::added);
+  const auto towards_zero = static_cast<std::int32_t>(y);
+  return towards_zero - (y < static_cast<float>(towards_zero));
+}
 
-// 48-bit lanes that are packed to 32 bits, likewise, and 64-bit lanes, which have no room to spare.
+// A 24-bit lane, at the top of its word: so 0 is a count like others.
 template <class Rounding>
-constexpr auto pack48_wide = [](auto shift, std::uint64_t x, word s) {
-  return Rounding::halve(shift(static_cast<std::int64_t>(x << 16), s + 15));
+constexpr auto pack24 = [](auto shift, word x, word s) {
+  const auto top = static_cast<std::int32_t>(x << 8);
+  if constexpr (decltype(shift)::scales)
+    return scaled<Rounding>(static_cast<float>(top), s + 8);
+  else
+    return Rounding::down(shift, top, s + 8);
+};
+
+// 48-bit lanes likewise, and 64-bit lanes, which have no room to spare.
+template <class Rounding>
+struct Pack48 {
+  using number = Number48;
+  using rounding = Rounding;
+  template <class Shift>
+  auto operator()(Shift shift, std::uint64_t x, word s) const {
+    if constexpr (Shift::is_signed)
+      return Rounding::down(shift, static_cast<std::int64_t>(x << 16), s + 16);
+    else
+      return static_cast<std::int64_t>(Rounding::down(shift, x << 16 ^ half_range, s + 16) -
+                                       shift.half_range_by(s + 16));
+  }
 };
 template <class Rounding>
-constexpr auto pack64 = [](auto shift, std::uint64_t x, word s) {
-  const word nothing = s == 0;
-  const std::int64_t twice = shift(static_cast<std::int64_t>(x), s - 1 + nothing);
-  return nothing ? twice : Rounding::halve(twice);
+struct Pack64 {
+  using number = Number64;
+  using rounding = Rounding;
+  template <class Shift>
+  auto operator()(Shift shift, std::uint64_t x, word s) const {
+    if constexpr (Shift::is_signed)
+      return Rounding::down_from_zero(shift, static_cast<std::int64_t>(x), s);
+    else
+      return static_cast<std::int64_t>(Rounding::down_from_zero(shift, x ^ half_range, s) - shift.half_range_by(s));
+  }
 };
 
-// A 48-bit lane packed to 16 bits needs no more than 32 bits of it: for a count up to 16 the lane
-// clamped to 32 bits, since whatever lies beyond saturates anyway; above 16 the lane without its low 16
-// bits, of which no shift leaves a trace.
+// A 48-bit lane packed to 16 bits by a count that all lanes share needs no more than 32 bits of it: for a count
+// up to 16 the lane clamped to 32 bits, since whatever lies beyond saturates anyway; above 16 the lane without its
+// low 16 bits, of which no shift leaves a trace.
 constexpr std::int32_t low_part(Words x) {
   const auto low = static_cast<std::int32_t>(x.low);
   const auto high = static_cast<std::int32_t>(x.high << 16);
@@ -118,46 +181,41 @@ constexpr std::int32_t high_part(Words x) { return static_cast<std::int32_t>(x.h
 
 constexpr auto pack48_unshifted = [](Words x) { return low_part(x); };
 template <class Rounding>
-constexpr auto pack48_low = [](Words x, word s) { return Rounding::halve(shared(low_part(x), s - 1)); };
+constexpr auto pack48_low = [](Words x, word s) { return Rounding::down(Shared{}, low_part(x), s); };
 template <class Rounding>
-constexpr auto pack48_high = [](Words x, word s) { return Rounding::halve(shared(high_part(x), s - 17)); };
-
-template <class Rounding>
-constexpr auto pack48_own = [](Words x, auto count) {
-  const word s = clamped(static_cast<word>(count), 32);
-  const std::int32_t part = s > 16 ? high_part(x) : low_part(x);
-  const word left = s > 16 ? s - 16 : s;
-  const std::int32_t twice = own(part, left - (s != 0));
-  return s == 0 ? twice : Rounding::halve(twice);
-};
-
-// Clamps a pair of words to one, in halves: no target but the newest compares 64-bit lanes.
-constexpr auto one_word = [](Words x) {
-  const auto low = static_cast<std::int32_t>(x.low);
-  const auto high = static_cast<std::int32_t>(x.high);
-  return high == low >> 31 ? low : (high >> 31) ^ std::numeric_limits<std::int32_t>::max();
-};
+constexpr auto pack48_high = [](Words x, word s) { return Rounding::down(Shared{}, high_part(x), s - 16); };
 
 // Applies a rule that makes words or pairs of them to every lane, and saturates.
 template <class R, class Rule, class... Operands>
 inline void pack(word* r, Rule rule, const Operands&... operands) {
-  using Result = decltype(rule(operands[0]...));
-  if constexpr (sizeof(Result) == 8) {
-    alignas(64) std::int64_t pairs[R::count];
-    KASTARRI_LANES_INDEPENDENT
-    for (int i = 0; i < R::count; ++i) pairs[i] = rule(operands[i]...);
-    lanes<R::count>(result<R>(r), one_word, InWords(pairs));
-  } else {
-    Saturated<typename R::container, R::count> words;
-    KASTARRI_LANES_INDEPENDENT
-    for (int i = 0; i < R::count; ++i) words.lane[i] = rule(operands[i]...);
+  Saturated<decltype(rule(operands[0]...)), typename R::container, R::count> results;
+  KASTARRI_LANES_INDEPENDENT
+  for (int i = 0; i < R::count; ++i) results.lane[i] = rule(operands[i]...);
+  results.collect(r);
+}
+
+// The same by counts of the lanes' own.
+template <class R, int Bound, class Rule, class Lanes, class Counts>
+inline void pack_by_counts(word* r, Rule rule, const Lanes& lanes_packed, const Counts& counts) {
+  using Count = decltype(counts[0]);
+  if constexpr (Own::scales && sizeof(decltype(lanes_packed[0])) == 8) {
+    alignas(16) std::uint64_t lane[R::count];
+    alignas(16) word count[R::count];
+    for (int i = 0; i < R::count; ++i) lane[i] = lanes_packed[i];
+    for (int i = 0; i < R::count; ++i) count[i] = clamped(counts[i], Count{Bound});
+    Saturated<std::int32_t, typename R::container, R::count> words;
+    scale_lanes<typename Rule::number, typename Rule::rounding, R::count>(lane, count, words.lane);
     words.collect(r);
+  } else {
+    const Own own;
+    const auto by_count = [&](auto x, Count n) { return rule(own, x, clamped(n, Count{Bound})); };
+    pack<R>(r, by_count, lanes_packed, counts);
   }
 }
 
 template <class R, class Rounding, class Lanes>
 inline void pack48(const Lanes& lanes, word count, word* r) {
-  const word s = clamped(count, 32);
+  const word s = clamped(count, word{32});
   if (s == 0) return pack<R>(r, pack48_unshifted, lanes);
   s > 16 ? pack<R>(r, pack48_high<Rounding>, lanes, Same(s)) : pack<R>(r, pack48_low<Rounding>, lanes, Same(s));
 }
@@ -175,9 +233,9 @@ inline void pack48(const Lanes& lanes, word count, word* r) {
 // One count for all lanes, no more than BOUND.
 #define KERNEL_shift(OP, R, RULE, BOUND, LANES)                                    \
   static inline void KASTARRI_SEMANTIC(OP)(const word* acc, word count, word* r) { \
-    const word s = clamped(count, BOUND);                                          \
+    const word s = clamped(count, word{BOUND});                                    \
     pack<R>(                                                                       \
-        r, [s](auto x) { return RULE(shared, x, s); }, LANES(acc));                \
+        r, [s](auto x) { return RULE(Shared{}, x, s); }, LANES(acc));              \
   }
 #define KERNEL_shift48(OP, R, ROUNDING, LANES)                                     \
   static inline void KASTARRI_SEMANTIC(OP)(const word* acc, word count, word* r) { \
@@ -185,14 +243,9 @@ inline void pack48(const Lanes& lanes, word count, word* r) {
   }
 
 // A count a lane, in layout C.
-#define KERNEL_counts(OP, R, RULE, BOUND, LANES, C)                                                      \
-  static inline void KASTARRI_SEMANTIC(OP)(const word* acc, const word* counts, word* r) {               \
-    const auto rule = [](auto x, auto n) { return RULE(own, x, clamped(static_cast<word>(n), BOUND)); }; \
-    pack<R>(r, rule, LANES(acc), Read<C>(counts));                                                       \
-  }
-#define KERNEL_counts48(OP, R, ROUNDING, LANES, C)                                         \
+#define KERNEL_counts(OP, R, RULE, BOUND, LANES, C)                                        \
   static inline void KASTARRI_SEMANTIC(OP)(const word* acc, const word* counts, word* r) { \
-    pack<R>(r, pack48_own<ROUNDING>, LANES(acc), Read<C>(counts));                         \
+    pack_by_counts<R, BOUND>(r, RULE, LANES(acc), Read<C>(counts));                        \
   }
 
 #include "multiply/pack.def"

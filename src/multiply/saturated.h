@@ -13,11 +13,16 @@
 
 namespace {
 
-// Whether lanes can shift by counts of their own, as fast as by one that they share.
+// Whether lanes can shift by counts of their own, as fast as by one that they share, and those of 64 bits as signed.
 #if defined __AVX2__
 constexpr bool lanes_shift_alone = true;
 #else
 constexpr bool lanes_shift_alone = false;
+#endif
+#if defined __AVX512BW__
+constexpr bool pairs_shift_signed = true;
+#else
+constexpr bool pairs_shift_signed = false;
 #endif
 
 #if defined __AVX512BW__
@@ -86,16 +91,23 @@ class Alternate48 {
   alignas(64) std::uint64_t lanes_[16];
 };
 
-// Count words on their way to lanes of type Lane.
+// Count words or pairs of them on their way to lanes of type Lane.
+template <class Wide, class Lane, int Count>
+struct Saturated;
+
 template <class Lane, int Count>
-struct Saturated {
+struct Saturated<std::int32_t, Lane, Count> {
   alignas(64) std::int32_t lane[Count];
 
   void collect(void* r) const {
-    constexpr int in_register = sizeof(Register) / sizeof(Lane);
-    for (int i = 0; i < Count; i += in_register) {
-      const Register packed = collected(reinterpret_cast<const Register*>(lane + i), Lane{});
-      std::memcpy(static_cast<Lane*>(r) + i, &packed, sizeof packed);
+    if constexpr (sizeof(Lane) == 4) {
+      std::memcpy(r, lane, sizeof lane);
+    } else {
+      constexpr int in_register = sizeof(Register) / sizeof(Lane);
+      for (int i = 0; i < Count; i += in_register) {
+        const Register packed = collected(reinterpret_cast<const Register*>(lane + i), Lane{});
+        std::memcpy(static_cast<Lane*>(r) + i, &packed, sizeof packed);
+      }
     }
   }
 
@@ -108,6 +120,37 @@ struct Saturated {
   template <class Byte>
   static Register collected(const Register* from, Byte byte) {
     return in_order4(pack_halves(pack_words(from[0], from[1]), pack_words(from[2], from[3]), byte));
+  }
+};
+
+template <class Lane, int Count>
+struct Saturated<std::int64_t, Lane, Count> {
+  alignas(64) std::int64_t lane[Count];
+
+  void collect(void* r) const {
+#if defined __AVX512BW__
+    for (int i = 0; i < Count; i += 8) {
+      const Register from = load(lane + i);
+      if constexpr (sizeof(Lane) == 4)
+        _mm256_storeu_si256(reinterpret_cast<__m256i*>(static_cast<Lane*>(r) + i),
+                            _mm512_maskz_cvtsepi64_epi32(0xFF, from));
+      else
+        _mm_storeu_si128(reinterpret_cast<__m128i*>(static_cast<Lane*>(r) + i),
+                         _mm512_maskz_cvtsepi64_epi16(0xFF, from));
+    }
+#else
+    // In halves: no other target compares 64-bit lanes fast.
+    Saturated<std::int32_t, Lane, Count> words;
+    const auto* half = reinterpret_cast<const in_memory<std::int32_t>*>(lane);
+    KASTARRI_LANES_INDEPENDENT
+    for (int i = 0; i < Count; ++i) words.lane[i] = one_word(half[2 * i], half[2 * i + 1]);
+    words.collect(r);
+#endif
+  }
+
+ private:
+  static constexpr std::int32_t one_word(std::int32_t low, std::int32_t high) {
+    return high == low >> 31 ? low : (high >> 31) ^ std::numeric_limits<std::int32_t>::max();
   }
 };
 

@@ -6,108 +6,18 @@
 
 #include <utility>
 
+#include "frame/registers.h"
 #include "multiply/products.h"
 
 namespace {
 
-// Coefficients stored as Stored in each of Words words, which lanes use in turn; they multiply as Factor.
-template <class Stored, int Words = 1, class Factor = Stored>
+// Coefficients stored as Stored in each of Words words, which lanes use in turn.
+template <class Stored, int Words = 1>
 struct Coefficients {
-  using factor = Factor;
+  using stored = Stored;
   static constexpr int words = Words;
+  static constexpr int bits = 8 * sizeof(Stored);
   static constexpr int in_a_word = 4 / sizeof(Stored);
-
-  static Factor at(word w, int j) {
-    return static_cast<Stored>(w >> (8 * static_cast<int>(sizeof(Stored)) * (j % in_a_word)));
-  }
-};
-
-// One coefficient of every lane: the same one, or those of several words in turn.
-template <class C, bool = C::words == 1>
-class Coefficient {
- public:
-  Coefficient(const word* words, int j) : value_(C::at(words[0], j)) {}
-  auto operator[](int) const { return value_; }
-
- private:
-  typename C::factor value_;
-};
-
-// All ones in the lanes whose number has the bit, as a table: compilers blend by it in registers, where
-// an array filled at run time would go through memory.
-template <class Lane, int Bit>
-struct LanesWithBit {
-  Lane mask[64] = {};
-  constexpr LanesWithBit() {
-    for (int i = 0; i < 64; ++i) mask[i] = static_cast<Lane>(i & Bit ? -1 : 0);
-  }
-};
-template <class Lane, int Bit>
-constexpr LanesWithBit<Lane, Bit> lanes_with_bit;
-
-template <class C>
-class Coefficient<C, false> {
- public:
-  Coefficient(const word* words, int j) {
-    for (int w = 0; w < C::words; ++w) values_[w] = C::at(words[w], j);
-  }
-  auto operator[](int i) const {
-    if constexpr (C::words == 2) {
-      return turn<1>(i, values_[0], values_[1]);
-    } else {
-      return turn<2>(i, turn<1>(i, values_[0], values_[1]), turn<1>(i, values_[2], values_[3]));
-    }
-  }
-
- private:
-  using factor = typename C::factor;
-  template <int Bit>
-  static factor turn(int i, factor without, factor with) {
-    return static_cast<factor>(without ^ ((without ^ with) & lanes_with_bit<factor, Bit>.mask[i]));
-  }
-  factor values_[C::words];
-};
-
-// Lane i of an operand times its coefficient.
-template <class L, class C>
-struct Tap {
-  Read<L> lane;
-  Coefficient<C> coefficient;
-  auto operator[](int i) const { return term(lane[i], coefficient[i]); }
-};
-
-constexpr auto SUM = [](auto... terms) { return (terms + ...); };
-template <int Operands, int Channels>
-constexpr int coefficient_number(int operand) {
-  return Operands / Channels - 1 - operand / Channels;
-}
-
-// The semantic functions: Operands vectors of layout L, then the words of coefficients, the accumulator
-// before them, the result last.
-template <class R, int Channels, class L, class C, class Operands, class Words = std::make_index_sequence<C::words>>
-struct Taps;
-
-template <std::size_t>
-using word_image = const word*;
-
-template <class R, int Channels, class L, class C, std::size_t... V, std::size_t... W>
-struct Taps<R, Channels, L, C, std::index_sequence<V...>, std::index_sequence<W...>> {
-  template <class Rule, class Kind>
-  static inline void run(Rule rule, const Kind& kind, word_image<V>... vectors, const word* words, word* r) {
-    constexpr int operands = sizeof...(V);
-    multiply<L::count>(result<R>(r), kind, rule,
-                       Tap<L, C>{Read<L>(vectors), {words, coefficient_number<operands, Channels>(V)}}...);
-  }
-  template <class Rule>
-  static inline void fresh(Rule rule, word_image<V>... vectors, word_image<W>... words, word* r) {
-    const word all[] = {*words...};
-    run(rule, Fresh{}, vectors..., all, r);
-  }
-  template <class Rule>
-  static inline void add(Rule rule, const word* acc, word_image<V>... vectors, word_image<W>... words, word* r) {
-    const word all[] = {*words...};
-    run(rule, Added<R>{Read<whole<R>>(acc)}, vectors..., all, r);
-  }
 };
 
 using s8 = Coefficients<std::int8_t>;
@@ -116,19 +26,225 @@ using s8_in_2 = Coefficients<std::int8_t, 2>;
 using u8_in_2 = Coefficients<std::uint8_t, 2>;
 using s8_in_4 = Coefficients<std::int8_t, 4>;
 using u8_in_4 = Coefficients<std::uint8_t, 4>;
-using s8_as_16 = Coefficients<std::int8_t, 1, std::int16_t>;
 using s16 = Coefficients<std::int16_t>;
 using u16 = Coefficients<std::uint16_t>;
 using s16_in_2 = Coefficients<std::int16_t, 2>;
 using u16_in_2 = Coefficients<std::uint16_t, 2>;
 
+// --- Sums of products by pairs -------------------------------------------------------------------------
+// Targets multiply pairs of neighbouring 16-bit numbers and add the two products in one step. So operands
+// are interleaved two by two to meet words that hold two coefficients.
+
+// The coefficients of pairs as 16-bit numbers: those of 8 bits from the odd bytes and from the even ones.
+template <class Stored>
+inline Vector<std::int16_t> odd_bytes(Vector<word> words) {
+  using Half = std::conditional_t<std::is_signed_v<Stored>, std::int16_t, std::uint16_t>;
+  return reinterpret_cast<Vector<std::int16_t>>(reinterpret_cast<Vector<Half>>(words) >> 8);
+}
+template <class Stored>
+inline Vector<std::int16_t> even_bytes(Vector<word> words) {
+  return odd_bytes<Stored>(reinterpret_cast<Vector<word>>(reinterpret_cast<Vector<std::uint16_t>>(words) << 8));
+}
+
+// Which operands are a pair, the one that meets the lower half of a word and the one that meets the upper:
+// operands 4 by bytes of a word are paired as those bytes are extended, others with their neighbours. Of a
+// single operand the upper partner is missing.
+template <class C>
+constexpr int lower_of(int pair) {
+  return C::in_a_word == 4 ? pair + 2 : 2 * pair + 1;
+}
+template <class C>
+constexpr int upper_of(int pair) {
+  return C::in_a_word == 4 ? pair : 2 * pair;
+}
+
+using Bytes = Vector<std::uint8_t>;
+
+template <class C, int Count>
+struct Pairs {
+  static constexpr int count = (Count + 1) / 2;
+  Bytes lower[count], upper[count];
+
+  template <class... Operand>
+  explicit Pairs(Operand... operand) {
+    const Bytes all[] = {dealt(operand)...};
+    for (int p = 0; p < count; ++p) {
+      lower[p] = Count == 1 ? all[0] : all[lower_of<C>(p)];
+      upper[p] = Count == 1 ? Bytes{} : all[upper_of<C>(p)];
+    }
+  }
+};
+
+// Sums of 8-bit lanes, four registers of words from one of lanes. A signed lane is extended as 2^8 times
+// itself, which is as far up as its sum then has to be for the sign of a 24-bit lane.
+template <class L, class C, int Count, bool = L::bits == 8>
+struct Sums {
+  static constexpr bool is_signed = std::is_signed_v<typename L::container>;
+  static constexpr int scale = is_signed ? 8 : 0;
+  static constexpr int pairs = Pairs<C, Count>::count;
+  using container = word;
+  Vector<std::int16_t> coefficients[2];
+
+  explicit Sums(const word* words) {
+    const auto all = repeated<C::words>(words);
+    if constexpr (C::in_a_word == 4) {
+      coefficients[0] = odd_bytes<typename C::stored>(all);
+      coefficients[1] = even_bytes<typename C::stored>(all);
+    } else {
+      coefficients[0] = coefficients[1] = reinterpret_cast<Vector<std::int16_t>>(all);
+    }
+  }
+
+  template <int Half>
+  static Vector<std::int16_t> extended(Bytes v) {
+    return reinterpret_cast<Vector<std::int16_t>>(is_signed ? interleaved<Half, std::uint8_t>(Bytes{}, v)
+                                                            : interleaved<Half, std::uint8_t>(v, Bytes{}));
+  }
+  template <int Quarter>
+  Vector<word> sum(const Pairs<C, Count>& operands) const {
+    Vector<word> sum{};
+    for (int p = 0; p < pairs; ++p) {
+      const auto both = interleaved<Quarter / 2, std::uint8_t>(operands.lower[p], operands.upper[p]);
+      sum += reinterpret_cast<Vector<word>>(sums_of_products(extended<Quarter % 2>(both), coefficients[p]));
+    }
+    return sum;
+  }
+};
+
+// Sums of 16-bit lanes, four registers of pairs of words from one of lanes. A coefficient of 16 bits is split into
+// bytes, so that the sums of all products with its parts are exact in a word, of whichever sign the factors are.
+template <class L, class C, int Count>
+struct Sums<L, C, Count, false> {
+  static constexpr bool is_signed = std::is_signed_v<typename L::container>;
+  static constexpr int scale = 0;
+  static constexpr int pairs = Pairs<C, Count>::count;
+  static constexpr bool split = C::in_a_word == 2;
+  using container = std::uint64_t;
+  Vector<std::int16_t> odd, even;
+  Vector<word> odd_bias, even_bias;  // what unsigned lanes, made signed by flipping their top bit, are short of
+
+  explicit Sums(const word* words) {
+    using stored = typename C::stored;
+    const auto all = repeated<C::words>(words);
+    odd = odd_bytes<stored>(all);
+    even = even_bytes<std::conditional_t<split, std::uint8_t, stored>>(all);
+    odd_bias = bias(odd);
+    even_bias = bias(even);
+  }
+  static Vector<word> bias(Vector<std::int16_t> coefficient) {
+    if (is_signed) return Vector<word>{};
+    const auto half = sums_of_products(coefficient, Vector<std::int16_t>{} + 0x4000);
+    return reinterpret_cast<Vector<word>>(half) << (split && pairs == 2 ? 2 : 1);
+  }
+  static Vector<std::int16_t> made_signed(Vector<std::uint16_t> v) {
+    return reinterpret_cast<Vector<std::int16_t>>(is_signed ? v : v ^ 0x8000);
+  }
+
+  template <int Quarter>
+  Vector<std::uint64_t> sum(const Pairs<C, Count>& operands) const {
+    Vector<word> by_odd = odd_bias, by_even = even_bias;
+    for (int p = 0; p < pairs; ++p) {
+      const auto both = made_signed(interleaved<Quarter / 2, std::uint16_t>(operands.lower[p], operands.upper[p]));
+      if (split || p == 0) by_odd += reinterpret_cast<Vector<word>>(sums_of_products(both, odd));
+      if (split || p == 1) by_even += reinterpret_cast<Vector<word>>(sums_of_products(both, even));
+    }
+    if constexpr (split) {
+      const auto high = reinterpret_cast<Vector<std::int32_t>>(by_odd);
+      const auto low = reinterpret_cast<Vector<std::int32_t>>(by_even);
+      return pair_of_words<Quarter % 2>((by_odd << 8) + by_even, (high + (low >> 8)) >> 24);
+    } else {
+      const auto sum = by_odd + by_even;
+      return pair_of_words<Quarter % 2>(sum, reinterpret_cast<Vector<std::int32_t>>(sum) >> 31);
+    }
+  }
+  template <int Half>
+  static Vector<std::uint64_t> pair_of_words(Vector<word> low, Vector<std::int32_t> high) {
+    return reinterpret_cast<Vector<std::uint64_t>>(interleaved<Half, word>(bits_of(low), bits_of(high)));
+  }
+};
+
+// A sum 2^Scale times as large in the canonical form of a lane of R.
+template <class R, int Scale>
+inline Vector<word> in_lane(Vector<word> sum) {
+  constexpr int above = 32 - R::bits;
+  return reinterpret_cast<Vector<word>>(reinterpret_cast<Vector<std::int32_t>>(sum << (above ? above - Scale : 0)) >>
+                                        (above ? above : Scale));
+}
+template <class R, int Scale>
+inline Vector<std::uint64_t> in_lane(Vector<std::uint64_t> sum) {
+  if constexpr (R::bits == 64) return sum;
+  constexpr std::uint64_t sign = std::uint64_t{1} << (R::bits - 1);
+  return ((sum & (2 * sign - 1)) ^ sign) - sign;
+}
+
+// Writes the sums of an operand's register: to an accumulator's lanes or over them.
+struct Over {
+  template <int, class V>
+  static V with(V sum, const void*, int) {
+    return sum;
+  }
+};
+struct Onto {
+  template <int Scale, class V>
+  static V with(V sum, const void* acc, int k) {
+    V lanes;
+    std::memcpy(&lanes, static_cast<const unsigned char*>(acc) + k * register_bytes, sizeof lanes);
+    return (lanes << Scale) + sum;
+  }
+};
+template <class R, class How, class S, class P, std::size_t... Quarter>
+inline void put_sums(const S& sums, const P& operands, int first, const void* acc, void* r,
+                     std::index_sequence<Quarter...>) {
+  const auto put = [&](int k, auto sum) {
+    store_register(r, k, in_lane<R, S::scale>(How::template with<S::scale>(sum, acc, k)));
+  };
+  (put(first + static_cast<int>(Quarter), sums.template sum<static_cast<int>(Quarter)>(operands)), ...);
+}
+
+// Register number k of an operand.
+struct Whole {
+  const word* image;
+  Bytes part(int k) const { return load_register<std::uint8_t>(image, k); }
+};
+
+template <class R, class How, class L, class C, class... Operands>
+[[gnu::always_inline]] inline void sum_of_taps(const void* acc, const word* words, void* r,
+                                               const Operands&... operands) {
+  const Sums<L, C, sizeof...(Operands)> sums(words);
+  for (int k = 0; k < 64 / register_bytes; ++k) {
+    const Pairs<C, sizeof...(Operands)> pairs(operands.part(k)...);
+    put_sums<R, How>(sums, pairs, 4 * k, acc, r, std::make_index_sequence<4>());
+  }
+}
+
+// The semantic functions: Operands vectors of layout L, then the words of coefficients, the accumulator
+// before them, the result last.
+template <class R, class L, class C, class Operands, class Words = std::make_index_sequence<C::words>>
+struct Taps;
+
+template <std::size_t>
+using word_image = const word*;
+
+template <class R, class L, class C, std::size_t... V, std::size_t... W>
+struct Taps<R, L, C, std::index_sequence<V...>, std::index_sequence<W...>> {
+  [[gnu::always_inline]] static inline void fresh(word_image<V>... vectors, word_image<W>... words, word* r) {
+    const word all[] = {*words...};
+    sum_of_taps<R, Over, L, C>(nullptr, all, r, Whole{vectors}...);
+  }
+  [[gnu::always_inline]] static inline void add(const word* acc, word_image<V>... vectors, word_image<W>... words,
+                                                word* r) {
+    const word all[] = {*words...};
+    sum_of_taps<R, Onto, L, C>(acc, all, r, Whole{vectors}...);
+  }
+};
+
 }  // namespace
 
 // A semantic function whose operands, all arrays of words, go to CALL as `units`.
-#define KERNEL_OF_WORDS(OP, CALL)                               \
-  template <class... Units>                                     \
-  static inline void KASTARRI_SEMANTIC(OP)(Units * ... units) { \
-    CALL;                                                       \
+#define KERNEL_OF_WORDS(OP, CALL)                                                      \
+  template <class... Units>                                                            \
+  [[gnu::always_inline]] static inline void KASTARRI_SEMANTIC(OP)(Units * ... units) { \
+    CALL;                                                                              \
   }
 
 #endif

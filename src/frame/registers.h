@@ -1,0 +1,130 @@
+// The target's registers as vectors of lanes, for arrangements that compilers do not find in a loop over lanes.
+// What compilers have no expression for is here once a target, all else is the same text for all.
+#ifndef KASTARRI_FRAME_REGISTERS_H
+#define KASTARRI_FRAME_REGISTERS_H
+
+#include <immintrin.h>
+
+#include <cstdint>
+#include <cstring>
+#include <utility>
+
+namespace {
+
+#if defined __AVX512BW__
+constexpr int register_bytes = 64;
+#elif defined __AVX2__
+constexpr int register_bytes = 32;
+#else
+constexpr int register_bytes = 16;
+#endif
+constexpr int blocks_in_register = register_bytes / 16;  // most shuffles work within blocks of 128 bits
+
+template <class Lane>
+struct vector_of {
+  typedef Lane type __attribute__((vector_size(register_bytes)));
+};
+template <class Lane>
+using Vector = typename vector_of<Lane>::type;
+template <class Lane>
+constexpr int lanes_in_register = register_bytes / static_cast<int>(sizeof(Lane));
+
+template <class Lane>
+inline Vector<Lane> as(Vector<std::uint8_t> v) {
+  return reinterpret_cast<Vector<Lane>>(v);
+}
+template <class V>
+inline Vector<std::uint8_t> bits_of(V v) {
+  return reinterpret_cast<Vector<std::uint8_t>>(v);
+}
+
+// Register number k of those at an address.
+template <class Lane>
+inline Vector<Lane> load_register(const void* from, int k) {
+  Vector<Lane> v;
+  std::memcpy(&v, static_cast<const unsigned char*>(from) + k * register_bytes, sizeof v);
+  return v;
+}
+template <class V>
+inline void store_register(void* to, int k, V v) {
+  std::memcpy(static_cast<unsigned char*>(to) + k * register_bytes, &v, sizeof v);
+}
+
+// Words that fill a block, one after the other and again, and that block over and over.
+template <int Words, std::size_t... I>
+inline __m128i block_of(const std::uint32_t* words, std::index_sequence<I...>) {
+  typedef std::uint32_t Block __attribute__((vector_size(16)));
+  return reinterpret_cast<__m128i>(Block{words[I % Words]...});
+}
+template <int Words>
+inline Vector<std::uint32_t> repeated(const std::uint32_t* words) {
+  if constexpr (Words == 1) return Vector<std::uint32_t>{} + *words;
+  const __m128i block = block_of<Words>(words, std::make_index_sequence<4>());
+#if defined __AVX512BW__
+  return reinterpret_cast<Vector<std::uint32_t>>(_mm512_maskz_broadcast_i32x4(0xFFFF, block));
+#elif defined __AVX2__
+  return reinterpret_cast<Vector<std::uint32_t>>(_mm256_broadcastsi128_si256(block));
+#else
+  return reinterpret_cast<Vector<std::uint32_t>>(block);
+#endif
+}
+
+// The lower (Half = 0) or upper (1) lanes of every block of a and b, taken in turn.
+template <int Half, class Lane, std::size_t... I>
+inline Vector<Lane> interleaved(Vector<Lane> a, Vector<Lane> b, std::index_sequence<I...>) {
+  constexpr int in_block = 16 / sizeof(Lane), all = lanes_in_register<Lane>;
+  return __builtin_shufflevector(a, b,
+                                 (I / in_block * in_block + Half * in_block / 2 + I % in_block / 2 + I % 2 * all)...);
+}
+template <int Half, class Lane>
+inline Vector<Lane> interleaved(Vector<std::uint8_t> a, Vector<std::uint8_t> b) {
+  return interleaved<Half, Lane>(as<Lane>(a), as<Lane>(b), std::make_index_sequence<lanes_in_register<Lane>>());
+}
+
+// The words of a register dealt to its blocks in turn: interleaving such registers twice puts lanes in order.
+template <std::size_t... I>
+inline Vector<std::uint32_t> dealt(Vector<std::uint32_t> v, std::index_sequence<I...>) {
+  return __builtin_shufflevector(v, v, (I % 4 * blocks_in_register + I / 4)...);
+}
+inline Vector<std::uint8_t> dealt(Vector<std::uint8_t> v) {
+  return bits_of(dealt(as<std::uint32_t>(v), std::make_index_sequence<lanes_in_register<std::uint32_t>>()));
+}
+
+// The blocks of a but its first, then the first of b.
+template <std::size_t... I>
+inline Vector<std::uint64_t> next_block(Vector<std::uint64_t> a, Vector<std::uint64_t> b, std::index_sequence<I...>) {
+  return __builtin_shufflevector(a, b, (I + 2)...);
+}
+
+// The sum of two neighbouring products a lane. Only four products of -2^15 and itself overflow.
+inline Vector<std::int32_t> sums_of_products(Vector<std::int16_t> a, Vector<std::int16_t> b) {
+#if defined __AVX512BW__
+  return reinterpret_cast<Vector<std::int32_t>>(
+      _mm512_madd_epi16(reinterpret_cast<__m512i>(a), reinterpret_cast<__m512i>(b)));
+#elif defined __AVX2__
+  return reinterpret_cast<Vector<std::int32_t>>(
+      _mm256_madd_epi16(reinterpret_cast<__m256i>(a), reinterpret_cast<__m256i>(b)));
+#else
+  return reinterpret_cast<Vector<std::int32_t>>(
+      _mm_madd_epi16(reinterpret_cast<__m128i>(a), reinterpret_cast<__m128i>(b)));
+#endif
+}
+
+// The bytes from Bytes on of a followed by b.
+template <int Bytes>
+inline Vector<std::uint8_t> from_byte(Vector<std::uint8_t> a, Vector<std::uint8_t> b) {
+  const auto next = bits_of(next_block(as<std::uint64_t>(a), as<std::uint64_t>(b),
+                                       std::make_index_sequence<lanes_in_register<std::uint64_t>>()));
+#if defined __AVX512BW__
+  return bits_of(_mm512_alignr_epi8(reinterpret_cast<__m512i>(next), reinterpret_cast<__m512i>(a), Bytes));
+#elif defined __AVX2__
+  return bits_of(_mm256_alignr_epi8(reinterpret_cast<__m256i>(next), reinterpret_cast<__m256i>(a), Bytes));
+#else
+  return bits_of(_mm_srli_si128(reinterpret_cast<__m128i>(a), Bytes)) |
+         bits_of(_mm_slli_si128(reinterpret_cast<__m128i>(next), 16 - Bytes));
+#endif
+}
+
+}  // namespace
+
+#endif

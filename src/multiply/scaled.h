@@ -1,0 +1,60 @@
+// Lanes of 64 bits shifted right by counts of their own where the target has no such shift: they are scaled as
+// floating-point numbers, which is exact. A power of two, by its exponent, times a lane that the number holds; then a
+// half that it holds besides. What is beyond a word is clamped to it, and the truncation of negative numbers made a
+// floor. Compilers make jumps of the clamps in a loop over lanes, so this is written out, in registers of 128 bits.
+#ifndef KASTARRI_MULTIPLY_SCALED_H
+#define KASTARRI_MULTIPLY_SCALED_H
+
+#include <emmintrin.h>
+
+#include <cstdint>
+
+namespace {
+
+inline __m128i both(std::uint64_t bits) { return _mm_set1_epi64x(static_cast<long long>(bits)); }
+inline __m128d number_of(__m128i bits, double less) { return _mm_sub_pd(_mm_castsi128_pd(bits), _mm_set1_pd(less)); }
+
+// The bits of a 48-bit lane, its top one flipped, under the exponent of 2^52 are the lane plus 2^52 and 2^47.
+struct Number48 {
+  static __m128d of(__m128i lanes, __m128i) {
+    const __m128i own = _mm_and_si128(lanes, both((std::uint64_t{1} << 48) - 1));
+    return number_of(_mm_xor_si128(own, both(0x4330800000000000)), 0x1.08p52);
+  }
+};
+// A 64-bit lane is the sum of two such numbers, of either word. Of a lane that is shifted by 12 or more the low 11
+// bits leave no trace, and one shifted by less saturates if it needs more than the 53 bits of the number.
+struct Number64 {
+  static __m128d of(__m128i lanes, __m128i counts) {
+    const __m128i needed = _mm_or_si128(_mm_cmplt_epi32(counts, _mm_set1_epi32(12)), both(~std::uint64_t{0x7FF}));
+    const __m128i seen = _mm_and_si128(lanes, needed);
+    const __m128i low = _mm_or_si128(_mm_and_si128(seen, both(0xFFFFFFFF)), both(0x4330000000000000));
+    const __m128i high = _mm_xor_si128(_mm_srli_epi64(seen, 32), both(0x4530000080000000));
+    return _mm_add_pd(number_of(high, 0x1.000008p84), number_of(low, 0x1p52));
+  }
+};
+
+// Two lanes, shifted by their counts after Added, which is a half or nothing, as words in the lower half.
+template <class Number, class Rounding>
+inline __m128i two_scaled(const std::uint64_t* lanes, __m128i counts) {
+  const __m128d number = Number::of(_mm_load_si128(reinterpret_cast<const __m128i*>(lanes)), counts);
+  const __m128d scale = _mm_castsi128_pd(_mm_slli_epi64(_mm_sub_epi64(both(1023), counts), 52));
+  const __m128d exact = _mm_add_pd(_mm_mul_pd(number, scale), _mm_set1_pd(Rounding::added));
+  const __m128d clamped = _mm_min_pd(_mm_max_pd(exact, _mm_set1_pd(-0x1p31)), _mm_set1_pd(0x1p31 - 1));
+  const __m128i towards_zero = _mm_cvttpd_epi32(clamped);
+  const __m128i above = _mm_castpd_si128(_mm_cmplt_pd(clamped, _mm_cvtepi32_pd(towards_zero)));
+  return _mm_add_epi32(towards_zero, _mm_shuffle_epi32(above, 0x08));
+}
+
+template <class Number, class Rounding, int Count>
+inline void scale_lanes(const std::uint64_t* lanes, const std::uint32_t* counts, std::int32_t* words) {
+  for (int i = 0; i < Count; i += 4) {
+    const __m128i four = _mm_load_si128(reinterpret_cast<const __m128i*>(counts + i)), zero = _mm_setzero_si128();
+    const __m128i low = two_scaled<Number, Rounding>(lanes + i, _mm_unpacklo_epi32(four, zero));
+    const __m128i high = two_scaled<Number, Rounding>(lanes + i + 2, _mm_unpackhi_epi32(four, zero));
+    _mm_store_si128(reinterpret_cast<__m128i*>(words + i), _mm_unpacklo_epi64(low, high));
+  }
+}
+
+}  // namespace
+
+#endif

@@ -67,7 +67,8 @@ inline void apply(UnitsUnder<Unit, PredicateUnit, false> out, const Units*... op
   const Read<L> result(results), old(out.units);
   const Write<L> to(out.units);
   KASTARRI_LANES_INDEPENDENT
-  for (int i = 0; i < L::count; ++i) to.put(i, enabled.lane[i] ? result[i] : old[i]);
+  for (int i = 0; i < L::count; ++i)  // by masks: of a choice the compiler makes a store under a branch
+    to.put(i, static_cast<lane_of<L>>(old[i] ^ ((old[i] ^ result[i]) & enabled.lane[i])));
 }
 
 // An operation on bits alone, without flags, as a rule on lanes.

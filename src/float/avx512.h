@@ -46,16 +46,38 @@ inline Sixteen<R> fused_for_half(Sixteen<R> acc, Sixteen<R> a, Sixteen<R> b) {
   return {_mm512_castsi512_ps(_mm512_mask_or_epi32(zeroward, inexact, zeroward, _mm512_set1_epi32(1)))};
 }
 
+template <Rounding R>
+inline Sixteen<R> integral(Sixteen<R> x) {
+  return {_mm512_maskz_roundscale_round_ps(0xFFFF, x.v, in_instruction<R>, _MM_FROUND_NO_EXC)};
+}
+
+template <Rounding R>
+inline Sixteen<R> integral_away(Sixteen<R> x) {
+  const Sixteen<R> absolute{_mm512_andnot_ps(_mm512_set1_ps(-0.0f), x.v)};
+  const __m512 cut = integral(Sixteen<toward_zero>{absolute.v}).v;
+  const __m512 cut_off = (absolute - Sixteen<R>{cut}).v;
+  const __mmask16 up = _mm512_cmp_round_ps_mask(cut_off, _mm512_set1_ps(0.5f), _CMP_GE_OQ, _MM_FROUND_NO_EXC);
+  const __m512 rounded = _mm512_mask_add_round_ps(cut, up, cut, _mm512_set1_ps(1), in_instruction<R>);
+  return {_mm512_or_ps(rounded, _mm512_and_ps(_mm512_set1_ps(-0.0f), x.v))};
+}
+
 // --- Lanes ------------------------------------------------------------------------------------------
 
-// Sixteen lanes of layout L at `lanes`, as singles; a lane alone sixteen times.
+// A load of part of what has just been stored whole would wait for the store: so it is whole too.
+template <class L>
+inline __m256i half_register(const typename L::container* lanes, int from) {
+  if constexpr (L::count == 1) return _mm256_set1_epi16(static_cast<short>(*lanes));
+  if constexpr (L::count == 16) return _mm256_loadu_si256(reinterpret_cast<const __m256i*>(lanes));
+  const __m512i all = _mm512_loadu_si512(lanes);
+  return from == 0 ? _mm512_castsi512_si256(all) : _mm512_maskz_extracti64x4_epi64(0xF, all, 1);
+}
+
+// Sixteen lanes of layout L from number `from` on, as singles; a lane alone sixteen times.
 template <class L, Rounding R>
-inline Sixteen<R> load_sixteen(const typename L::container* lanes) {
+inline Sixteen<R> load_sixteen(const typename L::container* lanes, int from) {
   constexpr bool is_signed = std::is_signed_v<typename L::container>;
   if constexpr (std::is_same_v<typename L::number, half_float>) {
-    const __m256i halves = L::count == 1 ? _mm256_set1_epi16(static_cast<short>(*lanes))
-                                         : _mm256_loadu_si256(reinterpret_cast<const __m256i*>(lanes));
-    return {_mm512_maskz_cvt_roundph_ps(0xFFFF, halves, _MM_FROUND_NO_EXC)};
+    return {_mm512_maskz_cvt_roundph_ps(0xFFFF, half_register<L>(lanes, from), _MM_FROUND_NO_EXC)};
   } else if constexpr (std::is_same_v<typename L::number, single_float>) {
     return {
         _mm512_castsi512_ps(L::count == 1 ? _mm512_set1_epi32(static_cast<int>(*lanes)) : _mm512_loadu_si512(lanes))};
@@ -64,7 +86,7 @@ inline Sixteen<R> load_sixteen(const typename L::container* lanes) {
     if constexpr (is_signed) return {_mm512_maskz_cvt_roundepi32_ps(0xFFFF, integers, in_instruction<R>)};
     return {_mm512_maskz_cvt_roundepu32_ps(0xFFFF, integers, in_instruction<R>)};
   } else {
-    const __m256i integers = _mm256_loadu_si256(reinterpret_cast<const __m256i*>(lanes));
+    const __m256i integers = half_register<L>(lanes, from);
     const __m512i wide =
         is_signed ? _mm512_maskz_cvtepi16_epi32(0xFFFF, integers) : _mm512_maskz_cvtepu16_epi32(0xFFFF, integers);
     return {_mm512_maskz_cvt_roundepi32_ps(0xFFFF, wide, in_instruction<R>)};
@@ -88,7 +110,7 @@ inline __m256i halves_of(Sixteen<R> x) {
 template <class L, Rounding R, class... Ls, class Rule, class... Units>
 inline __m512i rounded(Rule rule, const Units*... operands) {
   const auto sixteen = [&](int from) {
-    return rule(load_sixteen<Ls, R>(reinterpret_cast<const typename Ls::container*>(operands) + from)...);
+    return rule(load_sixteen<Ls, R>(reinterpret_cast<const typename Ls::container*>(operands), from)...);
   };
   if constexpr (L::bits == 32) {
     return _mm512_castps_si512(sixteen(0).v);
@@ -187,34 +209,31 @@ inline HostResult truncated_by_instruction(typename L::container* results, float
   constexpr bool is_signed = std::is_signed_v<typename L::container>;
   const HonestSubnormals honest(results, operand);
   std::uint32_t left = 0, fractions = 0;
-  for (int i = 0; i < L::count; i += 16) {
+  const auto sixteen = [&](int from) {
     const __m512 x =
-        (load_sixteen<From, toward_zero>(reinterpret_cast<const typename From::container*>(operand) + i) * power).v;
-    const auto no_integer = [&](__mmask16 lanes, __m512 back) {
-      left |= lanes;
-      fractions |=
-          _mm512_mask_cmp_round_ps_mask(static_cast<__mmask16>(~lanes), x, back, _CMP_NEQ_UQ, _MM_FROUND_NO_EXC);
-    };
-    if constexpr (L::bits == 32 && !is_signed) {
-      const __m512i integers = _mm512_maskz_cvtt_roundps_epu32(0xFFFF, x, _MM_FROUND_NO_EXC);
-      no_integer(_mm512_cmpeq_epu32_mask(integers, _mm512_set1_epi32(-1)),
-                 _mm512_maskz_cvt_roundepu32_ps(0xFFFF, integers, in_instruction<toward_zero>));
-      _mm512_storeu_si512(results + i, integers);
-    } else {
-      const __m512i integers = _mm512_maskz_cvtt_roundps_epi32(0xFFFF, x, _MM_FROUND_NO_EXC);
-      const __m512 back = _mm512_maskz_cvt_roundepi32_ps(0xFFFF, integers, in_instruction<toward_zero>);
-      if constexpr (L::bits == 32) {
-        no_integer(_mm512_cmpeq_epu32_mask(integers, _mm512_set1_epi32(INT32_MIN)), back);
-        _mm512_storeu_si512(results + i, integers);
-      } else {
-        const __m256i narrow = _mm512_maskz_cvtepi32_epi16(0xFFFF, integers);
-        const __m512i again =
-            is_signed ? _mm512_maskz_cvtepi16_epi32(0xFFFF, narrow) : _mm512_maskz_cvtepu16_epi32(0xFFFF, narrow);
-        no_integer(_mm512_cmpneq_epu32_mask(integers, again), back);
-        _mm256_storeu_si256(reinterpret_cast<__m256i*>(results + i), narrow);
-      }
-    }
-  }
+        (load_sixteen<From, toward_zero>(reinterpret_cast<const typename From::container*>(operand), from) * power).v;
+    constexpr bool whole_word = L::bits == 32 && !is_signed;
+    const __m512i integers = whole_word ? _mm512_maskz_cvtt_roundps_epu32(0xFFFF, x, _MM_FROUND_NO_EXC)
+                                        : _mm512_maskz_cvtt_roundps_epi32(0xFFFF, x, _MM_FROUND_NO_EXC);
+    const __m512 back = whole_word ? _mm512_maskz_cvt_roundepu32_ps(0xFFFF, integers, in_instruction<toward_zero>)
+                                   : _mm512_maskz_cvt_roundepi32_ps(0xFFFF, integers, in_instruction<toward_zero>);
+    // What does not fit converts to the integer without a single of its own, or to the least.
+    __m512i fitting = integers;
+    if constexpr (L::bits == 16)
+      fitting = is_signed ? _mm512_maskz_cvtepi16_epi32(0xFFFF, _mm512_maskz_cvtepi32_epi16(0xFFFF, integers))
+                          : _mm512_and_si512(integers, _mm512_set1_epi32(0xFFFF));
+    const __mmask16 unfit = L::bits == 16
+                                ? _mm512_cmpneq_epu32_mask(integers, fitting)
+                                : _mm512_cmpeq_epu32_mask(integers, _mm512_set1_epi32(whole_word ? -1 : INT32_MIN));
+    left |= unfit;
+    fractions |= _mm512_mask_cmp_round_ps_mask(static_cast<__mmask16>(~unfit), x, back, _CMP_NEQ_UQ, _MM_FROUND_NO_EXC);
+    return integers;
+  };
+  __m512i integers = sixteen(0);
+  if constexpr (L::bits == 16)
+    integers = _mm512_inserti64x4(_mm512_zextsi256_si512(_mm512_maskz_cvtepi32_epi16(0xFFFF, integers)),
+                                  _mm512_maskz_cvtepi32_epi16(0xFFFF, sixteen(16)), 1);
+  store_lanes<L>(results, integers);
   return {fractions != 0 ? word{inexact} : 0, left != 0};
 }
 

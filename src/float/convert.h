@@ -66,7 +66,7 @@ inline void convert_register(Out* out, const Units* in, word scale) {
     convert_vector<From, To>(out, in, fast, exact);
   } else {
     const float unit = as_float(single_bits_of_power(-static_cast<int>(scale)));
-    const auto rule = [unit](auto x) {
+    const auto rule = [=](auto x) {
       if constexpr (is_float<From>) return x;
       if constexpr (!is_float<From>) return single_of(x) * unit;
     };

@@ -244,13 +244,13 @@ class HostOperand<L, half_float> {
       number_[0] = widen(halves[0]);
       return;
     }
-#if defined __AVX512F__
-    for (int i = 0; i < L::count; i += 16)
-      _mm512_store_ps(number_ + i,
-                      _mm512_maskz_cvtph_ps(0xFFFF, _mm256_loadu_si256(reinterpret_cast<const __m256i*>(halves + i))));
-#elif defined __F16C__
-    for (int i = 0; i < L::count; i += 8)
-      _mm256_store_ps(number_ + i, _mm256_cvtph_ps(_mm_loadu_si128(reinterpret_cast<const __m128i*>(halves + i))));
+#if defined __F16C__
+    // A load of part of what has just been stored whole would wait for the store: so it is whole too.
+    for (int i = 0; i < L::count; i += 16) {
+      const __m256i sixteen = _mm256_loadu_si256(reinterpret_cast<const __m256i*>(halves + i));
+      _mm256_store_ps(number_ + i, _mm256_cvtph_ps(_mm256_castsi256_si128(sixteen)));
+      _mm256_store_ps(number_ + i + 8, _mm256_cvtph_ps(_mm256_extracti128_si256(sixteen, 1)));
+    }
 #else
     KASTARRI_LANES_INDEPENDENT
     for (int i = 0; i < L::count; ++i) number_[i] = widen(halves[i]);
@@ -270,16 +270,7 @@ inline Left narrow(const float* numbers, std::uint16_t* halves) {
     halves[0] = static_cast<std::uint16_t>(narrow(numbers[0], left));
     return left;
   }
-#if defined __AVX512F__
-  word nans = 0;
-  for (int i = 0; i < Count; i += 16) {
-    const __m512 x = _mm512_load_ps(numbers + i);
-    nans |= _mm512_cmp_ps_mask(x, x, _CMP_UNORD_Q);
-    _mm256_storeu_si256(reinterpret_cast<__m256i*>(halves + i),
-                        _mm512_maskz_cvtps_ph(0xFFFF, x, _MM_FROUND_CUR_DIRECTION));
-  }
-  return mask_not_zero(nans);
-#elif defined __F16C__
+#if defined __F16C__
   // Stored in pieces as wide as those that are loaded next.
   __m256 nans = _mm256_setzero_ps();
   const auto eight = [&](int i) {

@@ -171,7 +171,7 @@ enum class Direction { away, up, down, zero, by_mode };
 
 // Adding and taking away 2^23 with the number's sign rounds a single to an integer; from there on it is
 // one, and stays out of the sum lest that tell it inexact.
-inline float integral_on_host(float x) {
+inline float integral(float x) {
   const word sign = bits_of(x) & single_sign;
   const word absolute = bits_of(x) & single_magnitude;
   const word small = mask_below(absolute, single_bits_of_power(23));
@@ -181,10 +181,10 @@ inline float integral_on_host(float x) {
 }
 
 // Ties away from zero, the unit truncating: one more where at least half has been cut off.
-inline float away_on_host(float x) {
+inline float integral_away(float x) {
   const word sign = bits_of(x) & single_sign;
   const float absolute = as_float(bits_of(x) & single_magnitude);
-  const float cut = integral_on_host(absolute);
+  const float cut = integral(absolute);
   const float rounded = cut + as_float(~mask_below(bits_of(absolute - cut), bits_of(0.5f)) & Single::one);
   return as_float(bits_of(rounded) | sign);
 }
@@ -204,8 +204,8 @@ struct Integral {
   }
   template <class L, class Units>
   static bool fast(Environment& env, typename L::container* r, const Units* a) {
-    constexpr auto rule = [](float x) { return D == Direction::away ? away_on_host(x) : integral_on_host(x); };
-    const HostResult host = on_host<L, L>(D == Direction::away ? toward_zero : rounding(env), r, rule, a);
+    constexpr auto rule = [](auto x) { return D == Direction::away ? integral_away(x) : integral(x); };
+    const HostResult host = on_unit<L, L>(D == Direction::away ? toward_zero : rounding(env), r, rule, a);
     // Halves are integers before they are narrowed: what is inexact is the rounding to an integer.
     if (D == Direction::by_mode) env.raise(host.flags);
     return host.some_left;

@@ -9,6 +9,17 @@
 
 #ifdef __AVX512F__
 
+// g++ takes what its own header leaves undefined on purpose for a mistake.
+#ifndef __clang__
+#pragma GCC diagnostic push
+#pragma GCC diagnostic ignored "-Wuninitialized"
+#pragma GCC diagnostic ignored "-Wmaybe-uninitialized"
+#endif
+#include <immintrin.h>
+#ifndef __clang__
+#pragma GCC diagnostic pop
+#endif
+
 #include "float/host.h"
 
 namespace {
@@ -18,6 +29,9 @@ constexpr int in_instruction = _MM_FROUND_NO_EXC | (R == to_nearest    ? _MM_FRO
                                                     : R == toward_zero ? _MM_FROUND_TO_ZERO
                                                     : R == upward      ? _MM_FROUND_TO_POS_INF
                                                                        : _MM_FROUND_TO_NEG_INF);
+
+// The mask of masked forms that leave nothing out. The plain ones have the compiler warn of its own header.
+inline __mmask16 sixteen_lanes() { return 0xFFFF; }
 
 // Sixteen singles, with arithmetic that rounds by R.
 template <Rounding R>
@@ -48,7 +62,7 @@ inline Sixteen<R> fused_for_half(Sixteen<R> acc, Sixteen<R> a, Sixteen<R> b) {
 
 template <Rounding R>
 inline Sixteen<R> integral(Sixteen<R> x) {
-  return {_mm512_maskz_roundscale_round_ps(0xFFFF, x.v, in_instruction<R>, _MM_FROUND_NO_EXC)};
+  return {_mm512_maskz_roundscale_round_ps(sixteen_lanes(), x.v, in_instruction<R>, _MM_FROUND_NO_EXC)};
 }
 
 template <Rounding R>
@@ -77,19 +91,19 @@ template <class L, Rounding R>
 inline Sixteen<R> load_sixteen(const typename L::container* lanes, int from) {
   constexpr bool is_signed = std::is_signed_v<typename L::container>;
   if constexpr (std::is_same_v<typename L::number, half_float>) {
-    return {_mm512_maskz_cvt_roundph_ps(0xFFFF, half_register<L>(lanes, from), _MM_FROUND_NO_EXC)};
+    return {_mm512_maskz_cvt_roundph_ps(sixteen_lanes(), half_register<L>(lanes, from), _MM_FROUND_NO_EXC)};
   } else if constexpr (std::is_same_v<typename L::number, single_float>) {
     return {
         _mm512_castsi512_ps(L::count == 1 ? _mm512_set1_epi32(static_cast<int>(*lanes)) : _mm512_loadu_si512(lanes))};
   } else if constexpr (L::bits == 32) {
     const __m512i integers = _mm512_loadu_si512(lanes);
-    if constexpr (is_signed) return {_mm512_maskz_cvt_roundepi32_ps(0xFFFF, integers, in_instruction<R>)};
-    return {_mm512_maskz_cvt_roundepu32_ps(0xFFFF, integers, in_instruction<R>)};
+    if constexpr (is_signed) return {_mm512_maskz_cvt_roundepi32_ps(sixteen_lanes(), integers, in_instruction<R>)};
+    return {_mm512_maskz_cvt_roundepu32_ps(sixteen_lanes(), integers, in_instruction<R>)};
   } else {
     const __m256i integers = half_register<L>(lanes, from);
-    const __m512i wide =
-        is_signed ? _mm512_maskz_cvtepi16_epi32(0xFFFF, integers) : _mm512_maskz_cvtepu16_epi32(0xFFFF, integers);
-    return {_mm512_maskz_cvt_roundepi32_ps(0xFFFF, wide, in_instruction<R>)};
+    const __m512i wide = is_signed ? _mm512_maskz_cvtepi16_epi32(sixteen_lanes(), integers)
+                                   : _mm512_maskz_cvtepu16_epi32(sixteen_lanes(), integers);
+    return {_mm512_maskz_cvt_roundepi32_ps(sixteen_lanes(), wide, in_instruction<R>)};
   }
 }
 
@@ -164,7 +178,7 @@ struct LaneTests<32> {
   static __m512i chosen(__m512i a, std::uint32_t where, __m512i b) {
     return _mm512_mask_mov_epi32(a, static_cast<__mmask16>(where), b);
   }
-  static __m512i greater(__m512i a, __m512i b) { return _mm512_maskz_max_epu32(0xFFFF, a, b); }
+  static __m512i greater(__m512i a, __m512i b) { return _mm512_maskz_max_epu32(sixteen_lanes(), a, b); }
 };
 
 template <class L>
@@ -213,14 +227,16 @@ inline HostResult truncated_by_instruction(typename L::container* results, float
     const __m512 x =
         (load_sixteen<From, toward_zero>(reinterpret_cast<const typename From::container*>(operand), from) * power).v;
     constexpr bool whole_word = L::bits == 32 && !is_signed;
-    const __m512i integers = whole_word ? _mm512_maskz_cvtt_roundps_epu32(0xFFFF, x, _MM_FROUND_NO_EXC)
-                                        : _mm512_maskz_cvtt_roundps_epi32(0xFFFF, x, _MM_FROUND_NO_EXC);
-    const __m512 back = whole_word ? _mm512_maskz_cvt_roundepu32_ps(0xFFFF, integers, in_instruction<toward_zero>)
-                                   : _mm512_maskz_cvt_roundepi32_ps(0xFFFF, integers, in_instruction<toward_zero>);
+    const __m512i integers = whole_word ? _mm512_maskz_cvtt_roundps_epu32(sixteen_lanes(), x, _MM_FROUND_NO_EXC)
+                                        : _mm512_maskz_cvtt_roundps_epi32(sixteen_lanes(), x, _MM_FROUND_NO_EXC);
+    const __m512 back = whole_word
+                            ? _mm512_maskz_cvt_roundepu32_ps(sixteen_lanes(), integers, in_instruction<toward_zero>)
+                            : _mm512_maskz_cvt_roundepi32_ps(sixteen_lanes(), integers, in_instruction<toward_zero>);
     // What does not fit converts to the integer without a single of its own, or to the least.
     __m512i fitting = integers;
     if constexpr (L::bits == 16)
-      fitting = is_signed ? _mm512_maskz_cvtepi16_epi32(0xFFFF, _mm512_maskz_cvtepi32_epi16(0xFFFF, integers))
+      fitting = is_signed ? _mm512_maskz_cvtepi16_epi32(sixteen_lanes(),
+                                                        _mm512_maskz_cvtepi32_epi16(sixteen_lanes(), integers))
                           : _mm512_and_si512(integers, _mm512_set1_epi32(0xFFFF));
     const __mmask16 unfit = L::bits == 16
                                 ? _mm512_cmpneq_epu32_mask(integers, fitting)
@@ -231,8 +247,8 @@ inline HostResult truncated_by_instruction(typename L::container* results, float
   };
   __m512i integers = sixteen(0);
   if constexpr (L::bits == 16)
-    integers = _mm512_inserti64x4(_mm512_zextsi256_si512(_mm512_maskz_cvtepi32_epi16(0xFFFF, integers)),
-                                  _mm512_maskz_cvtepi32_epi16(0xFFFF, sixteen(16)), 1);
+    integers = _mm512_inserti64x4(_mm512_zextsi256_si512(_mm512_maskz_cvtepi32_epi16(sixteen_lanes(), integers)),
+                                  _mm512_maskz_cvtepi32_epi16(sixteen_lanes(), sixteen(16)), 1);
   store_lanes<L>(results, integers);
   return {fractions != 0 ? word{inexact} : 0, left != 0};
 }

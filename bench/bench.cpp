@@ -4,6 +4,8 @@
 
 #include <cstring>
 #include <random>
+#include <regex>
+#include <string>
 #include <tuple>
 
 #include "frame/entry.h"
@@ -20,34 +22,40 @@ struct Arena {
 
 Arena arena;
 
-// Random numbers from 1 to 2 of either sign in place of random bits: of those, most registers would hold
-// a NaN.
+enum class Operands { ordinary, special };
+
 template <class L>
-void make_numbers(void* image) {
-  auto* lanes = static_cast<typename L::container*>(image);
+constexpr bool holds_numbers =
+    std::is_same_v<typename L::number, half_float> || std::is_same_v<typename L::number, single_float>;
+
+// Numbers from 1 to 2 of either sign in place of random bits: of those, most registers would hold a NaN.
+// Special operands have a NaN, an infinity, a subnormal number and a zero among them.
+template <class L>
+void make_numbers(typename L::container* lanes, int count, Operands kind) {
   constexpr word one = L::bits == 16 ? 0x3C00 : 0x3F800000, free = L::bits == 16 ? 0x83FF : 0x807FFFFF;
-  for (int i = 0; i < L::count; ++i) lanes[i] = static_cast<typename L::container>((lanes[i] & free) | one);
+  constexpr word nan = L::bits == 16 ? 0x7E00 : 0x7FC00000, infinity = L::bits == 16 ? 0x7C00 : 0x7F800000;
+  for (int i = 0; i < count; ++i) lanes[i] = static_cast<typename L::container>((lanes[i] & free) | one);
+  constexpr word specials[] = {nan, infinity, 1, 0};
+  for (int i = 0; kind == Operands::special && i < 4 && i < count; ++i)
+    lanes[i] = static_cast<typename L::container>(specials[i]);
 }
-template <class T, class = void>
-struct numbers {
-  static void make(T&) {}
-};
-template <class T>
-struct numbers<T, std::enable_if_t<std::is_same_v<typename layout_of<T>::number, half_float> ||
-                                   std::is_same_v<typename layout_of<T>::number, single_float>>> {
-  static void make(T& value) { make_numbers<layout_of<T>>(value._); }
-};
+
+void fill_randomly(unsigned char* bytes, std::size_t count) {
+  static std::minstd_rand random(1);
+  for (std::size_t i = 0; i < count; ++i) bytes[i] = static_cast<unsigned char>(random());
+}
+
+void fill_arena(Operands kind) {
+  fill_randomly(arena.bytes, sizeof arena);
+  for (std::size_t i = 0; i < sizeof arena; i += 64)
+    make_numbers<f16x32>(reinterpret_cast<std::uint16_t*>(arena.bytes + i), 32, kind);
+}
 
 // An argument of an intrinsic: a register with random lanes, a pointer into the arena, a small count.
 template <class T>
 struct alignas(64) Argument {
   T value;
-  Argument() {
-    std::minstd_rand random(1);
-    auto* bytes = reinterpret_cast<unsigned char*>(&value);
-    for (std::size_t i = 0; i < sizeof value; ++i) bytes[i] = static_cast<unsigned char>(random());
-    numbers<T>::make(value);
-  }
+  Argument() { fill_randomly(reinterpret_cast<unsigned char*>(&value), sizeof value); }
   T& get() { return value; }
 };
 // A count beside registers, an offset or increment beside a pointer: accesses stay within a cache line.
@@ -91,9 +99,35 @@ void place_in_arena(int& offset) { offset = 64; }
 template <class T>
 using bare = std::remove_cv_t<std::remove_reference_t<T>>;
 
+template <class T, class = void>
+struct layout_if_any {
+  using type = Layout<std::conditional_t<std::is_same_v<T, unsigned>, word, std::int32_t>, 32, 1>;
+};
+template <class T>
+struct layout_if_any<T, std::void_t<layout_of<T>>> {
+  using type = layout_of<T>;
+};
+
+// Numbers in a register of numbers; none below zero where the result counts without a sign.
+template <class R, class T>
+void place_numbers(T& value, Operands kind) {
+  using L = typename layout_if_any<T>::type;
+  using To = typename layout_if_any<bare<R>>::type;
+  if constexpr (holds_numbers<L>) {
+    make_numbers<L>(reinterpret_cast<typename L::container*>(&value), L::count, kind);
+    if constexpr (std::is_same_v<typename To::number, integer> && std::is_unsigned_v<typename To::container>)
+      for (int i = 0; i < L::count; ++i)
+        reinterpret_cast<typename L::container*>(&value)[i] &=
+            static_cast<typename L::container>((1u << (L::bits - 1)) - 1);
+  }
+}
+
 template <class R, class... A>
-[[gnu::noinline]] void time_calls(benchmark::State& state, R (*f)(A...)) {
+[[gnu::noinline]] void time_calls(benchmark::State& state, R (*f)(A...), unsigned rounding, Operands kind) {
   alignas(page) std::tuple<Argument<bare<A>>...> arguments;
+  fill_arena(kind);
+  std::apply([&](auto&... a) { (place_numbers<R>(a.get(), kind), ...); }, arguments);
+  cstub_Km_ZNB_Orbis_R5_64k_proc.states.RoundMode = rounding;
   if constexpr ((std::is_pointer_v<A> || ...))
     std::apply([](auto&... a) { (place_in_arena(a.get()), ...); }, arguments);
   asm volatile("" : "+r"(f));  // a call, as from another library: the compiler knows nothing of it
@@ -114,13 +148,17 @@ namespace {
 
 struct Timed {
   const char* name;
-  void (*run)(benchmark::State&);
+  void (*run)(benchmark::State&, unsigned rounding, Operands kind);
 };
 
-#define ENTRY(SYMBOL, SHAPE, ...) \
-  {#SYMBOL, [](benchmark::State& state) { time_calls(state, &KASTARRI_SYMBOL(SYMBOL)); }},
-#define HELPER(NAME, SHAPE, ...) \
-  {"RK_" #NAME, [](benchmark::State& state) { time_calls(state, &cstub_Km_ZNB_Orbis_R5_64k_##NAME); }},
+#define ENTRY(SYMBOL, SHAPE, ...)                                           \
+  {#SYMBOL, [](benchmark::State& state, unsigned rounding, Operands kind) { \
+     time_calls(state, &KASTARRI_SYMBOL(SYMBOL), rounding, kind);           \
+   }},
+#define HELPER(NAME, SHAPE, ...)                                                \
+  {"RK_" #NAME, [](benchmark::State& state, unsigned rounding, Operands kind) { \
+     time_calls(state, &cstub_Km_ZNB_Orbis_R5_64k_##NAME, rounding, kind);      \
+   }},
 
 #include "frame/rows.h"
 
@@ -130,6 +168,27 @@ constexpr Timed timed[] = {
 };
 
 #include "frame/rows_end.h"
+
+// An intrinsic with ordinary operands, rounding to nearest; arithmetic on numbers in the other rounding modes
+// too, and what has a fast path for numbers with special operands.
+void register_row(const Timed& row) {
+  static const std::regex rounded(R"(rk_zra32_ZRA_(ADD|SUB|MUL|MULA|MULS)(NXF16|N_2XF32)T?)"
+                                  R"(|rk_zran_scalarfp_(ADD|SUB|MUL|MADD|MSUB)_[HS])");
+  static const std::regex of_numbers(
+      R"(rk_zra32_ZRA_((ADD|SUB|MULA?|MULS|(MIN|MAX)(NUM)?|[OU](EQ|LT|LE|N))(NXF16|N_2XF32)T?)"
+      R"(|U?TRUNCN.*|CVTF(16|32)N.*|[LS]VN_2XF16T?_I))");
+  const auto time = [&row](const char* variant, unsigned rounding, Operands kind) {
+    benchmark::RegisterBenchmark((row.name + std::string(variant)).c_str(),
+                                 [&row, rounding, kind](benchmark::State& state) { row.run(state, rounding, kind); });
+  };
+  time("", 0, Operands::ordinary);
+  if (std::regex_match(row.name, rounded)) {
+    time("/zero", 1, Operands::ordinary);
+    time("/up", 2, Operands::ordinary);
+    time("/down", 3, Operands::ordinary);
+  }
+  if (std::regex_match(row.name, of_numbers)) time("/special", 0, Operands::special);
+}
 
 // Ports that are always ready, so that what is timed is the intrinsics.
 void open_ports() {
@@ -148,6 +207,6 @@ int main(int argc, char** argv) {
   benchmark::Initialize(&argc, argv);
   benchmark::AddCustomContext("target", cstub_Km_ZNB_Orbis_R5_64k_target());
   open_ports();
-  for (const Timed& intrinsic : timed) benchmark::RegisterBenchmark(intrinsic.name, intrinsic.run);
+  for (const Timed& row : timed) register_row(row);
   benchmark::RunSpecifiedBenchmarks();
 }

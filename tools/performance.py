@@ -23,6 +23,8 @@ import generate_headers  # noqa: E402
 
 TARGETS = ["avx512", "avx2", "sse2"]
 BASELINE = "rk_zra32_qv_vecNx16_move"
+DIRECTED = ["zero", "up", "down"]
+SPECIAL = 10
 
 
 def run(build, target, pattern, repetitions, seconds):
@@ -56,9 +58,11 @@ def read_limits():
 
 
 def limit_of(name, target, limits):
+    """A limit holds in every rounding mode; operands with special values may take SPECIAL times as long."""
+    name, _, variant = name.partition("/")
     for pattern, ratios in limits:
         if pattern.fullmatch(name):
-            return ratios[target]
+            return ratios[target] * (SPECIAL if variant == "special" else 1)
     return None
 
 
@@ -67,21 +71,42 @@ def processor():
         return re.search(r"model name\s*: (.*)", file.read())[1]
 
 
+def cell(name, target, ratios, limits):
+    ratio, limit = ratios[target].get(name), limit_of(name, target, limits)
+    if ratio is None:
+        return ""
+    return f"**{ratio:.1f}** (limit {limit:g})" if limit and ratio > limit else f"{ratio:.1f}"
+
+
 def table_lines(names, ratios, limits):
     targets = [t for t in TARGETS if t in ratios]
     yield "| intrinsic | " + " | ".join(targets) + " |"
     yield "|---|" + "---|" * len(targets)
     for name in names:
+        yield f"| `{name}` | " + " | ".join(cell(name, target, ratios, limits) for target in targets) + " |"
+
+
+def variant_lines(ratios, limits):
+    """The slowest of the directed rounding modes, and operands with special values, of what is timed so."""
+    targets = [t for t in TARGETS if t in ratios]
+    measured = next(iter(ratios.values()))
+    yield "| intrinsic | " + " | ".join(f"{t} directed | {t} special" for t in targets) + " |"
+    yield "|---|" + "---|---|" * len(targets)
+    for name in dict.fromkeys(n.partition("/")[0] for n in measured if "/" in n):
         cells = []
         for target in targets:
-            ratio, limit = ratios[target][name], limit_of(name, target, limits)
-            cells.append(f"**{ratio:.1f}** (limit {limit:g})" if limit and ratio > limit else f"{ratio:.1f}")
+            modes = [f"{name}/{mode}" for mode in DIRECTED if f"{name}/{mode}" in ratios[target]]
+            slowest = max(modes, key=ratios[target].get, default=name + "/none")
+            cells += [cell(slowest, target, ratios, limits), cell(name + "/special", target, ratios, limits)]
         yield f"| `{name}` | " + " | ".join(cells) + " |"
 
 
 def document(times, limits):
-    ratios = {t: {generate_headers.short_name(n) if n.startswith("rk_") else n: v / times[t][BASELINE] for n, v in found.items()}
-              for t, found in times.items()}
+    def known_as(name):
+        symbol, slash, variant = name.partition("/")
+        return (generate_headers.short_name(symbol) if symbol.startswith("rk_") else symbol) + slash + variant
+
+    ratios = {t: {known_as(n): v / times[t][BASELINE] for n, v in found.items()} for t, found in times.items()}
     measured = next(iter(ratios.values()))
     lines = ["# Performance", "",
              "A call of each intrinsic, operands in memory, as a multiple of an exported call that copies one",
@@ -101,6 +126,11 @@ def document(times, limits):
         names = [n for n in dict.fromkeys(names) if n in measured]
         if names:
             lines += [f"## {title}", ""] + list(table_lines(names, ratios, limits)) + [""]
+    if any("/" in n for n in measured):
+        lines += ["## Rounding modes and special values", "",
+                  "Directed: the slowest of rounding toward zero, up and down; the limit is that of rounding to nearest.",
+                  "Special: a NaN, an infinity, a subnormal number and a zero among the lanes of each operand; the limit",
+                  f"is {SPECIAL} times as high.", ""] + list(variant_lines(ratios, limits)) + [""]
     notes = os.path.join(ROOT, "bench", "notes.md")
     if os.path.exists(notes):
         lines += [open(notes, encoding="utf-8").read().rstrip(), ""]

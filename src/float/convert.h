@@ -2,8 +2,8 @@
 #ifndef KASTARRI_FLOAT_CONVERT_H
 #define KASTARRI_FLOAT_CONVERT_H
 
-#include "float/host.h"
 #include "float/reference.h"
+#include "float/unit.h"
 
 namespace {
 
@@ -31,47 +31,15 @@ inline typename To::container convert_lane(Environment& env, typename From::cont
   }
 }
 
-// --- On the host's unit: a whole vector --------------------------------------------------------------------
+// --- On the unit: a whole vector -----------------------------------------------------------------------
 
-// An integer as a single, rounded once. One of 32 bits without a sign is put together from exact halves.
-template <class T>
-inline float single_of(T integer) {
-  if constexpr (std::is_same_v<T, std::uint32_t>) {
-    const auto high = static_cast<float>(static_cast<std::int32_t>(integer >> 16));
-    return high * 0x1p16f + static_cast<float>(static_cast<std::int32_t>(integer & 0xFFFF));
-  } else {
-    return static_cast<float>(integer);
-  }
-}
-
-// x truncated to an integer of To. Out of range, or a NaN, it is left.
-template <class To>
-inline word truncated(float x, Left& left) {
-  constexpr bool is_signed = std::is_signed_v<typename To::container>;
-  const word absolute = bits_of(x) & single_magnitude;
-  const word negative = sign_mask(bits_of(x));
-  const word bound = is_signed ? single_bits_of_power(To::bits - 1)
-                               : (negative & Single::one) | (~negative & single_bits_of_power(To::bits));
-  const word within = mask_below(absolute, bound);
-  left |= ~within;
-  const float kept = as_float(bits_of(x) & within);
-  if constexpr (is_signed || To::bits < 32) {
-    return static_cast<word>(static_cast<std::int32_t>(kept));
-  } else {
-    // The unit converts to signed integers only: bit 31 goes over by itself.
-    const word high = within & ~mask_below(absolute, single_bits_of_power(31));
-    const float low = kept - as_float(high & single_bits_of_power(31));
-    return static_cast<word>(static_cast<std::int32_t>(low)) | (high & single_sign);
-  }
-}
-
-// A whole vector on the host's unit, or, when it leaves a lane, by the reference altogether: a lane that
+// A whole vector on the unit, or, when it leaves a lane, by the reference altogether: a lane that
 // is left may have raised flags of its own.
 template <class From, class To, class Out, class Units, class Fast, class Exact>
 inline void convert_vector(Out* out, const Units* in, Fast fast, Exact exact) {
   alignas(64) typename To::container results[To::count];
   Environment env;
-  const HostResult host = on_host<To, From>(env.rounding, results, fast, in);
+  const HostResult host = fast(env.rounding, results);
   if (__builtin_expect(host.some_left, 0)) {
     const Read<From> from(in);
     for (int i = 0; i < To::count; ++i) results[i] = exact(env, from[i]);
@@ -90,17 +58,20 @@ inline void convert_register(Out* out, const Units* in, word scale) {
     const auto lane = exact(env, Read<From>(in)[0]);
     lanes<To::count>(
         Write<To>(out), [](auto same) { return same; }, Same(lane));
-  } else if constexpr (!is_float<From>) {
-    const float unit = as_float(single_bits_of_power(-static_cast<int>(scale)));
-    convert_vector<From, To>(
-        out, in, [unit](auto integer) { return single_of(integer) * unit; }, exact);
   } else if constexpr (!is_float<To>) {
     const float power = as_float(single_bits_of_power(static_cast<int>(scale)));
-    convert_vector<From, To>(
-        out, in, [power](Left& left, float x) { return truncated<To>(x * power, left); }, exact);
+    const auto fast = [=](Rounding rounding, auto* results) {
+      return truncated_on_unit<To, From>(rounding, results, power, in);
+    };
+    convert_vector<From, To>(out, in, fast, exact);
   } else {
-    convert_vector<From, To>(
-        out, in, [](float x) { return x; }, exact);
+    const float unit = as_float(single_bits_of_power(-static_cast<int>(scale)));
+    const auto rule = [=](auto x) {
+      if constexpr (is_float<From>) return x;
+      if constexpr (!is_float<From>) return single_of(x) * unit;
+    };
+    const auto fast = [=](Rounding rounding, auto* results) { return on_unit<To, From>(rounding, results, rule, in); };
+    convert_vector<From, To>(out, in, fast, exact);
   }
 }
 

@@ -27,11 +27,17 @@
 
 namespace {
 
+// What the pointer leads to is unknown before, and memory may be read after.
+template <class Pointer>
+inline void pin(Pointer& pointer) {
+  asm volatile("" : "+r"(pointer) : : "memory");
+}
+
 // From its beginning to leave(): MXCSR with a rounding of ours, every exception masked, subnormals
-// honoured, no flags. Compilers know nothing of MXCSR and move arithmetic past its writes; they cannot
-// where operands are read through pointers, and results written through them, that pass here as outputs
-// of an assembler statement between the writes: what a load yields is unknown before the one write, and a
-// store must be done before the other, which may read any memory.
+// honoured, no flags. It is read, which is cheap, and written only where it differs. Compilers know nothing of MXCSR
+// and move arithmetic past its writes; they cannot where operands are read through pointers, and results written
+// through them, that pass here as outputs of an assembler statement between the writes: what a load yields is unknown
+// before the one write, and a store must be done before the other, which may read any memory.
 class HostFpu {
  public:
   template <class... Pointers>
@@ -39,7 +45,7 @@ class HostFpu {
     asm volatile("stmxcsr %0" : "=m"(found_));
     // MXCSR counts the modes nearest, down, up, zero.
     const word wanted = all_masked | ((4 - static_cast<word>(rounding)) & 3) << 13;
-    asm volatile("ldmxcsr %0" : : "m"(wanted) : "memory");
+    if (found_ != wanted) asm volatile("ldmxcsr %0" : : "m"(wanted) : "memory");
     (pin(operands_and_results), ...);
   }
   HostFpu(const HostFpu&) = delete;
@@ -49,18 +55,12 @@ class HostFpu {
   word leave() const {
     word raised;
     asm volatile("stmxcsr %0" : "=m"(raised) : : "memory");
-    asm volatile("ldmxcsr %0" : : "m"(found_) : "memory");
+    if (raised != found_) asm volatile("ldmxcsr %0" : : "m"(found_) : "memory");
     return (raised >> 5 & inexact) | (raised >> 3 & underflow) | (raised >> 1 & overflow);
   }
 
  private:
   static constexpr word all_masked = 0x1F80;
-
-  template <class Pointer>
-  static void pin(Pointer& pointer) {
-    asm volatile("" : "+r"(pointer) : : "memory");
-  }
-
   word found_;
 };
 
@@ -166,6 +166,12 @@ inline Wide odd_sum(Wide p, Wide c) {
   }
 }
 
+// acc + a * b in single precision, such that rounding it to half precision is rounding once.
+template <bool Nearest>
+inline float fused_for_half(float acc, float a, float b) {
+  return odd_sum<Half, Nearest>(a * b, acc);
+}
+
 // acc + a * b in single precision, rounded once.
 template <bool Nearest, bool Alone>
 inline float fused(float acc, float a, float b) {
@@ -174,6 +180,40 @@ inline float fused(float acc, float a, float b) {
 #else
   return static_cast<float>(odd_sum<Single, Nearest, Alone>(double{a} * double{b}, double{acc}));
 #endif
+}
+
+// --- Integers -----------------------------------------------------------------------------------------
+
+// An integer as a single, rounded once. One of 32 bits without a sign is put together from exact halves.
+template <class T>
+inline float single_of(T integer) {
+  if constexpr (std::is_same_v<T, std::uint32_t>) {
+    const auto high = static_cast<float>(static_cast<std::int32_t>(integer >> 16));
+    return high * 0x1p16f + static_cast<float>(static_cast<std::int32_t>(integer & 0xFFFF));
+  } else {
+    return static_cast<float>(integer);
+  }
+}
+
+// x truncated to an integer of To. Out of range, or a NaN, it is left.
+template <class To>
+inline word truncated(float x, Left& left) {
+  constexpr bool is_signed = std::is_signed_v<typename To::container>;
+  const word absolute = bits_of(x) & single_magnitude;
+  const word negative = sign_mask(bits_of(x));
+  const word bound = is_signed ? single_bits_of_power(To::bits - 1)
+                               : (negative & Single::one) | (~negative & single_bits_of_power(To::bits));
+  const word within = mask_below(absolute, bound);
+  left |= ~within;
+  const float kept = as_float(bits_of(x) & within);
+  if constexpr (is_signed || To::bits < 32) {
+    return static_cast<word>(static_cast<std::int32_t>(kept));
+  } else {
+    // The unit converts to signed integers only: bit 31 goes over by itself.
+    const word high = within & ~mask_below(absolute, single_bits_of_power(31));
+    const float low = kept - as_float(high & single_bits_of_power(31));
+    return static_cast<word>(static_cast<std::int32_t>(low)) | (high & single_sign);
+  }
 }
 
 // --- Lanes ------------------------------------------------------------------------------------------
@@ -204,13 +244,13 @@ class HostOperand<L, half_float> {
       number_[0] = widen(halves[0]);
       return;
     }
-#if defined __AVX512F__
-    for (int i = 0; i < L::count; i += 16)
-      _mm512_store_ps(number_ + i,
-                      _mm512_maskz_cvtph_ps(0xFFFF, _mm256_loadu_si256(reinterpret_cast<const __m256i*>(halves + i))));
-#elif defined __F16C__
-    for (int i = 0; i < L::count; i += 8)
-      _mm256_store_ps(number_ + i, _mm256_cvtph_ps(_mm_loadu_si128(reinterpret_cast<const __m128i*>(halves + i))));
+#if defined __F16C__
+    // A load of part of what has just been stored whole would wait for the store: so it is whole too.
+    for (int i = 0; i < L::count; i += 16) {
+      const __m256i sixteen = _mm256_loadu_si256(reinterpret_cast<const __m256i*>(halves + i));
+      _mm256_store_ps(number_ + i, _mm256_cvtph_ps(_mm256_castsi256_si128(sixteen)));
+      _mm256_store_ps(number_ + i + 8, _mm256_cvtph_ps(_mm256_extracti128_si256(sixteen, 1)));
+    }
 #else
     KASTARRI_LANES_INDEPENDENT
     for (int i = 0; i < L::count; ++i) number_[i] = widen(halves[i]);
@@ -230,22 +270,16 @@ inline Left narrow(const float* numbers, std::uint16_t* halves) {
     halves[0] = static_cast<std::uint16_t>(narrow(numbers[0], left));
     return left;
   }
-#if defined __AVX512F__
-  word nans = 0;
-  for (int i = 0; i < Count; i += 16) {
-    const __m512 x = _mm512_load_ps(numbers + i);
-    nans |= _mm512_cmp_ps_mask(x, x, _CMP_UNORD_Q);
-    _mm256_storeu_si256(reinterpret_cast<__m256i*>(halves + i),
-                        _mm512_maskz_cvtps_ph(0xFFFF, x, _MM_FROUND_CUR_DIRECTION));
-  }
-  return mask_not_zero(nans);
-#elif defined __F16C__
+#if defined __F16C__
+  // Stored in pieces as wide as those that are loaded next.
   __m256 nans = _mm256_setzero_ps();
-  for (int i = 0; i < Count; i += 8) {
+  const auto eight = [&](int i) {
     const __m256 x = _mm256_load_ps(numbers + i);
     nans = _mm256_or_ps(nans, _mm256_cmp_ps(x, x, _CMP_UNORD_Q));
-    _mm_storeu_si128(reinterpret_cast<__m128i*>(halves + i), _mm256_cvtps_ph(x, _MM_FROUND_CUR_DIRECTION));
-  }
+    return _mm256_cvtps_ph(x, _MM_FROUND_CUR_DIRECTION);
+  };
+  for (int i = 0; i < Count; i += 16)
+    _mm256_storeu_si256(reinterpret_cast<__m256i*>(halves + i), _mm256_set_m128i(eight(i + 8), eight(i)));
   return mask_not_zero(static_cast<word>(_mm256_movemask_ps(nans)));
 #else
   // Words first: the compiler would pack each term of the last sum by itself.

@@ -5,18 +5,18 @@
 
 #include <type_traits>
 
-#include "float/host.h"
 #include "float/reference.h"
+#include "float/unit.h"
 
 namespace {
 
 template <class L, class>
 using same_layout = L;
 
-// A rule of two or three floats on the host's unit: results and flags into the register and env.
+// A rule of two or three floats on the unit: results and flags into the register and env.
 template <class L, class Rule, class... Units>
-inline bool fast_on_host(Environment& env, typename L::container* results, Rule rule, const Units*... operands) {
-  const HostResult host = on_host<L, same_layout<L, Units>...>(env.rounding, results, rule, operands...);
+inline bool fast_on_unit(Environment& env, typename L::container* results, Rule rule, const Units*... operands) {
+  const HostResult host = on_unit<L, same_layout<L, Units>...>(env.rounding, results, rule, operands...);
   env.raise(host.flags);
   return host.some_left;
 }
@@ -28,8 +28,8 @@ struct ADD {
   }
   template <class L, class... Units>
   static bool fast(Environment& env, typename L::container* r, const Units*... ab) {
-    return fast_on_host<L>(
-        env, r, [](float a, float b) { return a + b; }, ab...);
+    return fast_on_unit<L>(
+        env, r, [](auto a, auto b) { return a + b; }, ab...);
   }
 };
 
@@ -40,8 +40,8 @@ struct SUB {
   }
   template <class L, class... Units>
   static bool fast(Environment& env, typename L::container* r, const Units*... ab) {
-    return fast_on_host<L>(
-        env, r, [](float a, float b) { return a - b; }, ab...);
+    return fast_on_unit<L>(
+        env, r, [](auto a, auto b) { return a - b; }, ab...);
   }
 };
 
@@ -52,8 +52,8 @@ struct MUL {
   }
   template <class L, class... Units>
   static bool fast(Environment& env, typename L::container* r, const Units*... ab) {
-    return fast_on_host<L>(
-        env, r, [](float a, float b) { return a * b; }, ab...);
+    return fast_on_unit<L>(
+        env, r, [](auto a, auto b) { return a * b; }, ab...);
   }
 };
 
@@ -66,16 +66,16 @@ struct Fused {
   }
   template <class L, class... Units>
   static bool fast(Environment& env, typename L::container* r, const Units*... operands) {
-    return env.rounding == to_nearest ? fast_on_host<L>(env, r, host<L, true>, operands...)
-                                      : fast_on_host<L>(env, r, host<L, false>, operands...);
+    if (rounds_by_instruction || env.rounding == to_nearest) return fast_on_unit<L>(env, r, rule<L, true>, operands...);
+    return fast_on_unit<L>(env, r, rule<L, false>, operands...);
   }
 
  private:
   template <class L, bool Nearest>
-  static constexpr auto host = [](float acc, float a, float b) {
-    const float factor = Subtract ? -a : a;
+  static constexpr auto rule = [](auto acc, auto a, auto b) {
+    const auto factor = Subtract ? -a : a;
     if constexpr (L::bits == 16) {
-      return odd_sum<Half, Nearest>(factor * b, acc);
+      return fused_for_half<Nearest>(acc, factor, b);
     } else {
       return fused<Nearest, L::count == 1>(acc, factor, b);
     }
@@ -171,7 +171,7 @@ enum class Direction { away, up, down, zero, by_mode };
 
 // Adding and taking away 2^23 with the number's sign rounds a single to an integer; from there on it is
 // one, and stays out of the sum lest that tell it inexact.
-inline float integral_on_host(float x) {
+inline float integral(float x) {
   const word sign = bits_of(x) & single_sign;
   const word absolute = bits_of(x) & single_magnitude;
   const word small = mask_below(absolute, single_bits_of_power(23));
@@ -181,10 +181,10 @@ inline float integral_on_host(float x) {
 }
 
 // Ties away from zero, the unit truncating: one more where at least half has been cut off.
-inline float away_on_host(float x) {
+inline float integral_away(float x) {
   const word sign = bits_of(x) & single_sign;
   const float absolute = as_float(bits_of(x) & single_magnitude);
-  const float cut = integral_on_host(absolute);
+  const float cut = integral(absolute);
   const float rounded = cut + as_float(~mask_below(bits_of(absolute - cut), bits_of(0.5f)) & Single::one);
   return as_float(bits_of(rounded) | sign);
 }
@@ -204,8 +204,8 @@ struct Integral {
   }
   template <class L, class Units>
   static bool fast(Environment& env, typename L::container* r, const Units* a) {
-    constexpr auto rule = [](float x) { return D == Direction::away ? away_on_host(x) : integral_on_host(x); };
-    const HostResult host = on_host<L, L>(D == Direction::away ? toward_zero : rounding(env), r, rule, a);
+    constexpr auto rule = [](auto x) { return D == Direction::away ? integral_away(x) : integral(x); };
+    const HostResult host = on_unit<L, L>(D == Direction::away ? toward_zero : rounding(env), r, rule, a);
     // Halves are integers before they are narrowed: what is inexact is the rounding to an integer.
     if (D == Direction::by_mode) env.raise(host.flags);
     return host.some_left;

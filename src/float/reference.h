@@ -222,7 +222,8 @@ template <class F>
 constexpr auto order(word x) {
   using S = std::make_signed_t<typename F::lane>;
   const auto bits = static_cast<S>(x);
-  return static_cast<S>(bits < 0 ? bits ^ static_cast<S>(F::sign - 1) : bits);
+  const auto negative = static_cast<S>(bits >> (F::bits - 1));
+  return static_cast<S>(bits ^ (negative & static_cast<S>(F::sign - 1)));
 }
 
 template <class F>

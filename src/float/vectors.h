@@ -10,11 +10,13 @@ namespace {
 template <class L>
 using lane_of = typename L::container;
 
-// One lane is quickest by the reference, but for the fused operations on singles, whose exact sum is long.
+// One lane is quickest by the reference, but for the fused operations, whose exact sum is long.
 template <class Op, class L>
 constexpr bool is_fast_alone = false;
 template <bool Subtract>
 constexpr bool is_fast_alone<Fused<Subtract>, f32x1> = true;
+template <bool Subtract>
+constexpr bool is_fast_alone<Fused<Subtract>, f16x1> = rounds_by_instruction;
 
 // results[i] = Op of lanes i of the operands. The results are apart from the operands.
 template <class L, class Op, class... Units>
@@ -65,7 +67,8 @@ inline void apply(UnitsUnder<Unit, PredicateUnit, false> out, const Units*... op
   const Read<L> result(results), old(out.units);
   const Write<L> to(out.units);
   KASTARRI_LANES_INDEPENDENT
-  for (int i = 0; i < L::count; ++i) to.put(i, enabled.lane[i] ? result[i] : old[i]);
+  for (int i = 0; i < L::count; ++i)  // by masks: of a choice the compiler makes a store under a branch
+    to.put(i, static_cast<lane_of<L>>(old[i] ^ ((old[i] ^ result[i]) & enabled.lane[i])));
 }
 
 // An operation on bits alone, without flags, as a rule on lanes.

@@ -1,0 +1,38 @@
+// The unit that whole vectors are computed on: AVX-512's, or else the host's as its control word has it.
+#ifndef KASTARRI_FLOAT_UNIT_H
+#define KASTARRI_FLOAT_UNIT_H
+
+#include "float/avx512.h"
+#include "float/host.h"
+
+namespace {
+
+#ifdef __AVX512F__
+constexpr bool rounds_by_instruction = true;
+
+template <class R, class... Ls, class Rule, class... Units>
+inline HostResult on_unit(Rounding rounding, typename R::container* results, Rule rule, const Units*... operands) {
+  return by_instruction<R, Ls...>(rounding, results, rule, operands...);
+}
+template <class R, class From, class Units>
+inline HostResult truncated_on_unit(Rounding, typename R::container* results, float power, const Units* operand) {
+  return truncated_by_instruction<R, From>(results, power, operand);
+}
+#else
+constexpr bool rounds_by_instruction = false;
+
+template <class R, class... Ls, class Rule, class... Units>
+inline HostResult on_unit(Rounding rounding, typename R::container* results, Rule rule, const Units*... operands) {
+  return on_host<R, Ls...>(rounding, results, rule, operands...);
+}
+template <class R, class From, class Units>
+inline HostResult truncated_on_unit(Rounding rounding, typename R::container* results, float power,
+                                    const Units* operand) {
+  return on_host<R, From>(
+      rounding, results, [power](Left& left, float x) { return truncated<R>(x * power, left); }, operand);
+}
+#endif
+
+}  // namespace
+
+#endif

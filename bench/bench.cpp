@@ -2,11 +2,10 @@
 // tools/performance.py runs this for each target and makes the table of docs/performance.md.
 #include <benchmark/benchmark.h>
 
-#include <cstring>
+#include <new>
 #include <random>
 #include <regex>
 #include <string>
-#include <tuple>
 
 #include "frame/entry.h"
 #include "frame/shapes.h"
@@ -122,29 +121,43 @@ void place_numbers(T& value, Operands kind) {
   }
 }
 
+// Where the operands of a call lie, one after the other.
+struct Frame {
+  alignas(page) unsigned char bytes[page];
+  std::size_t used = 0;
+
+  template <class T>
+  Argument<T>& make() {
+    auto* argument = new (bytes + used) Argument<T>;
+    used += (sizeof *argument + 63) & ~std::size_t{63};
+    return *argument;
+  }
+};
+
 template <class R, class... A>
-[[gnu::noinline]] void time_calls(benchmark::State& state, R (*f)(A...), unsigned rounding, Operands kind) {
-  alignas(page) std::tuple<Argument<bare<A>>...> arguments;
-  fill_arena(kind);
-  std::apply([&](auto&... a) { (place_numbers<R>(a.get(), kind), ...); }, arguments);
-  cstub_Km_ZNB_Orbis_R5_64k_proc.states.RoundMode = rounding;
-  if constexpr ((std::is_pointer_v<A> || ...))
-    std::apply([](auto&... a) { (place_in_arena(a.get()), ...); }, arguments);
+[[gnu::noinline]] void time_with(benchmark::State& state, R (*f)(A...), [[maybe_unused]] Operands kind,
+                                 Argument<bare<A>>&... a) {
+  (place_numbers<R>(a.get(), kind), ...);
+  if constexpr ((std::is_pointer_v<A> || ...)) (place_in_arena(a.get()), ...);
   asm volatile("" : "+r"(f));  // a call, as from another library: the compiler knows nothing of it
   for (auto _ : state) {
     if constexpr (std::is_void_v<R>) {
-      std::apply([&](auto&... a) { f(a.get()...); }, arguments);
+      f(a.get()...);
       benchmark::ClobberMemory();
     } else {
-      alignas(64) R result = std::apply([&](auto&... a) { return f(a.get()...); }, arguments);
+      alignas(64) R result = f(a.get()...);
       asm volatile("" : : "m"(result) : "memory");
     }
   }
 }
 
-}  // namespace
-
-namespace {
+template <class R, class... A>
+void time_calls(benchmark::State& state, R (*f)(A...), unsigned rounding, Operands kind) {
+  Frame frame;
+  fill_arena(kind);
+  cstub_Km_ZNB_Orbis_R5_64k_proc.states.RoundMode = rounding;
+  time_with(state, f, kind, frame.make<bare<A>>()...);
+}
 
 struct Timed {
   const char* name;

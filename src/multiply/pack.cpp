@@ -71,7 +71,7 @@ constexpr ShiftedHalf shifted_half;
 
 // x shifted right by a count that all lanes share, or by the lane's own.
 struct Shared {
-  static constexpr bool scales = false, is_signed = false;
+  [[maybe_unused]] static constexpr bool scales = false, is_signed = false;
   static constexpr std::int32_t shift(std::int32_t x, word s) { return shift_right(x, s); }
   static constexpr std::uint64_t shift(std::uint64_t x, word s) { return x >> s; }
   // Out of a table: to shift two words by a run-time count the compiler goes through memory in two halves.
@@ -79,7 +79,7 @@ struct Shared {
 };
 class Own {
  public:
-  static constexpr bool scales = !lanes_shift_alone, is_signed = pairs_shift_signed;
+  [[maybe_unused]] static constexpr bool scales = !lanes_shift_alone, is_signed = pairs_shift_signed;
   static constexpr std::int32_t shift(std::int32_t x, word s) { return x >> s; }
   static constexpr std::int64_t shift(std::int64_t x, word s) { return x >> std::int64_t{s}; }
   static constexpr std::uint64_t shift(std::uint64_t x, word s) { return x >> std::uint64_t{s}; }

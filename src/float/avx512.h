@@ -33,6 +33,15 @@ constexpr int in_instruction = _MM_FROUND_NO_EXC | (R == to_nearest    ? _MM_FRO
 // The mask of masked forms that leave nothing out. The plain ones have the compiler warn of its own header.
 inline __mmask16 sixteen_lanes() { return 0xFFFF; }
 
+// Where numbers differ, of which no lane holds a NaN. Compared as integers: clang makes of a comparison that
+// raises no flags one that does.
+inline __mmask16 differing(__m512 a, __m512 b) {
+  const __m512i bits_a = _mm512_castps_si512(a), bits_b = _mm512_castps_si512(b);
+  const __m512i either = _mm512_or_si512(bits_a, bits_b);  // without the sign, 0 for zeros of either sign
+  return static_cast<__mmask16>(_mm512_cmpneq_epi32_mask(bits_a, bits_b) &
+                                _mm512_test_epi32_mask(either, _mm512_set1_epi32(INT32_MAX)));
+}
+
 // Sixteen singles, with arithmetic that rounds by R.
 template <Rounding R>
 struct Sixteen {
@@ -56,7 +65,7 @@ inline Sixteen<R> fused_for_half(Sixteen<R> acc, Sixteen<R> a, Sixteen<R> b) {
   const __m512i zeroward = _mm512_castps_si512(_mm512_fmadd_round_ps(a.v, b.v, acc.v, in_instruction<toward_zero>));
   const __m512 up = _mm512_fmadd_round_ps(a.v, b.v, acc.v, in_instruction<upward>);
   const __m512 down = _mm512_fmadd_round_ps(a.v, b.v, acc.v, in_instruction<downward>);
-  const __mmask16 inexact = _mm512_cmp_round_ps_mask(up, down, _CMP_NEQ_UQ, _MM_FROUND_NO_EXC);
+  const __mmask16 inexact = differing(up, down);
   return {_mm512_castsi512_ps(_mm512_mask_or_epi32(zeroward, inexact, zeroward, _mm512_set1_epi32(1)))};
 }
 
@@ -70,7 +79,8 @@ inline Sixteen<R> integral_away(Sixteen<R> x) {
   const Sixteen<R> absolute{_mm512_andnot_ps(_mm512_set1_ps(-0.0f), x.v)};
   const __m512 cut = integral(Sixteen<toward_zero>{absolute.v}).v;
   const __m512 cut_off = (absolute - Sixteen<R>{cut}).v;
-  const __mmask16 up = _mm512_cmp_round_ps_mask(cut_off, _mm512_set1_ps(0.5f), _CMP_GE_OQ, _MM_FROUND_NO_EXC);
+  // What is cut off is at least 0, or a NaN.
+  const __mmask16 up = _mm512_cmpge_epi32_mask(_mm512_castps_si512(cut_off), _mm512_castps_si512(_mm512_set1_ps(0.5f)));
   const __m512 rounded = _mm512_mask_add_round_ps(cut, up, cut, _mm512_set1_ps(1), in_instruction<R>);
   return {_mm512_or_ps(rounded, _mm512_and_ps(_mm512_set1_ps(-0.0f), x.v))};
 }
@@ -242,7 +252,7 @@ inline HostResult truncated_by_instruction(typename L::container* results, float
                                 ? _mm512_cmpneq_epu32_mask(integers, fitting)
                                 : _mm512_cmpeq_epu32_mask(integers, _mm512_set1_epi32(whole_word ? -1 : INT32_MIN));
     left |= unfit;
-    fractions |= _mm512_mask_cmp_round_ps_mask(static_cast<__mmask16>(~unfit), x, back, _CMP_NEQ_UQ, _MM_FROUND_NO_EXC);
+    fractions |= ~unfit & differing(x, back);
     return integers;
   };
   __m512i integers = sixteen(0);

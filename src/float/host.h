@@ -271,16 +271,19 @@ inline Left narrow(const float* numbers, std::uint16_t* halves) {
     return left;
   }
 #if defined __F16C__
-  // Stored in pieces as wide as those that are loaded next.
-  __m256 nans = _mm256_setzero_ps();
+  // Stored in pieces as wide as those that are loaded next. NaNs are told by their bits: a comparison of numbers may be
+  // moved behind the end of what HostFpu guards.
+  const __m256i infinity = _mm256_set1_epi32(Single::infinity), magnitude = _mm256_set1_epi32(single_magnitude);
+  __m256i nans = _mm256_setzero_si256();
   const auto eight = [&](int i) {
     const __m256 x = _mm256_load_ps(numbers + i);
-    nans = _mm256_or_ps(nans, _mm256_cmp_ps(x, x, _CMP_UNORD_Q));
+    const __m256i bits = _mm256_castps_si256(x);
+    nans = _mm256_or_si256(nans, _mm256_sub_epi32(infinity, _mm256_and_si256(bits, magnitude)));
     return _mm256_cvtps_ph(x, _MM_FROUND_CUR_DIRECTION);
   };
   for (int i = 0; i < Count; i += 16)
     _mm256_storeu_si256(reinterpret_cast<__m256i*>(halves + i), _mm256_set_m128i(eight(i + 8), eight(i)));
-  return mask_not_zero(static_cast<word>(_mm256_movemask_ps(nans)));
+  return mask_not_zero(static_cast<word>(_mm256_movemask_ps(_mm256_castsi256_ps(nans))));
 #else
   // Words first: the compiler would pack each term of the last sum by itself.
   alignas(64) word words[Count];

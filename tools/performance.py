@@ -101,6 +101,16 @@ def variant_lines(ratios, limits):
         yield f"| `{name}` | " + " | ".join(cells) + " |"
 
 
+def family_lines(families, ratios):
+    """The middle intrinsic of each family."""
+    targets = [t for t in TARGETS if t in ratios]
+    yield "| family | intrinsics | " + " | ".join(targets) + " |"
+    yield "|---|---|" + "---|" * len(targets)
+    for title, names in families.items():
+        medians = [f"{statistics.median(ratios[t][n] for n in names):.1f}" for t in targets]
+        yield f"| {title} | {len(names)} | " + " | ".join(medians) + " |"
+
+
 def document(times, limits):
     def known_as(name):
         symbol, slash, variant = name.partition("/")
@@ -121,11 +131,14 @@ def document(times, limits):
                   "`-O2 -fno-tree-vectorize`:", "", "| target | speed-up |", "|---|---|"]
         lines += [f"| {t} | {ratios[t]['fir_scalar'] / ratios[t]['fir_kernel']:.2f} |" for t in TARGETS if t in ratios]
         lines += [""]
-    for header, (title, _, rows) in generate_headers.all_rows().items():
-        names = [generate_headers.short_name(row[0]) for row in rows]
-        names = [n for n in dict.fromkeys(names) if n in measured]
-        if names:
-            lines += [f"## {title}", ""] + list(table_lines(names, ratios, limits)) + [""]
+    families = {}
+    for title, _, rows in generate_headers.all_rows().values():
+        names = dict.fromkeys(generate_headers.short_name(row[0]) for row in rows)
+        families[title] = [n for n in names if n in measured]
+    families = {title: names for title, names in families.items() if names}
+    lines += ["## Families", "", "The median of each family's intrinsics.", ""] + list(family_lines(families, ratios)) + [""]
+    for title, names in families.items():
+        lines += [f"## {title}", ""] + list(table_lines(names, ratios, limits)) + [""]
     if any("/" in n for n in measured):
         lines += ["## Rounding modes and special values", "",
                   "Directed: the slowest of rounding toward zero, up and down; the limit is that of rounding to nearest.",

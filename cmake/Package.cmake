@@ -1,6 +1,6 @@
 # Debian packages, as Debian divides libraries: libkastarri<major> with what programs load, which other major
 # versions can stand beside, and libkastarri-dev with all that programs are made with.
-set(KASTARRI_MAINTAINER "The kastarri authors <kastarri@localhost>" CACHE STRING "Maintainer of the packages")
+set(KASTARRI_MAINTAINER "The kastarri authors <maintainers@kastarri.invalid>" CACHE STRING "Maintainer of the packages")
 
 set(runtime_package libkastarri${PROJECT_VERSION_MAJOR})
 set(devel_package libkastarri-dev)
@@ -40,8 +40,9 @@ set(CPACK_DEBIAN_RUNTIME_DESCRIPTION "intrinsics of a DSP core as a library\n${w
 This package has the shared library, which programs need to run.")
 set(CPACK_DEBIAN_DEVEL_PACKAGE_NAME ${devel_package})
 set(CPACK_DEBIAN_DEVEL_PACKAGE_SECTION libdevel)
-set(CPACK_DEBIAN_DEVEL_PACKAGE_DEPENDS "${runtime_package} (= ${PROJECT_VERSION}), python3")  # for kastarri-profile
+# For kastarri-profile: any Python will do, of whichever architecture; its counting library needs a newer libc.
+set(CPACK_DEBIAN_DEVEL_PACKAGE_DEPENDS "${runtime_package} (= ${PROJECT_VERSION}), libc6 (>= 2.34), python3:any")
 set(CPACK_DEBIAN_DEVEL_DESCRIPTION "intrinsics of a DSP core as a library (development)\n${what}\n.
-This package has what programs are made with: headers, libraries to link, and
-files for CMake and pkg-config.")
+This package has what programs are made with: headers, libraries to link, files for
+CMake and pkg-config, printers for gdb, the profiler and the reference page.")
 include(CPack)

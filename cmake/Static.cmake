@@ -1,5 +1,5 @@
-# The static library: one target, without dispatch. With GCC its integer, multiply and memory intrinsics can be
-# inlined into kernels at link time; the objects hold machine code besides, for links without.
+# The static library: one target, without dispatch. With GCC its integer, multiply and memory intrinsics, moves
+# and conversions can be inlined into kernels at link time; the objects hold machine code besides, for links without.
 #
 # Floats and the scalar core stay calls. How the compiler may treat floating-point arithmetic is up to the
 # flags of the function that it is inlined into, and the rules count on theirs. The state block is looked up

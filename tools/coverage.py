@@ -36,7 +36,7 @@ def document():
         total += len(rows)
     lines += [f"| **All** | **{total}** |", "",
               "## What is not built", "",
-              "A missing intrinsic is an honest error when a program is linked; a guessed one would be a silent wrong answer.", "",
+              "A missing intrinsic is an error when a kernel is compiled; a guessed one would be a silent wrong answer.", "",
               "| what | why |", "|---|---|"] + [f"| {what} | {why} |" for what, why in NOT_BUILT]
     return "\n".join(lines) + "\n"
 

@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
 # Installs the Debian packages that are missing for the named purposes, as root or through sudo; where
-# neither works, prints the command that does it and fails.
+# neither works, prints the commands that do it and fails. On a system that is not Debian it names them and goes on.
 #
 #   tools/packages.sh PURPOSE...     build, test, picture, check
 set -euo pipefail
@@ -19,7 +19,7 @@ for purpose in "$@"; do
   wanted+=("${names[@]}")
 done
 
-if ! command -v dpkg-query apt-get >/dev/null; then
+if ! { command -v dpkg-query && command -v apt-get; } >/dev/null; then
   echo "This is not a Debian system. What is needed here, by Debian's names: ${wanted[*]}" >&2
   exit 0
 fi

@@ -15,7 +15,7 @@
 KASTARRI_API const char* cstub_Km_ZNB_Orbis_R5_64k_version();
 
 /// The instruction set that the loaded library's intrinsics use on this processor: "avx512", "avx2" or
-/// "sse2".
+/// "sse2"; "none" if it runs none that the library was built for.
 KASTARRI_API const char* cstub_Km_ZNB_Orbis_R5_64k_target();
 
 #define KASTARRI_DOTTED(MAJOR, MINOR, PATCH) KASTARRI_DOTTED_AS_IS(MAJOR, MINOR, PATCH)

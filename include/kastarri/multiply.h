@@ -2165,8 +2165,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKQNX48(const cstub_Km_ZNB_Orbis_R
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKPNX48(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc);
 
-/// lane i = acc[i] shifted right by shift (no more than 23 for 24-bit lanes, 32 for others; so negative),
-/// rounded half up, clamped to the range of the lane.
+/// lane i = acc[i] shifted right by shift (at most 23 for 24-bit lanes, 32 for others, which also stand for
+/// larger and negative counts), rounded half up, clamped to the range of the lane.
 /// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vecNx16 32 x 16 bits, signed;
 /// qv_vecN_2x32v 16 x 32 bits, signed; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed;
 /// qv_vecN_2x64w 16 x 64 bits, signed.
@@ -2188,8 +2188,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRN_2X64W(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
     unsigned int shift);
 
-/// lane k = acc[2k] shifted right by shift (no more than 23 for 24-bit lanes, 32 for others; so negative),
-/// rounded half up, clamped to the range of the lane.
+/// lane k = acc[2k] shifted right by shift (at most 23 for 24-bit lanes, 32 for others, which also stand for
+/// larger and negative counts), rounded half up, clamped to the range of the lane.
 /// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecN_2x32v 16 x 32 bits,
 /// signed; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed.
 /// Rule: src/multiply/pack.def
@@ -2206,8 +2206,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNX48_0(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
     unsigned int shift);
 
-/// lane k = acc[2k + 1] shifted right by shift (no more than 23 for 24-bit lanes, 32 for others; so
-/// negative), rounded half up, clamped to the range of the lane.
+/// lane k = acc[2k + 1] shifted right by shift (at most 23 for 24-bit lanes, 32 for others, which also stand
+/// for larger and negative counts), rounded half up, clamped to the range of the lane.
 /// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecN_2x32v 16 x 32 bits,
 /// signed; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed.
 /// Rule: src/multiply/pack.def
@@ -2224,8 +2224,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNX48_1(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
     unsigned int shift);
 
-/// lane i = acc[i] shifted right by shift (no more than 23 for 24-bit lanes, 32 for others; so negative),
-/// truncated, clamped to the range of the lane.
+/// lane i = acc[i] shifted right by shift (at most 23 for 24-bit lanes, 32 for others, which also stand for
+/// larger and negative counts), truncated, clamped to the range of the lane.
 /// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits,
 /// signed; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed; qv_vecN_2x64w 16 x 64 bits,
 /// signed.
@@ -2243,8 +2243,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNRN_2X64W(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
     unsigned int shift);
 
-/// lane k = acc[2k] shifted right by shift (no more than 23 for 24-bit lanes, 32 for others; so negative),
-/// truncated, clamped to the range of the lane.
+/// lane k = acc[2k] shifted right by shift (at most 23 for 24-bit lanes, 32 for others, which also stand for
+/// larger and negative counts), truncated, clamped to the range of the lane.
 /// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits, signed; qv_vec2Nx24 64 x 24 bits,
 /// signed; qv_vecNx48 32 x 48 bits, signed.
 /// Rule: src/multiply/pack.def
@@ -2257,8 +2257,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNRNX48_0(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
     unsigned int shift);
 
-/// lane k = acc[2k + 1] shifted right by shift (no more than 23 for 24-bit lanes, 32 for others; so
-/// negative), truncated, clamped to the range of the lane.
+/// lane k = acc[2k + 1] shifted right by shift (at most 23 for 24-bit lanes, 32 for others, which also stand
+/// for larger and negative counts), truncated, clamped to the range of the lane.
 /// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits, signed; qv_vec2Nx24 64 x 24 bits,
 /// signed; qv_vecNx48 32 x 48 bits, signed.
 /// Rule: src/multiply/pack.def
@@ -2271,8 +2271,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNRNX48_1(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
     unsigned int shift);
 
-/// lane i = acc[i] shifted right by shift[i] (no more than 23 for 24-bit lanes, 32 for others; so negative),
-/// rounded half up, clamped to the range of the lane.
+/// lane i = acc[i] shifted right by shift[i] (at most 23 for 24-bit lanes, 32 for others, which also stand
+/// for larger and negative counts), rounded half up, clamped to the range of the lane.
 /// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vecNx16 32 x 16 bits, signed;
 /// qv_vecN_2x32v 16 x 32 bits, signed; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed;
 /// qv_vecN_2x64w 16 x 64 bits, signed.
@@ -2294,8 +2294,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVN_2X64W(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& shift);
 
-/// lane k = acc[2k] shifted right by shift[k] (no more than 23 for 24-bit lanes, 32 for others; so negative),
-/// rounded half up, clamped to the range of the lane.
+/// lane k = acc[2k] shifted right by shift[k] (at most 23 for 24-bit lanes, 32 for others, which also stand
+/// for larger and negative counts), rounded half up, clamped to the range of the lane.
 /// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecN_2x32v 16 x 32 bits,
 /// signed; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed.
 /// Rule: src/multiply/pack.def
@@ -2312,8 +2312,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNX48_0(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& shift);
 
-/// lane k = acc[2k + 1] shifted right by shift[k] (no more than 23 for 24-bit lanes, 32 for others; so
-/// negative), rounded half up, clamped to the range of the lane.
+/// lane k = acc[2k + 1] shifted right by shift[k] (at most 23 for 24-bit lanes, 32 for others, which also
+/// stand for larger and negative counts), rounded half up, clamped to the range of the lane.
 /// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecN_2x32v 16 x 32 bits,
 /// signed; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed.
 /// Rule: src/multiply/pack.def
@@ -2330,8 +2330,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNX48_1(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& shift);
 
-/// lane i = acc[i] shifted right by shift[i] (no more than 23 for 24-bit lanes, 32 for others; so negative),
-/// truncated, clamped to the range of the lane.
+/// lane i = acc[i] shifted right by shift[i] (at most 23 for 24-bit lanes, 32 for others, which also stand
+/// for larger and negative counts), truncated, clamped to the range of the lane.
 /// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits,
 /// signed; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed; qv_vecN_2x64w 16 x 64 bits,
 /// signed.
@@ -2349,8 +2349,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNRN_2X64W(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& shift);
 
-/// lane k = acc[2k] shifted right by shift[k] (no more than 23 for 24-bit lanes, 32 for others; so negative),
-/// truncated, clamped to the range of the lane.
+/// lane k = acc[2k] shifted right by shift[k] (at most 23 for 24-bit lanes, 32 for others, which also stand
+/// for larger and negative counts), truncated, clamped to the range of the lane.
 /// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits, signed; qv_vec2Nx24 64 x 24 bits,
 /// signed; qv_vecNx48 32 x 48 bits, signed.
 /// Rule: src/multiply/pack.def
@@ -2363,8 +2363,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNRNX48_0(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& shift);
 
-/// lane k = acc[2k + 1] shifted right by shift[k] (no more than 23 for 24-bit lanes, 32 for others; so
-/// negative), truncated, clamped to the range of the lane.
+/// lane k = acc[2k + 1] shifted right by shift[k] (at most 23 for 24-bit lanes, 32 for others, which also
+/// stand for larger and negative counts), truncated, clamped to the range of the lane.
 /// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits, signed; qv_vec2Nx24 64 x 24 bits,
 /// signed; qv_vecNx48 32 x 48 bits, signed.
 /// Rule: src/multiply/pack.def

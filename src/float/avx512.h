@@ -1,5 +1,5 @@
-// The AVX-512 unit, whose instructions carry their rounding and raise no flags: the control word is never
-// written, which costs as much as a whole vector does.
+// The AVX-512 unit, whose instructions carry their rounding and raise no flags: the control word, the writing of
+// which costs as much as a whole vector does, is left alone unless the host flushes subnormals.
 //
 // A result is inexact when rounding up and rounding down disagree on it. So every vector is computed both
 // ways, and once more to nearest; toward zero is the lesser of the two. The host's flush-to-zero and
@@ -242,7 +242,7 @@ inline HostResult truncated_by_instruction(typename L::container* results, float
     const __m512 back = whole_word
                             ? _mm512_maskz_cvt_roundepu32_ps(sixteen_lanes(), integers, in_instruction<toward_zero>)
                             : _mm512_maskz_cvt_roundepi32_ps(sixteen_lanes(), integers, in_instruction<toward_zero>);
-    // What does not fit converts to the integer without a single of its own, or to the least.
+    // What does not fit becomes 2^32 - 1 without a sign, which no single is, or the least integer.
     __m512i fitting = integers;
     if constexpr (L::bits == 16)
       fitting = is_signed ? _mm512_maskz_cvtepi16_epi32(sixteen_lanes(),

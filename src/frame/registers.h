@@ -96,7 +96,8 @@ inline Vector<std::uint64_t> next_block(Vector<std::uint64_t> a, Vector<std::uin
   return __builtin_shufflevector(a, b, (I + 2)...);
 }
 
-// The sum of two neighbouring products a lane. Only four products of -2^15 and itself overflow.
+// The sum of two neighbouring products a lane. It passes 2^31 - 1 only if all four factors are -2^15,
+// and then wraps.
 inline Vector<std::int32_t> sums_of_products(Vector<std::int16_t> a, Vector<std::int16_t> b) {
 #if defined __AVX512BW__
   return reinterpret_cast<Vector<std::int32_t>>(

@@ -1,4 +1,4 @@
-// Packs: wide lanes back to narrow ones, the only place where products are rounded and saturated.
+// Packs: wide lanes back to narrow ones, shifted, rounded and saturated.
 #include "frame/lanes.h"
 
 #include "frame/arithmetic.h"

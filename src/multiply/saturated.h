@@ -9,7 +9,7 @@
 #include <cstring>
 
 #include "frame/arithmetic.h"
-#include "frame/layouts.h"
+#include "frame/lanes.h"
 
 namespace {
 
@@ -32,11 +32,11 @@ inline Register pack_words(Register a, Register b) { return _mm512_packs_epi32(a
 inline Register pack_halves(Register a, Register b, std::int8_t) { return _mm512_packs_epi16(a, b); }
 inline Register pack_halves(Register a, Register b, std::uint8_t) { return _mm512_packus_epi16(a, b); }
 inline Register flip_halves(Register a) { return _mm512_xor_si512(a, _mm512_set1_epi16(-0x8000)); }
+// The forms without a mask make the compiler warn of its own header.
 inline Register low_pairs(Register a, Register b) { return _mm512_maskz_unpacklo_epi64(0xFF, a, b); }
 inline Register high_pairs(Register a, Register b) { return _mm512_maskz_unpackhi_epi64(0xFF, a, b); }
 inline Register less_half(Register a) { return _mm512_sub_epi32(a, _mm512_set1_epi32(0x8000)); }
-// (The forms without a mask make this compiler warn of its own header.) Packs work within 128 bits: these put pairs and
-// fours of results back in order.
+// Packs work within 128 bits: these put pairs and fours of results back in order.
 inline Register in_order2(Register a) {
   return _mm512_maskz_permutexvar_epi64(0xFF, _mm512_setr_epi64(0, 2, 4, 6, 1, 3, 5, 7), a);
 }

@@ -33,7 +33,8 @@ struct Number64 {
   }
 };
 
-// Two lanes, shifted by their counts after Added, which is a half or nothing, as words in the lower half.
+// Two lanes over 2 to their counts, plus Rounding::added, which is a half or nothing; the floors of these, clamped, as
+// words in the lower half.
 template <class Number, class Rounding>
 inline __m128i two_scaled(const std::uint64_t* lanes, __m128i counts) {
   const __m128d number = Number::of(_mm_load_si128(reinterpret_cast<const __m128i*>(lanes)), counts);

@@ -82,7 +82,6 @@ struct Sums {
   static constexpr bool is_signed = std::is_signed_v<typename L::container>;
   static constexpr int scale = is_signed ? 8 : 0;
   static constexpr int pairs = Pairs<C, Count>::count;
-  using container = word;
   Vector<std::int16_t> coefficients[2];
 
   explicit Sums(const word* words) {
@@ -119,7 +118,6 @@ struct Sums<L, C, Count, false> {
   static constexpr int scale = 0;
   static constexpr int pairs = Pairs<C, Count>::count;
   static constexpr bool split = C::in_a_word == 2;
-  using container = std::uint64_t;
   Vector<std::int16_t> odd, even;
   Vector<word> odd_bias, even_bias;  // what unsigned lanes, made signed by flipping their top bit, are short of
 
@@ -177,7 +175,7 @@ inline Vector<std::uint64_t> in_lane(Vector<std::uint64_t> sum) {
   return ((sum & (2 * sign - 1)) ^ sign) - sign;
 }
 
-// Writes the sums of an operand's register: to an accumulator's lanes or over them.
+// What a sum is before it is cut to its lane: the sum alone, or added to the accumulator's lane.
 struct Over {
   template <int, class V>
   static V with(V sum, const void*, int) {

@@ -6,6 +6,7 @@
 #include <cstdlib>
 #include <filesystem>
 #include <set>
+#include <stdexcept>
 #include <string>
 
 #include <sys/wait.h>
@@ -16,8 +17,8 @@
 class Directory {
  public:
   Directory() {
-    char name[] = "/tmp/kastarri-examples-XXXXXX";
-    path_ = ::mkdtemp(name);
+    path_ = std::filesystem::temp_directory_path() / "kastarri-examples-XXXXXX";
+    if (!::mkdtemp(path_.data())) throw std::runtime_error("cannot make " + path_);
   }
   Directory(const Directory&) = delete;
   Directory& operator=(const Directory&) = delete;

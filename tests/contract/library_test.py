@@ -172,6 +172,19 @@ class Documents(unittest.TestCase):
             run = subprocess.run([binary], stdout=subprocess.PIPE, stderr=subprocess.STDOUT, text=True, check=False)
             return run.stdout, run.returncode
 
+    def test_figures_of_the_readme_are_those_of_the_tables(self):
+        def section(title):
+            return re.search(rf"^## {title}$(.*?)^## ", read("README.md"), re.M | re.S)[1]
+
+        def read(*path):
+            return open(os.path.join(ROOT, *path), encoding="utf-8").read()
+
+        measured = re.findall(r"^\|.*", section("How fast"), re.M)
+        self.assertGreater(len(measured), 8)
+        self.assertEqual([row for row in measured if row not in read("docs", "performance.md").splitlines()], [])
+        covered = re.findall(r"\| (\d+) \|$", section("What is covered"), re.M)
+        self.assertEqual(covered, re.findall(r"\| \*\*(\d+)\*\* \|$", read("docs", "coverage.md"), re.M))
+
     def test_the_kernel_of_the_readme_prints_what_the_readme_says(self):
         readme = open(os.path.join(ROOT, "README.md"), encoding="utf-8").read()
         program = re.search(r"```cpp\n(.*?)```", readme, re.S)[1]

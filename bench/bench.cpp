@@ -30,24 +30,25 @@ constexpr bool holds_numbers =
 // Numbers from 1 to 2 of either sign in place of random bits: of those, most registers would hold a NaN.
 // Special operands have a NaN, an infinity, a subnormal number and a zero among them.
 template <class L>
-void make_numbers(typename L::container* lanes, int count, Operands kind) {
+void make_numbers(typename L::container* lanes, Operands kind) {
   constexpr word one = L::bits == 16 ? 0x3C00 : 0x3F800000, free = L::bits == 16 ? 0x83FF : 0x807FFFFF;
   constexpr word nan = L::bits == 16 ? 0x7E00 : 0x7FC00000, infinity = L::bits == 16 ? 0x7C00 : 0x7F800000;
-  for (int i = 0; i < count; ++i) lanes[i] = static_cast<typename L::container>((lanes[i] & free) | one);
+  for (int i = 0; i < L::count; ++i) lanes[i] = static_cast<typename L::container>((lanes[i] & free) | one);
   constexpr word specials[] = {nan, infinity, 1, 0};
-  for (int i = 0; kind == Operands::special && i < 4 && i < count; ++i)
+  for (int i = 0; kind == Operands::special && i < 4 && i < L::count; ++i)
     lanes[i] = static_cast<typename L::container>(specials[i]);
 }
 
+std::minstd_rand random_numbers;
+
 void fill_randomly(unsigned char* bytes, std::size_t count) {
-  static std::minstd_rand random(1);
-  for (std::size_t i = 0; i < count; ++i) bytes[i] = static_cast<unsigned char>(random());
+  for (std::size_t i = 0; i < count; ++i) bytes[i] = static_cast<unsigned char>(random_numbers());
 }
 
 void fill_arena(Operands kind) {
   fill_randomly(arena.bytes, sizeof arena);
   for (std::size_t i = 0; i < sizeof arena; i += 64)
-    make_numbers<f16x32>(reinterpret_cast<std::uint16_t*>(arena.bytes + i), 32, kind);
+    make_numbers<f16x32>(reinterpret_cast<std::uint16_t*>(arena.bytes + i), kind);
 }
 
 // An argument of an intrinsic: a register with random lanes, a pointer into the arena, a small count.
@@ -113,7 +114,7 @@ void place_numbers(T& value, Operands kind) {
   using L = typename layout_if_any<T>::type;
   using To = typename layout_if_any<bare<R>>::type;
   if constexpr (holds_numbers<L>) {
-    make_numbers<L>(reinterpret_cast<typename L::container*>(&value), L::count, kind);
+    make_numbers<L>(reinterpret_cast<typename L::container*>(&value), kind);
     if constexpr (std::is_same_v<typename To::number, integer> && std::is_unsigned_v<typename To::container>)
       for (int i = 0; i < L::count; ++i)
         reinterpret_cast<typename L::container*>(&value)[i] &=
@@ -154,6 +155,7 @@ template <class R, class... A>
 template <class R, class... A>
 void time_calls(benchmark::State& state, R (*f)(A...), unsigned rounding, Operands kind) {
   Frame frame;
+  random_numbers.seed(1);  // the same operands whatever has been timed before
   fill_arena(kind);
   cstub_Km_ZNB_Orbis_R5_64k_proc.states.RoundMode = rounding;
   time_with(state, f, kind, frame.make<bare<A>>()...);

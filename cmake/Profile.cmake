@@ -1,6 +1,5 @@
 # kastarri-profile: the counting library, the list of intrinsics beside it, and the program, which finds both by
 # their place relative to its own. The build tree is laid out as the installed one.
-include(GNUInstallDirs)
 find_package(Python3 REQUIRED COMPONENTS Interpreter)
 enable_language(ASM)
 

@@ -80,7 +80,6 @@ class RegisterType:
         kind = {"i": ", signed", "u": ", unsigned", "f": ", floating point", "w": "", "b": ""}[kind]
         return f"{lanes} x {bits} {'bit' if bits == '1' else 'bits'}{kind}"
 
-
     @property
     def lanes(self):
         """How a value is shown: kind and bits of a lane and how many there are. Booleans are bits; a register

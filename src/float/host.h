@@ -34,7 +34,7 @@ inline void pin(Pointer& pointer) {
 }
 
 // From its beginning to leave(): MXCSR with a rounding of ours, every exception masked, subnormals
-// honoured, no flags. It is read, which is cheap, and written only where it differs. Compilers know nothing of MXCSR
+// honoured, no flags. It is written only where it differs. Compilers know nothing of MXCSR
 // and move arithmetic past its writes; they cannot where operands are read through pointers, and results written
 // through them, that pass here as outputs of an assembler statement between the writes: what a load yields is unknown
 // before the one write, and a store must be done before the other, which may read any memory.

@@ -81,6 +81,16 @@ inline Vector<Lane> interleaved(Vector<std::uint8_t> a, Vector<std::uint8_t> b) 
   return interleaved<Half, Lane>(as<Lane>(a), as<Lane>(b), std::make_index_sequence<lanes_in_register<Lane>>());
 }
 
+// The lanes of a register, of which every block holds one of each of its parts, with the parts in order.
+template <class Lane, std::size_t... I>
+inline Vector<Lane> in_order(Vector<Lane> v, std::index_sequence<I...>) {
+  return __builtin_shufflevector(v, v, (I % blocks_in_register * (16 / sizeof(Lane)) + I / blocks_in_register)...);
+}
+template <class Lane>
+inline Vector<Lane> in_order(Vector<std::uint8_t> v) {
+  return in_order<Lane>(as<Lane>(v), std::make_index_sequence<lanes_in_register<Lane>>());
+}
+
 // The words of a register dealt to its blocks in turn: interleaving such registers twice puts lanes in order.
 template <std::size_t... I>
 inline Vector<std::uint32_t> dealt(Vector<std::uint32_t> v, std::index_sequence<I...>) {

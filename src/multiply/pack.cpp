@@ -141,32 +141,32 @@ constexpr auto pack24 = [](auto shift, word x, word s) {
     return Rounding::down(shift, top, s + 8);
 };
 
-// 48-bit lanes likewise, and 64-bit lanes, which have no room to spare.
-template <class Rounding>
-struct Pack48 {
-  using number = Number48;
+// Lanes of 48 bits likewise, and of 64, which have no room to spare.
+template <int Bits, class Rounding>
+struct PackPairs {
+  using number = std::conditional_t<Bits == 48, Number48, Number64>;
   using rounding = Rounding;
+
   template <class Shift>
   auto operator()(Shift shift, std::uint64_t x, word s) const {
+    constexpr int room = 64 - Bits;
     if constexpr (Shift::is_signed)
-      return Rounding::down(shift, static_cast<std::int64_t>(x << 16), s + 16);
+      return down(shift, static_cast<std::int64_t>(x << room), s + room);
     else
-      return static_cast<std::int64_t>(Rounding::down(shift, x << 16 ^ half_range, s + 16) -
-                                       shift.half_range_by(s + 16));
+      return static_cast<std::int64_t>(down(shift, x << room ^ half_range, s + room) - shift.half_range_by(s + room));
+  }
+
+ private:
+  template <class Shift, class T>
+  static constexpr T down(Shift shift, T x, word s) {
+    if constexpr (Bits == 64) return Rounding::down_from_zero(shift, x, s);
+    return Rounding::down(shift, x, s);
   }
 };
 template <class Rounding>
-struct Pack64 {
-  using number = Number64;
-  using rounding = Rounding;
-  template <class Shift>
-  auto operator()(Shift shift, std::uint64_t x, word s) const {
-    if constexpr (Shift::is_signed)
-      return Rounding::down_from_zero(shift, static_cast<std::int64_t>(x), s);
-    else
-      return static_cast<std::int64_t>(Rounding::down_from_zero(shift, x ^ half_range, s) - shift.half_range_by(s));
-  }
-};
+using Pack48 = PackPairs<48, Rounding>;
+template <class Rounding>
+using Pack64 = PackPairs<64, Rounding>;
 
 // A 48-bit lane packed to 16 bits by a count that all lanes share needs no more than 32 bits of it: for a count
 // up to 16 the lane clamped to 32 bits, since whatever lies beyond saturates anyway; above 16 the lane without its

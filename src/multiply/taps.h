@@ -185,9 +185,7 @@ struct Over {
 struct Onto {
   template <int Scale, class V>
   static V with(V sum, const void* acc, int k) {
-    V lanes;
-    std::memcpy(&lanes, static_cast<const unsigned char*>(acc) + k * register_bytes, sizeof lanes);
-    return (lanes << Scale) + sum;
+    return (reinterpret_cast<V>(load_register<std::uint8_t>(acc, k)) << Scale) + sum;
   }
 };
 template <class R, class How, class S, class P, std::size_t... Quarter>

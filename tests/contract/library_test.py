@@ -41,6 +41,11 @@ SYSTEM_HEADERS = """
 """.split()
 
 
+def read(*path):
+    with open(os.path.join(ROOT, *path), encoding="utf-8") as file:
+        return file.read()
+
+
 def output(*command):
     return subprocess.run(command, capture_output=True, text=True, check=True).stdout
 
@@ -55,7 +60,7 @@ def declared():
     """The names that the public headers declare as exported."""
     names = set()
     for path in glob.glob(os.path.join(ROOT, "include", "kastarri", "*.h")):
-        for declaration in re.findall(r"^(?:extern |\[\[noreturn\]\] )*KASTARRI_API ([^;]*);", open(path, encoding="utf-8").read(), re.M):
+        for declaration in re.findall(r"^(?:extern |\[\[noreturn\]\] )*KASTARRI_API ([^;]*);", read(path), re.M):
             names.add(re.findall(r"\bcstub_\w+(?=\(|\[|$)", declaration)[0])
     return names
 
@@ -76,7 +81,7 @@ class Library(unittest.TestCase):
     def test_file_is_a_plain_32_bit_library(self):
         self.assertIn("ELF32", output("readelf", "-h", LIBRARY))
         dynamic = output("readelf", "-d", LIBRARY)
-        major = re.search(r"KASTARRI_VERSION_MAJOR (\d+)", open(os.path.join(ROOT, "include/kastarri/library.h")).read())[1]
+        major = re.search(r"KASTARRI_VERSION_MAJOR (\d+)", read("include", "kastarri", "library.h"))[1]
         self.assertEqual(re.findall(r"SONAME.*\[(.*)\]", dynamic), [f"libkastarri.so.{major}"])
         self.assertLessEqual(set(re.findall(r"NEEDED.*\[(.*)\]", dynamic)), {"libc.so.6"})
         self.assertNotIn("TEXTREL", dynamic)
@@ -100,7 +105,7 @@ class Headers(unittest.TestCase):
         self.assertEqual(result.returncode, 0, " ".join(command) + "\n" + result.stderr[:2000])
 
     def test_headers_are_those_of_the_rows(self):
-        stale = [path for path, text in generate_headers.outputs().items() if open(path, encoding="utf-8").read() != text]
+        stale = [path for path, text in generate_headers.outputs().items() if read(path) != text]
         self.assertEqual(stale, [], "run `make headers`")
 
     def test_each_header_compiles_alone(self):
@@ -176,9 +181,6 @@ class Documents(unittest.TestCase):
         def section(title):
             return re.search(rf"^## {title}$(.*?)^## ", read("README.md"), re.M | re.S)[1]
 
-        def read(*path):
-            return open(os.path.join(ROOT, *path), encoding="utf-8").read()
-
         measured = re.findall(r"^\|.*", section("How fast"), re.M)
         self.assertGreater(len(measured), 8)
         self.assertEqual([row for row in measured if row not in read("docs", "performance.md").splitlines()], [])
@@ -186,13 +188,13 @@ class Documents(unittest.TestCase):
         self.assertEqual(covered, re.findall(r"\| \*\*(\d+)\*\* \|$", read("docs", "coverage.md"), re.M))
 
     def test_the_kernel_of_the_readme_prints_what_the_readme_says(self):
-        readme = open(os.path.join(ROOT, "README.md"), encoding="utf-8").read()
+        readme = read("README.md")
         program = re.search(r"```cpp\n(.*?)```", readme, re.S)[1]
         printed = re.search(r"It prints `(.*?)`", readme)[1]
         self.assertEqual(self.run_program(program), (printed + "\n", 0))
 
     def test_the_programs_of_the_porting_page_print_what_it_says(self):
-        page = open(os.path.join(ROOT, "docs", "porting.md"), encoding="utf-8").read()
+        page = read("docs", "porting.md")
         programs = re.findall(r"```cpp\n(.*?)```\n\n(?:```text\n(.*?)```)?", page, re.S)
         self.assertEqual(len(programs), page.count("```cpp"))
         self.assertGreaterEqual(sum(bool(printed) for _, printed in programs), 5)
@@ -205,10 +207,10 @@ class Documents(unittest.TestCase):
                     subprocess.run(["g++", *USER_FLAGS, "-fsyntax-only", "-x", "c++", "-"], input=program, text=True, check=True)
 
     def test_what_the_guide_quotes_stands_in_the_sources(self):
-        guide = open(os.path.join(ROOT, "docs", "adding-an-intrinsic.md"), encoding="utf-8").read()
+        guide = read("docs", "adding-an-intrinsic.md")
         quotations = 0
         for path, blocks in re.findall(r"^`(\S+)`:\n\n((?:```\w*\n.*?```\n)+)", guide, re.S | re.M):
-            source = open(os.path.join(ROOT, path), encoding="utf-8").read()
+            source = read(path)
             for block in re.findall(r"```\w*\n(.*?)```", blocks, re.S):
                 quotations += 1
                 with self.subTest(path=path):

@@ -53,36 +53,47 @@ struct Sixteen {
   friend Sixteen operator-(Sixteen a) { return {_mm512_xor_ps(a.v, _mm512_set1_ps(-0.0f))}; }
 };
 
-template <bool, bool, Rounding R>
-inline Sixteen<R> fused(Sixteen<R> acc, Sixteen<R> a, Sixteen<R> b) {
-  return {_mm512_fmadd_round_ps(a.v, b.v, acc.v, in_instruction<R>)};
+template <class F, Rounding R>
+inline Sixteen<R> sum(Sixteen<R> a, Sixteen<R> b) {
+  return a + b;
+}
+template <class F, Rounding R>
+inline Sixteen<R> product(Sixteen<R> a, Sixteen<R> b) {
+  return a * b;
 }
 
-// To nearest, rounded to odd first, as odd_sum is: truncated, and the last bit set where that is inexact.
-template <bool, Rounding R>
-inline Sixteen<R> fused_for_half(Sixteen<R> acc, Sixteen<R> a, Sixteen<R> b) {
-  if constexpr (R != to_nearest) return fused<false, false>(acc, a, b);
-  const __m512i zeroward = _mm512_castps_si512(_mm512_fmadd_round_ps(a.v, b.v, acc.v, in_instruction<toward_zero>));
-  const __m512 up = _mm512_fmadd_round_ps(a.v, b.v, acc.v, in_instruction<upward>);
-  const __m512 down = _mm512_fmadd_round_ps(a.v, b.v, acc.v, in_instruction<downward>);
-  const __mmask16 inexact = differing(up, down);
+template <Rounding R>
+inline __m512 fused_as(__m512 acc, __m512 a, __m512 b) {
+  return _mm512_fmadd_round_ps(a, b, acc, in_instruction<R>);
+}
+
+// For halves to nearest, rounded to odd first, as odd() has it: truncated, and the last bit set where that is inexact.
+template <class F, Rounding R>
+inline Sixteen<R> fused(Sixteen<R> acc, Sixteen<R> a, Sixteen<R> b) {
+  if constexpr (std::is_same_v<F, Single> || R != to_nearest) return {fused_as<R>(acc.v, a.v, b.v)};
+  const __m512i zeroward = _mm512_castps_si512(fused_as<toward_zero>(acc.v, a.v, b.v));
+  const __mmask16 inexact = differing(fused_as<upward>(acc.v, a.v, b.v), fused_as<downward>(acc.v, a.v, b.v));
   return {_mm512_castsi512_ps(_mm512_mask_or_epi32(zeroward, inexact, zeroward, _mm512_set1_epi32(1)))};
 }
 
-template <Rounding R>
-inline Sixteen<R> integral(Sixteen<R> x) {
-  return {_mm512_maskz_roundscale_round_ps(sixteen_lanes(), x.v, in_instruction<R>, _MM_FROUND_NO_EXC)};
+inline __m512 integral_away(__m512 x) {
+  const __m512 absolute = _mm512_andnot_ps(_mm512_set1_ps(-0.0f), x);
+  const __m512 cut =
+      _mm512_maskz_roundscale_round_ps(sixteen_lanes(), absolute, in_instruction<toward_zero>, _MM_FROUND_NO_EXC);
+  const __m512 cut_off = _mm512_sub_round_ps(absolute, cut, in_instruction<to_nearest>);
+  // What is cut off is at least 0, or a NaN.
+  const __mmask16 up = _mm512_cmpge_epi32_mask(_mm512_castps_si512(cut_off), _mm512_castps_si512(_mm512_set1_ps(0.5f)));
+  const __m512 rounded = _mm512_mask_add_round_ps(cut, up, cut, _mm512_set1_ps(1), in_instruction<to_nearest>);
+  return _mm512_or_ps(rounded, _mm512_and_ps(_mm512_set1_ps(-0.0f), x));
 }
 
 template <Rounding R>
-inline Sixteen<R> integral_away(Sixteen<R> x) {
-  const Sixteen<R> absolute{_mm512_andnot_ps(_mm512_set1_ps(-0.0f), x.v)};
-  const __m512 cut = integral(Sixteen<toward_zero>{absolute.v}).v;
-  const __m512 cut_off = (absolute - Sixteen<R>{cut}).v;
-  // What is cut off is at least 0, or a NaN.
-  const __mmask16 up = _mm512_cmpge_epi32_mask(_mm512_castps_si512(cut_off), _mm512_castps_si512(_mm512_set1_ps(0.5f)));
-  const __m512 rounded = _mm512_mask_add_round_ps(cut, up, cut, _mm512_set1_ps(1), in_instruction<R>);
-  return {_mm512_or_ps(rounded, _mm512_and_ps(_mm512_set1_ps(-0.0f), x.v))};
+inline Sixteen<R> integral(const TiesAway&, Sixteen<R> x) {
+  return {integral_away(x.v)};
+}
+template <Rounding R>
+inline Sixteen<R> integral(Rounding, Sixteen<R> x) {
+  return {_mm512_maskz_roundscale_round_ps(sixteen_lanes(), x.v, in_instruction<R>, _MM_FROUND_NO_EXC)};
 }
 
 // --- Lanes ------------------------------------------------------------------------------------------
@@ -90,7 +101,6 @@ inline Sixteen<R> integral_away(Sixteen<R> x) {
 // A load of part of what has just been stored whole would wait for the store: so it is whole too.
 template <class L>
 inline __m256i half_register(const typename L::container* lanes, int from) {
-  if constexpr (L::count == 1) return _mm256_set1_epi16(static_cast<short>(*lanes));
   if constexpr (L::count == 16) return _mm256_loadu_si256(reinterpret_cast<const __m256i*>(lanes));
   const __m512i all = _mm512_loadu_si512(lanes);
   return from == 0 ? _mm512_castsi512_si256(all) : _mm512_maskz_extracti64x4_epi64(0xF, all, 1);
@@ -118,8 +128,12 @@ inline Sixteen<R> load_sixteen(const typename L::container* lanes, int from) {
 }
 
 template <Rounding R>
-inline Sixteen<R> single_of(Sixteen<R> converted) {
+inline Sixteen<R> exact_single_of(Sixteen<R> converted) {
   return converted;
+}
+template <Rounding R>
+inline Sixteen<R> scaled_single(Sixteen<R> converted, float unit) {
+  return converted * unit;
 }
 
 // The compiler's own function of this instruction lets it raise flags.
@@ -131,10 +145,10 @@ inline __m256i halves_of(Sixteen<R> x) {
 }
 
 // A register of results of layout L, rounded by R.
-template <class L, Rounding R, class... Ls, class Rule, class... Units>
-inline __m512i rounded(Rule rule, const Units*... operands) {
+template <class L, Rounding R, class... Ls, class Mode, class Rule, class... Units>
+inline __m512i rounded(const Mode& mode, Rule rule, const Units*... operands) {
   const auto sixteen = [&](int from) {
-    return rule(load_sixteen<Ls, R>(reinterpret_cast<const typename Ls::container*>(operands), from)...);
+    return by_rule(rule, mode, load_sixteen<Ls, R>(reinterpret_cast<const typename Ls::container*>(operands), from)...);
   };
   if constexpr (L::bits == 32) {
     return _mm512_castps_si512(sixteen(0).v);
@@ -202,16 +216,20 @@ inline void store_lanes(typename L::container* results, __m512i lanes) {
   }
 }
 
+constexpr Rounding rounding_of(Rounding rounding) { return rounding; }
+constexpr Rounding rounding_of(TiesAway) { return toward_zero; }
+
 // Result lane i = rule(operand lanes i ...), as on_host. Lanes that overflow, or whose inexact result may be
 // tiny, are left.
-template <class L, class... Ls, class Rule, class... Units>
-inline HostResult by_instruction(Rounding rounding, typename L::container* results, Rule rule,
+template <class L, class... Ls, class Mode, class Rule, class... Units>
+inline HostResult by_instruction(const Mode& mode, typename L::container* results, Rule rule,
                                  const Units*... operands) {
   using F = format_of<L>;
   using Tests = LaneTests<L::bits>;
   const HonestSubnormals honest(results, operands...);
-  const __m512i up = rounded<L, upward, Ls...>(rule, operands...);
-  const __m512i down = rounded<L, downward, Ls...>(rule, operands...);
+  const Rounding rounding = rounding_of(mode);
+  const __m512i up = rounded<L, upward, Ls...>(mode, rule, operands...);
+  const __m512i down = rounded<L, downward, Ls...>(mode, rule, operands...);
   const __m512i magnitude_mask = Tests::all(F::sign - 1);
   const __m512i up_magnitude = _mm512_and_si512(up, magnitude_mask);
   const __m512i down_magnitude = _mm512_and_si512(down, magnitude_mask);
@@ -219,7 +237,7 @@ inline HostResult by_instruction(Rounding rounding, typename L::container* resul
   const std::uint32_t differ = Tests::differ(up_magnitude, down_magnitude);
   const std::uint32_t left =
       Tests::above(greater, Tests::all(F::largest)) | (differ & ~Tests::above(greater, Tests::all(F::unit)));
-  const __m512i result = rounding == to_nearest ? rounded<L, to_nearest, Ls...>(rule, operands...)
+  const __m512i result = rounding == to_nearest ? rounded<L, to_nearest, Ls...>(mode, rule, operands...)
                          : rounding == upward   ? up
                          : rounding == downward ? down
                                                 : Tests::chosen(up, Tests::above(up_magnitude, down_magnitude), down);
@@ -229,9 +247,10 @@ inline HostResult by_instruction(Rounding rounding, typename L::container* resul
 
 // Numbers times a power of two, truncated to integers of layout L. Lanes that have no such integer are left.
 template <class L, class From, class Units>
-inline HostResult truncated_by_instruction(typename L::container* results, float power, const Units* operand) {
+inline HostResult truncated_by_instruction(typename L::container* results, word scale, const Units* operand) {
   constexpr bool is_signed = std::is_signed_v<typename L::container>;
   const HonestSubnormals honest(results, operand);
+  const float power = as_float(single_bits_of_power(static_cast<int>(scale)));
   std::uint32_t left = 0, fractions = 0;
   const auto sixteen = [&](int from) {
     const __m512 x =

@@ -59,16 +59,13 @@ inline void convert_register(Out* out, const Units* in, word scale) {
     lanes<To::count>(
         Write<To>(out), [](auto same) { return same; }, Same(lane));
   } else if constexpr (!is_float<To>) {
-    const float power = as_float(single_bits_of_power(static_cast<int>(scale)));
-    const auto fast = [=](Rounding rounding, auto* results) {
-      return truncated_on_unit<To, From>(rounding, results, power, in);
-    };
+    const auto fast = [=](Rounding, auto* results) { return truncated_on_unit<To, From>(results, scale, in); };
     convert_vector<From, To>(out, in, fast, exact);
   } else {
     const float unit = as_float(single_bits_of_power(-static_cast<int>(scale)));
     const auto rule = [=](auto x) {
-      if constexpr (is_float<From>) return x;
-      if constexpr (!is_float<From>) return single_of(x) * unit;
+      if constexpr (is_float<From>) return exact_single_of(x);
+      if constexpr (!is_float<From>) return scaled_single(x, unit);
     };
     const auto fast = [=](Rounding rounding, auto* results) { return on_unit<To, From>(rounding, results, rule, in); };
     convert_vector<From, To>(out, in, fast, exact);

@@ -1,19 +1,17 @@
 // The host's floating-point unit as a fast path for whole vectors.
 //
-// Its single-precision addition, multiplication, fused multiply-add and conversions are those of the
-// core: IEEE 754, one rounding, underflow told by tininess after rounding. They differ in two things
-// alone. NaNs: so a lane whose result is a NaN is left to the reference, and the invalid flag with it,
-// for nothing else raises that. And the control word, which is the host program's: so HostFpu sets it
-// and puts it back.
+// Its control word (MXCSR) is the host program's: rounding, and flags that have to be found as they were left.
+// To write it, or to read flags that have just been raised, costs more than a whole vector does. So the unit
+// computes exactly, in a format with room enough: then no rounding mode counts and no flag is raised. The
+// rounding is done afterwards, on the bits of the result (rounded_off), and what it drops tells whether it is inexact.
 //
-// Half precision is computed in single precision, in which every half is a number, subnormals too:
-//   products   11 x 11 bits are exact in 24, exponents far within range;
-//   sums       rounded to 24 bits, then to 11: rounding twice is rounding once. In the directed modes
-//              that is always so; to nearest since 24 >= 2 * 11 + 2; sums below the least normal half
-//              are exact;
-//   fused      the exact product, then the sum rounded to odd (odd_sum).
-// Inexact, told by either rounding, is then told rightly. The unit's own conversion to half precision
-// tells the rest; without it, lanes that overflow, or underflow inexactly, are left to the reference.
+//   halves    are computed as singles, 24 bits, in which every half is a number and the product of two exact;
+//   singles   as doubles, 53 bits, in which the product of two is exact;
+//   sums      of numbers too far apart for that have the lesser one replaced (apart).
+//
+// Lanes for which this does not hold are left to the reference: operands or results that are infinite or
+// NaNs, results that overflow or come near, tiny ones that need not be exact. They raise the host's flags, so
+// HostFpu puts these back.
 #ifndef KASTARRI_FLOAT_HOST_H
 #define KASTARRI_FLOAT_HOST_H
 
@@ -24,6 +22,7 @@
 
 #include "float/formats.h"
 #include "frame/lanes.h"
+#include "frame/scale.h"
 
 namespace {
 
@@ -33,35 +32,36 @@ inline void pin(Pointer& pointer) {
   asm volatile("" : "+r"(pointer) : : "memory");
 }
 
-// From its beginning to leave(): MXCSR with a rounding of ours, every exception masked, subnormals
-// honoured, no flags. It is written only where it differs. Compilers know nothing of MXCSR
-// and move arithmetic past its writes; they cannot where operands are read through pointers, and results written
-// through them, that pass here as outputs of an assembler statement between the writes: what a load yields is unknown
-// before the one write, and a store must be done before the other, which may read any memory.
+// While it lives, subnormals are honoured, every exception is masked, and sums of 0 are +0. Afterwards MXCSR is as
+// it was before. It is written only where it differs.
+// Compilers know nothing of MXCSR and move arithmetic past its writes; they cannot where operands are read through
+// pointers, and results written through them, that pass here as outputs of an assembler statement between the
+// writes: what a load yields is unknown before the one write, and a store must be done before the other, which may
+// read any memory.
 class HostFpu {
  public:
   template <class... Pointers>
-  explicit HostFpu(Rounding rounding, Pointers&... operands_and_results) {
-    asm volatile("stmxcsr %0" : "=m"(found_));
-    // MXCSR counts the modes nearest, down, up, zero.
-    const word wanted = all_masked | ((4 - static_cast<word>(rounding)) & 3) << 13;
-    if (found_ != wanted) asm volatile("ldmxcsr %0" : : "m"(wanted) : "memory");
+  explicit HostFpu(Pointers&... operands_and_results) : found_(read()) {
+    if (__builtin_expect((found_ & ~flags) != all_masked, 0)) write(all_masked);
     (pin(operands_and_results), ...);
+  }
+  ~HostFpu() {
+    if (__builtin_expect(read() != found_, 0)) write(found_);
   }
   HostFpu(const HostFpu&) = delete;
   HostFpu& operator=(const HostFpu&) = delete;
 
-  // Puts MXCSR back. Of the flags raised since, those that count: inexact, underflow, overflow.
-  word leave() const {
-    word raised;
-    asm volatile("stmxcsr %0" : "=m"(raised) : : "memory");
-    if (raised != found_) asm volatile("ldmxcsr %0" : : "m"(found_) : "memory");
-    return (raised >> 5 & inexact) | (raised >> 3 & underflow) | (raised >> 1 & overflow);
-  }
-
  private:
-  static constexpr word all_masked = 0x1F80;
-  word found_;
+  static constexpr word all_masked = 0x1F80, flags = 0x3F;
+
+  static word read() {
+    word mxcsr;
+    asm volatile("stmxcsr %0" : "=m"(mxcsr) : : "memory");
+    return mxcsr;
+  }
+  static void write(word mxcsr) { asm volatile("ldmxcsr %0" : : "m"(mxcsr) : "memory"); }
+
+  const word found_;
 };
 
 template <class To, class From>
@@ -72,7 +72,9 @@ inline To same_bits_as(From from) {
   return to;
 }
 inline float as_float(word bits) { return same_bits_as<float>(bits); }
+inline double as_float(std::uint64_t bits) { return same_bits_as<double>(bits); }
 inline word bits_of(float x) { return same_bits_as<word>(x); }
+inline std::uint64_t bits_of(double x) { return same_bits_as<std::uint64_t>(x); }
 
 // Rules for whole vectors choose between values by masks made of signs. Of a comparison the compiler
 // makes a branch when that spares it a floating-point operation, and does not vectorise the branch.
@@ -89,19 +91,227 @@ template <class T>
 constexpr T mask_not_zero(T x) {
   return sign_mask(static_cast<T>(0 - x));
 }
+template <class T>
+constexpr T chosen(T mask, T where_set, T elsewhere) {
+  return (mask & where_set) | (~mask & elsewhere);
+}
 
 constexpr word single_sign = Single::sign;
 constexpr word single_magnitude = Single::sign - 1;
-
-// What a loop learns about its lanes: bit 31 is set when one is left to the reference.
-using Left = word;
-constexpr bool some_left(Left left) { return left >> 31 != 0; }
-// All magnitudes are below 2^31, so a difference of two has its sign in bit 31.
-constexpr Left left_above(word magnitude, word bound) { return bound - magnitude; }
+constexpr std::uint64_t double_sign = std::uint64_t{1} << 63;
+constexpr std::uint64_t double_magnitude = double_sign - 1;
+constexpr int double_fraction_bits = 52;
 
 constexpr word single_bits_of_power(int exponent) {
   return static_cast<word>(exponent + Single::bias) << Single::fraction_bits;
 }
+
+// What a loop learns about its lanes: bit 31 of `left` is set when one is left to the reference, a bit of `lost` when
+// a result is inexact.
+using Left = word;
+struct Seen {
+  Left left = 0;
+  word lost = 0;
+  std::uint64_t lost_from_doubles = 0;
+};
+// All magnitudes are below 2^31, so a difference of two has its sign in bit 31.
+constexpr Left left_above(word magnitude, word bound) { return bound - magnitude; }
+
+// --- Rounding -----------------------------------------------------------------------------------------
+
+// What is added to the bits of a number before the lowest are dropped, so that it is rounded: bits of a
+// number, a carry from its fraction included, count as an integer does.
+struct ToNearest {
+  template <int Count, class Bits>
+  static constexpr Bits increment(Bits bits) {
+    return (Bits{1} << (Count - 1)) - 1 + (bits >> Count & 1);
+  }
+  // Bits of a sum, which is +0 when it is 0 but for signs that agree.
+  static constexpr word sum_bits(word bits, word) { return bits; }
+};
+
+struct TiesAway {
+  template <int Count, class Bits>
+  static constexpr Bits increment(Bits) {
+    return Bits{1} << (Count - 1);
+  }
+};
+
+struct Directed {
+  explicit Directed(Rounding rounding)
+      : away(rounding == toward_zero ? 0 : ~std::uint64_t{0}),
+        up(rounding == upward ? ~std::uint64_t{0} : 0),
+        sign_of_zero(rounding == downward ? single_sign : 0) {}
+  template <int Count, class Bits>
+  constexpr Bits increment(Bits bits) const {
+    return (sign_mask(bits) ^ static_cast<Bits>(up)) & static_cast<Bits>(away) & ((Bits{1} << Count) - 1);
+  }
+  word sum_bits(word bits, word either_sign) const {
+    return bits | (either_sign & sign_of_zero & ~mask_not_zero(bits & single_magnitude));
+  }
+
+  std::uint64_t away, up;
+  word sign_of_zero;
+};
+
+template <class Bits>
+struct Dropped {
+  Bits kept, dropped;
+};
+template <int Count, class Bits, class Mode>
+inline Dropped<Bits> rounded_off(Bits bits, const Mode& mode) {
+  constexpr Bits low = (Bits{1} << Count) - 1;
+  return {(bits + mode.template increment<Count>(bits)) & ~low, bits & low};
+}
+
+// --- Exact arithmetic: format of the operands -----------------------------------------------------------
+
+// The exact result, or another number that rounds as it does.
+template <class Wide>
+struct Exact {
+  Wide value;
+  word may_be_tiny;  // all ones where a result below the normal numbers is not left, if it is exact
+  word either_sign;  // of a sum: the signs of both, where the bits of value do not tell it when it is 0
+};
+constexpr word always = ~word{0};
+
+// The bits of x, but where |x| < 2^-Gap |y| and not 0 a number of that magnitude. Beside y it counts no more than any
+// other: sums with y round alike as long as they keep less than Gap bits.
+template <class F, int Gap>
+inline typename F::lane apart(typename F::lane x, typename F::lane y) {
+  using Signed = std::make_signed_t<typename F::lane>;
+  const auto magnitude = static_cast<Signed>(x & (F::sign - 1));
+  const auto least = static_cast<Signed>((y & F::infinity) - (word{Gap} << F::fraction_bits));
+  const Signed lifted = magnitude < least ? least : magnitude;
+  return static_cast<typename F::lane>((x & F::sign) | static_cast<word>(magnitude == 0 ? Signed{0} : lifted));
+}
+template <int Gap>
+inline float apart(float x, float y) {
+  return as_float(apart<Single, Gap>(bits_of(x), bits_of(y)));
+}
+
+// Halves whose sum has room in a single. (That of a power of two and the lesser one, where they differ in sign, may
+// become a tie, between that power and the number below it; it goes to the power, which is right.)
+template <class L>
+struct ApartHalves {
+  ApartHalves(const void* a_lanes, const void* b_lanes) {
+    const Read<L> x(a_lanes), y(b_lanes);
+    KASTARRI_LANES_INDEPENDENT
+    for (int i = 0; i < L::count; ++i) {
+      a[i] = apart<Half, 12>(x[i], y[i]);
+      b[i] = apart<Half, 12>(y[i], x[i]);
+    }
+  }
+  alignas(64) std::uint16_t a[L::count], b[L::count];
+};
+
+template <class F>
+inline auto sum(float a, float b) {
+  const word either_sign = (bits_of(a) | bits_of(b)) & single_sign;
+  if constexpr (std::is_same_v<F, Half>) {
+    return Exact<float>{a + b, 0, either_sign};  // of ApartHalves
+  } else {
+    return Exact<double>{double{apart<28>(a, b)} + double{apart<28>(b, a)}, always, either_sign};
+  }
+}
+
+inline word mask_zero(float x) { return ~mask_not_zero(bits_of(x) & single_magnitude); }
+
+template <class F>
+inline auto product(float a, float b) {
+  if constexpr (std::is_same_v<F, Half>) {
+    return Exact<float>{a * b, 0, 0};
+  } else {
+    return Exact<double>{double{a} * double{b}, mask_zero(a) | mask_zero(b), 0};
+  }
+}
+
+// c + p for the product p of two singles, 48 bits. Where c is the greater by 3 powers of two or more, of p counts
+// what a single holds and whether there is more, which the last bit says; where it is the greater by more than 28, not
+// even that. Where p is the greater by as much the sum has no room, and is left.
+inline double sum_with_product(double c, double p) {
+  constexpr std::uint64_t power = std::uint64_t{1} << double_fraction_bits, last = std::uint64_t{1} << 29;
+  const std::uint64_t c_magnitude = bits_of(c) & double_magnitude, p_magnitude = bits_of(p) & double_magnitude;
+  const std::uint64_t odd = (p_magnitude & ~(last - 1)) | (mask_not_zero(p_magnitude & (last - 1)) & last);
+  const std::uint64_t least = (c_magnitude & ~(power - 1)) - 28 * power;
+  const std::uint64_t lifted = chosen(sign_mask(odd - least) & ~sign_mask(least), least, odd);
+  const std::uint64_t above = sign_mask(p_magnitude + 3 * power - c_magnitude);
+  const std::uint64_t kept = chosen(above, lifted & mask_not_zero(p_magnitude), p_magnitude);
+  const double total = c + as_float(kept | (bits_of(p) & double_sign));
+  const std::uint64_t no_room = sign_mask(c_magnitude + 28 * power - p_magnitude) & mask_not_zero(c_magnitude);
+  return as_float(bits_of(total) | (no_room & (double_magnitude & ~(power / 2 - 1))));
+}
+
+template <class F>
+inline auto fused(float acc, float a, float b) {
+  const word either_sign = ((bits_of(a) ^ bits_of(b)) | bits_of(acc)) & single_sign;
+  if constexpr (std::is_same_v<F, Half>) {
+    const float p = a * b;
+    return Exact<double>{double{apart<30>(p, acc)} + double{apart<30>(acc, p)}, 0, either_sign};
+  } else {
+    const word zeros = (mask_zero(a) | mask_zero(b)) & mask_zero(acc);
+    return Exact<double>{sum_with_product(acc, double{a} * double{b}), zeros, either_sign};
+  }
+}
+
+// --- Integers -----------------------------------------------------------------------------------------
+
+// An integer divided by a power of two.
+template <class T>
+inline auto scaled_single(T integer, float unit) {
+  using Wide = std::conditional_t<sizeof(T) == 4, double, float>;
+  return Exact<Wide>{static_cast<Wide>(integer) * Wide{unit}, always, 0};
+}
+
+// A number as it is.
+inline Exact<float> exact_single_of(float x) { return {x, always, 0}; }
+
+// The exponent of a number is `Single::bias` less than this.
+constexpr word biased_exponent(word magnitude) { return magnitude >> Single::fraction_bits; }
+// With the hidden bit; 0 for zero. Of subnormals too, which are too small to tell from other small numbers here.
+constexpr word significand(word magnitude) {
+  return (magnitude & (Single::unit - 1)) | (mask_not_zero(magnitude) & Single::unit);
+}
+constexpr word at_most(word x, word bound) { return chosen(mask_below(x, bound), x, bound); }
+
+// x * 2^scale truncated to an integer of To. Out of range, or a NaN, it is left.
+template <class To>
+inline word truncated(float x, word scale, Seen& seen) {
+  constexpr bool is_signed = std::is_signed_v<typename To::container>;
+  constexpr bool fills_word = !is_signed && To::bits == 32;
+  const word magnitude = bits_of(x) & single_magnitude, negative = sign_mask(bits_of(x));
+  // |x| * 2^scale is the significand, its first bit the word's, times 2^-right.
+  const word right = Single::bias + 31 - biased_exponent(magnitude) - scale, bits = significand(magnitude) << 8;
+  const word least = is_signed ? 33 - To::bits : chosen<word>(negative, 32, 32 - To::bits);
+  seen.left |= mask_below(right, least);
+  const word count = at_most(right, 32);
+  const Scaled32 parts(bits, 32 - count);  // but for a count of 0, which it takes for 32
+  const word shifted = fills_word ? mask_not_zero(count) : always;
+  seen.lost |= shifted & parts.low;
+  const word integer = chosen(shifted, parts.high, bits);
+  return (integer ^ negative) - negative;
+}
+
+struct WholeNumber {
+  float value;
+  word dropped;
+};
+
+// x rounded to an integer; from 2^23 on it is one.
+template <class Mode>
+inline WholeNumber integral(const Mode& mode, float x) {
+  const word magnitude = bits_of(x) & single_magnitude, sign = bits_of(x) & single_sign;
+  const word small = mask_below(magnitude, single_bits_of_power(Single::fraction_bits));
+  const word right = at_most(Single::bias + Single::fraction_bits - biased_exponent(magnitude), 32);
+  const Scaled32 parts(significand(magnitude) & small, 32 - right);
+  const auto rounded =
+      rounded_off<32>(std::uint64_t{sign} << 32 | std::uint64_t{parts.high} << 32 | parts.low, mode);
+  const auto integer = static_cast<word>(rounded.kept >> 32) & single_magnitude;
+  const float number = static_cast<float>(static_cast<std::int32_t>(integer));
+  return {as_float(sign | chosen(small, bits_of(number), magnitude)), static_cast<word>(rounded.dropped)};
+}
+
+// --- Lanes ------------------------------------------------------------------------------------------
 
 // A half as a single. As the low bits of one it is 2^-112 times itself; only the exponent of infinity
 // and NaN has to be told.
@@ -110,113 +320,6 @@ inline float widen(word half) {
   const word special = mask_below(word{Half::largest} << 13, spread & 0x0FFFE000) & Single::infinity;
   return as_float((spread & 0x8FFFE000) | special) * 0x1p112f;
 }
-
-// A single rounded to half precision. Adding 2^13 times the power of two of its exponent, or of the
-// least normal half's if that is more, leaves just the bits that the half has room for, rounded and
-// flagged by the unit itself. A lane that is left comes out as a NaN.
-inline word narrow(float x, Left& left) {
-  const word sign = bits_of(x) & single_sign;
-  const word absolute = bits_of(x) & single_magnitude;
-  const word least_normal = single_bits_of_power(Half::least_exponent);
-  const word power = absolute & Single::infinity;
-  const word small = mask_below(power, least_normal);
-  const float pull = as_float(((power & ~small) | (least_normal & small)) + (word{13} << 23) + sign);
-  const float kept = (x + pull) - pull;
-  const word rounded = bits_of(kept) & single_magnitude;
-  const word largest = single_bits_of_power(Half::greatest_exponent + 1) - (word{1} << 13);
-  const word tiny_inexact = (0 - (rounded ^ absolute)) & (absolute - least_normal);  // in bit 31
-  const Left leave = left_above(rounded, largest) | tiny_inexact;
-  left |= leave;
-  const word half = bits_of(as_float(rounded) * 0x1p-112f) >> 13 | sign >> 16;
-  return half | (sign_mask(leave) & (Half::sign - 1));
-}
-
-// p + c for a p that is the exact product of two numbers of the narrower format F, such that rounding
-// the sum again to F is rounding once. Nothing over- or underflows, the range being twice that of F.
-//
-// To nearest, the sum is rounded to odd: of the two neighbours of an inexact sum the one with the last
-// bit 1, which the second rounding takes for neither a tie nor a number of F. That needs two bits more
-// than F has. The error of the sum is exact (Knuth).
-//
-// In a directed mode any rounding in between does. But the sum may come out as a subnormal number of F,
-// and then the second rounding does not know that it is inexact; so all such are left, as a NaN.
-template <class F, bool Nearest, bool Alone = false, class Wide>
-inline Wide odd_sum(Wide p, Wide c) {
-  using Bits = std::conditional_t<sizeof(Wide) == 4, std::uint32_t, std::uint64_t>;
-  constexpr bool is_double = sizeof(Wide) == 8;
-  constexpr int fraction_bits = is_double ? 52 : Single::fraction_bits;
-  constexpr Bits sign = Bits{1} << (8 * sizeof(Bits) - 1);
-  constexpr Bits infinity = sign - (Bits{1} << fraction_bits);
-  const Wide s = p + c;
-  const auto bits = same_bits_as<Bits>(s);
-  if constexpr (Nearest) {
-    const Wide back = s - p;
-    const Wide rounded_off = (p - (s - back)) + (c - back);
-    if (Alone && rounded_off == 0) return s;  // one lane may branch: most sums are exact
-    const auto error = same_bits_as<Bits>(rounded_off);
-    const Bits even = (bits & 1) - 1;
-    const Bits adjust = mask_not_zero(error & ~sign) & even & mask_below(bits & ~sign, infinity);
-    const Bits step = sign_mask(bits ^ error) | 1;
-    return same_bits_as<Wide>(bits + (adjust & step));
-  } else {
-    constexpr int bias = is_double ? 1023 : Single::bias;
-    constexpr Bits least_normal = Bits{F::least_exponent + bias} << fraction_bits;
-    const Bits subnormal = mask_not_zero(bits & ~sign) & mask_below(bits & ~sign, least_normal);
-    return same_bits_as<Wide>(bits | (subnormal & ~sign));
-  }
-}
-
-// acc + a * b in single precision, such that rounding it to half precision is rounding once.
-template <bool Nearest>
-inline float fused_for_half(float acc, float a, float b) {
-  return odd_sum<Half, Nearest>(a * b, acc);
-}
-
-// acc + a * b in single precision, rounded once.
-template <bool Nearest, bool Alone>
-inline float fused(float acc, float a, float b) {
-#if defined __FMA__
-  return __builtin_fmaf(a, b, acc);
-#else
-  return static_cast<float>(odd_sum<Single, Nearest, Alone>(double{a} * double{b}, double{acc}));
-#endif
-}
-
-// --- Integers -----------------------------------------------------------------------------------------
-
-// An integer as a single, rounded once. One of 32 bits without a sign is put together from exact halves.
-template <class T>
-inline float single_of(T integer) {
-  if constexpr (std::is_same_v<T, std::uint32_t>) {
-    const auto high = static_cast<float>(static_cast<std::int32_t>(integer >> 16));
-    return high * 0x1p16f + static_cast<float>(static_cast<std::int32_t>(integer & 0xFFFF));
-  } else {
-    return static_cast<float>(integer);
-  }
-}
-
-// x truncated to an integer of To. Out of range, or a NaN, it is left.
-template <class To>
-inline word truncated(float x, Left& left) {
-  constexpr bool is_signed = std::is_signed_v<typename To::container>;
-  const word absolute = bits_of(x) & single_magnitude;
-  const word negative = sign_mask(bits_of(x));
-  const word bound = is_signed ? single_bits_of_power(To::bits - 1)
-                               : (negative & Single::one) | (~negative & single_bits_of_power(To::bits));
-  const word within = mask_below(absolute, bound);
-  left |= ~within;
-  const float kept = as_float(bits_of(x) & within);
-  if constexpr (is_signed || To::bits < 32) {
-    return static_cast<word>(static_cast<std::int32_t>(kept));
-  } else {
-    // The unit converts to signed integers only: bit 31 goes over by itself.
-    const word high = within & ~mask_below(absolute, single_bits_of_power(31));
-    const float low = kept - as_float(high & single_bits_of_power(31));
-    return static_cast<word>(static_cast<std::int32_t>(low)) | (high & single_sign);
-  }
-}
-
-// --- Lanes ------------------------------------------------------------------------------------------
 
 // The lanes of an operand as the unit takes them: singles and integers where they lie, halves widened.
 template <class L, class = typename L::number>
@@ -240,10 +343,6 @@ class HostOperand<L, half_float> {
  public:
   explicit HostOperand(const void* lanes) {
     const in_memory<std::uint16_t>* halves = static_cast<const in_memory<std::uint16_t>*>(lanes);
-    if constexpr (L::count == 1) {
-      number_[0] = widen(halves[0]);
-      return;
-    }
 #if defined __F16C__
     // A load of part of what has just been stored whole would wait for the store: so it is whole too.
     for (int i = 0; i < L::count; i += 16) {
@@ -262,38 +361,86 @@ class HostOperand<L, half_float> {
   alignas(64) float number_[L::count];
 };
 
-// Singles as the lanes of a result. A lane that is left is a NaN.
+// A lane that is left: a NaN, or what is narrowed to one.
+#ifdef __F16C__
+template <class F>
+constexpr word mark_of_left = ~word{0};
+#else
+template <class F>
+constexpr word mark_of_left = F::bits == 32 ? ~word{0} : (single_bits_of_power(Half::bias + 2) - 1) & ~word{0x1FFF};
+#endif
+// The largest half.
+constexpr word widened_largest = (single_bits_of_power(Half::bias + 1) - 1) & ~word{0x1FFF};
+
+#ifndef __F16C__
+// Without the processor's own conversion. Adding 0.5, whose last bit is that of subnormal halves, puts those in place.
+inline word narrow(word single) {
+  const word magnitude = single & single_magnitude;
+  const word small = mask_below(magnitude, single_bits_of_power(Half::least_exponent));
+  const word normal = (magnitude >> 13) - (word{Single::bias - Half::bias} << Half::fraction_bits);
+  const word subnormal = bits_of(as_float(magnitude & small) + 0.5f) - bits_of(0.5f);
+  return chosen(small, subnormal, normal) | (single >> 16 & Half::sign);
+}
+#endif
+
 template <int Count>
-inline Left narrow(const float* numbers, std::uint16_t* halves) {
-  if constexpr (Count == 1) {
-    Left left = 0;
-    halves[0] = static_cast<std::uint16_t>(narrow(numbers[0], left));
-    return left;
-  }
-#if defined __F16C__
-  // Stored in pieces as wide as those that are loaded next. NaNs are told by their bits: a comparison of numbers may be
-  // moved behind the end of what HostFpu guards.
-  const __m256i infinity = _mm256_set1_epi32(Single::infinity), magnitude = _mm256_set1_epi32(single_magnitude);
-  __m256i nans = _mm256_setzero_si256();
-  const auto eight = [&](int i) {
-    const __m256 x = _mm256_load_ps(numbers + i);
-    const __m256i bits = _mm256_castps_si256(x);
-    nans = _mm256_or_si256(nans, _mm256_sub_epi32(infinity, _mm256_and_si256(bits, magnitude)));
-    return _mm256_cvtps_ph(x, _MM_FROUND_CUR_DIRECTION);
+inline void narrow_all(const word* singles, std::uint16_t* halves) {
+#ifdef __F16C__
+  const auto eight = [singles](int i) {
+    return _mm256_cvtps_ph(_mm256_castsi256_ps(_mm256_load_si256(reinterpret_cast<const __m256i*>(singles + i))), 0);
   };
   for (int i = 0; i < Count; i += 16)
     _mm256_storeu_si256(reinterpret_cast<__m256i*>(halves + i), _mm256_set_m128i(eight(i + 8), eight(i)));
-  return mask_not_zero(static_cast<word>(_mm256_movemask_ps(_mm256_castsi256_ps(nans))));
 #else
   // Words first: the compiler would pack each term of the last sum by itself.
   alignas(64) word words[Count];
-  Left left = 0;
   KASTARRI_LANES_INDEPENDENT
-  for (int i = 0; i < Count; ++i) words[i] = narrow(numbers[i], left);
+  for (int i = 0; i < Count; ++i) words[i] = narrow(singles[i]);
   KASTARRI_LANES_INDEPENDENT
   for (int i = 0; i < Count; ++i) halves[i] = static_cast<std::uint16_t>(words[i]);
-  return left;
 #endif
+}
+
+// --- Results ------------------------------------------------------------------------------------------
+
+// An exact result rounded to format F, as the bits of a single, all ones in a lane that is left.
+template <class F, class Wide, class Mode>
+inline word settled(const Exact<Wide>& x, const Mode& mode, Seen& seen) {
+  constexpr int wide_bits = sizeof(Wide) == 8 ? double_fraction_bits : Single::fraction_bits;
+  constexpr int excess = wide_bits - F::fraction_bits;
+  word bits, dropped = 0;
+  if constexpr (excess == 0) {
+    bits = bits_of(x.value);
+  } else {
+    const auto rounded = rounded_off<excess>(bits_of(x.value), mode);
+    bits = mode.sum_bits(bits_of(static_cast<float>(as_float(rounded.kept))), x.either_sign);
+    if constexpr (sizeof(Wide) == 8) seen.lost_from_doubles |= rounded.dropped;
+    if constexpr (sizeof(Wide) == 4) seen.lost |= rounded.dropped;
+    dropped = static_cast<word>(mask_not_zero(rounded.dropped));
+  }
+  const word magnitude = bits & single_magnitude;
+  Left left;
+  if constexpr (F::bits == 32) {
+    const word tiny = mask_below(magnitude, Single::unit + 1) & ~x.may_be_tiny;
+    left = tiny | left_above(magnitude, single_bits_of_power(Single::greatest_exponent));
+  } else {
+    const word small = mask_below(magnitude, single_bits_of_power(Half::least_exponent)), tiny = magnitude & small;
+    const word uneven = bits_of((as_float(tiny) + 0.5f) - 0.5f) ^ tiny;  // no multiple of the least half
+    left = left_above(magnitude, widened_largest) | (0 - (uneven & x.may_be_tiny)) | (small & dropped & x.may_be_tiny) |
+           ((0 - tiny) & ~x.may_be_tiny);
+  }
+  seen.left |= left;
+  return chosen(sign_mask(left), mark_of_left<F>, bits);
+}
+// A half that is rounded to an integer is a half.
+template <class F, class Mode>
+inline word settled(const WholeNumber& x, const Mode&, Seen& seen) {
+  constexpr bool is_half = std::is_same_v<F, Half>;
+  const word bits = bits_of(x.value);
+  const word left = sign_mask(left_above(bits & single_magnitude, is_half ? widened_largest : Single::largest));
+  seen.left |= left;
+  seen.lost |= x.dropped;
+  return chosen(left, mark_of_left<F>, bits);
 }
 
 struct HostResult {
@@ -301,31 +448,56 @@ struct HostResult {
   bool some_left;
 };
 
-// Result lane i = rule(operand lanes i ...) on the unit, a float; for a result of integers,
-// rule(left, operand lanes i ...). The results are apart from the operands.
-template <class R, class... Ls, class Rule, class... Units>
-inline HostResult on_host(Rounding rounding, typename R::container* results, Rule rule, const Units*... operands) {
-  HostFpu fpu(rounding, results, operands...);
-  Left left = 0;
-  const auto every_lane = [=, &left](const auto&... x) {
-    if constexpr (std::is_same_v<typename R::number, half_float>) {
-      alignas(64) float numbers[R::count];
+// A rule on lanes, or one that asks for the mode too.
+template <class Rule, class Mode, class... X>
+inline auto by_rule(Rule rule, [[maybe_unused]] const Mode& mode, X... x) {
+  if constexpr (std::is_invocable_v<Rule, Mode, X...>) {
+    return rule(mode, x...);
+  } else {
+    return rule(x...);
+  }
+}
+
+// Result lane i = rule(operand lanes i ...) on the unit, Exact or WholeNumber; for a result of integers
+// rule(seen, operand lanes i ...). The results are apart from the operands. Flattened: a call within a
+// loop over lanes would keep it from being vectorised.
+template <class R, class... Ls, class Mode, class Rule, class... Units>
+[[gnu::flatten]] inline HostResult on_host_in(const Mode& mode, typename R::container* results, Rule rule, const Units*... operands) {
+  Seen seen;
+  const auto every_lane = [&](const auto&... x) {
+    if constexpr (std::is_same_v<typename R::number, integer>) {
       KASTARRI_LANES_INDEPENDENT
-      for (int i = 0; i < R::count; ++i) numbers[i] = rule(x[i]...);
-      left = narrow<R::count>(numbers, results);
-    } else if constexpr (std::is_same_v<typename R::number, single_float>) {
-      KASTARRI_LANES_INDEPENDENT
-      for (int i = 0; i < R::count; ++i) {
-        results[i] = bits_of(rule(x[i]...));
-        left |= left_above(results[i] & single_magnitude, Single::infinity);
-      }
+      for (int i = 0; i < R::count; ++i) results[i] = static_cast<typename R::container>(rule(seen, x[i]...));
     } else {
-      KASTARRI_LANES_INDEPENDENT
-      for (int i = 0; i < R::count; ++i) results[i] = static_cast<typename R::container>(rule(left, x[i]...));
+      const auto singles = [&](word* to) {
+        KASTARRI_LANES_INDEPENDENT
+        for (int i = 0; i < R::count; ++i)
+          to[i] = settled<format_of<R>>(by_rule(rule, mode, x[i]...), mode, seen);
+      };
+      if constexpr (R::bits == 32) {
+        singles(results);
+      } else {
+        alignas(64) word halves[R::count];
+        singles(halves);
+        narrow_all<R::count>(halves, results);
+      }
     }
   };
-  every_lane(HostOperand<Ls>(operands)...);
-  return {fpu.leave(), some_left(left)};
+  {
+    const HostFpu fpu(results, operands...);
+    every_lane(HostOperand<Ls>(operands)...);
+  }
+  return {(seen.lost | seen.lost_from_doubles) != 0 ? word{inexact} : 0, sign_mask(seen.left) != 0};
+}
+
+template <class R, class... Ls, class Rule, class... Units>
+inline HostResult on_host(TiesAway mode, typename R::container* results, Rule rule, const Units*... operands) {
+  return on_host_in<R, Ls...>(mode, results, rule, operands...);
+}
+template <class R, class... Ls, class Rule, class... Units>
+inline HostResult on_host(Rounding rounding, typename R::container* results, Rule rule, const Units*... operands) {
+  if (rounding == to_nearest) return on_host_in<R, Ls...>(ToNearest(), results, rule, operands...);
+  return on_host_in<R, Ls...>(Directed(rounding), results, rule, operands...);
 }
 
 }  // namespace

@@ -21,29 +21,26 @@ inline bool fast_on_unit(Environment& env, typename L::container* results, Rule 
   return host.some_left;
 }
 
-struct ADD {
+// a + b, or a - b.
+template <bool Subtract>
+struct Sum {
   template <class F>
   static word exact(Environment& env, word a, word b) {
-    return add<F>(env, a, b);
+    return add<F>(env, a, Subtract ? negated<F>(b) : b);
   }
-  template <class L, class... Units>
-  static bool fast(Environment& env, typename L::container* r, const Units*... ab) {
-    return fast_on_unit<L>(
-        env, r, [](auto a, auto b) { return a + b; }, ab...);
-  }
-};
-
-struct SUB {
-  template <class F>
-  static word exact(Environment& env, word a, word b) {
-    return add<F>(env, a, negated<F>(b));
-  }
-  template <class L, class... Units>
-  static bool fast(Environment& env, typename L::container* r, const Units*... ab) {
-    return fast_on_unit<L>(
-        env, r, [](auto a, auto b) { return a - b; }, ab...);
+  template <class L, class Units>
+  static bool fast(Environment& env, typename L::container* r, const Units* a, const Units* b) {
+    const auto rule = [](auto x, auto y) { return sum<format_of<L>>(x, Subtract ? -y : y); };
+    if constexpr (L::bits == 16 && !rounds_by_instruction) {
+      const ApartHalves<L> operands(a, b);
+      return fast_on_unit<L>(env, r, rule, operands.a, operands.b);
+    } else {
+      return fast_on_unit<L>(env, r, rule, a, b);
+    }
   }
 };
+using ADD = Sum<false>;
+using SUB = Sum<true>;
 
 struct MUL {
   template <class F>
@@ -53,7 +50,7 @@ struct MUL {
   template <class L, class... Units>
   static bool fast(Environment& env, typename L::container* r, const Units*... ab) {
     return fast_on_unit<L>(
-        env, r, [](auto a, auto b) { return a * b; }, ab...);
+        env, r, [](auto a, auto b) { return product<format_of<L>>(a, b); }, ab...);
   }
 };
 
@@ -66,20 +63,9 @@ struct Fused {
   }
   template <class L, class... Units>
   static bool fast(Environment& env, typename L::container* r, const Units*... operands) {
-    if (rounds_by_instruction || env.rounding == to_nearest) return fast_on_unit<L>(env, r, rule<L, true>, operands...);
-    return fast_on_unit<L>(env, r, rule<L, false>, operands...);
+    return fast_on_unit<L>(
+        env, r, [](auto acc, auto a, auto b) { return fused<format_of<L>>(acc, Subtract ? -a : a, b); }, operands...);
   }
-
- private:
-  template <class L, bool Nearest>
-  static constexpr auto rule = [](auto acc, auto a, auto b) {
-    const auto factor = Subtract ? -a : a;
-    if constexpr (L::bits == 16) {
-      return fused_for_half<Nearest>(acc, factor, b);
-    } else {
-      return fused<Nearest, L::count == 1>(acc, factor, b);
-    }
-  };
 };
 using MULA = Fused<false>;
 using MULS = Fused<true>;
@@ -169,26 +155,6 @@ struct CLSFY {
 
 enum class Direction { away, up, down, zero, by_mode };
 
-// Adding and taking away 2^23 with the number's sign rounds a single to an integer; from there on it is
-// one, and stays out of the sum lest that tell it inexact.
-inline float integral(float x) {
-  const word sign = bits_of(x) & single_sign;
-  const word absolute = bits_of(x) & single_magnitude;
-  const word small = mask_below(absolute, single_bits_of_power(23));
-  const float pull = as_float(single_bits_of_power(23) | sign);
-  const float rounded = (as_float((small & absolute) | sign) + pull) - pull;
-  return as_float((small & bits_of(rounded) & single_magnitude) | (~small & absolute) | sign);
-}
-
-// Ties away from zero, the unit truncating: one more where at least half has been cut off.
-inline float integral_away(float x) {
-  const word sign = bits_of(x) & single_sign;
-  const float absolute = as_float(bits_of(x) & single_magnitude);
-  const float cut = integral(absolute);
-  const float rounded = cut + as_float(~mask_below(bits_of(absolute - cut), bits_of(0.5f)) & Single::one);
-  return as_float(bits_of(rounded) | sign);
-}
-
 template <Direction D>
 struct Integral {
   static Rounding rounding(const Environment& env) {
@@ -204,8 +170,8 @@ struct Integral {
   }
   template <class L, class Units>
   static bool fast(Environment& env, typename L::container* r, const Units* a) {
-    constexpr auto rule = [](auto x) { return D == Direction::away ? integral_away(x) : integral(x); };
-    const HostResult host = on_unit<L, L>(D == Direction::away ? toward_zero : rounding(env), r, rule, a);
+    const auto rule = [](const auto& mode, auto x) { return integral(mode, x); };
+    const HostResult host = D == Direction::away ? on_unit<L, L>(TiesAway(), r, rule, a) : on_unit<L, L>(rounding(env), r, rule, a);
     // Halves are integers before they are narrowed: what is inexact is the rounding to an integer.
     if (D == Direction::by_mode) env.raise(host.flags);
     return host.some_left;

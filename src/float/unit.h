@@ -10,26 +10,25 @@ namespace {
 #ifdef __AVX512F__
 constexpr bool rounds_by_instruction = true;
 
-template <class R, class... Ls, class Rule, class... Units>
-inline HostResult on_unit(Rounding rounding, typename R::container* results, Rule rule, const Units*... operands) {
-  return by_instruction<R, Ls...>(rounding, results, rule, operands...);
+template <class R, class... Ls, class Mode, class Rule, class... Units>
+inline HostResult on_unit(const Mode& mode, typename R::container* results, Rule rule, const Units*... operands) {
+  return by_instruction<R, Ls...>(mode, results, rule, operands...);
 }
 template <class R, class From, class Units>
-inline HostResult truncated_on_unit(Rounding, typename R::container* results, float power, const Units* operand) {
-  return truncated_by_instruction<R, From>(results, power, operand);
+inline HostResult truncated_on_unit(typename R::container* results, word scale, const Units* operand) {
+  return truncated_by_instruction<R, From>(results, scale, operand);
 }
 #else
 constexpr bool rounds_by_instruction = false;
 
-template <class R, class... Ls, class Rule, class... Units>
-inline HostResult on_unit(Rounding rounding, typename R::container* results, Rule rule, const Units*... operands) {
-  return on_host<R, Ls...>(rounding, results, rule, operands...);
+template <class R, class... Ls, class Mode, class Rule, class... Units>
+inline HostResult on_unit(const Mode& mode, typename R::container* results, Rule rule, const Units*... operands) {
+  return on_host<R, Ls...>(mode, results, rule, operands...);
 }
 template <class R, class From, class Units>
-inline HostResult truncated_on_unit(Rounding rounding, typename R::container* results, float power,
-                                    const Units* operand) {
-  return on_host<R, From>(
-      rounding, results, [power](Left& left, float x) { return truncated<R>(x * power, left); }, operand);
+inline HostResult truncated_on_unit(typename R::container* results, word scale, const Units* operand) {
+  return on_host_in<R, From>(
+      ToNearest(), results, [scale](Seen& seen, float x) { return truncated<R>(x, scale, seen); }, operand);
 }
 #endif
 

@@ -10,13 +10,11 @@ namespace {
 template <class L>
 using lane_of = typename L::container;
 
-// One lane is quickest by the reference, but for the fused operations, whose exact sum is long.
+// One lane is quickest by the reference, but for the fused operations on singles, whose exact sum is long.
 template <class Op, class L>
 constexpr bool is_fast_alone = false;
 template <bool Subtract>
-constexpr bool is_fast_alone<Fused<Subtract>, f32x1> = true;
-template <bool Subtract>
-constexpr bool is_fast_alone<Fused<Subtract>, f16x1> = rounds_by_instruction;
+constexpr bool is_fast_alone<Fused<Subtract>, f32x1> = rounds_by_instruction;
 
 // results[i] = Op of lanes i of the operands. The results are apart from the operands.
 template <class L, class Op, class... Units>

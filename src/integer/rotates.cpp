@@ -1,7 +1,7 @@
 // Rotations and normalisation counts.
 #include "integer/kernels.h"
 #include "integer/packed.h"
-#include "integer/scale.h"
+#include "frame/scale.h"
 
 namespace {
 

@@ -1,6 +1,6 @@
 // Shifts by a count a lane.
 #include "integer/kernels.h"
-#include "integer/scale.h"
+#include "frame/scale.h"
 
 namespace {
 

@@ -1,8 +1,8 @@
 // A lane times a power of two: shifts and rotations by a count a lane. The baseline target has no shift by
 // a count a lane, but it multiplies; one product holds the shift left in its low half and the shift right
 // by the rest of the width in its high half.
-#ifndef KASTARRI_INTEGER_SCALE_H
-#define KASTARRI_INTEGER_SCALE_H
+#ifndef KASTARRI_FRAME_SCALE_H
+#define KASTARRI_FRAME_SCALE_H
 
 #include "frame/arithmetic.h"
 

@@ -33,13 +33,12 @@ constexpr int in_instruction = _MM_FROUND_NO_EXC | (R == to_nearest    ? _MM_FRO
 // The mask of masked forms that leave nothing out. The plain ones have the compiler warn of its own header.
 inline __mmask16 sixteen_lanes() { return 0xFFFF; }
 
-// Where numbers differ, of which no lane holds a NaN. Compared as integers: clang makes of a comparison that
-// raises no flags one that does.
+// Where numbers differ. The compiler's own function of this instruction may raise flags: clang makes of a comparison
+// that raises none one that does.
 inline __mmask16 differing(__m512 a, __m512 b) {
-  const __m512i bits_a = _mm512_castps_si512(a), bits_b = _mm512_castps_si512(b);
-  const __m512i either = _mm512_or_si512(bits_a, bits_b);  // without the sign, 0 for zeros of either sign
-  return static_cast<__mmask16>(_mm512_cmpneq_epi32_mask(bits_a, bits_b) &
-                                _mm512_test_epi32_mask(either, _mm512_set1_epi32(INT32_MAX)));
+  __mmask16 differ;
+  asm("vcmpneqps %{sae%}, %2, %1, %0" : "=k"(differ) : "v"(a), "v"(b));
+  return differ;
 }
 
 // Sixteen singles, with arithmetic that rounds by R.
@@ -62,18 +61,9 @@ inline Sixteen<R> product(Sixteen<R> a, Sixteen<R> b) {
   return a * b;
 }
 
-template <Rounding R>
-inline __m512 fused_as(__m512 acc, __m512 a, __m512 b) {
-  return _mm512_fmadd_round_ps(a, b, acc, in_instruction<R>);
-}
-
-// For halves to nearest, rounded to odd first, as odd() has it: truncated, and the last bit set where that is inexact.
 template <class F, Rounding R>
 inline Sixteen<R> fused(Sixteen<R> acc, Sixteen<R> a, Sixteen<R> b) {
-  if constexpr (std::is_same_v<F, Single> || R != to_nearest) return {fused_as<R>(acc.v, a.v, b.v)};
-  const __m512i zeroward = _mm512_castps_si512(fused_as<toward_zero>(acc.v, a.v, b.v));
-  const __mmask16 inexact = differing(fused_as<upward>(acc.v, a.v, b.v), fused_as<downward>(acc.v, a.v, b.v));
-  return {_mm512_castsi512_ps(_mm512_mask_or_epi32(zeroward, inexact, zeroward, _mm512_set1_epi32(1)))};
+  return {_mm512_fmadd_round_ps(a.v, b.v, acc.v, in_instruction<R>)};
 }
 
 inline __m512 integral_away(__m512 x) {
@@ -215,6 +205,64 @@ inline void store_lanes(typename L::container* results, __m512i lanes) {
     _mm512_storeu_si512(results, lanes);
   }
 }
+
+// --- Halves -------------------------------------------------------------------------------------------
+
+// Sixteen results in single precision, to be rounded by R to halves: rounded to odd first, so that rounding again is
+// rounding once. Odd is truncated, and the last bit set where that is inexact.
+template <Rounding R, class... Ls, class Rule, class... Units>
+inline __m512 odd(Rule rule, int from, const Units*... operands) {
+  const auto rounded_by = [&](auto... x) { return rule(x...).v; };
+  const __m512 up = rounded_by(load_sixteen<Ls, upward>(operands, from)...);
+  const __m512 down = rounded_by(load_sixteen<Ls, downward>(operands, from)...);
+  const __m512i zeroward = _mm512_castps_si512(rounded_by(load_sixteen<Ls, toward_zero>(operands, from)...));
+  const __m512i exact = R == downward ? _mm512_castps_si512(down) : zeroward;  // which differ where they are 0
+  return _mm512_castsi512_ps(_mm512_mask_or_epi32(exact, differing(up, down), zeroward, _mm512_set1_epi32(1)));
+}
+
+// Lanes that overflow, and tiny ones that are inexact, are left.
+template <Rounding R, class L, class... Ls, class Rule, class... Units>
+[[gnu::flatten]] inline HostResult halves_by_instruction(typename L::container* results, Rule rule,
+                                                         const Units*... operands) {
+  const HonestSubnormals honest(results, operands...);
+  std::uint32_t all_left = 0, all_inexact = 0;
+  const auto sixteen = [&](int from) {
+    const __m512 x = odd<R, Ls...>(rule, from, reinterpret_cast<const typename Ls::container*>(operands)...);
+    const __m256i halves = halves_of(Sixteen<R>{x});
+    const __m512i bits = _mm512_castps_si512(x);
+    const __m512i magnitude = _mm512_and_si512(bits, _mm512_set1_epi32(single_magnitude));
+    const __mmask16 inexact = _mm512_cmpneq_epi32_mask(
+        bits, _mm512_castps_si512(_mm512_maskz_cvt_roundph_ps(sixteen_lanes(), halves, _MM_FROUND_NO_EXC)));
+    const __mmask16 tiny =
+        _mm512_mask_cmplt_epi32_mask(inexact, magnitude, _mm512_set1_epi32(single_bits_of_power(Half::least_exponent)));
+    const __mmask16 left = tiny | _mm512_cmpgt_epi32_mask(magnitude, _mm512_set1_epi32(widened_largest));
+    all_left |= left;
+    all_inexact |= inexact & ~left;
+    // A branch, so that the halves need not wait for what tells whether they are left.
+    return __builtin_expect(left != 0, 0) ? _mm256_mask_mov_epi16(halves, left, _mm256_set1_epi32(-1)) : halves;
+  };
+  __m512i halves = _mm512_zextsi256_si512(sixteen(0));
+  if constexpr (L::count == 32) halves = _mm512_inserti64x4(halves, sixteen(16), 1);
+  store_lanes<L>(results, halves);
+  return {all_inexact != 0 ? word{inexact} : 0, all_left != 0};
+}
+
+template <class L, class... Ls, class Rule, class... Units>
+inline HostResult halves_by_instruction(Rounding rounding, typename L::container* results, Rule rule,
+                                        const Units*... operands) {
+  switch (rounding) {
+    case upward:
+      return halves_by_instruction<upward, L, Ls...>(results, rule, operands...);
+    case downward:
+      return halves_by_instruction<downward, L, Ls...>(results, rule, operands...);
+    case toward_zero:
+      return halves_by_instruction<toward_zero, L, Ls...>(results, rule, operands...);
+    default:
+      return halves_by_instruction<to_nearest, L, Ls...>(results, rule, operands...);
+  }
+}
+
+// --- All ----------------------------------------------------------------------------------------------
 
 constexpr Rounding rounding_of(Rounding rounding) { return rounding; }
 constexpr Rounding rounding_of(TiesAway) { return toward_zero; }

@@ -304,8 +304,7 @@ inline WholeNumber integral(const Mode& mode, float x) {
   const word small = mask_below(magnitude, single_bits_of_power(Single::fraction_bits));
   const word right = at_most(Single::bias + Single::fraction_bits - biased_exponent(magnitude), 32);
   const Scaled32 parts(significand(magnitude) & small, 32 - right);
-  const auto rounded =
-      rounded_off<32>(std::uint64_t{sign} << 32 | std::uint64_t{parts.high} << 32 | parts.low, mode);
+  const auto rounded = rounded_off<32>(std::uint64_t{sign} << 32 | std::uint64_t{parts.high} << 32 | parts.low, mode);
   const auto integer = static_cast<word>(rounded.kept >> 32) & single_magnitude;
   const float number = static_cast<float>(static_cast<std::int32_t>(integer));
   return {as_float(sign | chosen(small, bits_of(number), magnitude)), static_cast<word>(rounded.dropped)};
@@ -462,7 +461,8 @@ inline auto by_rule(Rule rule, [[maybe_unused]] const Mode& mode, X... x) {
 // rule(seen, operand lanes i ...). The results are apart from the operands. Flattened: a call within a
 // loop over lanes would keep it from being vectorised.
 template <class R, class... Ls, class Mode, class Rule, class... Units>
-[[gnu::flatten]] inline HostResult on_host_in(const Mode& mode, typename R::container* results, Rule rule, const Units*... operands) {
+[[gnu::flatten]] inline HostResult on_host_in(const Mode& mode, typename R::container* results, Rule rule,
+                                              const Units*... operands) {
   Seen seen;
   const auto every_lane = [&](const auto&... x) {
     if constexpr (std::is_same_v<typename R::number, integer>) {
@@ -471,8 +471,7 @@ template <class R, class... Ls, class Mode, class Rule, class... Units>
     } else {
       const auto singles = [&](word* to) {
         KASTARRI_LANES_INDEPENDENT
-        for (int i = 0; i < R::count; ++i)
-          to[i] = settled<format_of<R>>(by_rule(rule, mode, x[i]...), mode, seen);
+        for (int i = 0; i < R::count; ++i) to[i] = settled<format_of<R>>(by_rule(rule, mode, x[i]...), mode, seen);
       };
       if constexpr (R::bits == 32) {
         singles(results);

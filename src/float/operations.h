@@ -3,6 +3,7 @@
 #ifndef KASTARRI_FLOAT_OPERATIONS_H
 #define KASTARRI_FLOAT_OPERATIONS_H
 
+#include <algorithm>
 #include <type_traits>
 
 #include "float/reference.h"
@@ -72,11 +73,13 @@ using MULS = Fused<true>;
 
 // --- Order --------------------------------------------------------------------------------------------
 
-// All ones for a NaN.
+// All ones where one of them is a NaN.
 template <class F>
-constexpr typename F::lane nan_mask(typename F::lane x) {
+constexpr typename F::lane nan_mask(typename F::lane x, typename F::lane y) {
   using Lane = typename F::lane;
-  return mask_below(static_cast<Lane>(F::infinity), static_cast<Lane>(x & (F::sign - 1)));
+  using Signed = std::make_signed_t<Lane>;  // of which more targets have the greater one
+  const auto greater = std::max(static_cast<Signed>(magnitude<F>(x)), static_cast<Signed>(magnitude<F>(y)));
+  return mask_below(static_cast<Lane>(F::infinity), static_cast<Lane>(greater));
 }
 
 // The lanes of the rule on numbers; a lane with a NaN operand is left.
@@ -89,7 +92,7 @@ inline bool fast_ordered(typename L::container* results, Rule rule, const Units*
   KASTARRI_LANES_INDEPENDENT
   for (int i = 0; i < L::count; ++i) {
     const Lane a_lane = x[i], b_lane = y[i];
-    const auto nan = static_cast<Lane>(nan_mask<F>(a_lane) | nan_mask<F>(b_lane));
+    const Lane nan = nan_mask<F>(a_lane, b_lane);
     left = static_cast<Lane>(left | nan);
     results[i] = static_cast<Lane>((rule(order<F>(a_lane), order<F>(b_lane)) ? a_lane : b_lane) | nan);
   }
@@ -171,7 +174,8 @@ struct Integral {
   template <class L, class Units>
   static bool fast(Environment& env, typename L::container* r, const Units* a) {
     const auto rule = [](const auto& mode, auto x) { return integral(mode, x); };
-    const HostResult host = D == Direction::away ? on_unit<L, L>(TiesAway(), r, rule, a) : on_unit<L, L>(rounding(env), r, rule, a);
+    const HostResult host =
+        D == Direction::away ? on_unit<L, L>(TiesAway(), r, rule, a) : on_unit<L, L>(rounding(env), r, rule, a);
     // Halves are integers before they are narrowed: what is inexact is the rounding to an integer.
     if (D == Direction::by_mode) env.raise(host.flags);
     return host.some_left;

@@ -12,7 +12,12 @@ constexpr bool rounds_by_instruction = true;
 
 template <class R, class... Ls, class Mode, class Rule, class... Units>
 inline HostResult on_unit(const Mode& mode, typename R::container* results, Rule rule, const Units*... operands) {
-  return by_instruction<R, Ls...>(mode, results, rule, operands...);
+  constexpr bool rounds_to_integers =
+      std::is_invocable_v<Rule, Mode, decltype(load_sixteen<Ls, to_nearest>(nullptr, 0))...>;
+  if constexpr (R::bits == 16 && !rounds_to_integers)
+    return halves_by_instruction<R, Ls...>(mode, results, rule, operands...);
+  else
+    return by_instruction<R, Ls...>(mode, results, rule, operands...);
 }
 template <class R, class From, class Units>
 inline HostResult truncated_on_unit(typename R::container* results, word scale, const Units* operand) {

@@ -98,7 +98,7 @@ inline void compare(Bits* out, const Units* a, const Units* b) {
     for (int i = 0; i < L::count; ++i)
       holds.lane[i] = static_cast<lane_of<L>>(Op::template on_numbers<F>(x[i], y[i]) ? -1 : 0);
     lane_of<L> left = 0;
-    for (int i = 0; i < L::count; ++i) left = static_cast<lane_of<L>>(left | nan_mask<F>(x[i]) | nan_mask<F>(y[i]));
+    for (int i = 0; i < L::count; ++i) left = static_cast<lane_of<L>>(left | nan_mask<F>(x[i], y[i]));
     if (__builtin_expect(left != 0, 0)) {
       Environment env;
       for (int i = 0; i < L::count; ++i)

@@ -4,137 +4,216 @@
 
 #include <immintrin.h>
 
-#include "frame/lanes.h"
+#include <cstring>
+#include <utility>
 
-// Elements are taken one after the other: what is left to save is the counting.
-#ifdef __clang__
-#define KASTARRI_UNROLLED _Pragma("clang loop unroll_count(8)")
-#else
-#define KASTARRI_UNROLLED _Pragma("GCC unroll 8")
-#endif
+#include "frame/lanes.h"
+#include "frame/registers.h"
 
 namespace {
 
-// The elements' addresses. A disabled element gets that of a word of no meaning, so that nothing branches
-// on the predicate and memory is left alone all the same.
+template <class Unit>
+inline in_memory<Unit>& element(const void* base, word offset) {
+  return *reinterpret_cast<in_memory<Unit>*>(reinterpret_cast<std::uintptr_t>(base) + offset);
+}
+
+// --- Predicates -------------------------------------------------------------------------------------
+
+// A vector in parts. Wider ones than these would slow down what goes element by element beside them.
+constexpr int part_bytes = register_bytes < 32 ? register_bytes : 32;
+constexpr int parts = 64 / part_bytes;
+template <class Lane>
+struct part_of {
+  typedef Lane type __attribute__((vector_size(part_bytes)));
+};
 template <class O>
-class ElementAddresses {
+using Part = typename part_of<typename O::container>::type;
+template <class O>
+using PartLanes = std::make_index_sequence<O::count / parts>;
+
+// All ones in the lanes of part number k that a predicate enables.
+template <class O, std::size_t... I>
+inline Part<O> enabled_lanes(word predicate, int k, std::index_sequence<I...>) {
+  constexpr Part<O> bit = {(typename O::container{1} << I)...};
+  const auto own_bits = static_cast<typename O::container>(predicate >> k * static_cast<int>(sizeof...(I)));
+  return reinterpret_cast<Part<O>>(((Part<O>{} + own_bits) & bit) == bit);
+}
+template <class O>
+inline Part<O> enabled_lanes(word predicate, int k) {
+  return enabled_lanes<O>(predicate, k, PartLanes<O>());
+}
+
+// Lanes D in the width of offsets O, the disabled ones as the last that is enabled (there is one). So elements are
+// taken without a look at the predicate: a disabled lane does what another does anyhow, and of a scatter that is
+// what stays.
+template <class O, class D = O>
+class LastForDisabled {
  public:
-  static constexpr int count = O::count;
-
-  // Enabled are the elements whose predicate bit is 1, or whose mask is not 0, or all: Same(true).
-  template <class PredicateUnit>
-  ElementAddresses(const void* base, const Read<O>& offsets, const PredicateUnit* predicate) {
-    LaneMask<8 * sizeof(std::uintptr_t), count> mask;
-    mask.expand(predicate);
-    fill(base, offsets, [&](int i) { return mask.lane[i]; });
+  LastForDisabled(const void* operand, word predicate) {
+    const Read<D> lane(operand);
+    const Part<O> last = Part<O>{} + static_cast<typename O::container>(lane[31 - __builtin_clz(predicate)]);
+    for (int k = 0; k < parts; ++k) {
+      const Part<O> enabled = enabled_lanes<O>(predicate, k);
+      part_[k] = (enabled & part_at(lane, k, PartLanes<O>())) | (~enabled & last);
+    }
   }
-  ElementAddresses(const void* base, const Read<O>& offsets, const Read<O>& masks) {
-    fill(base, offsets, [&](int i) { return masks[i] ? ~std::uintptr_t{0} : std::uintptr_t{0}; });
-  }
-  ElementAddresses(const void* base, const Read<O>& offsets, Same<bool>) {
-    fill(base, offsets, [](int) { return ~std::uintptr_t{0}; });
-  }
-  ElementAddresses(const ElementAddresses&) = delete;
+  const void* image() const { return part_; }
 
-  // Has the addresses in memory, to be read one by one: compilers would rather take vectors apart, which
-  // serves gathers well and scatters badly.
-  void settle() { asm("" : "+m"(at_)); }
+ private:
+  template <std::size_t... I>
+  static Part<O> part_at(Read<D> lane, int k, std::index_sequence<I...>) {
+    return Part<O>{lane[k * static_cast<int>(sizeof...(I)) + static_cast<int>(I)]...};
+  }
 
-  // The element at address i, as long as a Unit.
-  template <class Unit>
-  in_memory<Unit>& element(int i) const {
-    return *reinterpret_cast<in_memory<Unit>*>(at_[i]);
+  Part<O> part_[parts];
+};
+
+// --- Gathers ----------------------------------------------------------------------------------------
+
+// The offset of element i. Those of 16 bits are loaded two at a time, to leave loads to the elements.
+template <class O>
+inline word offset(const void* offsets, int i) {
+  constexpr int in_word = 32 / O::bits;
+  const word own_and_next = static_cast<const in_memory<word>*>(offsets)[i / in_word];
+  if constexpr (in_word == 1) return own_and_next;
+  return i % in_word == 0 ? own_and_next & 0xFFFF : own_and_next >> 16;
+}
+
+// A block of elements from number First on, the low Bits of each.
+template <class O, int Bits, int First, std::size_t... I>
+inline __m128i fetch(const void* base, const void* offsets, std::index_sequence<I...>) {
+  if constexpr (O::bits == 32) {
+    return _mm_setr_epi32(element<std::int32_t>(base, offset<O>(offsets, First + I))...);
+  } else {
+    __m128i units = _mm_setzero_si128();
+    ((units = _mm_insert_epi16(units, element<std::int16_t>(base, offset<O>(offsets, First + I)), I)), ...);
+    asm("" : "+x"(units));  // of an 8-bit element the byte after it is read, used or not
+    if constexpr (Bits == 8) units = _mm_and_si128(units, _mm_set1_epi16(0xFF));
+    return units;
+  }
+}
+template <class O, int Bits, int Block>
+inline __m128i fetch(const void* base, const void* offsets) {
+  constexpr int count = O::count / 4;
+  return fetch<O, Bits, Block * count>(base, offsets, std::make_index_sequence<count>());
+}
+
+// Gathers 32 elements of 16 or 8 bits or 16 of 32 bits into units of the offsets' width. The gather register is
+// stored and loaded in parts (see GatherRegister).
+template <class O, int Bits, class Rule>
+inline void gather_parts(const void* base, const void* offsets, word* out, Rule rule) {
+  const __m128i block[] = {fetch<O, Bits, 0>(base, offsets), fetch<O, Bits, 1>(base, offsets),
+                           fetch<O, Bits, 2>(base, offsets), fetch<O, Bits, 3>(base, offsets)};
+  for (int k = 0; k < parts; ++k) {
+#if defined __AVX2__
+    const auto part = reinterpret_cast<Part<O>>(_mm256_set_m128i(block[2 * k + 1], block[2 * k]));
+#else
+    const auto part = reinterpret_cast<Part<O>>(block[k]);
+#endif
+    const Part<O> stored = rule(part, k);
+    std::memcpy(out + k * part_bytes / 4, &stored, part_bytes);
+  }
+}
+template <class O, int Bits>
+inline void gather(const void* base, const void* offsets, word* out) {
+  gather_parts<O, Bits>(base, offsets, out, [](Part<O> part, int) { return part; });
+}
+
+// Under a predicate: disabled elements are not read, and their units are 0.
+template <class O, int Bits>
+inline void gather(const void* base, const void* offsets, word* out, word predicate) {
+  if (predicate == 0) {
+    std::memset(out, 0, 64);
+    return;
+  }
+  gather_parts<O, Bits>(base, LastForDisabled<O>(offsets, predicate).image(), out,
+                        [predicate](Part<O> part, int k) { return part & enabled_lanes<O>(predicate, k); });
+}
+
+// The gather register as it is read: in the parts that it was stored in, so that stores forward to loads.
+class GatherRegister {
+ public:
+  explicit GatherRegister(const word* stored) {
+#if defined __AVX512BW__
+    const auto* half = reinterpret_cast<const __m256i*>(stored);
+    const __m512i low = _mm512_castsi256_si512(_mm256_loadu_si256(half));
+    // The form with a mask of all ones: with the other the compiler warns of its own header.
+    _mm512_store_si512(units_, _mm512_maskz_inserti64x4(0xFF, low, _mm256_loadu_si256(half + 1), 1));
+#else
+    std::memcpy(units_, stored, sizeof units_);
+#endif
+  }
+  Read<u16x32> units() const { return Read<u16x32>(units_); }
+
+ private:
+  alignas(64) word units_[16];
+};
+
+// --- Scatters ---------------------------------------------------------------------------------------
+
+// The lanes of an operand in turn, from registers: what is stored between two of them may lie anywhere, in the
+// operand too, and a processor that takes a load to depend on such stores does one element after the other.
+template <class L>
+class InTurn {
+ public:
+  explicit InTurn(const void* operand) : InTurn(operand, std::make_index_sequence<L::bits * L::count / 128>()) {}
+
+  // For i = 0, 1 ...
+  template <int i>
+  typename L::container lane() {
+    __m128i& block = block_[i * L::bits / 128];
+    if constexpr (i * L::bits % 32 == 0) {
+      word_ = static_cast<word>(_mm_cvtsi128_si32(block));
+      block = _mm_srli_si128(block, 4);
+    } else {
+      word_ >>= L::bits;
+    }
+    return static_cast<typename L::container>(word_);
   }
 
  private:
-  // An element's mask is all ones, or 0 when it is disabled.
-  template <class MaskOf>
-  void fill(const void* base, const Read<O>& offsets, MaskOf mask_of) {
-    const auto nowhere = reinterpret_cast<std::uintptr_t>(&nowhere_);
-    const auto from = reinterpret_cast<std::uintptr_t>(base) - nowhere;
-    KASTARRI_LANES_INDEPENDENT
-    for (int i = 0; i < count; ++i) {
-      const std::uintptr_t there = from + offsets[i];
-      at_[i] = nowhere + (there & mask_of(i));
-    }
-  }
+  template <std::size_t... I>
+  InTurn(const void* operand, std::index_sequence<I...>)
+      : block_{_mm_loadu_si128(static_cast<const __m128i*>(operand) + I)...} {}
 
-  alignas(64) std::uintptr_t at_[count];
-  word nowhere_ = 0;
+  __m128i block_[L::bits * L::count / 128];
+  word word_ = 0;
 };
 
-// Eight 16-bit elements or four 32-bit ones from index i on. The compiler must not see what becomes of
-// them: an 8-bit element is read with the byte after it, used or not.
-inline __m128i fetch(const ElementAddresses<u16x32>& from, int i) {
-  __m128i units = _mm_setzero_si128();
-#define KASTARRI_INSERT(K) units = _mm_insert_epi16(units, from.element<std::int16_t>(i + K), K);
-  KASTARRI_INSERT(0)
-  KASTARRI_INSERT(1)
-  KASTARRI_INSERT(2)
-  KASTARRI_INSERT(3)
-  KASTARRI_INSERT(4)
-  KASTARRI_INSERT(5)
-  KASTARRI_INSERT(6)
-  KASTARRI_INSERT(7)
-#undef KASTARRI_INSERT
-  asm("" : "+x"(units));
-  return units;
-}
-inline __m128i fetch(const ElementAddresses<u32x16>& from, int i) {
-  const auto unit = [&](int k) { return from.element<std::int32_t>(i + k); };
-  return _mm_set_epi32(unit(3), unit(2), unit(1), unit(0));
+template <class Element>
+inline void store(in_memory<Element>& element, Element value) {
+  if constexpr (sizeof(Element) == 1) asm volatile("" : : "q"((&element)[1]));  // the byte after it is read
+  element = value;
 }
 
-// 64 bytes from four quarters, stored in the width in which lanes are read back, so that the store forwards
-// to the load.
-inline void store_quarters(void* to, __m128i q0, __m128i q1, __m128i q2, __m128i q3) {
-#if defined __AVX512BW__
-  const __m512i low = _mm512_castsi256_si512(_mm256_set_m128i(q1, q0));
-  // The form with a mask of all ones: with the other the compiler warns of its own header.
-  _mm512_storeu_si512(to, _mm512_maskz_inserti64x4(0xFF, low, _mm256_set_m128i(q3, q2), 1));
-#elif defined __AVX2__
-  auto* half = static_cast<__m256i*>(to);
-  _mm256_storeu_si256(half, _mm256_set_m128i(q1, q0));
-  _mm256_storeu_si256(half + 1, _mm256_set_m128i(q3, q2));
-#else
-  auto* quarter = static_cast<__m128i*>(to);
-  _mm_storeu_si128(quarter, q0);
-  _mm_storeu_si128(quarter + 1, q1);
-  _mm_storeu_si128(quarter + 2, q2);
-  _mm_storeu_si128(quarter + 3, q3);
-#endif
+// Stores each lane of the data, in ascending order.
+template <class Element, class O, class D, std::size_t... I>
+inline void scatter(void* base, const void* offsets, const void* data, std::index_sequence<I...>) {
+  InTurn<O> to(offsets);
+  InTurn<D> from(data);
+  (store(element<Element>(base, to.template lane<I>()), static_cast<Element>(from.template lane<I>())), ...);
+}
+template <class Element, class O, class D>
+inline void scatter(void* base, const void* offsets, const void* data) {
+  scatter<Element, O, D>(base, offsets, data, std::make_index_sequence<O::count>());
+}
+template <class Element, class O, class D>
+inline void scatter(void* base, const void* offsets, const void* data, word predicate) {
+  if (predicate == 0) return;
+  const LastForDisabled<O> to(offsets, predicate);
+  const LastForDisabled<O, D> from(data, predicate);
+  scatter<Element, O, O>(base, to.image(), from.image());
 }
 
-// Gathers whole elements, of 16 bits from 32 offsets, of 32 bits from 16. A disabled one reads 0.
+// Adds 1 to each element, in ascending order.
+template <class O, std::size_t... I>
+inline void increment(void* base, const void* offsets, std::index_sequence<I...>) {
+  InTurn<O> to(offsets);
+  (++element<typename O::container>(base, to.template lane<I>()), ...);
+}
 template <class O>
-inline void gather(const ElementAddresses<O>& from, word* out) {
-  constexpr int step = O::count / 4;
-  store_quarters(out, fetch(from, 0), fetch(from, step), fetch(from, 2 * step), fetch(from, 3 * step));
-}
-
-// Each element, in ascending order, becomes value(i). The byte after an 8-bit element is read.
-template <class Element, class O, class Value>
-inline void scatter(ElementAddresses<O>&& to, Value value) {
-  to.settle();
-  KASTARRI_UNROLLED
-  for (int i = 0; i < O::count; ++i) {
-    in_memory<Element>& element = to.template element<Element>(i);
-    if constexpr (sizeof(Element) == 1) asm volatile("" : : "q"((&element)[1]));
-    element = static_cast<Element>(value(i));
-  }
-}
-
-// Each element, in ascending order, is read as a unit of the offsets' width and becomes rule(unit, i).
-template <class Element, class O, class Rule>
-inline void modify(ElementAddresses<O>&& to, Rule rule) {
-  to.settle();
-  KASTARRI_UNROLLED
-  for (int i = 0; i < O::count; ++i) {
-    using Unit = typename O::container;
-    const Unit unit = to.template element<Unit>(i);
-    to.template element<Element>(i) = static_cast<Element>(rule(unit, i));
-  }
+inline void increment(void* base, const void* offsets) {
+  increment<O>(base, offsets, std::make_index_sequence<O::count>());
 }
 
 }  // namespace

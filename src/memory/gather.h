@@ -70,40 +70,41 @@ class LastForDisabled {
 
 // --- Gathers ----------------------------------------------------------------------------------------
 
-// The offset of element i. Those of 16 bits are loaded two at a time, to leave loads to the elements.
+// The offset of element i. Of 16 bits every other two are loaded together: processors have as much to do with
+// loads here as with taking words apart.
 template <class O>
 inline word offset(const void* offsets, int i) {
-  constexpr int in_word = 32 / O::bits;
-  const word own_and_next = static_cast<const in_memory<word>*>(offsets)[i / in_word];
-  if constexpr (in_word == 1) return own_and_next;
-  return i % in_word == 0 ? own_and_next & 0xFFFF : own_and_next >> 16;
+  if (O::bits == 32 || i % 4 > 1) return Read<O>(offsets)[i];
+  const word own_and_next = Read<u32x16>(offsets)[i / 2];
+  return i % 2 == 0 ? own_and_next & 0xFFFF : own_and_next >> 16;
 }
 
-// A block of elements from number First on, the low Bits of each.
-template <class O, int Bits, int First, std::size_t... I>
-inline __m128i fetch(const void* base, const void* offsets, std::index_sequence<I...>) {
-  if constexpr (O::bits == 32) {
-    return _mm_setr_epi32(element<std::int32_t>(base, offset<O>(offsets, First + I))...);
+// A block of elements from number First on, the low Bits of each; offset(i) is that of element i.
+template <int Bits, int First, class Offset, std::size_t... I>
+inline __m128i fetch(const void* base, Offset offset, std::index_sequence<I...>) {
+  if constexpr (Bits == 32) {
+    const __m128i units[] = {_mm_cvtsi32_si128(element<std::int32_t>(base, offset(First + I)))...};
+    return _mm_unpacklo_epi64(_mm_unpacklo_epi32(units[0], units[1]), _mm_unpacklo_epi32(units[2], units[3]));
   } else {
     __m128i units = _mm_setzero_si128();
-    ((units = _mm_insert_epi16(units, element<std::int16_t>(base, offset<O>(offsets, First + I)), I)), ...);
+    ((units = _mm_insert_epi16(units, element<std::int16_t>(base, offset(First + I)), I)), ...);
     asm("" : "+x"(units));  // of an 8-bit element the byte after it is read, used or not
     if constexpr (Bits == 8) units = _mm_and_si128(units, _mm_set1_epi16(0xFF));
     return units;
   }
 }
-template <class O, int Bits, int Block>
-inline __m128i fetch(const void* base, const void* offsets) {
+template <class O, int Bits, int Block, class Offset>
+inline __m128i fetch(const void* base, Offset offset) {
   constexpr int count = O::count / 4;
-  return fetch<O, Bits, Block * count>(base, offsets, std::make_index_sequence<count>());
+  return fetch<Bits, Block * count>(base, offset, std::make_index_sequence<count>());
 }
 
 // Gathers 32 elements of 16 or 8 bits or 16 of 32 bits into units of the offsets' width. The gather register is
 // stored and loaded in parts (see GatherRegister).
-template <class O, int Bits, class Rule>
-inline void gather_parts(const void* base, const void* offsets, word* out, Rule rule) {
-  const __m128i block[] = {fetch<O, Bits, 0>(base, offsets), fetch<O, Bits, 1>(base, offsets),
-                           fetch<O, Bits, 2>(base, offsets), fetch<O, Bits, 3>(base, offsets)};
+template <class O, int Bits, class Offset, class Rule>
+inline void gather_parts(const void* base, Offset offset, word* out, Rule rule) {
+  const __m128i block[] = {fetch<O, Bits, 0>(base, offset), fetch<O, Bits, 1>(base, offset),
+                           fetch<O, Bits, 2>(base, offset), fetch<O, Bits, 3>(base, offset)};
   for (int k = 0; k < parts; ++k) {
 #if defined __AVX2__
     const auto part = reinterpret_cast<Part<O>>(_mm256_set_m128i(block[2 * k + 1], block[2 * k]));
@@ -116,18 +117,25 @@ inline void gather_parts(const void* base, const void* offsets, word* out, Rule 
 }
 template <class O, int Bits>
 inline void gather(const void* base, const void* offsets, word* out) {
-  gather_parts<O, Bits>(base, offsets, out, [](Part<O> part, int) { return part; });
+  gather_parts<O, Bits>(
+      base, [=](int i) { return offset<O>(offsets, i); }, out, [](Part<O> part, int) { return part; });
 }
 
-// Under a predicate: disabled elements are not read, and their units are 0.
+// Under a predicate: disabled elements are not read, and their units are 0. In their stead the last enabled one is
+// read, so that nothing branches on the predicate.
 template <class O, int Bits>
 inline void gather(const void* base, const void* offsets, word* out, word predicate) {
   if (predicate == 0) {
     std::memset(out, 0, 64);
     return;
   }
-  gather_parts<O, Bits>(base, LastForDisabled<O>(offsets, predicate).image(), out,
-                        [predicate](Part<O> part, int k) { return part & enabled_lanes<O>(predicate, k); });
+  const word last = Read<O>(offsets)[31 - __builtin_clz(predicate)];
+  const auto chosen = [=](int i) {
+    word own = Read<O>(offsets)[i];
+    asm("" : "+r"(own));  // there in any case, so that compilers choose rather than branch
+    return (predicate >> i & 1) != 0 ? own : last;
+  };
+  gather_parts<O, Bits>(base, chosen, out, [=](Part<O> part, int k) { return part & enabled_lanes<O>(predicate, k); });
 }
 
 // The gather register as it is read: in the parts that it was stored in, so that stores forward to loads.

@@ -9,7 +9,8 @@
   template <class Memory, class Units, class... Predicate>                                    \
   static inline void KASTARRI_SEMANTIC(OP)(const Memory* base, const Units* offsets, word* r, \
                                            const Predicate*... predicate) {                   \
-    gather<O, BITS>(base, offsets, r, *predicate...);                                         \
+    word nowhere = 0;                                                                         \
+    gather<O, BITS>(base, offsets, elements(base, nowhere, *predicate...), r);                \
   }
 
 // The units of the gather register as lanes of the result, or their low bytes as its low or high half.

@@ -8,7 +8,6 @@
 #include <utility>
 
 #include "frame/lanes.h"
-#include "frame/registers.h"
 
 namespace {
 
@@ -17,56 +16,38 @@ inline in_memory<Unit>& element(const void* base, word offset) {
   return *reinterpret_cast<in_memory<Unit>*>(reinterpret_cast<std::uintptr_t>(base) + offset);
 }
 
-// --- Predicates -------------------------------------------------------------------------------------
-
-// A vector in parts. Wider ones than these would slow down what goes element by element beside them.
-constexpr int part_bytes = register_bytes < 32 ? register_bytes : 32;
-constexpr int parts = 64 / part_bytes;
-template <class Lane>
-struct part_of {
-  typedef Lane type __attribute__((vector_size(part_bytes)));
+// Which elements there are: all, or those that a predicate enables.
+struct EveryElement {
+  word at(word offset, int) const { return offset; }
 };
-template <class O>
-using Part = typename part_of<typename O::container>::type;
-template <class O>
-using PartLanes = std::make_index_sequence<O::count / parts>;
 
-// All ones in the lanes of part number k that a predicate enables.
-template <class O, std::size_t... I>
-inline Part<O> enabled_lanes(word predicate, int k, std::index_sequence<I...>) {
-  constexpr Part<O> bit = {(typename O::container{1} << I)...};
-  const auto own_bits = static_cast<typename O::container>(predicate >> k * static_cast<int>(sizeof...(I)));
-  return reinterpret_cast<Part<O>>(((Part<O>{} + own_bits) & bit) == bit);
-}
-template <class O>
-inline Part<O> enabled_lanes(word predicate, int k) {
-  return enabled_lanes<O>(predicate, k, PartLanes<O>());
-}
-
-// Lanes D in the width of offsets O, the disabled ones as the last that is enabled (there is one). So elements are
-// taken without a look at the predicate: a disabled lane does what another does anyhow, and of a scatter that is
-// what stays.
-template <class O, class D = O>
-class LastForDisabled {
+// The offset of a disabled element is that of a word of no meaning, so that nothing branches on the predicate and
+// memory is left alone all the same. Offsets are chosen one by one: vectors of them would be there so late that
+// processors run out of steps to be done meanwhile.
+class EnabledElements {
  public:
-  LastForDisabled(const void* operand, word predicate) {
-    const Read<D> lane(operand);
-    const Part<O> last = Part<O>{} + static_cast<typename O::container>(lane[31 - __builtin_clz(predicate)]);
-    for (int k = 0; k < parts; ++k) {
-      const Part<O> enabled = enabled_lanes<O>(predicate, k);
-      part_[k] = (enabled & part_at(lane, k, PartLanes<O>())) | (~enabled & last);
-    }
+  EnabledElements(const void* base, word& nowhere, word predicate)
+      : away_(reinterpret_cast<std::uintptr_t>(&nowhere) - reinterpret_cast<std::uintptr_t>(base)),
+        predicate_(predicate) {
+    asm("" : "+m"(nowhere));  // in memory, whatever compilers make of its address
   }
-  const void* image() const { return part_; }
+
+  // The offset of element i where its own is given.
+  word at(word offset, int i) const {
+    asm("" : "+r"(offset));  // known by now, so that compilers choose rather than branch
+    return (predicate_ >> i & 1) != 0 ? offset : away_;
+  }
 
  private:
-  template <std::size_t... I>
-  static Part<O> part_at(Read<D> lane, int k, std::index_sequence<I...>) {
-    return Part<O>{lane[k * static_cast<int>(sizeof...(I)) + static_cast<int>(I)]...};
-  }
-
-  Part<O> part_[parts];
+  word away_;
+  word predicate_;
 };
+
+// The word of no meaning is what disabled elements are gathered as.
+inline EveryElement elements(const void*, word&) { return {}; }
+inline EnabledElements elements(const void* base, word& nowhere, word predicate) {
+  return EnabledElements(base, nowhere, predicate);
+}
 
 // --- Gathers ----------------------------------------------------------------------------------------
 
@@ -79,66 +60,47 @@ inline word offset(const void* offsets, int i) {
   return i % 2 == 0 ? own_and_next & 0xFFFF : own_and_next >> 16;
 }
 
-// A block of elements from number First on, the low Bits of each; offset(i) is that of element i.
-template <int Bits, int First, class Offset, std::size_t... I>
-inline __m128i fetch(const void* base, Offset offset, std::index_sequence<I...>) {
+// A block of elements from number First on, the low Bits of each.
+template <class O, int Bits, int First, class Which, std::size_t... I>
+inline __m128i fetch(const void* base, const void* offsets, Which which, std::index_sequence<I...>) {
+  const auto place = [=](int i) { return which.at(offset<O>(offsets, First + i), First + i); };
   if constexpr (Bits == 32) {
-    const __m128i units[] = {_mm_cvtsi32_si128(element<std::int32_t>(base, offset(First + I)))...};
+    const __m128i units[] = {_mm_cvtsi32_si128(element<std::int32_t>(base, place(I)))...};
     return _mm_unpacklo_epi64(_mm_unpacklo_epi32(units[0], units[1]), _mm_unpacklo_epi32(units[2], units[3]));
   } else {
     __m128i units = _mm_setzero_si128();
-    ((units = _mm_insert_epi16(units, element<std::int16_t>(base, offset(First + I)), I)), ...);
+    ((units = _mm_insert_epi16(units, element<std::int16_t>(base, place(I)), I)), ...);
     asm("" : "+x"(units));  // of an 8-bit element the byte after it is read, used or not
     if constexpr (Bits == 8) units = _mm_and_si128(units, _mm_set1_epi16(0xFF));
     return units;
   }
 }
-template <class O, int Bits, int Block, class Offset>
-inline __m128i fetch(const void* base, Offset offset) {
-  constexpr int count = O::count / 4;
-  return fetch<Bits, Block * count>(base, offset, std::make_index_sequence<count>());
-}
 
 // Gathers 32 elements of 16 or 8 bits or 16 of 32 bits into units of the offsets' width. The gather register is
-// stored and loaded in parts (see GatherRegister).
-template <class O, int Bits, class Offset, class Rule>
-inline void gather_parts(const void* base, Offset offset, word* out, Rule rule) {
-  const __m128i block[] = {fetch<O, Bits, 0>(base, offset), fetch<O, Bits, 1>(base, offset),
-                           fetch<O, Bits, 2>(base, offset), fetch<O, Bits, 3>(base, offset)};
-  for (int k = 0; k < parts; ++k) {
+// stored and loaded in halves at most (see GatherRegister): registers of 512 bits would slow down what goes element
+// by element.
+template <class O, int Bits, class Which>
+inline void gather(const void* base, const void* offsets, Which which, word* out) {
+  constexpr int count = O::count / 4;
+  constexpr auto numbers = std::make_index_sequence<count>();
+  const __m128i q0 = fetch<O, Bits, 0>(base, offsets, which, numbers);
+  const __m128i q1 = fetch<O, Bits, count>(base, offsets, which, numbers);
+  const __m128i q2 = fetch<O, Bits, 2 * count>(base, offsets, which, numbers);
+  const __m128i q3 = fetch<O, Bits, 3 * count>(base, offsets, which, numbers);
 #if defined __AVX2__
-    const auto part = reinterpret_cast<Part<O>>(_mm256_set_m128i(block[2 * k + 1], block[2 * k]));
+  auto* half = reinterpret_cast<__m256i*>(out);
+  _mm256_storeu_si256(half, _mm256_set_m128i(q1, q0));
+  _mm256_storeu_si256(half + 1, _mm256_set_m128i(q3, q2));
 #else
-    const auto part = reinterpret_cast<Part<O>>(block[k]);
+  auto* quarter = reinterpret_cast<__m128i*>(out);
+  _mm_storeu_si128(quarter, q0);
+  _mm_storeu_si128(quarter + 1, q1);
+  _mm_storeu_si128(quarter + 2, q2);
+  _mm_storeu_si128(quarter + 3, q3);
 #endif
-    const Part<O> stored = rule(part, k);
-    std::memcpy(out + k * part_bytes / 4, &stored, part_bytes);
-  }
-}
-template <class O, int Bits>
-inline void gather(const void* base, const void* offsets, word* out) {
-  gather_parts<O, Bits>(
-      base, [=](int i) { return offset<O>(offsets, i); }, out, [](Part<O> part, int) { return part; });
 }
 
-// Under a predicate: disabled elements are not read, and their units are 0. In their stead the last enabled one is
-// read, so that nothing branches on the predicate.
-template <class O, int Bits>
-inline void gather(const void* base, const void* offsets, word* out, word predicate) {
-  if (predicate == 0) {
-    std::memset(out, 0, 64);
-    return;
-  }
-  const word last = Read<O>(offsets)[31 - __builtin_clz(predicate)];
-  const auto chosen = [=](int i) {
-    word own = Read<O>(offsets)[i];
-    asm("" : "+r"(own));  // there in any case, so that compilers choose rather than branch
-    return (predicate >> i & 1) != 0 ? own : last;
-  };
-  gather_parts<O, Bits>(base, chosen, out, [=](Part<O> part, int k) { return part & enabled_lanes<O>(predicate, k); });
-}
-
-// The gather register as it is read: in the parts that it was stored in, so that stores forward to loads.
+// The gather register as it is read: in the halves that it was stored in, so that stores forward to loads.
 class GatherRegister {
  public:
   explicit GatherRegister(const word* stored) {
@@ -195,22 +157,16 @@ inline void store(in_memory<Element>& element, Element value) {
 }
 
 // Stores each lane of the data, in ascending order.
-template <class Element, class O, class D, std::size_t... I>
-inline void scatter(void* base, const void* offsets, const void* data, std::index_sequence<I...>) {
+template <class Element, class O, class D, class Which, std::size_t... I>
+inline void scatter(void* base, const void* offsets, Which which, const void* data, std::index_sequence<I...>) {
   InTurn<O> to(offsets);
   InTurn<D> from(data);
-  (store(element<Element>(base, to.template lane<I>()), static_cast<Element>(from.template lane<I>())), ...);
+  (store(element<Element>(base, which.at(to.template lane<I>(), I)), static_cast<Element>(from.template lane<I>())),
+   ...);
 }
-template <class Element, class O, class D>
-inline void scatter(void* base, const void* offsets, const void* data) {
-  scatter<Element, O, D>(base, offsets, data, std::make_index_sequence<O::count>());
-}
-template <class Element, class O, class D>
-inline void scatter(void* base, const void* offsets, const void* data, word predicate) {
-  if (predicate == 0) return;
-  const LastForDisabled<O> to(offsets, predicate);
-  const LastForDisabled<O, D> from(data, predicate);
-  scatter<Element, O, O>(base, to.image(), from.image());
+template <class Element, class O, class D, class Which>
+inline void scatter(void* base, const void* offsets, Which which, const void* data) {
+  scatter<Element, O, D>(base, offsets, which, data, std::make_index_sequence<O::count>());
 }
 
 // Adds 1 to each element, in ascending order.

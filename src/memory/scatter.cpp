@@ -8,7 +8,9 @@
   template <class Units, class Offsets, class Memory, class... Predicate>                        \
   static inline void KASTARRI_SEMANTIC(OP)(const Units* v, const Offsets* offsets, Memory* base, \
                                            const Predicate*... predicate) {                      \
-    scatter<ELEMENT, O, D>(base, offsets, v + FIRST * D::bits / 32, predicate[FIRST / 32]...);   \
+    word nowhere = 0;                                                                            \
+    scatter<ELEMENT, O, D>(base, offsets, elements(base, nowhere, predicate[FIRST / 32]...),     \
+                           v + FIRST * D::bits / 32);                                            \
   }
 #define KERNEL_scatter(OP, O, ELEMENT, D) KERNEL_scatter_from(OP, O, ELEMENT, D, 0)
 #define KERNEL_scatter_high(OP, O, ELEMENT, D) KERNEL_scatter_from(OP, O, ELEMENT, D, 32)

@@ -20,7 +20,8 @@ void gather_masked(const void* base, const unsigned* offsets, const unsigned* ma
   word enabled = 0;
   for (int i = 0; i < L::count; ++i) enabled |= word{mask[i] != 0} << i;
   alignas(64) word units[16];
-  gather<L, Bits>(base, offsets, units, enabled);
+  word nowhere = 0;
+  gather<L, Bits>(base, offsets, elements(base, nowhere, enabled), units);
   lanes<L::count>(
       Write<L>(out), [](word unit, word mask_lane) { return unit & mask_lane; }, Read<L>(units), mask);
 }

@@ -70,7 +70,10 @@ class Predicated {
   template <class V>
   void put(int i, V value) const {
     using C = typename L::container;
-    lanes_[i] = enabled_.lane[i] ? canonical<L>(value) : Clear ? C{} : C{lanes_[i]};
+    if constexpr (Clear)
+      lanes_[i] = static_cast<C>(canonical<L>(value) & static_cast<C>(enabled_.lane[i]));
+    else
+      lanes_[i] = enabled_.lane[i] ? canonical<L>(value) : C{lanes_[i]};
   }
 
  private:

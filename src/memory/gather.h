@@ -4,101 +4,95 @@
 
 #include <immintrin.h>
 
-#include "frame/lanes.h"
+#include <cstring>
+#include <utility>
 
-// Elements are taken one after the other: what is left to save is the counting.
-#ifdef __clang__
-#define KASTARRI_UNROLLED _Pragma("clang loop unroll_count(8)")
-#else
-#define KASTARRI_UNROLLED _Pragma("GCC unroll 8")
-#endif
+#include "frame/lanes.h"
 
 namespace {
 
-// The elements' addresses. A disabled element gets that of a word of no meaning, so that nothing branches
-// on the predicate and memory is left alone all the same.
-template <class O>
-class ElementAddresses {
+template <class Unit>
+inline in_memory<Unit>& element(const void* base, word offset) {
+  return *reinterpret_cast<in_memory<Unit>*>(reinterpret_cast<std::uintptr_t>(base) + offset);
+}
+
+// Which elements there are: all, or those that a predicate enables.
+struct EveryElement {
+  word at(word offset, int) const { return offset; }
+};
+
+// The offset of a disabled element is that of a word of no meaning, so that nothing branches on the predicate and
+// memory is left alone all the same. Offsets are chosen one by one: vectors of them would be there so late that
+// processors run out of steps to be done meanwhile.
+class EnabledElements {
  public:
-  static constexpr int count = O::count;
-
-  // Enabled are the elements whose predicate bit is 1, or whose mask is not 0, or all: Same(true).
-  template <class PredicateUnit>
-  ElementAddresses(const void* base, const Read<O>& offsets, const PredicateUnit* predicate) {
-    LaneMask<8 * sizeof(std::uintptr_t), count> mask;
-    mask.expand(predicate);
-    fill(base, offsets, [&](int i) { return mask.lane[i]; });
+  EnabledElements(const void* base, word& nowhere, word predicate)
+      : away_(reinterpret_cast<std::uintptr_t>(&nowhere) - reinterpret_cast<std::uintptr_t>(base)),
+        predicate_(predicate) {
+    asm("" : "+m"(nowhere));  // in memory, whatever compilers make of its address
   }
-  ElementAddresses(const void* base, const Read<O>& offsets, const Read<O>& masks) {
-    fill(base, offsets, [&](int i) { return masks[i] ? ~std::uintptr_t{0} : std::uintptr_t{0}; });
-  }
-  ElementAddresses(const void* base, const Read<O>& offsets, Same<bool>) {
-    fill(base, offsets, [](int) { return ~std::uintptr_t{0}; });
-  }
-  ElementAddresses(const ElementAddresses&) = delete;
 
-  // Has the addresses in memory, to be read one by one: compilers would rather take vectors apart, which
-  // serves gathers well and scatters badly.
-  void settle() { asm("" : "+m"(at_)); }
-
-  // The element at address i, as long as a Unit.
-  template <class Unit>
-  in_memory<Unit>& element(int i) const {
-    return *reinterpret_cast<in_memory<Unit>*>(at_[i]);
+  // The offset of element i where its own is given.
+  word at(word offset, int i) const {
+    asm("" : "+r"(offset));  // known by now, so that compilers choose rather than branch
+    return (predicate_ >> i & 1) != 0 ? offset : away_;
   }
 
  private:
-  // An element's mask is all ones, or 0 when it is disabled.
-  template <class MaskOf>
-  void fill(const void* base, const Read<O>& offsets, MaskOf mask_of) {
-    const auto nowhere = reinterpret_cast<std::uintptr_t>(&nowhere_);
-    const auto from = reinterpret_cast<std::uintptr_t>(base) - nowhere;
-    KASTARRI_LANES_INDEPENDENT
-    for (int i = 0; i < count; ++i) {
-      const std::uintptr_t there = from + offsets[i];
-      at_[i] = nowhere + (there & mask_of(i));
-    }
-  }
-
-  alignas(64) std::uintptr_t at_[count];
-  word nowhere_ = 0;
+  word away_;
+  word predicate_;
 };
 
-// Eight 16-bit elements or four 32-bit ones from index i on. The compiler must not see what becomes of
-// them: an 8-bit element is read with the byte after it, used or not.
-inline __m128i fetch(const ElementAddresses<u16x32>& from, int i) {
-  __m128i units = _mm_setzero_si128();
-#define KASTARRI_INSERT(K) units = _mm_insert_epi16(units, from.element<std::int16_t>(i + K), K);
-  KASTARRI_INSERT(0)
-  KASTARRI_INSERT(1)
-  KASTARRI_INSERT(2)
-  KASTARRI_INSERT(3)
-  KASTARRI_INSERT(4)
-  KASTARRI_INSERT(5)
-  KASTARRI_INSERT(6)
-  KASTARRI_INSERT(7)
-#undef KASTARRI_INSERT
-  asm("" : "+x"(units));
-  return units;
-}
-inline __m128i fetch(const ElementAddresses<u32x16>& from, int i) {
-  const auto unit = [&](int k) { return from.element<std::int32_t>(i + k); };
-  return _mm_set_epi32(unit(3), unit(2), unit(1), unit(0));
+// The word of no meaning is what disabled elements are gathered as.
+inline EveryElement elements(const void*, word&) { return {}; }
+inline EnabledElements elements(const void* base, word& nowhere, word predicate) {
+  return EnabledElements(base, nowhere, predicate);
 }
 
-// 64 bytes from four quarters, stored in the width in which lanes are read back, so that the store forwards
-// to the load.
-inline void store_quarters(void* to, __m128i q0, __m128i q1, __m128i q2, __m128i q3) {
-#if defined __AVX512BW__
-  const __m512i low = _mm512_castsi256_si512(_mm256_set_m128i(q1, q0));
-  // The form with a mask of all ones: with the other the compiler warns of its own header.
-  _mm512_storeu_si512(to, _mm512_maskz_inserti64x4(0xFF, low, _mm256_set_m128i(q3, q2), 1));
-#elif defined __AVX2__
-  auto* half = static_cast<__m256i*>(to);
+// --- Gathers ----------------------------------------------------------------------------------------
+
+// The offset of element i. Of 16 bits every other two are loaded together: processors have as much to do with
+// loads here as with taking words apart.
+template <class O>
+inline word offset(const void* offsets, int i) {
+  if (O::bits == 32 || i % 4 > 1) return Read<O>(offsets)[i];
+  const word own_and_next = Read<u32x16>(offsets)[i / 2];
+  return i % 2 == 0 ? own_and_next & 0xFFFF : own_and_next >> 16;
+}
+
+// A block of elements from number First on, the low Bits of each.
+template <class O, int Bits, int First, class Which, std::size_t... I>
+inline __m128i fetch(const void* base, const void* offsets, Which which, std::index_sequence<I...>) {
+  const auto place = [=](int i) { return which.at(offset<O>(offsets, First + i), First + i); };
+  if constexpr (Bits == 32) {
+    const __m128i units[] = {_mm_cvtsi32_si128(element<std::int32_t>(base, place(I)))...};
+    return _mm_unpacklo_epi64(_mm_unpacklo_epi32(units[0], units[1]), _mm_unpacklo_epi32(units[2], units[3]));
+  } else {
+    __m128i units = _mm_setzero_si128();
+    ((units = _mm_insert_epi16(units, element<std::int16_t>(base, place(I)), I)), ...);
+    asm("" : "+x"(units));  // of an 8-bit element the byte after it is read, used or not
+    if constexpr (Bits == 8) units = _mm_and_si128(units, _mm_set1_epi16(0xFF));
+    return units;
+  }
+}
+
+// Gathers 32 elements of 16 or 8 bits or 16 of 32 bits into units of the offsets' width. The gather register is
+// stored and loaded in halves at most (see GatherRegister): registers of 512 bits would slow down what goes element
+// by element.
+template <class O, int Bits, class Which>
+inline void gather(const void* base, const void* offsets, Which which, word* out) {
+  constexpr int count = O::count / 4;
+  constexpr auto numbers = std::make_index_sequence<count>();
+  const __m128i q0 = fetch<O, Bits, 0>(base, offsets, which, numbers);
+  const __m128i q1 = fetch<O, Bits, count>(base, offsets, which, numbers);
+  const __m128i q2 = fetch<O, Bits, 2 * count>(base, offsets, which, numbers);
+  const __m128i q3 = fetch<O, Bits, 3 * count>(base, offsets, which, numbers);
+#if defined __AVX2__
+  auto* half = reinterpret_cast<__m256i*>(out);
   _mm256_storeu_si256(half, _mm256_set_m128i(q1, q0));
   _mm256_storeu_si256(half + 1, _mm256_set_m128i(q3, q2));
 #else
-  auto* quarter = static_cast<__m128i*>(to);
+  auto* quarter = reinterpret_cast<__m128i*>(out);
   _mm_storeu_si128(quarter, q0);
   _mm_storeu_si128(quarter + 1, q1);
   _mm_storeu_si128(quarter + 2, q2);
@@ -106,35 +100,84 @@ inline void store_quarters(void* to, __m128i q0, __m128i q1, __m128i q2, __m128i
 #endif
 }
 
-// Gathers whole elements, of 16 bits from 32 offsets, of 32 bits from 16. A disabled one reads 0.
+// The gather register as it is read: in the halves that it was stored in, so that stores forward to loads.
+class GatherRegister {
+ public:
+  explicit GatherRegister(const word* stored) {
+#if defined __AVX512BW__
+    const auto* half = reinterpret_cast<const __m256i*>(stored);
+    const __m512i low = _mm512_castsi256_si512(_mm256_loadu_si256(half));
+    // The form with a mask of all ones: with the other the compiler warns of its own header.
+    _mm512_store_si512(units_, _mm512_maskz_inserti64x4(0xFF, low, _mm256_loadu_si256(half + 1), 1));
+#else
+    std::memcpy(units_, stored, sizeof units_);
+#endif
+  }
+  Read<u16x32> units() const { return Read<u16x32>(units_); }
+
+ private:
+  alignas(64) word units_[16];
+};
+
+// --- Scatters ---------------------------------------------------------------------------------------
+
+// The lanes of an operand in turn, from registers: what is stored between two of them may lie anywhere, in the
+// operand too, and a processor that takes a load to depend on such stores does one element after the other.
+template <class L>
+class InTurn {
+ public:
+  explicit InTurn(const void* operand) : InTurn(operand, std::make_index_sequence<L::bits * L::count / 128>()) {}
+
+  // For i = 0, 1 ...
+  template <int i>
+  typename L::container lane() {
+    __m128i& block = block_[i * L::bits / 128];
+    if constexpr (i * L::bits % 32 == 0) {
+      word_ = static_cast<word>(_mm_cvtsi128_si32(block));
+      block = _mm_srli_si128(block, 4);
+    } else {
+      word_ >>= L::bits;
+    }
+    return static_cast<typename L::container>(word_);
+  }
+
+ private:
+  template <std::size_t... I>
+  InTurn(const void* operand, std::index_sequence<I...>)
+      : block_{_mm_loadu_si128(static_cast<const __m128i*>(operand) + I)...} {}
+
+  __m128i block_[L::bits * L::count / 128];
+  word word_ = 0;
+};
+
+template <class Element>
+inline void store(in_memory<Element>& element, Element value) {
+  if constexpr (sizeof(Element) == 1) asm volatile("" : : "q"((&element)[1]));  // the byte after it is read
+  element = value;
+}
+
+// Stores each lane of the data, in ascending order.
+template <class Element, class O, class D, class Which, std::size_t... I>
+inline void scatter(void* base, const void* offsets, Which which, const void* data, std::index_sequence<I...>) {
+  InTurn<O> to(offsets);
+  InTurn<D> from(data);
+  (store(element<Element>(base, which.at(to.template lane<I>(), I)), static_cast<Element>(from.template lane<I>())),
+   ...);
+}
+template <class Element, class O, class D, class Which>
+inline void scatter(void* base, const void* offsets, Which which, const void* data) {
+  scatter<Element, O, D>(base, offsets, which, data, std::make_index_sequence<O::count>());
+}
+
+// Adds 1 to each element, in ascending order.
+template <class O, std::size_t... I>
+inline void increment(void* base, const void* offsets, std::index_sequence<I...>) {
+  InTurn<O> to(offsets);
+  (++element<typename O::container>(base, to.template lane<I>()), ...);
+}
 template <class O>
-inline void gather(const ElementAddresses<O>& from, word* out) {
-  constexpr int step = O::count / 4;
-  store_quarters(out, fetch(from, 0), fetch(from, step), fetch(from, 2 * step), fetch(from, 3 * step));
-}
-
-// Each element, in ascending order, becomes value(i). The byte after an 8-bit element is read.
-template <class Element, class O, class Value>
-inline void scatter(ElementAddresses<O>&& to, Value value) {
-  to.settle();
-  KASTARRI_UNROLLED
-  for (int i = 0; i < O::count; ++i) {
-    in_memory<Element>& element = to.template element<Element>(i);
-    if constexpr (sizeof(Element) == 1) asm volatile("" : : "q"((&element)[1]));
-    element = static_cast<Element>(value(i));
-  }
-}
-
-// Each element, in ascending order, is read as a unit of the offsets' width and becomes rule(unit, i).
-template <class Element, class O, class Rule>
-inline void modify(ElementAddresses<O>&& to, Rule rule) {
-  to.settle();
-  KASTARRI_UNROLLED
-  for (int i = 0; i < O::count; ++i) {
-    using Unit = typename O::container;
-    const Unit unit = to.template element<Unit>(i);
-    to.template element<Element>(i) = static_cast<Element>(rule(unit, i));
-  }
+inline void increment(void* base, const void* offsets) {
+  increment<O>(base, offsets, std::make_index_sequence<O::count>());
 }
 
 }  // namespace

@@ -6,6 +6,7 @@
 
 #include "frame/lanes.h"
 #include "kastarri/state.h"
+#include "kastarri/tables.h"
 
 namespace {
 
@@ -36,8 +37,9 @@ class MergeMask {
     const word* const table = cstub_Km_ZNB_Orbis_R5_64k_mask;
 #if defined __AVX512BW__
     // The forms with a mask of all ones: with the others the compiler warns of its own headers.
-    const __m512i all_lanes = _mm512_maskz_inserti64x4(0xFF, _mm512_set1_epi32(disabled(predicate, 0)),
-                                                       _mm256_set1_epi32(disabled(predicate, Words / 2)), 1);
+    __m512i all_lanes = _mm512_set1_epi32(disabled(predicate, 0));
+    if constexpr (lanes_a_word * Words == 64)
+      all_lanes = _mm512_maskz_inserti64x4(0xFF, all_lanes, _mm256_set1_epi32(disabled(predicate, Words / 2)), 1);
     const __m512i lanes = _mm512_maskz_srlv_epi32(0xFFFF, all_lanes, _mm512_load_si512(step.first_lane));
     const __m512i bytes =
         LaneBytes == 1 ? lanes : _mm512_maskz_permutexvar_epi32(0xFFFF, lanes, _mm512_load_si512(step.bytes));
@@ -82,6 +84,22 @@ class MergeMask {
   static constexpr MergeStep<lanes_a_word> step{};
 };
 
+// Whether the table is known to be as it was at first: a byte is then stored where its lane is enabled. Only where
+// registers do not hold the table does it pay to ask; and clang vectorises no two such merges side by side.
+inline bool merges_plainly() {
+#if defined __AVX2__ || defined __clang__
+  return false;
+#else
+  __m128i inverse = _mm_set1_epi32(-1);
+  for (int i = 0; i < 16; i += 4) {
+    const auto load = [i](const word* from) { return _mm_loadu_si128(reinterpret_cast<const __m128i*>(from + i)); };
+    inverse = _mm_and_si128(inverse, _mm_xor_si128(load(cstub_Km_ZNB_Orbis_R5_64k_mask),
+                                                   load(cstub_Km_ZNB_Orbis_R5_64k_table__rk_bytelane_lsb)));
+  }
+  return _mm_movemask_epi8(_mm_cmpeq_epi32(inverse, _mm_set1_epi32(-1))) == 0xFFFF;
+#endif
+}
+
 // Stores lane i of v by the rule where the predicate enables it. Memory is not touched when no lane is
 // enabled; else, unless all are, every word of it is read and written back.
 template <class M, class Rule, class Operand, class PredicateUnit>
@@ -100,12 +118,20 @@ inline void store_where(const Operand& v, Rule rule, const PredicateUnit* predic
   }
   using Bits = std::make_unsigned_t<typename M::container>;
   using MaskLanes = Layout<Bits, M::bits, M::count>;
+  const auto merge = [&](const void* mask) {
+    const auto rule_where = [rule](auto lane, Bits old, Bits enabled) {
+      return static_cast<Bits>(old ^ ((static_cast<Bits>(rule(lane)) ^ old) & enabled));
+    };
+    lanes<M::count>(Write<MaskLanes>(to), rule_where, v, Read<MaskLanes>(to), Read<MaskLanes>(mask));
+  };
+  if (sizeof(Bits) * M::count == 64 && merges_plainly()) {
+    LaneMask<M::bits, M::count> enabled;
+    enabled.expand(predicate);
+    return merge(enabled.lane);
+  }
   MergeMask<sizeof(Bits), M::count * sizeof(Bits) / 4> mask;
   mask.look_up(predicate);
-  const auto merge = [rule](auto lane, Bits old, Bits enabled) {
-    return static_cast<Bits>(old ^ ((static_cast<Bits>(rule(lane)) ^ old) & enabled));
-  };
-  lanes<M::count>(Write<MaskLanes>(to), merge, v, Read<MaskLanes>(to), Read<MaskLanes>(mask.of_word));
+  merge(mask.of_word);
 }
 
 }  // namespace

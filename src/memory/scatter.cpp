@@ -1,34 +1,24 @@
 // Scatters.
 #include "memory/gather.h"
 
-namespace {
-
-// What enables the upper half of the lanes.
-inline Same<bool> upper(Same<bool> all) { return all; }
-inline const word* upper(const word* predicate) { return predicate + 1; }
-
-}  // namespace
-
 #include "frame/stamp.h"
 
-// The layout of the offsets, the element, the layout of the data.
-#define KERNEL_scatter(OP, O, ELEMENT, D)                                                                           \
-  template <class Units, class Offsets, class Enabled, class Memory>                                                \
-  static inline void KASTARRI_SEMANTIC(OP)(const Units* v, const Offsets* offsets, Enabled enabled, Memory* base) { \
-    const Read<D> data(v);                                                                                          \
-    scatter<ELEMENT>(ElementAddresses<O>(base, Read<O>(offsets), enabled), [&](int i) { return data[i]; });         \
+// The layout of the offsets, the element, the layout of the data, the first lane of the data.
+#define KERNEL_scatter_from(OP, O, ELEMENT, D, FIRST)                                            \
+  template <class Units, class Offsets, class Memory, class... Predicate>                        \
+  static inline void KASTARRI_SEMANTIC(OP)(const Units* v, const Offsets* offsets, Memory* base, \
+                                           const Predicate*... predicate) {                      \
+    word nowhere = 0;                                                                            \
+    scatter<ELEMENT, O, D>(base, offsets, elements(base, nowhere, predicate[FIRST / 32]...),     \
+                           v + FIRST * D::bits / 32);                                            \
   }
-#define KERNEL_scatter_high(OP, O, ELEMENT, D)                                                                  \
-  KERNEL_scatter(OP##_of, O, ELEMENT, D) template <class Enabled, class Memory>                                 \
-  static inline void KASTARRI_SEMANTIC(OP)(const word* v, const word* offsets, Enabled enabled, Memory* base) { \
-    KASTARRI_SEMANTIC(OP##_of)(v + 8, offsets, upper(enabled), base);                                           \
-  }
+#define KERNEL_scatter(OP, O, ELEMENT, D) KERNEL_scatter_from(OP, O, ELEMENT, D, 0)
+#define KERNEL_scatter_high(OP, O, ELEMENT, D) KERNEL_scatter_from(OP, O, ELEMENT, D, 32)
 
-#define KERNEL_increment(OP, O)                                                   \
-  template <class Units, class Memory>                                            \
-  static inline void KASTARRI_SEMANTIC(OP)(const Units* offsets, Memory* base) {  \
-    modify<O::container>(ElementAddresses<O>(base, Read<O>(offsets), Same(true)), \
-                         [](O::container old, int) { return old + 1u; });         \
+#define KERNEL_increment(OP, O)                                                  \
+  template <class Units, class Memory>                                           \
+  static inline void KASTARRI_SEMANTIC(OP)(const Units* offsets, Memory* base) { \
+    increment<O>(base, offsets);                                                 \
   }
 
 #include "memory/scatter.def"

@@ -73,19 +73,16 @@
 
 // --- Gather and scatter: E the element, O the vector of offsets -------------------------------------
 
-// What enables the elements of a form without a predicate.
-#define KASTARRI_EVERY_ELEMENT Same(true)
-
 #define SIG_gather(SYMBOL, E, O, K) qv_gsr SYMBOL(const E* base, const O& offsets)
-#define BODY_gather(E, O, K)                                          \
-  qv_gsr r;                                                           \
-  KASTARRI_SEMANTIC(K)(base, offsets._, KASTARRI_EVERY_ELEMENT, r._); \
+#define BODY_gather(E, O, K)                  \
+  qv_gsr r;                                   \
+  KASTARRI_SEMANTIC(K)(base, offsets._, r._); \
   return r;
 
 #define SIG_gather_T(SYMBOL, E, O, P, K) qv_gsr SYMBOL(const E* base, const O& offsets, const P& p)
 #define BODY_gather_T(E, O, P, K)                  \
   qv_gsr r;                                        \
-  KASTARRI_SEMANTIC(K)(base, offsets._, p._, r._); \
+  KASTARRI_SEMANTIC(K)(base, offsets._, r._, p._); \
   return r;
 
 // With an int of which the result does not depend.
@@ -105,10 +102,10 @@
 #define BODY_gathered_part(V, K) KASTARRI_SEMANTIC(K)(gathered._, r._);
 
 #define SIG_scatter(SYMBOL, V, E, O, K) void SYMBOL(const V& v, const E* base, const O& offsets)
-#define BODY_scatter(V, E, O, K) KASTARRI_SEMANTIC(K)(v._, offsets._, KASTARRI_EVERY_ELEMENT, writable(base));
+#define BODY_scatter(V, E, O, K) KASTARRI_SEMANTIC(K)(v._, offsets._, writable(base));
 
 #define SIG_scatter_T(SYMBOL, V, E, O, P, K) void SYMBOL(const V& v, const E* base, const O& offsets, const P& p)
-#define BODY_scatter_T(V, E, O, P, K) KASTARRI_SEMANTIC(K)(v._, offsets._, p._, writable(base));
+#define BODY_scatter_T(V, E, O, P, K) KASTARRI_SEMANTIC(K)(v._, offsets._, writable(base), p._);
 
 #define SIG_increment(SYMBOL, E, O, K) void SYMBOL(const E* base, const O& offsets)
 #define BODY_increment(E, O, K) KASTARRI_SEMANTIC(K)(offsets._, writable(base));

@@ -6,8 +6,11 @@ namespace model {
 using testing_support::Int;
 
 constexpr auto SAME = [](Int lane) { return lane; };
-constexpr auto SATURATE8 = [](Int lane) { return std::clamp<Int>(lane, -128, 127); };
-constexpr auto SATURATE16 = [](Int lane) { return std::clamp<Int>(lane, -32768, 32767); };
+template <int Bits>
+constexpr auto SATURATE =
+    [](Int lane) { return std::clamp<Int>(lane, -(Int{1} << (Bits - 1)), (Int{1} << (Bits - 1)) - 1); };
+constexpr auto SATURATE8 = SATURATE<8>;
+constexpr auto SATURATE16 = SATURATE<16>;
 
 }  // namespace model
 
@@ -17,6 +20,8 @@ constexpr auto SATURATE16 = [](Int lane) { return std::clamp<Int>(lane, -32768, 
 #undef KERNEL_a
 #define KERNEL_a(OP, R, RULE, A) constexpr auto model_##OP = testing_support::memory_model<R, A>(model::RULE);
 #define KERNEL_store_where KERNEL_a
+#define KERNEL_saturated(OP, R, A) KERNEL_a(OP, R, SATURATE<R::bits>, A)
+#define KERNEL_saturated_where KERNEL_saturated
 #define KERNEL_replicate(OP, R, E) KERNEL_a(OP, R, SAME, E)
 
 #define TEST_load_I(NAME, F, V, M, K) testing_support::drive_load_I(NAME, model_##K, F)

@@ -226,8 +226,7 @@ void drive_gathered_part(const std::string& name, void (*f)(V&, const qv_gsr&)) 
 
 #define TEST_gathered(NAME, F, V, K) testing_support::drive_gathered(NAME, F)
 #define TEST_gathered_part(NAME, F, V, K) testing_support::drive_gathered_part(NAME, F)
-#undef KERNEL_a
-#define KERNEL_a(...)
+#define KERNEL_gathered(...)
 #define KERNEL_gathered_low(...)
 #define KERNEL_gathered_high(...)
 
@@ -293,6 +292,21 @@ TEST(Gather, CountsAndOrdersCollisions) {
   p._[0] = 1u << 3 | 1u << 7;
   ZRA(SCATTERNX16T)(v, &cell, filled<qv_vecNx16U>(0), p);
   EXPECT_EQ(cell, 777);
+}
+
+// Operands are as they were before the first element is stored, which may be in an operand.
+TEST(Gather, ScattersOverItsOperands) {
+  qv_vecNx16U numbers, down;
+  for (int i = 0; i < 32; ++i) {
+    set_lane<u16x32>(numbers._, i, 100 + i);
+    set_lane<u16x32>(down._, i, 2 * (31 - i));
+  }
+  const auto* in_numbers = reinterpret_cast<const unsigned short*>(numbers._);
+  const auto* in_down = reinterpret_cast<const unsigned short*>(down._);
+  ZRA(SCATTERNX16U)(numbers, in_numbers, down);
+  for (int i = 0; i < 32; ++i) EXPECT_EQ(lane<u16x32>(numbers._, i), 131 - i);
+  ZRA(SCATTERNX16UT)(numbers, in_down, down, filled<vboolN>(0xFF));
+  for (int i = 0; i < 32; ++i) EXPECT_EQ(lane<u16x32>(down._, i), 100 + i);
 }
 
 }  // namespace

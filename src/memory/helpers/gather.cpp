@@ -14,11 +14,16 @@ struct Control {
 };
 
 // A disabled element's mask is 0, and so is what it gathers.
-template <class L>
-void gather_masked(const void* base, const unsigned* offsets, const unsigned* masks, word kept, unsigned* out) {
-  gather(ElementAddresses<L>(base, Read<L>(offsets), Read<L>(masks)), out);
+template <class L, int Bits>
+void gather_masked(const void* base, const unsigned* offsets, const unsigned* masks, unsigned* out) {
+  const Read<L> mask(masks);
+  word enabled = 0;
+  for (int i = 0; i < L::count; ++i) enabled |= word{mask[i] != 0} << i;
+  alignas(64) word units[16];
+  word nowhere = 0;
+  gather<L, Bits>(base, offsets, elements(base, nowhere, enabled), units);
   lanes<L::count>(
-      Write<L>(out), [kept](word unit, word mask) { return unit & mask & kept; }, Read<L>(out), Read<L>(masks));
+      Write<L>(out), [](word unit, word mask_lane) { return unit & mask_lane; }, Read<L>(units), mask);
 }
 
 // Elements of 8 bits are read in 16-bit units whatever becomes of the upper byte.
@@ -26,11 +31,14 @@ template <class L, class Element>
 void scatter_masked(const void* base, const unsigned* offsets, const unsigned* masks, bool increment,
                     const unsigned* data) {
   using Unit = typename L::container;
-  const Read<L> mask(masks), lane(data);
-  modify<Element>(ElementAddresses<L>(base, Read<L>(offsets), mask), [&](Unit old, int i) {
+  const Read<L> mask(masks), lane(data), offset(offsets);
+  for (int i = 0; i < L::count; ++i) {
+    if (mask[i] == 0) continue;
+    const Unit old = element<Unit>(base, offset[i]);
     asm volatile("" : : "r"(old));
-    return increment ? old + (mask[i] & 1u) : old ^ (mask[i] & (lane[i] ^ old));
-  });
+    const auto merged = increment ? old + (mask[i] & 1u) : old ^ (mask[i] & (lane[i] ^ old));
+    element<Element>(base, offset[i]) = static_cast<Element>(merged);
+  }
 }
 
 }  // namespace
@@ -38,8 +46,9 @@ void scatter_masked(const void* base, const unsigned* offsets, const unsigned* m
 void cstub_Km_ZNB_Orbis_R5_64k_do_gathera(const void* base, const unsigned* offsets, const unsigned* masks,
                                           unsigned control, unsigned* out) {
   const Control c(control);
-  if (c.path == 0) gather_masked<u16x32>(base, offsets, masks, c.bytes ? 0xFF : 0xFFFF, out);
-  if (c.path == 1) gather_masked<u32x16>(base, offsets, masks, 0xFFFFFFFF, out);
+  if (c.path == 0 && c.bytes) gather_masked<u16x32, 8>(base, offsets, masks, out);
+  if (c.path == 0 && !c.bytes) gather_masked<u16x32, 16>(base, offsets, masks, out);
+  if (c.path == 1) gather_masked<u32x16, 32>(base, offsets, masks, out);
 }
 
 void cstub_Km_ZNB_Orbis_R5_64k_do_scatter(const void* base, const unsigned* offsets, const unsigned* masks,

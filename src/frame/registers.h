@@ -121,6 +121,66 @@ inline Vector<std::int32_t> sums_of_products(Vector<std::int16_t> a, Vector<std:
 #endif
 }
 
+// The bits that at least two of three hold.
+inline Vector<std::int32_t> majority(Vector<std::int32_t> a, Vector<std::int32_t> b, Vector<std::int32_t> c) {
+#if defined __AVX512BW__
+  return reinterpret_cast<Vector<std::int32_t>>(_mm512_ternarylogic_epi32(
+      reinterpret_cast<__m512i>(a), reinterpret_cast<__m512i>(b), reinterpret_cast<__m512i>(c), 0xE8));
+#else
+  return (a & b) | ((a | b) & c);
+#endif
+}
+
+// The upper halves of 32-bit products.
+inline Vector<std::int16_t> upper_halves(Vector<std::int16_t> a, Vector<std::int16_t> b) {
+#if defined __AVX512BW__
+  return reinterpret_cast<Vector<std::int16_t>>(
+      _mm512_mulhi_epi16(reinterpret_cast<__m512i>(a), reinterpret_cast<__m512i>(b)));
+#elif defined __AVX2__
+  return reinterpret_cast<Vector<std::int16_t>>(
+      _mm256_mulhi_epi16(reinterpret_cast<__m256i>(a), reinterpret_cast<__m256i>(b)));
+#else
+  return reinterpret_cast<Vector<std::int16_t>>(
+      _mm_mulhi_epi16(reinterpret_cast<__m128i>(a), reinterpret_cast<__m128i>(b)));
+#endif
+}
+inline Vector<std::uint16_t> upper_halves(Vector<std::uint16_t> a, Vector<std::uint16_t> b) {
+#if defined __AVX512BW__
+  return reinterpret_cast<Vector<std::uint16_t>>(
+      _mm512_mulhi_epu16(reinterpret_cast<__m512i>(a), reinterpret_cast<__m512i>(b)));
+#elif defined __AVX2__
+  return reinterpret_cast<Vector<std::uint16_t>>(
+      _mm256_mulhi_epu16(reinterpret_cast<__m256i>(a), reinterpret_cast<__m256i>(b)));
+#else
+  return reinterpret_cast<Vector<std::uint16_t>>(
+      _mm_mulhi_epu16(reinterpret_cast<__m128i>(a), reinterpret_cast<__m128i>(b)));
+#endif
+}
+
+// The low 24 bits of a word, the low 48 of a pair of words, sign-extended. Where a target can multiply some lanes and
+// leave the rest, the sign is that of a product with 1.
+inline Vector<std::uint32_t> extended_from_24(Vector<std::uint32_t> v) {
+#if defined __AVX512BW__
+  const auto all = reinterpret_cast<__m512i>(v);
+  return reinterpret_cast<Vector<std::uint32_t>>(_mm512_mask_maddubs_epi16(all, 0xAAAAAAAA, _mm512_set1_epi16(1), all));
+#else
+  return reinterpret_cast<Vector<std::uint32_t>>(reinterpret_cast<Vector<std::int32_t>>(v << 8) >> 8);
+#endif
+}
+inline Vector<std::uint64_t> extended_from_48(Vector<std::uint64_t> v) {
+#if defined __AVX512BW__
+  const auto all = reinterpret_cast<__m512i>(v);
+  return reinterpret_cast<Vector<std::uint64_t>>(_mm512_mask_madd_epi16(all, 0xAAAA, all, _mm512_set1_epi32(1)));
+#elif defined __AVX2__
+  const auto all = reinterpret_cast<__m256i>(v);
+  return reinterpret_cast<Vector<std::uint64_t>>(
+      _mm256_blend_epi32(all, _mm256_madd_epi16(all, _mm256_set1_epi32(1)), 0xAA));
+#else
+  constexpr std::uint64_t sign = std::uint64_t{1} << 47;
+  return ((v & (2 * sign - 1)) ^ sign) - sign;
+#endif
+}
+
 // The bytes from Bytes on of a followed by b.
 template <int Bytes>
 inline Vector<std::uint8_t> from_byte(Vector<std::uint8_t> a, Vector<std::uint8_t> b) {

@@ -81,6 +81,18 @@ inline Vector<Lane> interleaved(Vector<std::uint8_t> a, Vector<std::uint8_t> b) 
   return interleaved<Half, Lane>(as<Lane>(a), as<Lane>(b), std::make_index_sequence<lanes_in_register<Lane>>());
 }
 
+// The even (First = 0) or odd (1) words of a and b, block by block: a's, then b's. As numbers they are shuffled in one
+// step.
+template <int First, std::size_t... I>
+inline Vector<float> every_other_word(Vector<float> a, Vector<float> b, std::index_sequence<I...>) {
+  return __builtin_shufflevector(a, b, (I / 4 * 4 + I % 2 * 2 + First + I % 4 / 2 * sizeof...(I))...);
+}
+template <int First>
+inline Vector<std::uint32_t> every_other_word(Vector<std::uint8_t> a, Vector<std::uint8_t> b) {
+  return reinterpret_cast<Vector<std::uint32_t>>(
+      every_other_word<First>(as<float>(a), as<float>(b), std::make_index_sequence<lanes_in_register<float>>()));
+}
+
 // The lanes of a register, of which every block holds one of each of its parts, with the parts in order.
 template <class Lane, std::size_t... I>
 inline Vector<Lane> in_order(Vector<Lane> v, std::index_sequence<I...>) {
@@ -128,6 +140,19 @@ inline Vector<std::int32_t> majority(Vector<std::int32_t> a, Vector<std::int32_t
       reinterpret_cast<__m512i>(a), reinterpret_cast<__m512i>(b), reinterpret_cast<__m512i>(c), 0xE8));
 #else
   return (a & b) | ((a | b) & c);
+#endif
+}
+
+// Words shifted right by a count that all share. Compilers take such a count through memory in two halves, which a load
+// of both waits for.
+inline Vector<std::int32_t> shifted_right(Vector<std::int32_t> v, std::uint32_t count) {
+  const __m128i shared = _mm_cvtsi32_si128(static_cast<int>(count));
+#if defined __AVX512BW__
+  return reinterpret_cast<Vector<std::int32_t>>(_mm512_maskz_sra_epi32(0xFFFF, reinterpret_cast<__m512i>(v), shared));
+#elif defined __AVX2__
+  return reinterpret_cast<Vector<std::int32_t>>(_mm256_sra_epi32(reinterpret_cast<__m256i>(v), shared));
+#else
+  return reinterpret_cast<Vector<std::int32_t>>(_mm_sra_epi32(reinterpret_cast<__m128i>(v), shared));
 #endif
 }
 

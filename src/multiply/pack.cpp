@@ -5,6 +5,7 @@
 #include "multiply/fractions.h"
 #include "multiply/saturated.h"
 #include "multiply/scaled.h"
+#include "multiply/shifted.h"
 
 namespace {
 
@@ -24,17 +25,16 @@ class Alternate24 {
   Read<u64x32> pairs_;
 };
 
-// The two words of a lane: of a 48-bit lane the upper one as it stands in memory.
-struct Words {
-  word low, high;
+// A register of these lanes.
+struct Whole24 {
+  static Word part(const void* acc, int k) { return load_register<word>(acc, k); }
 };
-class InWords {
- public:
-  explicit InWords(const void* lanes) : words_(static_cast<const in_memory<word>*>(lanes)) {}
-  Words operator[](int i) const { return {words_[2 * i], words_[2 * i + 1]}; }
-
- private:
-  const in_memory<word>* words_;
+template <int First>
+struct Part24 {
+  static Word part(const void* acc, int k) {
+    const auto a = load_register<std::uint8_t>(acc, 2 * k), b = load_register<std::uint8_t>(acc, 2 * k + 1);
+    return as<word>(bits_of(in_order<std::uint64_t>(bits_of(every_other_word<First>(a, b)))));
+  }
 };
 
 // The whole containers of 64-bit lanes, which compilers read better than signed ones.
@@ -168,23 +168,6 @@ using Pack48 = PackPairs<48, Rounding>;
 template <class Rounding>
 using Pack64 = PackPairs<64, Rounding>;
 
-// A 48-bit lane packed to 16 bits by a count that all lanes share needs no more than 32 bits of it: for a count
-// up to 16 the lane clamped to 32 bits, since whatever lies beyond saturates anyway; above 16 the lane without its
-// low 16 bits, of which no shift leaves a trace.
-constexpr std::int32_t low_part(Words x) {
-  const auto low = static_cast<std::int32_t>(x.low);
-  const auto high = static_cast<std::int32_t>(x.high << 16);
-  const std::int32_t bound = (high >> 31) ^ std::numeric_limits<std::int32_t>::max();
-  return static_cast<word>(low >> 31) << 16 == unsigned_bits(high) ? low : bound;
-}
-constexpr std::int32_t high_part(Words x) { return static_cast<std::int32_t>(x.high << 16 | x.low >> 16); }
-
-constexpr auto pack48_unshifted = [](Words x) { return low_part(x); };
-template <class Rounding>
-constexpr auto pack48_low = [](Words x, word s) { return Rounding::down(Shared{}, low_part(x), s); };
-template <class Rounding>
-constexpr auto pack48_high = [](Words x, word s) { return Rounding::down(Shared{}, high_part(x), s - 16); };
-
 // Applies a rule that makes words or pairs of them to every lane, and saturates.
 template <class R, class Rule, class... Operands>
 inline void pack(word* r, Rule rule, const Operands&... operands) {
@@ -214,10 +197,12 @@ inline void pack_by_counts(word* r, Rule rule, const Lanes& lanes_packed, const 
 }
 
 template <class R, class Rounding, class Lanes>
-inline void pack48(const Lanes& lanes, word count, word* r) {
-  const word s = clamped(count, word{32});
-  if (s == 0) return pack<R>(r, pack48_unshifted, lanes);
-  s > 16 ? pack<R>(r, pack48_high<Rounding>, lanes, Same(s)) : pack<R>(r, pack48_low<Rounding>, lanes, Same(s));
+inline void pack24_shifted(const word* acc, word count, word* r) {
+  const word s = clamped(count, word{23});
+  Saturated<std::int32_t, typename R::container, R::count> results;
+  for (int k = 0; k < 4 * R::count / register_bytes; ++k)
+    store_register(results.lane, k, shifted24<Rounding>(Lanes::part(acc, k), s));
+  results.collect(r);
 }
 
 }  // namespace
@@ -237,15 +222,27 @@ inline void pack48(const Lanes& lanes, word count, word* r) {
     pack<R>(                                                                       \
         r, [s](auto x) { return RULE(Shared{}, x, s); }, LANES(acc));              \
   }
-#define KERNEL_shift48(OP, R, ROUNDING, LANES)                                     \
+#define KERNEL_shift24(OP, R, ROUNDING, LANES)                                     \
   static inline void KASTARRI_SEMANTIC(OP)(const word* acc, word count, word* r) { \
-    pack48<R, ROUNDING>(LANES(acc), count, r);                                     \
+    pack24_shifted<R, ROUNDING, LANES>(acc, count, r);                             \
+  }
+#define KERNEL_shift48(OP, ROUNDING)                                               \
+  static inline void KASTARRI_SEMANTIC(OP)(const word* acc, word count, word* r) { \
+    pack48<ROUNDING>(acc, clamped(count, word{32}), r);                            \
   }
 
 // A count a lane, in layout C.
 #define KERNEL_counts(OP, R, RULE, BOUND, LANES, C)                                        \
   static inline void KASTARRI_SEMANTIC(OP)(const word* acc, const word* counts, word* r) { \
     pack_by_counts<R, BOUND>(r, RULE, LANES(acc), Read<C>(counts));                        \
+  }
+
+#define KERNEL_counts48(OP, ROUNDING)                                                       \
+  static inline void KASTARRI_SEMANTIC(OP)(const word* acc, const word* counts, word* r) {  \
+    if constexpr (lanes_shift_alone && !pairs_shift_signed)                                 \
+      pack48_by_counts<ROUNDING>(acc, counts, r);                                           \
+    else                                                                                    \
+      pack_by_counts<i16x32, 32>(r, Pack48<ROUNDING>{}, All<u64x32>(acc), Read<u16x32>(counts)); \
   }
 
 #include "multiply/pack.def"

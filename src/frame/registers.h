@@ -143,17 +143,37 @@ inline Vector<std::int32_t> majority(Vector<std::int32_t> a, Vector<std::int32_t
 #endif
 }
 
-// Words shifted right by a count that all share. Compilers take such a count through memory in two halves, which a load
-// of both waits for.
-inline Vector<std::int32_t> shifted_right(Vector<std::int32_t> v, std::uint32_t count) {
-  const __m128i shared = _mm_cvtsi32_si128(static_cast<int>(count));
+// Counts to shift words by: the lanes' own, or where the target has no such shift one for all. Any count serves that is
+// below 32 or stands for nothing being left. (Compilers take a count that all share through memory in two halves, which
+// a load of both waits for.)
 #if defined __AVX512BW__
-  return reinterpret_cast<Vector<std::int32_t>>(_mm512_maskz_sra_epi32(0xFFFF, reinterpret_cast<__m512i>(v), shared));
+using Counts = __m512i;
+inline Counts counts_of(std::uint32_t n) { return _mm512_set1_epi32(static_cast<int>(n)); }
+inline Counts counts_of(Vector<std::uint32_t> n) { return reinterpret_cast<Counts>(n); }
+inline __m512i left_by(__m512i v, Counts n) { return _mm512_maskz_sllv_epi32(0xFFFF, v, n); }
+inline __m512i right_by(__m512i v, Counts n, std::uint32_t) { return _mm512_maskz_srlv_epi32(0xFFFF, v, n); }
+inline __m512i right_by(__m512i v, Counts n, std::int32_t) { return _mm512_maskz_srav_epi32(0xFFFF, v, n); }
 #elif defined __AVX2__
-  return reinterpret_cast<Vector<std::int32_t>>(_mm256_sra_epi32(reinterpret_cast<__m256i>(v), shared));
+using Counts = __m256i;
+inline Counts counts_of(std::uint32_t n) { return _mm256_set1_epi32(static_cast<int>(n)); }
+inline Counts counts_of(Vector<std::uint32_t> n) { return reinterpret_cast<Counts>(n); }
+inline __m256i left_by(__m256i v, Counts n) { return _mm256_sllv_epi32(v, n); }
+inline __m256i right_by(__m256i v, Counts n, std::uint32_t) { return _mm256_srlv_epi32(v, n); }
+inline __m256i right_by(__m256i v, Counts n, std::int32_t) { return _mm256_srav_epi32(v, n); }
 #else
-  return reinterpret_cast<Vector<std::int32_t>>(_mm_sra_epi32(reinterpret_cast<__m128i>(v), shared));
+using Counts = __m128i;
+inline Counts counts_of(std::uint32_t n) { return _mm_cvtsi32_si128(static_cast<int>(n)); }
+inline __m128i left_by(__m128i v, Counts n) { return _mm_sll_epi32(v, n); }
+inline __m128i right_by(__m128i v, Counts n, std::uint32_t) { return _mm_srl_epi32(v, n); }
+inline __m128i right_by(__m128i v, Counts n, std::int32_t) { return _mm_sra_epi32(v, n); }
 #endif
+template <class Lane>
+inline Vector<Lane> shifted_left(Vector<Lane> v, Counts n) {
+  return reinterpret_cast<Vector<Lane>>(left_by(reinterpret_cast<Counts>(v), n));
+}
+template <class Lane>
+inline Vector<Lane> shifted_right(Vector<Lane> v, Counts n) {
+  return reinterpret_cast<Vector<Lane>>(right_by(reinterpret_cast<Counts>(v), n, Lane{}));
 }
 
 // The upper halves of 32-bit products.

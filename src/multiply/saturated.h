@@ -1,4 +1,4 @@
-// Words clamped to narrower lanes, and every other lane taken out of a register. Processors have single
+// Words clamped to narrower lanes. Processors have single
 // instructions for these that compilers do not find, so this is the one place that names them.
 #ifndef KASTARRI_MULTIPLY_SATURATED_H
 #define KASTARRI_MULTIPLY_SATURATED_H
@@ -13,18 +13,6 @@
 #include "frame/registers.h"
 
 namespace {
-
-// Whether lanes can shift by counts of their own, as fast as by one that they share, and those of 64 bits as signed.
-#if defined __AVX2__
-constexpr bool lanes_shift_alone = true;
-#else
-constexpr bool lanes_shift_alone = false;
-#endif
-#if defined __AVX512BW__
-constexpr bool pairs_shift_signed = true;
-#else
-constexpr bool pairs_shift_signed = false;
-#endif
 
 // Words clamped to halves, halves to bytes, block by block: first those of a, then those of b.
 #if defined __AVX512BW__
@@ -44,28 +32,9 @@ inline Register pack_halves(Register a, Register b, std::int8_t) { return _mm_pa
 inline Register pack_halves(Register a, Register b, std::uint8_t) { return _mm_packus_epi16(a, b); }
 #endif
 
-// Lanes First, First + 2, ... of 32 lanes in 64-bit containers.
-template <int First>
-class Alternate48 {
- public:
-  explicit Alternate48(const void* acc) {
-    for (int k = 0; k < static_cast<int>(sizeof lanes_) / register_bytes; ++k) {
-      const auto a = load_register<std::uint8_t>(acc, 2 * k), b = load_register<std::uint8_t>(acc, 2 * k + 1);
-      store_register(lanes_, k, in_order<std::uint64_t>(bits_of(interleaved<First, std::uint64_t>(a, b))));
-    }
-  }
-  std::uint64_t operator[](int k) const { return lanes_[k]; }
-
- private:
-  alignas(64) std::uint64_t lanes_[16];
-};
-
-// Count words or pairs of them on their way to lanes of type Lane.
-template <class Wide, class Lane, int Count>
-struct Saturated;
-
+// Count words on their way to lanes of type Lane.
 template <class Lane, int Count>
-struct Saturated<std::int32_t, Lane, Count> {
+struct Saturated {
   alignas(64) std::int32_t lane[Count];
 
   void collect(void* r) const {
@@ -96,37 +65,6 @@ struct Saturated<std::int32_t, Lane, Count> {
   static Bytes collected(const std::int32_t* from, Byte byte) {
     const Register low = pack_words(words(from, 0), words(from, 1)), high = pack_words(words(from, 2), words(from, 3));
     return bits_of(in_order<word>(bits_of(pack_halves(low, high, byte))));
-  }
-};
-
-template <class Lane, int Count>
-struct Saturated<std::int64_t, Lane, Count> {
-  alignas(64) std::int64_t lane[Count];
-
-  void collect(void* r) const {
-#if defined __AVX512BW__
-    for (int i = 0; i < Count; i += 8) {
-      const Register from = _mm512_loadu_si512(lane + i);
-      if constexpr (sizeof(Lane) == 4)
-        _mm256_storeu_si256(reinterpret_cast<__m256i*>(static_cast<Lane*>(r) + i),
-                            _mm512_maskz_cvtsepi64_epi32(0xFF, from));
-      else
-        _mm_storeu_si128(reinterpret_cast<__m128i*>(static_cast<Lane*>(r) + i),
-                         _mm512_maskz_cvtsepi64_epi16(0xFF, from));
-    }
-#else
-    // In halves: no other target compares 64-bit lanes fast.
-    Saturated<std::int32_t, Lane, Count> words;
-    const auto* half = reinterpret_cast<const in_memory<std::int32_t>*>(lane);
-    KASTARRI_LANES_INDEPENDENT
-    for (int i = 0; i < Count; ++i) words.lane[i] = one_word(half[2 * i], half[2 * i + 1]);
-    words.collect(r);
-#endif
-  }
-
- private:
-  static constexpr std::int32_t one_word(std::int32_t low, std::int32_t high) {
-    return high == low >> 31 ? low : (high >> 31) ^ std::numeric_limits<std::int32_t>::max();
   }
 };
 

@@ -95,6 +95,10 @@ inline void pack(const word* acc, const N& counts, word* r) {
   static inline void KASTARRI_SEMANTIC(OP)(const word* acc, word count, word* r) { \
     pack<R, WORDS<ROUNDING, LANES>>(acc, SharedCount(count, BOUND), r);            \
   }
+#define KERNEL_shift_alternate24(OP, R, ROUNDING, FIRST)                               \
+  static inline void KASTARRI_SEMANTIC(OP)(const word* acc, word count, word* r) {     \
+    pack_alternate24<R::container, ROUNDING, FIRST>(acc, clamped(count, word{23}), r); \
+  }
 #define KERNEL_shift48(OP, ROUNDING)                                               \
   static inline void KASTARRI_SEMANTIC(OP)(const word* acc, word count, word* r) { \
     pack48<ROUNDING>(acc, clamped(count, word{32}), r);                            \

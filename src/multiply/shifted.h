@@ -46,6 +46,18 @@ struct Truncated {
   }
 };
 
+// 32 lanes packed to lanes of type Half, by a rule that makes a register of words from two of the accumulator: one of
+// every pair of words, block by block.
+template <class Half, class Rule>
+[[gnu::always_inline]] inline void pack_two_by_two(const word* acc, word* r, Rule rule) {
+  const auto words = [acc, rule](int k) {
+    return reinterpret_cast<Register>(
+        rule(load_register<std::uint8_t>(acc, k), load_register<std::uint8_t>(acc, k + 1)));
+  };
+  for (int k = 0; k < 64 / register_bytes; ++k)
+    store_register(r, k, in_order<word>(bits_of(pack_words(words(4 * k), words(4 * k + 2), Half{}))));
+}
+
 // --- Lanes of 24 bits ------------------------------------------------------------------------------------
 
 // Register number k of all lanes, or of every other one.
@@ -68,6 +80,10 @@ inline Int shifted24(Word lanes, word n) {
   const Int half = Int{} + static_cast<std::int32_t>(word{1} << n >> 1);
   return Truncated::shifted(signed_words(extended_from_24(lanes)) + half, n);
 }
+template <class Half, class Rounding, int First>
+inline void pack_alternate24(const word* acc, word n, word* r) {
+  pack_two_by_two<Half>(acc, r, [n](auto a, auto b) { return shifted24<Rounding>(every_other_word<First>(a, b), n); });
+}
 template <class Rounding>
 inline Int shifted24(Word lanes, Word n) {
 #if defined __AVX2__
@@ -86,35 +102,25 @@ inline Int shifted24(Word lanes, Word n) {
 struct Windows {
   Int low, high;
 
-  Windows(Vector<std::uint64_t> a, Vector<std::uint64_t> b)
-      : low(signed_words(every_other_word<0>(bits_of(a), bits_of(b)))),
-        high(signed_words(every_other_word<0>(bits_of(a >> 16), bits_of(b >> 16)))) {}
+  Windows(Vector<std::uint8_t> a, Vector<std::uint8_t> b)
+      : low(signed_words(every_other_word<0>(a, b))), high(signed_words(every_other_word<0>(from_16(a), from_16(b)))) {}
+
+  static Vector<std::uint8_t> from_16(Vector<std::uint8_t> lanes) { return bits_of(as<std::uint64_t>(lanes) >> 16); }
 
   Int lane_fits_low() const { return lower_halves_extended(high) == high; }
   Int low_clamped() const { return either(lane_fits_low(), low, bound(high)); }
 };
 
-// rule(windows) of half the lanes of a register at a time.
-template <class Rule>
-[[gnu::always_inline]] inline void pack_windows(const word* acc, word* r, Rule rule) {
-  for (int k = 0; k < 64 / register_bytes; ++k) {
-    const auto words = [&](int first) {
-      const Windows windows(load_register<std::uint64_t>(acc, first), load_register<std::uint64_t>(acc, first + 1));
-      return reinterpret_cast<Register>(rule(windows));
-    };
-    const Register low = words(4 * k), high = words(4 * k + 2);
-    store_register(r, k, in_order<word>(bits_of(pack_words(low, high))));
-  }
-}
-
 template <class Rounding>
 inline void pack48(const word* acc, word count, word* r) {
   if (count > 16)
-    pack_windows(acc, r, [=](Windows w) { return Rounding::shifted(w.high, count - 16); });
+    pack_two_by_two<std::int16_t>(acc, r,
+                                  [=](auto a, auto b) { return Rounding::shifted(Windows(a, b).high, count - 16); });
   else if (count > 0)
-    pack_windows(acc, r, [=](Windows w) { return Rounding::shifted(w.low_clamped(), count); });
+    pack_two_by_two<std::int16_t>(
+        acc, r, [=](auto a, auto b) { return Rounding::shifted(Windows(a, b).low_clamped(), count); });
   else
-    pack_windows(acc, r, [=](Windows w) { return w.low_clamped(); });
+    pack_two_by_two<std::int16_t>(acc, r, [=](auto a, auto b) { return Windows(a, b).low_clamped(); });
 }
 
 // --- Lanes of 48 and 64 bits to 32 -----------------------------------------------------------------------

@@ -80,10 +80,6 @@ inline Int shifted24(Word lanes, word n) {
   const Int half = Int{} + static_cast<std::int32_t>(word{1} << n >> 1);
   return Truncated::shifted(signed_words(extended_from_24(lanes)) + half, n);
 }
-template <class Half, class Rounding, int First>
-inline void pack_alternate24(const word* acc, word n, word* r) {
-  pack_two_by_two<Half>(acc, r, [n](auto a, auto b) { return shifted24<Rounding>(every_other_word<First>(a, b), n); });
-}
 template <class Rounding>
 inline Int shifted24(Word lanes, Word n) {
 #if defined __AVX2__
@@ -94,10 +90,15 @@ inline Int shifted24(Word lanes, Word n) {
 #endif
 }
 
-// --- Lanes of 48 bits to 16 by one count
-// ------------------------------------------------------------------------------ 32 bits of a lane are enough: for a
-// count up to 16 the low ones, above 16 those without the low 16 bits, of which no shift leaves a trace. A lane that
-// does not fit the low 32 bits saturates by any count up to 16.
+// By one count the lanes are put in order last.
+template <class Half, class Rounding, int First>
+inline void pack_alternate24(const word* acc, word n, word* r) {
+  pack_two_by_two<Half>(acc, r, [n](auto a, auto b) { return shifted24<Rounding>(every_other_word<First>(a, b), n); });
+}
+
+// --- Lanes of 48 bits to 16 by one count -----------------------------------------------------------------
+// 32 bits of a lane are enough: for a count up to 16 the low ones, above 16 those without the low 16 bits, of which no
+// shift leaves a trace. A lane that does not fit the low 32 bits saturates by any count up to 16.
 
 struct Windows {
   Int low, high;

@@ -110,6 +110,15 @@ inline void pack(const word* acc, const N& counts, word* r) {
     pack<R, WORDS<ROUNDING, LANES>>(acc, OwnCounts<C, BOUND>(counts), r);                  \
   }
 
+#if defined __AVX512BW__
+#define KERNEL_counts48(OP, ROUNDING)                                                      \
+  static inline void KASTARRI_SEMANTIC(OP)(const word* acc, const word* counts, word* r) { \
+    pack48_by_counts<ROUNDING>(acc, counts, r);                                            \
+  }
+#else
+#define KERNEL_counts48(OP, ROUNDING) KERNEL_counts(OP, i16x32, WordsOfPairs, ROUNDING, AllLanes<48>, 32, u16x32)
+#endif
+
 #include "multiply/pack.def"
 
 #include "frame/stamp_end.h"

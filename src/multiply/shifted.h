@@ -169,17 +169,15 @@ inline Word joined(Half a, Half b, std::index_sequence<I...>) {
 // Lanes of 64 bits shift as signed and saturate. Rounded half up, x / 2^n is half of 2x / 2^n, plus a half, if there is
 // room for 2x; else the last bit shifted out is added.
 template <class Rounding, int Bits>
-inline Half eight_shifted(Vector<std::uint64_t> lanes, __m512i n) {
+inline __m512i eight_shifted(Vector<std::uint64_t> lanes, __m512i n) {
   const auto right = [n](__m512i v) { return _mm512_maskz_srav_epi64(0xFF, v, n); };
   const auto x = reinterpret_cast<__m512i>(Bits == 48 ? extended_from_48(lanes) : lanes);
-  __m512i shifted;
   if constexpr (Rounding::added == 0)
-    shifted = right(x);
+    return right(x);
   else if constexpr (Bits == 48)
-    shifted = _mm512_maskz_srai_epi64(0xFF, right(x + x) + 1, 1);
+    return _mm512_maskz_srai_epi64(0xFF, right(x + x) + 1, 1);
   else
-    shifted = right(x) + (_mm512_maskz_srlv_epi64(0xFF, x, n - 1) & _mm512_set1_epi64(1));
-  return reinterpret_cast<Half>(_mm512_maskz_cvtsepi64_epi32(0xFF, shifted));
+    return right(x) + (_mm512_maskz_srlv_epi64(0xFF, x, n - 1) & _mm512_set1_epi64(1));
 }
 inline Two widened(Word n) {
   const auto half = [n](auto number) {
@@ -196,11 +194,23 @@ template <class Rounding, class Lanes, class N>
 inline Int packed_pairs(Two two, N n) {
   const Two counts = widened(n);
   const auto half = [](Vector<std::uint8_t> lanes, Vector<std::uint8_t> by) {
-    return eight_shifted<Rounding, Lanes::bits>(as<std::uint64_t>(Lanes::lanes_ordered(lanes)),
-                                                reinterpret_cast<__m512i>(by));
+    const auto shifted = eight_shifted<Rounding, Lanes::bits>(as<std::uint64_t>(Lanes::lanes_ordered(lanes)),
+                                                              reinterpret_cast<__m512i>(by));
+    return reinterpret_cast<Half>(_mm512_maskz_cvtsepi64_epi32(0xFF, shifted));
   };
   return signed_words(
       joined(half(two.first, counts.first), half(two.last, counts.last), std::make_index_sequence<16>()));
+}
+
+// Lanes of 48 bits to 16 by counts of their own, without the detour over words.
+template <class Rounding>
+inline void pack48_by_counts(const word* acc, const word* counts, word* r) {
+  for (int k = 0; k < 4; ++k) {
+    const auto given = _mm_loadu_si128(reinterpret_cast<const __m128i*>(counts) + k);
+    const __m512i n = _mm512_maskz_cvtepu16_epi64(0xFF, _mm_min_epu16(given, _mm_set1_epi16(32)));
+    const __m512i shifted = eight_shifted<Rounding, 48>(load_register<std::uint64_t>(acc, k), n);
+    _mm_storeu_si128(reinterpret_cast<__m128i*>(r) + k, _mm512_maskz_cvtsepi64_epi16(0xFF, shifted));
+  }
 }
 #else
 // The low words of the shifted lanes, bounded where the lanes do not fit them; rounded, a word is raised by the last

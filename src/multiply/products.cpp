@@ -39,7 +39,7 @@ struct Products {
   template <int Half>
   static Vector<std::int16_t> of_bytes(Bytes a, Bytes b) {
     if constexpr (a_signed && b_signed) return upper_halves(at_top<Half>(a), at_top<Half>(b));
-    return widened<Half, a_signed>(a) * widened<Half, b_signed>(b);
+    return reinterpret_cast<Vector<std::int16_t>>(widened<Half, a_signed>(a) * widened<Half, b_signed>(b));
   }
   // Bytes as 2^8 times themselves, and as themselves.
   template <int Half>
@@ -47,9 +47,9 @@ struct Products {
     return reinterpret_cast<Vector<std::int16_t>>(interleaved<Half, std::uint8_t>(Bytes{}, v));
   }
   template <int Half, bool IsSigned>
-  static Vector<std::int16_t> widened(Bytes v) {
-    if constexpr (IsSigned) return at_top<Half>(v) >> 8;
-    return reinterpret_cast<Vector<std::int16_t>>(interleaved<Half, std::uint8_t>(v, Bytes{}));
+  static Vector<std::uint16_t> widened(Bytes v) {
+    return reinterpret_cast<Vector<std::uint16_t>>(IsSigned ? bits_of(at_top<Half>(v) >> 8)
+                                                            : bits_of(interleaved<Half, std::uint8_t>(v, Bytes{})));
   }
 
   // The upper halves of products of 16-bit lanes. An unsigned factor taken as signed is short of 2^16 if its top bit
@@ -59,7 +59,7 @@ struct Products {
     if constexpr (a_signed && b_signed)
       return bits_of(upper_halves(x, y));
     else if constexpr (b_signed)
-      return bits_of(upper_halves(x, y) + (y & x >> 15));
+      return bits_of(as<std::uint16_t>(bits_of(upper_halves(x, y))) + as<std::uint16_t>(bits_of(y & x >> 15)));
     else
       return bits_of(upper_halves(as<std::uint16_t>(a), as<std::uint16_t>(b)));
   }

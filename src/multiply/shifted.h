@@ -222,8 +222,9 @@ inline Int shifted_pairs(Word low_words, Word high_words, N n) {
                                shifted_left<word>(unsigned_words(high), counts_of(32 - n)));
   const Int fits = low >> 31 == shifted_right<std::int32_t>(high, counts_of(n));
   if constexpr (Rounding::added == 0) return either(fits, low, bound(high));
-  const Int raised = signed_words(unsigned_words(low) + (shifted_right<word>(low_words, counts_of(n - 1)) & 1));
-  return either(fits, raised + (low > raised), bound(high));
+  const Word raised = unsigned_words(low) + (shifted_right<word>(low_words, counts_of(n - 1)) & 1);
+  const Int wraps = low > signed_words(raised);
+  return either(fits, signed_words(raised + unsigned_words(wraps)), bound(high));
 }
 
 template <class Rounding, class Lanes, class N>

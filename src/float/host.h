@@ -170,7 +170,7 @@ inline Dropped<Bits> rounded_off(Bits bits, const Mode& mode) {
 template <class Wide>
 struct Exact {
   Wide value;
-  word may_be_tiny;  // all ones where a result below the normal numbers is not left, if it is exact
+  word exact_when_tiny;  // all ones where a result below the normal numbers is not left, since it is exact
   word either_sign;  // of a sum: the signs of both, where the bits of value do not tell it when it is 0
 };
 constexpr word always = ~word{0};
@@ -264,7 +264,7 @@ inline auto scaled_single(T integer, float unit) {
 }
 
 // A number as it is.
-inline Exact<float> exact_single_of(float x) { return {x, always, 0}; }
+inline Exact<float> exact_single_of(float x) { return {x, 0, 0}; }
 
 // The exponent of a number is `Single::bias` less than this.
 constexpr word biased_exponent(word magnitude) { return magnitude >> Single::fraction_bits; }
@@ -407,7 +407,7 @@ template <class F, class Wide, class Mode>
 inline word settled(const Exact<Wide>& x, const Mode& mode, Seen& seen) {
   constexpr int wide_bits = sizeof(Wide) == 8 ? double_fraction_bits : Single::fraction_bits;
   constexpr int excess = wide_bits - F::fraction_bits;
-  word bits, dropped = 0;
+  word bits;
   if constexpr (excess == 0) {
     bits = bits_of(x.value);
   } else {
@@ -415,18 +415,18 @@ inline word settled(const Exact<Wide>& x, const Mode& mode, Seen& seen) {
     bits = mode.sum_bits(bits_of(static_cast<float>(as_float(rounded.kept))), x.either_sign);
     if constexpr (sizeof(Wide) == 8) seen.lost_from_doubles |= rounded.dropped;
     if constexpr (sizeof(Wide) == 4) seen.lost |= rounded.dropped;
-    dropped = static_cast<word>(mask_not_zero(rounded.dropped));
   }
   const word magnitude = bits & single_magnitude;
   Left left;
   if constexpr (F::bits == 32) {
-    const word tiny = mask_below(magnitude, Single::unit + 1) & ~x.may_be_tiny;
+    // Up to the least normal number, for what is just below may have been rounded to it.
+    const word tiny = mask_below(magnitude, Single::unit + 1) & ~x.exact_when_tiny;
     left = tiny | left_above(magnitude, single_bits_of_power(Single::greatest_exponent));
   } else {
-    const word small = mask_below(magnitude, single_bits_of_power(Half::least_exponent)), tiny = magnitude & small;
-    const word uneven = bits_of((as_float(tiny) + 0.5f) - 0.5f) ^ tiny;  // no multiple of the least half
-    left = left_above(magnitude, widened_largest) | (0 - (uneven & x.may_be_tiny)) | (small & dropped & x.may_be_tiny) |
-           ((0 - tiny) & ~x.may_be_tiny);
+    // Judged before rounding where that may end at 0.
+    const word unrounded = sizeof(Wide) == 4 ? bits_of(static_cast<float>(x.value)) & single_magnitude : magnitude;
+    const word tiny = unrounded & mask_below(unrounded, single_bits_of_power(Half::least_exponent));
+    left = left_above(magnitude, widened_largest) | ((0 - tiny) & ~x.exact_when_tiny);
   }
   seen.left |= left;
   return chosen(sign_mask(left), mark_of_left<F>, bits);

@@ -28,16 +28,6 @@ constexpr T sign_fill(T lane) {
   return static_cast<T>(lane < 0 ? -1 : 0);
 }
 
-// x shifted right by s, copies of the sign shifted in: floor(x / 2^s). All lanes share s, which is less
-// than the width. The shift is an unsigned one of x + 2^(w-1): for a signed shift by a run-time count
-// the compiler takes the count through memory in two halves, which costs more than all the rest.
-template <class T, class Count>
-constexpr T shift_right(T x, Count s) {
-  using U = std::make_unsigned_t<T>;
-  constexpr U top = static_cast<U>(U{1} << (8 * sizeof(T) - 1));
-  return static_cast<T>(static_cast<U>((unsigned_bits(x) ^ top) >> s) - static_cast<U>(top >> s));
-}
-
 }  // namespace
 
 #endif

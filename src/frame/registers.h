@@ -81,6 +81,18 @@ inline Vector<Lane> interleaved(Vector<std::uint8_t> a, Vector<std::uint8_t> b) 
   return interleaved<Half, Lane>(as<Lane>(a), as<Lane>(b), std::make_index_sequence<lanes_in_register<Lane>>());
 }
 
+// The even (First = 0) or odd (1) words of a and b, block by block: a's, then b's. As numbers they are shuffled in one
+// step.
+template <int First, std::size_t... I>
+inline Vector<float> every_other_word(Vector<float> a, Vector<float> b, std::index_sequence<I...>) {
+  return __builtin_shufflevector(a, b, (I / 4 * 4 + I % 2 * 2 + First + I % 4 / 2 * sizeof...(I))...);
+}
+template <int First>
+inline Vector<std::uint32_t> every_other_word(Vector<std::uint8_t> a, Vector<std::uint8_t> b) {
+  return reinterpret_cast<Vector<std::uint32_t>>(
+      every_other_word<First>(as<float>(a), as<float>(b), std::make_index_sequence<lanes_in_register<float>>()));
+}
+
 // The lanes of a register, of which every block holds one of each of its parts, with the parts in order.
 template <class Lane, std::size_t... I>
 inline Vector<Lane> in_order(Vector<Lane> v, std::index_sequence<I...>) {
@@ -118,6 +130,99 @@ inline Vector<std::int32_t> sums_of_products(Vector<std::int16_t> a, Vector<std:
 #else
   return reinterpret_cast<Vector<std::int32_t>>(
       _mm_madd_epi16(reinterpret_cast<__m128i>(a), reinterpret_cast<__m128i>(b)));
+#endif
+}
+
+// The bits that at least two of three hold.
+inline Vector<std::int32_t> majority(Vector<std::int32_t> a, Vector<std::int32_t> b, Vector<std::int32_t> c) {
+#if defined __AVX512BW__
+  return reinterpret_cast<Vector<std::int32_t>>(_mm512_ternarylogic_epi32(
+      reinterpret_cast<__m512i>(a), reinterpret_cast<__m512i>(b), reinterpret_cast<__m512i>(c), 0xE8));
+#else
+  return (a & b) | ((a | b) & c);
+#endif
+}
+
+// Counts to shift words by: the lanes' own, or where the target has no such shift one for all. Any count serves that is
+// below 32 or stands for nothing being left. (Compilers take a count that all share through memory in two halves, which
+// a load of both waits for.)
+#if defined __AVX512BW__
+using Counts = __m512i;
+inline Counts counts_of(std::uint32_t n) { return _mm512_set1_epi32(static_cast<int>(n)); }
+inline Counts counts_of(Vector<std::uint32_t> n) { return reinterpret_cast<Counts>(n); }
+inline __m512i left_by(__m512i v, Counts n) { return _mm512_maskz_sllv_epi32(0xFFFF, v, n); }
+inline __m512i right_by(__m512i v, Counts n, std::uint32_t) { return _mm512_maskz_srlv_epi32(0xFFFF, v, n); }
+inline __m512i right_by(__m512i v, Counts n, std::int32_t) { return _mm512_maskz_srav_epi32(0xFFFF, v, n); }
+#elif defined __AVX2__
+using Counts = __m256i;
+inline Counts counts_of(std::uint32_t n) { return _mm256_set1_epi32(static_cast<int>(n)); }
+inline Counts counts_of(Vector<std::uint32_t> n) { return reinterpret_cast<Counts>(n); }
+inline __m256i left_by(__m256i v, Counts n) { return _mm256_sllv_epi32(v, n); }
+inline __m256i right_by(__m256i v, Counts n, std::uint32_t) { return _mm256_srlv_epi32(v, n); }
+inline __m256i right_by(__m256i v, Counts n, std::int32_t) { return _mm256_srav_epi32(v, n); }
+#else
+using Counts = __m128i;
+inline Counts counts_of(std::uint32_t n) { return _mm_cvtsi32_si128(static_cast<int>(n)); }
+inline __m128i left_by(__m128i v, Counts n) { return _mm_sll_epi32(v, n); }
+inline __m128i right_by(__m128i v, Counts n, std::uint32_t) { return _mm_srl_epi32(v, n); }
+inline __m128i right_by(__m128i v, Counts n, std::int32_t) { return _mm_sra_epi32(v, n); }
+#endif
+template <class Lane>
+inline Vector<Lane> shifted_left(Vector<Lane> v, Counts n) {
+  return reinterpret_cast<Vector<Lane>>(left_by(reinterpret_cast<Counts>(v), n));
+}
+template <class Lane>
+inline Vector<Lane> shifted_right(Vector<Lane> v, Counts n) {
+  return reinterpret_cast<Vector<Lane>>(right_by(reinterpret_cast<Counts>(v), n, Lane{}));
+}
+
+// The upper halves of 32-bit products.
+inline Vector<std::int16_t> upper_halves(Vector<std::int16_t> a, Vector<std::int16_t> b) {
+#if defined __AVX512BW__
+  return reinterpret_cast<Vector<std::int16_t>>(
+      _mm512_mulhi_epi16(reinterpret_cast<__m512i>(a), reinterpret_cast<__m512i>(b)));
+#elif defined __AVX2__
+  return reinterpret_cast<Vector<std::int16_t>>(
+      _mm256_mulhi_epi16(reinterpret_cast<__m256i>(a), reinterpret_cast<__m256i>(b)));
+#else
+  return reinterpret_cast<Vector<std::int16_t>>(
+      _mm_mulhi_epi16(reinterpret_cast<__m128i>(a), reinterpret_cast<__m128i>(b)));
+#endif
+}
+inline Vector<std::uint16_t> upper_halves(Vector<std::uint16_t> a, Vector<std::uint16_t> b) {
+#if defined __AVX512BW__
+  return reinterpret_cast<Vector<std::uint16_t>>(
+      _mm512_mulhi_epu16(reinterpret_cast<__m512i>(a), reinterpret_cast<__m512i>(b)));
+#elif defined __AVX2__
+  return reinterpret_cast<Vector<std::uint16_t>>(
+      _mm256_mulhi_epu16(reinterpret_cast<__m256i>(a), reinterpret_cast<__m256i>(b)));
+#else
+  return reinterpret_cast<Vector<std::uint16_t>>(
+      _mm_mulhi_epu16(reinterpret_cast<__m128i>(a), reinterpret_cast<__m128i>(b)));
+#endif
+}
+
+// The low 24 bits of a word, the low 48 of a pair of words, sign-extended. Where a target can multiply some lanes and
+// leave the rest, the sign is that of a product with 1.
+inline Vector<std::uint32_t> extended_from_24(Vector<std::uint32_t> v) {
+#if defined __AVX512BW__
+  const auto all = reinterpret_cast<__m512i>(v);
+  return reinterpret_cast<Vector<std::uint32_t>>(_mm512_mask_maddubs_epi16(all, 0xAAAAAAAA, _mm512_set1_epi16(1), all));
+#else
+  return reinterpret_cast<Vector<std::uint32_t>>(reinterpret_cast<Vector<std::int32_t>>(v << 8) >> 8);
+#endif
+}
+inline Vector<std::uint64_t> extended_from_48(Vector<std::uint64_t> v) {
+#if defined __AVX512BW__
+  const auto all = reinterpret_cast<__m512i>(v);
+  return reinterpret_cast<Vector<std::uint64_t>>(_mm512_mask_madd_epi16(all, 0xAAAA, all, _mm512_set1_epi32(1)));
+#elif defined __AVX2__
+  const auto all = reinterpret_cast<__m256i>(v);
+  return reinterpret_cast<Vector<std::uint64_t>>(
+      _mm256_blend_epi32(all, _mm256_madd_epi16(all, _mm256_set1_epi32(1)), 0xAA));
+#else
+  constexpr std::uint64_t sign = std::uint64_t{1} << 47;
+  return ((v & (2 * sign - 1)) ^ sign) - sign;
 #endif
 }
 

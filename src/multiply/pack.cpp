@@ -4,7 +4,7 @@
 #include "frame/arithmetic.h"
 #include "multiply/fractions.h"
 #include "multiply/saturated.h"
-#include "multiply/scaled.h"
+#include "multiply/shifted.h"
 
 namespace {
 
@@ -15,30 +15,14 @@ using All = Read<L>;
 
 // Every other 24-bit lane: two of them are the halves of a 64-bit container.
 template <int First>
-class Alternate24 {
+class Every2nd {
  public:
-  explicit Alternate24(const void* acc) : pairs_(acc) {}
+  explicit Every2nd(const void* acc) : pairs_(acc) {}
   word operator[](int k) const { return static_cast<word>(pairs_[k] >> (32 * First)); }
 
  private:
   Read<u64x32> pairs_;
 };
-
-// The two words of a lane: of a 48-bit lane the upper one as it stands in memory.
-struct Words {
-  word low, high;
-};
-class InWords {
- public:
-  explicit InWords(const void* lanes) : words_(static_cast<const in_memory<word>*>(lanes)) {}
-  Words operator[](int i) const { return {words_[2 * i], words_[2 * i + 1]}; }
-
- private:
-  const in_memory<word>* words_;
-};
-
-// The whole containers of 64-bit lanes, which compilers read better than signed ones.
-using u64x16 = Layout<std::uint64_t, 64, 16>;
 
 // --- Fixed packs -----------------------------------------------------------------------------------------
 
@@ -50,174 +34,50 @@ constexpr auto Q15 = [](std::uint64_t lane) { return q15(static_cast<word>(lane)
 constexpr auto Q10 = [](std::uint64_t lane) { return q10(static_cast<word>(lane)); };
 
 // --- Shifts ----------------------------------------------------------------------------------------------
-// The rules make words, or pairs of them, which saturate to the result's lanes in a step of their own.
-
 // Counts are unsigned, so that a negative one counts as the largest.
-template <class Count>
-constexpr Count clamped(Count count, Count bound) {
-  return count > bound ? bound : count;
-}
 
-// Lanes of 64 bits are shifted as unsigned, moved up by half their range, since few targets shift them as
-// signed: this is where that half goes.
-constexpr std::uint64_t half_range = std::uint64_t{1} << 63;
-struct ShiftedHalf {
-  std::uint64_t by[64] = {};
-  constexpr ShiftedHalf() {
-    for (int s = 0; s < 64; ++s) by[s] = half_range >> s;
+constexpr word clamped(word count, word bound) { return count > bound ? bound : count; }
+
+template <class C, int Bound>
+struct OwnCounts {
+  alignas(64) word count[C::count];
+  explicit OwnCounts(const word* counts) {
+    const Read<C> given(counts);
+    for (int i = 0; i < C::count; ++i) count[i] = given[i] > Bound ? Bound : given[i];
   }
+  Word operator[](int k) const { return load_register<word>(count, k); }
 };
-constexpr ShiftedHalf shifted_half;
-
-// x shifted right by a count that all lanes share, or by the lane's own.
-struct Shared {
-  [[maybe_unused]] static constexpr bool scales = false, is_signed = false;
-  static constexpr std::int32_t shift(std::int32_t x, word s) { return shift_right(x, s); }
-  static constexpr std::uint64_t shift(std::uint64_t x, word s) { return x >> s; }
-  // Out of a table: to shift two words by a run-time count the compiler goes through memory in two halves.
-  static std::uint64_t half_range_by(word s) { return shifted_half.by[s]; }
-};
-class Own {
+class SharedCount {
  public:
-  [[maybe_unused]] static constexpr bool scales = !lanes_shift_alone, is_signed = pairs_shift_signed;
-  static constexpr std::int32_t shift(std::int32_t x, word s) { return x >> s; }
-  static constexpr std::int64_t shift(std::int64_t x, word s) { return x >> std::int64_t{s}; }
-  static constexpr std::uint64_t shift(std::uint64_t x, word s) { return x >> std::uint64_t{s}; }
-  std::uint64_t half_range_by(word s) const { return half_range_ >> std::uint64_t{s}; }
+  SharedCount(word count, word bound) : count_(clamped(count, bound)) {}
+  word operator[](int) const { return count_; }
 
  private:
-  // Compilers do not vectorise shifts of what they know to be constant.
-  static std::uint64_t unknown_half_range() {
-    const std::uint64_t* at = shifted_half.by;
-    asm("" : "+r"(at));
-    return *at;
-  }
-  std::uint64_t half_range_ = unknown_half_range();
+  word count_;
 };
 
-// Rounded half up, x / 2^s is half of x / 2^(s-1), plus a half: the last bit shifted out is added.
-struct Rounded {
-  [[maybe_unused]] static constexpr double added = 0.5;
-  template <class Shift, class T>
-  static constexpr T down(Shift, T x, word s) {
-    const T twice = Shift::shift(x, s - 1);
-    return static_cast<T>(twice - (twice >> 1));
-  }
-  // For a count that may be 0.
-  template <class Shift, class T>
-  static constexpr T down_from_zero(Shift, T x, word s) {
-    const auto bits = unsigned_bits(x);
-    return static_cast<T>(Shift::shift(x, s) + static_cast<T>(Shift::shift(bits + bits, s) & 1));
+// Register number k of words of the lanes, shifted and rounded.
+template <class Rounding, class Lanes>
+struct Words24 {
+  template <class N>
+  static Int part(const word* acc, int k, N n) {
+    return shifted24<Rounding>(Lanes::part(acc, k), n);
   }
 };
-struct Truncated {
-  [[maybe_unused]] static constexpr double added = 0;
-  template <class Shift, class T>
-  static constexpr T down(Shift, T x, word s) {
-    return Shift::shift(x, s);
-  }
-  template <class Shift, class T>
-  static constexpr T down_from_zero(Shift, T x, word s) {
-    return Shift::shift(x, s);
+template <class Rounding, class Lanes>
+struct WordsOfPairs {
+  template <class N>
+  static Int part(const word* acc, int k, N n) {
+    return packed_pairs<Rounding, Lanes>(Lanes::lanes(acc, k), n);
   }
 };
 
-// A lane of at most 24 bits shifted right by its own count where the target has no such shift: scaled as a number,
-// as in scaled.h.
-template <class Rounding>
-inline std::int32_t scaled(float x, word s) {
-  const float y = x * __builtin_bit_cast(float, (127 - s) << 23) + static_cast<float>(Rounding::added);
-  const auto towards_zero = static_cast<std::int32_t>(y);
-  return towards_zero - (y < static_cast<float>(towards_zero));
-}
-
-// A 24-bit lane, at the top of its word: so 0 is a count like others.
-template <class Rounding>
-constexpr auto pack24 = [](auto shift, word x, word s) {
-  const auto top = static_cast<std::int32_t>(x << 8);
-  if constexpr (decltype(shift)::scales)
-    return scaled<Rounding>(static_cast<float>(top), s + 8);
-  else
-    return Rounding::down(shift, top, s + 8);
-};
-
-// Lanes of 48 bits likewise, and of 64, which have no room to spare.
-template <int Bits, class Rounding>
-struct PackPairs {
-  using number = std::conditional_t<Bits == 48, Number48, Number64>;
-  using rounding = Rounding;
-
-  template <class Shift>
-  auto operator()(Shift shift, std::uint64_t x, word s) const {
-    constexpr int room = 64 - Bits;
-    if constexpr (Shift::is_signed)
-      return down(shift, static_cast<std::int64_t>(x << room), s + room);
-    else
-      return static_cast<std::int64_t>(down(shift, x << room ^ half_range, s + room) - shift.half_range_by(s + room));
-  }
-
- private:
-  template <class Shift, class T>
-  static constexpr T down(Shift shift, T x, word s) {
-    if constexpr (Bits == 64) return Rounding::down_from_zero(shift, x, s);
-    return Rounding::down(shift, x, s);
-  }
-};
-template <class Rounding>
-using Pack48 = PackPairs<48, Rounding>;
-template <class Rounding>
-using Pack64 = PackPairs<64, Rounding>;
-
-// A 48-bit lane packed to 16 bits by a count that all lanes share needs no more than 32 bits of it: for a count
-// up to 16 the lane clamped to 32 bits, since whatever lies beyond saturates anyway; above 16 the lane without its
-// low 16 bits, of which no shift leaves a trace.
-constexpr std::int32_t low_part(Words x) {
-  const auto low = static_cast<std::int32_t>(x.low);
-  const auto high = static_cast<std::int32_t>(x.high << 16);
-  const std::int32_t bound = (high >> 31) ^ std::numeric_limits<std::int32_t>::max();
-  return static_cast<word>(low >> 31) << 16 == unsigned_bits(high) ? low : bound;
-}
-constexpr std::int32_t high_part(Words x) { return static_cast<std::int32_t>(x.high << 16 | x.low >> 16); }
-
-constexpr auto pack48_unshifted = [](Words x) { return low_part(x); };
-template <class Rounding>
-constexpr auto pack48_low = [](Words x, word s) { return Rounding::down(Shared{}, low_part(x), s); };
-template <class Rounding>
-constexpr auto pack48_high = [](Words x, word s) { return Rounding::down(Shared{}, high_part(x), s - 16); };
-
-// Applies a rule that makes words or pairs of them to every lane, and saturates.
-template <class R, class Rule, class... Operands>
-inline void pack(word* r, Rule rule, const Operands&... operands) {
-  Saturated<decltype(rule(operands[0]...)), typename R::container, R::count> results;
-  KASTARRI_LANES_INDEPENDENT
-  for (int i = 0; i < R::count; ++i) results.lane[i] = rule(operands[i]...);
+template <class R, class Words, class N>
+inline void pack(const word* acc, const N& counts, word* r) {
+  Saturated<typename R::container, R::count> results;
+  for (int k = 0; k < 4 * R::count / register_bytes; ++k)
+    store_register(results.lane, k, Words::part(acc, k, counts[k]));
   results.collect(r);
-}
-
-// The same by counts of the lanes' own.
-template <class R, int Bound, class Rule, class Lanes, class Counts>
-inline void pack_by_counts(word* r, Rule rule, const Lanes& lanes_packed, const Counts& counts) {
-  using Count = decltype(counts[0]);
-  if constexpr (Own::scales && sizeof(decltype(lanes_packed[0])) == 8) {
-    alignas(16) std::uint64_t lane[R::count];
-    alignas(16) word count[R::count];
-    for (int i = 0; i < R::count; ++i) lane[i] = lanes_packed[i];
-    for (int i = 0; i < R::count; ++i) count[i] = clamped(counts[i], Count{Bound});
-    Saturated<std::int32_t, typename R::container, R::count> words;
-    scale_lanes<typename Rule::number, typename Rule::rounding, R::count>(lane, count, words.lane);
-    words.collect(r);
-  } else {
-    const Own own;
-    const auto by_count = [&](auto x, Count n) { return rule(own, x, clamped(n, Count{Bound})); };
-    pack<R>(r, by_count, lanes_packed, counts);
-  }
-}
-
-template <class R, class Rounding, class Lanes>
-inline void pack48(const Lanes& lanes, word count, word* r) {
-  const word s = clamped(count, word{32});
-  if (s == 0) return pack<R>(r, pack48_unshifted, lanes);
-  s > 16 ? pack<R>(r, pack48_high<Rounding>, lanes, Same(s)) : pack<R>(r, pack48_low<Rounding>, lanes, Same(s));
 }
 
 }  // namespace
@@ -230,23 +90,34 @@ inline void pack48(const Lanes& lanes, word count, word* r) {
     lanes<R::count>(result<R>(r), RULE, LANES(acc));                   \
   }
 
-// One count for all lanes, no more than BOUND.
-#define KERNEL_shift(OP, R, RULE, BOUND, LANES)                                    \
+// KERNEL(OP, form, result layout, Words24 or WordsOfPairs, rounding, lanes that are packed, largest count)
+#define KERNEL_shift(OP, R, WORDS, ROUNDING, LANES, BOUND)                         \
   static inline void KASTARRI_SEMANTIC(OP)(const word* acc, word count, word* r) { \
-    const word s = clamped(count, word{BOUND});                                    \
-    pack<R>(                                                                       \
-        r, [s](auto x) { return RULE(Shared{}, x, s); }, LANES(acc));              \
+    pack<R, WORDS<ROUNDING, LANES>>(acc, SharedCount(count, BOUND), r);            \
   }
-#define KERNEL_shift48(OP, R, ROUNDING, LANES)                                     \
+#define KERNEL_shift_alternate24(OP, R, ROUNDING, FIRST)                               \
+  static inline void KASTARRI_SEMANTIC(OP)(const word* acc, word count, word* r) {     \
+    pack_alternate24<R::container, ROUNDING, FIRST>(acc, clamped(count, word{23}), r); \
+  }
+#define KERNEL_shift48(OP, ROUNDING)                                               \
   static inline void KASTARRI_SEMANTIC(OP)(const word* acc, word count, word* r) { \
-    pack48<R, ROUNDING>(LANES(acc), count, r);                                     \
+    pack48<ROUNDING>(acc, clamped(count, word{32}), r);                            \
   }
 
-// A count a lane, in layout C.
-#define KERNEL_counts(OP, R, RULE, BOUND, LANES, C)                                        \
+// The same by a count a lane, in layout C.
+#define KERNEL_counts(OP, R, WORDS, ROUNDING, LANES, BOUND, C)                             \
   static inline void KASTARRI_SEMANTIC(OP)(const word* acc, const word* counts, word* r) { \
-    pack_by_counts<R, BOUND>(r, RULE, LANES(acc), Read<C>(counts));                        \
+    pack<R, WORDS<ROUNDING, LANES>>(acc, OwnCounts<C, BOUND>(counts), r);                  \
   }
+
+#if defined __AVX512BW__
+#define KERNEL_counts48(OP, ROUNDING)                                                      \
+  static inline void KASTARRI_SEMANTIC(OP)(const word* acc, const word* counts, word* r) { \
+    pack48_by_counts<ROUNDING>(acc, counts, r);                                            \
+  }
+#else
+#define KERNEL_counts48(OP, ROUNDING) KERNEL_counts(OP, i16x32, WordsOfPairs, ROUNDING, AllLanes<48>, 32, u16x32)
+#endif
 
 #include "multiply/pack.def"
 

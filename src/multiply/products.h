@@ -21,27 +21,46 @@ using u64x8 = Layout<std::uint64_t, 64, 8>;
 template <class X, class Y>
 constexpr bool both_unsigned = std::is_unsigned_v<X>&& std::is_unsigned_v<Y>;
 
-// The exact product of a signed and an unsigned 32-bit factor. Processors multiply two of a kind: the
-// unsigned factor taken as signed is short of 2^32 when its top bit is set.
-constexpr std::int64_t product_of_mixed(std::int32_t x, std::uint32_t y) {
-  const std::int64_t as_signed = std::int64_t{x} * std::int64_t{static_cast<std::int32_t>(y)};
-  const std::uint32_t missing = static_cast<std::int32_t>(y) < 0 ? unsigned_bits(x) : 0;
-  return static_cast<std::int64_t>(unsigned_bits(as_signed) + (std::uint64_t{missing} << 32));
+// Whether words of which both are signed, or one, are best multiplied as signed.
+#if defined __AVX512BW__
+template <class X, class Y>
+constexpr bool multiply_as_signed = true;
+#elif defined __AVX2__
+template <class X, class Y>
+constexpr bool multiply_as_signed = std::is_signed_v<X>&& std::is_signed_v<Y>;
+#else
+template <class X, class Y>
+constexpr bool multiply_as_signed = false;
+#endif
+
+// The exact product of 32-bit factors, not both unsigned. Taken as signed, an unsigned one with its top bit set is 2^32
+// too small; taken as unsigned, a factor below zero is 2^32 too large.
+template <class X, class Y>
+constexpr std::int64_t product_of_words(X x, Y y) {
+  const std::uint32_t a = unsigned_bits(x), b = unsigned_bits(y);
+  const auto i = static_cast<std::int32_t>(x), j = static_cast<std::int32_t>(y);
+  const auto where_negative = [](std::int32_t factor, std::uint32_t other) {
+    return other & unsigned_bits(factor >> 31);
+  };
+  if constexpr (multiply_as_signed<X, Y>) {
+    const std::uint32_t missing =
+        (std::is_signed_v<X> ? 0 : where_negative(i, b)) + (std::is_signed_v<Y> ? 0 : where_negative(j, a));
+    return static_cast<std::int64_t>(unsigned_bits(std::int64_t{i} * j) + (std::uint64_t{missing} << 32));
+  } else {
+    const std::uint32_t excess =
+        (std::is_signed_v<X> ? where_negative(i, b) : 0) + (std::is_signed_v<Y> ? where_negative(j, a) : 0);
+    return static_cast<std::int64_t>(std::uint64_t{a} * b - (std::uint64_t{excess} << 32));
+  }
 }
 
 // The exact product of two factors, in a type as narrow as holds it: narrow types make fast loops.
 template <class X, class Y>
 constexpr auto product(X x, Y y) {
   if constexpr (sizeof(X) == 4 && sizeof(Y) == 4) {
-    if constexpr (both_unsigned<X, Y>) {
+    if constexpr (both_unsigned<X, Y>)
       return std::uint64_t{x} * y;
-    } else if constexpr (std::is_unsigned_v<X>) {
-      return product_of_mixed(y, x);
-    } else if constexpr (std::is_unsigned_v<Y>) {
-      return product_of_mixed(x, y);
-    } else {
-      return std::int64_t{x} * std::int64_t{y};
-    }
+    else
+      return product_of_words(x, y);
   } else if constexpr (sizeof(X) == 1 && sizeof(Y) == 1) {
     using Product = std::conditional_t<both_unsigned<X, Y>, std::uint16_t, std::int16_t>;
     return static_cast<Product>(x * y);

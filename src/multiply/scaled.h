@@ -36,8 +36,8 @@ struct Number64 {
 // Two lanes over 2 to their counts, plus Rounding::added, which is a half or nothing; the floors of these, clamped, as
 // words in the lower half.
 template <class Number, class Rounding>
-inline __m128i two_scaled(const std::uint64_t* lanes, __m128i counts) {
-  const __m128d number = Number::of(_mm_load_si128(reinterpret_cast<const __m128i*>(lanes)), counts);
+inline __m128i two_scaled(__m128i lanes, __m128i counts) {
+  const __m128d number = Number::of(lanes, counts);
   const __m128d scale = _mm_castsi128_pd(_mm_slli_epi64(_mm_sub_epi64(both(1023), counts), 52));
   const __m128d exact = _mm_add_pd(_mm_mul_pd(number, scale), _mm_set1_pd(Rounding::added));
   const __m128d clamped = _mm_min_pd(_mm_max_pd(exact, _mm_set1_pd(-0x1p31)), _mm_set1_pd(0x1p31 - 1));
@@ -46,14 +46,22 @@ inline __m128i two_scaled(const std::uint64_t* lanes, __m128i counts) {
   return _mm_add_epi32(towards_zero, _mm_shuffle_epi32(above, 0x08));
 }
 
-template <class Number, class Rounding, int Count>
-inline void scale_lanes(const std::uint64_t* lanes, const std::uint32_t* counts, std::int32_t* words) {
-  for (int i = 0; i < Count; i += 4) {
-    const __m128i four = _mm_load_si128(reinterpret_cast<const __m128i*>(counts + i)), zero = _mm_setzero_si128();
-    const __m128i low = two_scaled<Number, Rounding>(lanes + i, _mm_unpacklo_epi32(four, zero));
-    const __m128i high = two_scaled<Number, Rounding>(lanes + i + 2, _mm_unpackhi_epi32(four, zero));
-    _mm_store_si128(reinterpret_cast<__m128i*>(words + i), _mm_unpacklo_epi64(low, high));
-  }
+// Four lanes likewise.
+template <class Number, class Rounding>
+inline __m128i four_scaled(__m128i first, __m128i last, __m128i counts) {
+  const __m128i zero = _mm_setzero_si128();
+  return _mm_unpacklo_epi64(two_scaled<Number, Rounding>(first, _mm_unpacklo_epi32(counts, zero)),
+                            two_scaled<Number, Rounding>(last, _mm_unpackhi_epi32(counts, zero)));
+}
+
+// Four words, of which a number of half the size holds what matters: a lane of 24 bits at the top.
+template <class Rounding>
+inline __m128i four_scaled(__m128i words, __m128i counts) {
+  const __m128 scale = _mm_castsi128_ps(_mm_slli_epi32(_mm_sub_epi32(_mm_set1_epi32(127), counts), 23));
+  const __m128 scaled = _mm_mul_ps(_mm_cvtepi32_ps(words), scale);
+  const __m128 exact = _mm_add_ps(scaled, _mm_set1_ps(static_cast<float>(Rounding::added)));
+  const __m128i towards_zero = _mm_cvttps_epi32(exact);
+  return _mm_add_epi32(towards_zero, _mm_castps_si128(_mm_cmplt_ps(exact, _mm_cvtepi32_ps(towards_zero))));
 }
 
 }  // namespace

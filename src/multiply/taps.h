@@ -4,10 +4,7 @@
 #ifndef KASTARRI_MULTIPLY_TAPS_H
 #define KASTARRI_MULTIPLY_TAPS_H
 
-#include <utility>
-
-#include "frame/registers.h"
-#include "multiply/products.h"
+#include "multiply/wide_sums.h"
 
 namespace {
 
@@ -58,19 +55,26 @@ constexpr int upper_of(int pair) {
   return C::in_a_word == 4 ? pair : 2 * pair;
 }
 
-using Bytes = Vector<std::uint8_t>;
+// A value that is made here and not where it is used: compilers would keep what it is made of, for want of registers in
+// memory.
+inline Bytes made_now(Bytes v) {
+  asm("" : "+x"(v));
+  return v;
+}
 
-template <class C, int Count>
+// The lanes of pairs side by side: those that either half of a block makes.
+template <class L, class C, int Count>
 struct Pairs {
   static constexpr int count = (Count + 1) / 2;
-  Bytes lower[count], upper[count];
+  Bytes half[2][count];
 
   template <class... Operand>
   explicit Pairs(Operand... operand) {
     const Bytes all[] = {dealt(operand)...};
     for (int p = 0; p < count; ++p) {
-      lower[p] = Count == 1 ? all[0] : all[lower_of<C>(p)];
-      upper[p] = Count == 1 ? Bytes{} : all[upper_of<C>(p)];
+      const Bytes lower = Count == 1 ? all[0] : all[lower_of<C>(p)], upper = Count == 1 ? Bytes{} : all[upper_of<C>(p)];
+      half[0][p] = made_now(bits_of(interleaved<0, typename L::container>(lower, upper)));
+      half[1][p] = made_now(bits_of(interleaved<1, typename L::container>(lower, upper)));
     }
   }
 };
@@ -81,7 +85,7 @@ template <class L, class C, int Count, bool = L::bits == 8>
 struct Sums {
   static constexpr bool is_signed = std::is_signed_v<typename L::container>;
   static constexpr int scale = is_signed ? 8 : 0;
-  static constexpr int pairs = Pairs<C, Count>::count;
+  static constexpr int pairs = (Count + 1) / 2;
   Vector<std::int16_t> coefficients[2];
 
   explicit Sums(const word* words) {
@@ -100,15 +104,21 @@ struct Sums {
                                                             : interleaved<Half, std::uint8_t>(v, Bytes{}));
   }
   template <int Quarter>
-  Vector<word> sum(const Pairs<C, Count>& operands) const {
+  Vector<word> sum(const Pairs<L, C, Count>& operands) const {
     Vector<word> sum{};
-    for (int p = 0; p < pairs; ++p) {
-      const auto both = interleaved<Quarter / 2, std::uint8_t>(operands.lower[p], operands.upper[p]);
-      sum += reinterpret_cast<Vector<word>>(sums_of_products(extended<Quarter % 2>(both), coefficients[p]));
-    }
+    for (int p = 0; p < pairs; ++p)
+      sum += reinterpret_cast<Vector<word>>(
+          sums_of_products(extended<Quarter % 2>(operands.half[Quarter / 2][p]), coefficients[p]));
     return sum;
   }
 };
+
+// A 16-bit lane as a signed one: of an unsigned lane the top bit is flipped, which takes 2^15 from it.
+template <class L>
+inline Vector<std::int16_t> made_signed(Bytes v) {
+  return reinterpret_cast<Vector<std::int16_t>>(
+      std::is_signed_v<typename L::container> ? as<std::uint16_t>(v) : as<std::uint16_t>(v) ^ 0x8000);
+}
 
 // Sums of 16-bit lanes, four registers of pairs of words from one of lanes. A coefficient of 16 bits is split into
 // bytes, so that the sums of all products with its parts are exact in a word, of whichever sign the factors are.
@@ -116,7 +126,7 @@ template <class L, class C, int Count>
 struct Sums<L, C, Count, false> {
   static constexpr bool is_signed = std::is_signed_v<typename L::container>;
   static constexpr int scale = 0;
-  static constexpr int pairs = Pairs<C, Count>::count;
+  static constexpr int pairs = (Count + 1) / 2;
   static constexpr bool split = C::in_a_word == 2;
   Vector<std::int16_t> odd, even;
   Vector<word> odd_bias, even_bias;  // what unsigned lanes, made signed by flipping their top bit, are short of
@@ -134,68 +144,66 @@ struct Sums<L, C, Count, false> {
     const auto half = sums_of_products(coefficient, Vector<std::int16_t>{} + 0x4000);
     return reinterpret_cast<Vector<word>>(half) << (split && pairs == 2 ? 2 : 1);
   }
-  static Vector<std::int16_t> made_signed(Vector<std::uint16_t> v) {
-    return reinterpret_cast<Vector<std::int16_t>>(is_signed ? v : v ^ 0x8000);
-  }
 
   template <int Quarter>
-  Vector<std::uint64_t> sum(const Pairs<C, Count>& operands) const {
+  Vector<std::uint64_t> sum(const Pairs<L, C, Count>& operands) const {
     Vector<word> by_odd = odd_bias, by_even = even_bias;
     for (int p = 0; p < pairs; ++p) {
-      const auto both = made_signed(interleaved<Quarter / 2, std::uint16_t>(operands.lower[p], operands.upper[p]));
+      const auto both = made_signed<L>(operands.half[Quarter / 2][p]);
       if (split || p == 0) by_odd += reinterpret_cast<Vector<word>>(sums_of_products(both, odd));
       if (split || p == 1) by_even += reinterpret_cast<Vector<word>>(sums_of_products(both, even));
     }
     if constexpr (split) {
       const auto high = reinterpret_cast<Vector<std::int32_t>>(by_odd);
       const auto low = reinterpret_cast<Vector<std::int32_t>>(by_even);
-      return pair_of_words<Quarter % 2>((by_odd << 8) + by_even, (high + (low >> 8)) >> 24);
+      return pairs_of_words<Quarter % 2>((by_odd << 8) + by_even, (high + (low >> 8)) >> 24);
     } else {
       const auto sum = by_odd + by_even;
-      return pair_of_words<Quarter % 2>(sum, reinterpret_cast<Vector<std::int32_t>>(sum) >> 31);
+      return pairs_of_words<Quarter % 2>(sum, reinterpret_cast<Vector<std::int32_t>>(sum) >> 31);
     }
   }
-  template <int Half>
-  static Vector<std::uint64_t> pair_of_words(Vector<word> low, Vector<std::int32_t> high) {
-    return reinterpret_cast<Vector<std::uint64_t>>(interleaved<Half, word>(bits_of(low), bits_of(high)));
-  }
 };
 
-// A sum 2^Scale times as large in the canonical form of a lane of R.
-template <class R, int Scale>
-inline Vector<word> in_lane(Vector<word> sum) {
-  constexpr int above = 32 - R::bits;
-  return reinterpret_cast<Vector<word>>(reinterpret_cast<Vector<std::int32_t>>(sum << (above ? above - Scale : 0)) >>
-                                        (above ? above : Scale));
-}
-template <class R, int Scale>
-inline Vector<std::uint64_t> in_lane(Vector<std::uint64_t> sum) {
-  if constexpr (R::bits == 64) return sum;
-  constexpr std::uint64_t sign = std::uint64_t{1} << (R::bits - 1);
-  return ((sum & (2 * sign - 1)) ^ sign) - sign;
-}
+// Sums of 16-bit lanes by signed coefficients of 16 bits, which need not be split unless both of a pair are -2^15:
+// then, and only then, the sum of two products may not fit a word.
+template <class L, class C, int Count>
+struct UnsplitSums {
+  static constexpr int scale = 0;
+  static constexpr bool is_signed = std::is_signed_v<typename L::container>;
+  static constexpr int pairs = (Count + 1) / 2;
+  Vector<std::int16_t> coefficients;
+  Vector<std::uint64_t> bias;  // as above
 
-// What a sum is before it is cut to its lane: the sum alone, or added to the accumulator's lane.
-struct Over {
-  template <int, class V>
-  static V with(V sum, const void*, int) {
-    return sum;
+  static bool serves(const word* words) {
+    bool fit = true;
+    for (int i = 0; i < C::words; ++i) fit = fit && words[i] != 0x80008000;
+    return fit;
   }
-};
-struct Onto {
-  template <int Scale, class V>
-  static V with(V sum, const void* acc, int k) {
-    return (reinterpret_cast<V>(load_register<std::uint8_t>(acc, k)) << Scale) + sum;
+
+  explicit UnsplitSums(const word* words)
+      : coefficients(reinterpret_cast<Vector<std::int16_t>>(repeated<C::words>(words))), bias{} {
+    if (is_signed) return;
+    const auto half = sums_of_products(coefficients, Vector<std::int16_t>{} + 0x4000);
+    bias = pairs_of_words<0>(reinterpret_cast<Vector<word>>(half) << pairs, half >> (32 - pairs));
   }
+
+  template <int Quarter>
+  Vector<std::uint64_t> sum(const Pairs<L, C, Count>& operands) const {
+    Vector<std::int32_t> low = sum_of_pair(operands.half[Quarter / 2][0]), sign = low;
+    if constexpr (pairs == 2) {
+      const auto other = sum_of_pair(operands.half[Quarter / 2][1]);
+      const auto all = reinterpret_cast<Vector<std::int32_t>>(reinterpret_cast<Vector<word>>(low) +
+                                                              reinterpret_cast<Vector<word>>(other));
+      sign = majority(low, other, all);  // of both if they agree, else of their sum, which then fits
+      low = all;
+    }
+    const auto sum = pairs_of_words<Quarter % 2>(reinterpret_cast<Vector<word>>(low), sign >> 31);
+    return is_signed ? sum : sum + bias;
+  }
+
+ private:
+  Vector<std::int32_t> sum_of_pair(Bytes both) const { return sums_of_products(made_signed<L>(both), coefficients); }
 };
-template <class R, class How, class S, class P, std::size_t... Quarter>
-inline void put_sums(const S& sums, const P& operands, int first, const void* acc, void* r,
-                     std::index_sequence<Quarter...>) {
-  const auto put = [&](int k, auto sum) {
-    store_register(r, k, in_lane<R, S::scale>(How::template with<S::scale>(sum, acc, k)));
-  };
-  (put(first + static_cast<int>(Quarter), sums.template sum<static_cast<int>(Quarter)>(operands)), ...);
-}
 
 // Register number k of an operand.
 struct Whole {
@@ -203,14 +211,25 @@ struct Whole {
   Bytes part(int k) const { return load_register<std::uint8_t>(image, k); }
 };
 
+template <class R, class How, class L, class C, class Sums, class... Operands>
+[[gnu::always_inline]] inline void put_taps(const Sums& sums, const void* acc, void* r, const Operands&... operands) {
+  for (int k = 0; k < 64 / register_bytes; ++k) {
+    const Pairs<L, C, sizeof...(Operands)> pairs(operands.part(k)...);
+    const auto sum = [&](auto quarter) { return sums.template sum<quarter>(pairs); };
+    put_sums<R, How, Sums::scale>(sum, 4 * k, acc, r);
+  }
+}
+
 template <class R, class How, class L, class C, class... Operands>
 [[gnu::always_inline]] inline void sum_of_taps(const void* acc, const word* words, void* r,
                                                const Operands&... operands) {
-  const Sums<L, C, sizeof...(Operands)> sums(words);
-  for (int k = 0; k < 64 / register_bytes; ++k) {
-    const Pairs<C, sizeof...(Operands)> pairs(operands.part(k)...);
-    put_sums<R, How>(sums, pairs, 4 * k, acc, r, std::make_index_sequence<4>());
+  if constexpr (L::bits == 16 && C::in_a_word == 2 && std::is_signed_v<typename C::stored>) {
+    using Unsplit = UnsplitSums<L, C, sizeof...(Operands)>;
+    if (__builtin_expect(Unsplit::serves(words), true))
+      return put_taps<R, How, L, C>(Unsplit(words), acc, r, operands...);
+    asm("" : : : "memory");  // lest compilers load what both ways need before the branch, and spill it
   }
+  put_taps<R, How, L, C>(Sums<L, C, sizeof...(Operands)>(words), acc, r, operands...);
 }
 
 // The semantic functions: Operands vectors of layout L, then the words of coefficients, the accumulator

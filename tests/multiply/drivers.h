@@ -162,6 +162,15 @@ void dirty(void* image, std::mt19937& random) {
       static_cast<unsigned char*>(image)[size * i + b] = static_cast<unsigned char>(random());
 }
 
+// Most halves of words the smallest number, signed or unsigned: sums of their products are as large as they can be.
+inline void make_smallest(Image& image, bool is_unsigned, std::mt19937& random) {
+  for (std::size_t i = 0; i < sizeof image.bytes; i += 2) {
+    if (random() % 4 == 0) continue;
+    image.bytes[i] = 0;
+    image.bytes[i + 1] = is_unsigned ? 0 : 0x80;
+  }
+}
+
 template <class T>
 constexpr bool is_coefficient = std::is_same_v<T, qv_int32pr>;
 
@@ -182,9 +191,12 @@ void drive_multiply(const std::string& op, Call call) {
     // A word of coefficients lies anywhere, at times in the accumulator that is about to be written.
     Factors f{};
     int which = 0;
-    const unsigned char* const addresses[] = {(static_cast<void>(sizeof(A)), (++images)->bytes)...};
+    Image factors[] = {(static_cast<void>(sizeof(A)), *++images)...};
+    constexpr bool are_words[] = {is_coefficient<A>...};
+    for (std::size_t i = 0; n % 4 == 0 && i < sizeof...(A); ++i)
+      make_smallest(factors[i], name.first_unsigned && !are_words[i], random);
     const auto place = [&](bool is_word) {
-      const unsigned char* from = addresses[which];
+      const unsigned char* from = factors[which].bytes;
       const std::size_t slot = random() % 16;
       if (is_word && n % 2) from = reinterpret_cast<unsigned char*>(acc._);
       f.operand[which++] = is_word ? from + 4 * slot : from;

@@ -171,7 +171,7 @@ template <class Wide>
 struct Exact {
   Wide value;
   word exact_when_tiny;  // all ones where a result below the normal numbers is not left, since it is exact
-  word either_sign;  // of a sum: the signs of both, where the bits of value do not tell it when it is 0
+  word either_sign;      // of a sum: the signs of both, where the bits of value do not tell it when it is 0
 };
 constexpr word always = ~word{0};
 

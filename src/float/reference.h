@@ -6,6 +6,7 @@
 #define KASTARRI_FLOAT_REFERENCE_H
 
 #include <cstdint>
+#include <utility>
 
 #include "float/formats.h"
 
@@ -114,11 +115,14 @@ inline word round_pack(Environment& env, const Number<word>& x) {
 // The same for more bits: all but the first 31 become the sticky one.
 template <class F>
 inline word round_pack(Environment& env, const Number<std::uint64_t>& x) {
-  const auto high = static_cast<word>(x.significand >> 31);
-  if (high == 0) return round_pack<F>(env, Number<word>{x.negative, x.exponent, static_cast<word>(x.significand)});
-  const int excess = highest_bit(high) + 1;
-  return round_pack<F>(
-      env, Number<word>{x.negative, x.exponent + excess, static_cast<word>(shift_right_sticky(x.significand, excess))});
+  const auto high = static_cast<word>(x.significand >> 32), low = static_cast<word>(x.significand);
+  if (high != 0) {
+    const int lead = 30 - highest_bit(high);
+    const word kept = high << lead | low >> 1 >> (31 - lead);
+    return round_pack<F>(env, Number<word>{x.negative, x.exponent + 32 - lead, kept | ((low << lead) != 0)});
+  }
+  if (low >> 31 != 0) return round_pack<F>(env, Number<word>{x.negative, x.exponent + 1, low >> 1 | (low & 1)});
+  return round_pack<F>(env, Number<word>{x.negative, x.exponent, low});
 }
 
 // --- NaN ----------------------------------------------------------------------------------------------
@@ -151,29 +155,24 @@ constexpr word negated(word x) {
 
 // --- Sums and products --------------------------------------------------------------------------------
 
-// With the highest bit of the significand two below the top: room for a carry.
-template <class S>
-inline Number<S> normalised(const Number<S>& x) {
-  const int shift = static_cast<int>(8 * sizeof(S)) - 3 - highest_bit(x.significand);
-  return {x.negative, x.exponent - shift, x.significand << shift};
-}
-
-// x + y with the last bit sticky. Bits are lost only when the exponents lie two or more apart, where a
-// difference keeps all but one of its leading bits: five more, at least, than the formats have.
+// x + y with the last bit sticky. The number of the greater exponent is shifted to that of the other. Where there is
+// no room for all of it, its highest bit comes to lie two below the top, which leaves room for a carry, and the other
+// loses bits; it is the lesser by far then, so that a difference keeps all but one of the leading bits: five more, at
+// least, than the formats have.
 template <class S>
 inline Number<S> sum(Number<S> x, Number<S> y, Rounding rounding) {
   if (x.significand == 0 && y.significand == 0)
     return {x.negative == y.negative ? x.negative : rounding == downward, x.exponent, 0};
   if (x.significand == 0) return y;
   if (y.significand == 0) return x;
-  x = normalised(x);
-  y = normalised(y);
-  if (x.exponent < y.exponent) {
-    const Number<S> swapped = x;
-    x = y;
-    y = swapped;
+  if (x.exponent < y.exponent) std::swap(x, y);
+  const int apart = x.exponent - y.exponent, room = static_cast<int>(8 * sizeof(S)) - 3 - highest_bit(x.significand);
+  x.significand <<= apart < room ? apart : room;
+  x.exponent = y.exponent;
+  if (apart > room) {
+    x.exponent += apart - room;
+    y.significand = shift_right_sticky(y.significand, apart - room);
   }
-  if (x.exponent > y.exponent) y.significand = shift_right_sticky(y.significand, x.exponent - y.exponent);
   if (x.negative == y.negative) return {x.negative, x.exponent, x.significand + y.significand};
   if (x.significand == y.significand) return {rounding == downward, x.exponent, 0};
   if (x.significand > y.significand) return {x.negative, x.exponent, x.significand - y.significand};
@@ -186,33 +185,40 @@ inline Number<P> product(word a, word b) {
   return {x.negative != y.negative, x.exponent + y.exponent, x.significand * y.significand};
 }
 
+// Neither infinite nor NaNs, in one test.
+template <class F, class... X>
+constexpr bool all_finite(X... x) {
+  return ((magnitude<F>(x) < F::infinity) & ...);
+}
+
 template <class F>
 inline word add(Environment& env, word a, word b) {
+  if (__builtin_expect(all_finite<F>(a, b), 1))
+    return round_pack<F>(env, sum(unpack<F>(a), unpack<F>(b), env.rounding));
   if (any_nan<F>(a, b)) return nan_of<F>(env, a, b);
   if (is_infinite<F>(a)) return is_infinite<F>(b) && a != b ? invalid_result<F>(env) : a;
-  if (is_infinite<F>(b)) return b;
-  return round_pack<F>(env, sum(unpack<F>(a), unpack<F>(b), env.rounding));
+  return b;
 }
 
 template <class F>
 inline word multiply(Environment& env, word a, word b) {
+  if (__builtin_expect(all_finite<F>(a, b), 1)) return round_pack<F>(env, product<F>(a, b));
   if (any_nan<F>(a, b)) return nan_of<F>(env, a, b);
-  if (is_infinite<F>(a) || is_infinite<F>(b))
-    return is_zero<F>(a) || is_zero<F>(b) ? invalid_result<F>(env) : ((a ^ b) & F::sign) | F::infinity;
-  return round_pack<F>(env, product<F>(a, b));
+  return is_zero<F>(a) || is_zero<F>(b) ? invalid_result<F>(env) : ((a ^ b) & F::sign) | F::infinity;
 }
 
 // acc + a * b, rounded once.
 template <class F>
 inline word multiply_add(Environment& env, word acc, word a, word b) {
+  if (__builtin_expect(all_finite<F>(a, b, acc), 1))
+    return round_pack<F>(env, sum(product<F>(a, b), unpack<F, ProductSignificand<F>>(acc), env.rounding));
   if (any_nan<F>(a, b, acc)) return nan_of<F>(env, a, b, acc);
   if (is_infinite<F>(a) || is_infinite<F>(b)) {
     if (is_zero<F>(a) || is_zero<F>(b)) return invalid_result<F>(env);
     const word infinite = ((a ^ b) & F::sign) | F::infinity;
     return is_infinite<F>(acc) && acc != infinite ? invalid_result<F>(env) : infinite;
   }
-  if (is_infinite<F>(acc)) return acc;
-  return round_pack<F>(env, sum(product<F>(a, b), unpack<F, ProductSignificand<F>>(acc), env.rounding));
+  return acc;
 }
 
 // --- Order --------------------------------------------------------------------------------------------

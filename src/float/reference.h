@@ -185,10 +185,10 @@ inline Number<P> product(word a, word b) {
   return {x.negative != y.negative, x.exponent + y.exponent, x.significand * y.significand};
 }
 
-// Neither infinite nor NaNs, in one test.
+// Neither infinite nor NaNs.
 template <class F, class... X>
 constexpr bool all_finite(X... x) {
-  return ((magnitude<F>(x) < F::infinity) & ...);
+  return ((magnitude<F>(x) < F::infinity) && ...);
 }
 
 template <class F>

@@ -170,6 +170,7 @@ inline Dropped<Bits> rounded_off(Bits bits, const Mode& mode) {
 template <class Wide>
 struct Exact {
   Wide value;
+  Left left;
   word exact_when_tiny;  // all ones where a result below the normal numbers is not left, since it is exact
   word either_sign;      // of a sum: the signs of both, where the bits of value do not tell it when it is 0
 };
@@ -209,9 +210,9 @@ template <class F>
 inline auto sum(float a, float b) {
   const word either_sign = (bits_of(a) | bits_of(b)) & single_sign;
   if constexpr (std::is_same_v<F, Half>) {
-    return Exact<float>{a + b, 0, either_sign};  // of ApartHalves
+    return Exact<float>{a + b, 0, 0, either_sign};  // of ApartHalves
   } else {
-    return Exact<double>{double{apart<28>(a, b)} + double{apart<28>(b, a)}, always, either_sign};
+    return Exact<double>{double{apart<28>(a, b)} + double{apart<28>(b, a)}, 0, always, either_sign};
   }
 }
 
@@ -220,26 +221,31 @@ inline word mask_zero(float x) { return ~mask_not_zero(bits_of(x) & single_magni
 template <class F>
 inline auto product(float a, float b) {
   if constexpr (std::is_same_v<F, Half>) {
-    return Exact<float>{a * b, 0, 0};
+    return Exact<float>{a * b, 0, 0, 0};
   } else {
-    return Exact<double>{double{a} * double{b}, mask_zero(a) | mask_zero(b), 0};
+    return Exact<double>{double{a} * double{b}, 0, mask_zero(a) | mask_zero(b), 0};
   }
 }
 
-// c + p for the product p of two singles, 48 bits. Where c is the greater by 3 powers of two or more, of p counts
-// what a single holds and whether there is more, which the last bit says; where it is the greater by more than 28, not
-// even that. Where p is the greater by as much the sum has no room, and is left.
+// c + p for the product p of two singles, 48 bits, which has room unless it is the greater by 2^28. Where c is the
+// greater by 2^3, of p counts what a single holds and whether there is more, which the last bit says; where it is the
+// greater by 2^28, not even that.
 inline double sum_with_product(double c, double p) {
-  constexpr std::uint64_t power = std::uint64_t{1} << double_fraction_bits, last = std::uint64_t{1} << 29;
+  constexpr std::uint64_t power = std::uint64_t{1} << double_fraction_bits, cut_off = (std::uint64_t{1} << 29) - 1;
   const std::uint64_t c_magnitude = bits_of(c) & double_magnitude, p_magnitude = bits_of(p) & double_magnitude;
-  const std::uint64_t odd = (p_magnitude & ~(last - 1)) | (mask_not_zero(p_magnitude & (last - 1)) & last);
+  const std::uint64_t odd = (p_magnitude | ((p_magnitude & cut_off) + cut_off)) & ~cut_off;
   const std::uint64_t least = (c_magnitude & ~(power - 1)) - 28 * power;
-  const std::uint64_t lifted = chosen(sign_mask(odd - least) & ~sign_mask(least), least, odd);
-  const std::uint64_t above = sign_mask(p_magnitude + 3 * power - c_magnitude);
-  const std::uint64_t kept = chosen(above, lifted & mask_not_zero(p_magnitude), p_magnitude);
-  const double total = c + as_float(kept | (bits_of(p) & double_sign));
-  const std::uint64_t no_room = sign_mask(c_magnitude + 28 * power - p_magnitude) & mask_not_zero(c_magnitude);
-  return as_float(bits_of(total) | (no_room & (double_magnitude & ~(power / 2 - 1))));
+  const std::uint64_t lifted = chosen(sign_mask(odd - least), least, odd) & mask_not_zero(p_magnitude);
+  const std::uint64_t kept = chosen(sign_mask(p_magnitude + 3 * power - c_magnitude), lifted, p_magnitude);
+  return c + as_float(kept | (bits_of(p) & double_sign));
+}
+
+// In bit 31: whether a * b is greater than c by 2^27, if not 0, as exponents tell with fractions for their logarithms;
+// or c is subnormal, so that they do not.
+inline Left product_far_above(float a, float b, float c) {
+  const auto magnitude = [](float x) { return bits_of(x) & single_magnitude; };
+  const word bound = magnitude(c) + (Single::one + (word{27} << Single::fraction_bits));
+  return (bound - (magnitude(a) + magnitude(b))) | (magnitude(c) - Single::unit);
 }
 
 template <class F>
@@ -247,10 +253,12 @@ inline auto fused(float acc, float a, float b) {
   const word either_sign = ((bits_of(a) ^ bits_of(b)) | bits_of(acc)) & single_sign;
   if constexpr (std::is_same_v<F, Half>) {
     const float p = a * b;
-    return Exact<double>{double{apart<30>(p, acc)} + double{apart<30>(acc, p)}, 0, either_sign};
+    return Exact<double>{double{apart<30>(p, acc)} + double{apart<30>(acc, p)}, 0, 0, either_sign};
   } else {
-    const word zeros = (mask_zero(a) | mask_zero(b)) & mask_zero(acc);
-    return Exact<double>{sum_with_product(acc, double{a} * double{b}), zeros, either_sign};
+    const word product_zero = mask_zero(a) | mask_zero(b), acc_zero = mask_zero(acc);
+    return Exact<double>{sum_with_product(acc, double{a} * double{b}),
+                         product_far_above(a, b, acc) & ~product_zero & ~acc_zero, product_zero & acc_zero,
+                         either_sign};
   }
 }
 
@@ -260,11 +268,11 @@ inline auto fused(float acc, float a, float b) {
 template <class T>
 inline auto scaled_single(T integer, float unit) {
   using Wide = std::conditional_t<sizeof(T) == 4, double, float>;
-  return Exact<Wide>{static_cast<Wide>(integer) * Wide{unit}, always, 0};
+  return Exact<Wide>{static_cast<Wide>(integer) * Wide{unit}, 0, always, 0};
 }
 
 // A number as it is.
-inline Exact<float> exact_single_of(float x) { return {x, 0, 0}; }
+inline Exact<float> exact_single_of(float x) { return {x, 0, 0, 0}; }
 
 // The exponent of a number is `Single::bias` less than this.
 constexpr word biased_exponent(word magnitude) { return magnitude >> Single::fraction_bits; }
@@ -421,7 +429,7 @@ inline word settled(const Exact<Wide>& x, const Mode& mode, Seen& seen) {
   if constexpr (F::bits == 32) {
     // Up to the least normal number, for what is just below may have been rounded to it.
     const word tiny = mask_below(magnitude, Single::unit + 1) & ~x.exact_when_tiny;
-    left = tiny | left_above(magnitude, single_bits_of_power(Single::greatest_exponent));
+    left = tiny | x.left | left_above(magnitude, single_bits_of_power(Single::greatest_exponent));
   } else {
     // Judged before rounding where that may end at 0.
     const word unrounded = sizeof(Wide) == 4 ? bits_of(static_cast<float>(x.value)) & single_magnitude : magnitude;

@@ -30,7 +30,7 @@ SPECIAL = 10
 def run(build, target, pattern, repetitions, seconds):
     """Benchmark -> median time in nanoseconds, or None where the processor does not run the target."""
     environment = dict(os.environ, LD_LIBRARY_PATH=os.path.join(build, "tests", "only", target))
-    command = [os.path.join(build, "bench", "kastarri_bench"), f"--benchmark_filter=^{BASELINE}$|{pattern}",
+    command = [os.path.join(build, "bench", "kastarri_bench"), f"--benchmark_filter=^{BASELINE}(/repeats:[0-9]+)?$|{pattern}",
                f"--benchmark_repetitions={repetitions}", f"--benchmark_min_time={seconds}", "--benchmark_format=csv",
                "--benchmark_enable_random_interleaving=true"]
     result = subprocess.run(command, env=environment, capture_output=True, text=True, check=False)
@@ -41,8 +41,9 @@ def run(build, target, pattern, repetitions, seconds):
     times = {}
     table = result.stdout[result.stdout.index("name,"):]
     for row in csv.DictReader(io.StringIO(table)):
-        if not re.search(r"_(mean|median|stddev|cv)$", row["name"]):
-            times.setdefault(row["name"], []).append(float(row["cpu_time"]))
+        name = re.sub(r"/repeats:[0-9]+", "", row["name"])
+        if not re.search(r"_(mean|median|stddev|cv)$", name):
+            times.setdefault(name, []).append(float(row["cpu_time"]))
     return {name: statistics.median(values) for name, values in times.items()}
 
 

@@ -428,7 +428,7 @@ inline word settled(const Exact<Wide>& x, const Mode& mode, Seen& seen) {
   Left left;
   if constexpr (F::bits == 32) {
     // Up to the least normal number, for what is just below may have been rounded to it.
-    const word tiny = mask_below(magnitude, Single::unit + 1) & ~x.exact_when_tiny;
+    const word tiny = excess == 0 ? 0 : mask_below(magnitude, Single::unit + 1) & ~x.exact_when_tiny;
     left = tiny | x.left | left_above(magnitude, single_bits_of_power(Single::greatest_exponent));
   } else {
     // Judged before rounding where that may end at 0.

@@ -54,7 +54,8 @@ inline std::vector<Bits> edges(const exact::Format& f) {
                            infinity + 1,
                            infinity + f.quiet() - 1,
                            infinity + f.quiet(),
-                           infinity + f.quiet() + 5};
+                           infinity + f.quiet() + 5,
+                           f.sign() - 1};
   for (std::size_t i = 0, n = all.size(); i < n; ++i) all.push_back(all[i] + f.sign());
   return all;
 }

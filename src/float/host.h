@@ -176,8 +176,8 @@ struct Exact {
 constexpr word always = ~word{0};
 
 // The bits of x, but where x is not 0 and lies more than Gap powers of two below y, a number that lies Gap below.
-// Beside y it counts no more than any other: sums with y round alike as long as they keep less than Gap bits. They have
-// room in a format of the bits of x, Gap and one for a carry.
+// Beside y it counts no more than any other: sums with y round alike as long as they keep less than Gap bits. Of
+// numbers no farther apart the sum has room in a format of Gap bits more than x has.
 template <class F, int Gap>
 inline typename F::lane apart(typename F::lane x, typename F::lane y) {
   using Signed = std::make_signed_t<typename F::lane>;
@@ -240,12 +240,13 @@ inline double sum_with_product(double c, double p) {
   return c + as_float(kept | (bits_of(p) & double_sign));
 }
 
-// In bit 31: whether a * b is greater than c by 2^27, if not 0, as exponents tell with fractions for their logarithms;
-// or c is subnormal, so that they do not.
+// In bit 31: whether a * b is greater than c by 2^27, if not 0, as exponents tell with fractions for their logarithms,
+// which exceed them by less than 0.1. (A subnormal c counts as nearly 2^-126, whose last bit is no higher than its
+// own.)
 inline word product_far_above(float a, float b, float c) {
   const auto magnitude = [](float x) { return bits_of(x) & single_magnitude; };
   const word bound = magnitude(c) + (Single::one + (word{27} << Single::fraction_bits));
-  return (bound - (magnitude(a) + magnitude(b))) | (magnitude(c) - Single::unit);
+  return bound - (magnitude(a) + magnitude(b));
 }
 
 template <class F>

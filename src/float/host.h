@@ -431,7 +431,7 @@ inline word settled(const Exact<Wide>& x, const Mode& mode, Seen& seen) {
   word tiny;
   if constexpr (F::bits == 32) {
     // Up to the least normal number, for what is just below may have been rounded to it.
-    tiny = mask_below(magnitude, Single::unit + 1);
+    tiny = excess == 0 ? 0 : mask_below(magnitude, Single::unit + 1);
   } else {
     tiny = 0 - (magnitude & mask_below(magnitude, single_bits_of_power(Half::least_exponent)));
   }

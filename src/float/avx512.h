@@ -235,7 +235,7 @@ template <Rounding R, class L, class... Ls, class Rule, class... Units>
         bits, _mm512_castps_si512(_mm512_maskz_cvt_roundph_ps(sixteen_lanes(), halves, _MM_FROUND_NO_EXC)));
     const __mmask16 tiny =
         _mm512_mask_cmplt_epi32_mask(inexact, magnitude, _mm512_set1_epi32(single_bits_of_power(Half::least_exponent)));
-    const __mmask16 left = tiny | _mm512_cmpgt_epi32_mask(magnitude, _mm512_set1_epi32(widened_largest));
+    const __mmask16 left = tiny | _mm512_cmpgt_epi32_mask(magnitude, _mm512_set1_epi32(widened_largest<Half>));
     all_left |= left;
     all_inexact |= inexact & ~left;
     // A branch, so that the halves need not wait for what tells whether they are left.

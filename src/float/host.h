@@ -10,8 +10,8 @@
 //   sums      of numbers too far apart for that have the lesser one replaced (apart).
 //
 // Lanes for which this does not hold are left to the reference: operands or results that are infinite or
-// NaNs, results that overflow or come near, tiny ones that need not be exact. They raise the host's flags, so
-// HostFpu puts these back.
+// NaNs, results that overflow or come near, tiny ones that need not be exact. They, and subnormal operands, raise
+// the host's flags, so HostFpu puts these back.
 #ifndef KASTARRI_FLOAT_HOST_H
 #define KASTARRI_FLOAT_HOST_H
 
@@ -82,7 +82,7 @@ template <class T>
 constexpr T sign_mask(T x) {
   return static_cast<T>(static_cast<std::make_signed_t<T>>(x) >> (8 * sizeof(T) - 1));
 }
-// For x and y below the top bit: all ones where x < y, where x is not 0.
+// All ones where x < y, as signed numbers whose difference is one; where x, below the top bit, is not 0.
 template <class T>
 constexpr T mask_below(T x, T y) {
   return sign_mask(static_cast<T>(x - y));
@@ -108,14 +108,13 @@ constexpr word single_bits_of_power(int exponent) {
 
 // What a loop learns about its lanes: bit 31 of `left` is set when one is left to the reference, a bit of `lost` when
 // a result is inexact.
-using Left = word;
 struct Seen {
-  Left left = 0;
+  word left = 0;
   word lost = 0;
   std::uint64_t lost_from_doubles = 0;
 };
 // All magnitudes are below 2^31, so a difference of two has its sign in bit 31.
-constexpr Left left_above(word magnitude, word bound) { return bound - magnitude; }
+constexpr word left_above(word magnitude, word bound) { return bound - magnitude; }
 
 // --- Rounding -----------------------------------------------------------------------------------------
 
@@ -170,14 +169,15 @@ inline Dropped<Bits> rounded_off(Bits bits, const Mode& mode) {
 template <class Wide>
 struct Exact {
   Wide value;
-  Left left;
+  word left;             // bit 31 is set where it is neither: the lane is left
   word exact_when_tiny;  // all ones where a result below the normal numbers is not left, since it is exact
   word either_sign;      // of a sum: the signs of both, where the bits of value do not tell it when it is 0
 };
 constexpr word always = ~word{0};
 
-// The bits of x, but where |x| < 2^-Gap |y| and not 0 a number of that magnitude. Beside y it counts no more than any
-// other: sums with y round alike as long as they keep less than Gap bits.
+// The bits of x, but where x is not 0 and lies more than Gap powers of two below y, a number that lies Gap below.
+// Beside y it counts no more than any other: sums with y round alike as long as they keep less than Gap bits. Of
+// numbers no farther apart the sum has room in a format of Gap bits more than x has.
 template <class F, int Gap>
 inline typename F::lane apart(typename F::lane x, typename F::lane y) {
   using Signed = std::make_signed_t<typename F::lane>;
@@ -210,7 +210,7 @@ template <class F>
 inline auto sum(float a, float b) {
   const word either_sign = (bits_of(a) | bits_of(b)) & single_sign;
   if constexpr (std::is_same_v<F, Half>) {
-    return Exact<float>{a + b, 0, 0, either_sign};  // of ApartHalves
+    return Exact<float>{a + b, 0, always, either_sign};  // of ApartHalves
   } else {
     return Exact<double>{double{apart<28>(a, b)} + double{apart<28>(b, a)}, 0, always, either_sign};
   }
@@ -228,8 +228,8 @@ inline auto product(float a, float b) {
 }
 
 // c + p for the product p of two singles, 48 bits, which has room unless it is the greater by 2^28. Where c is the
-// greater by 2^3, of p counts what a single holds and whether there is more, which the last bit says; where it is the
-// greater by 2^28, not even that.
+// greater by 2^3, of p counts what a single holds and whether there is more, which the last bit says: it lies below all
+// that decides how the sum, half of c at the least, is rounded. Where c is the greater by 2^28 not even that counts.
 inline double sum_with_product(double c, double p) {
   constexpr std::uint64_t power = std::uint64_t{1} << double_fraction_bits, cut_off = (std::uint64_t{1} << 29) - 1;
   const std::uint64_t c_magnitude = bits_of(c) & double_magnitude, p_magnitude = bits_of(p) & double_magnitude;
@@ -240,12 +240,13 @@ inline double sum_with_product(double c, double p) {
   return c + as_float(kept | (bits_of(p) & double_sign));
 }
 
-// In bit 31: whether a * b is greater than c by 2^27, if not 0, as exponents tell with fractions for their logarithms;
-// or c is subnormal, so that they do not.
-inline Left product_far_above(float a, float b, float c) {
+// In bit 31: whether a * b is greater than c by 2^27, if not 0, as exponents tell with fractions for their logarithms,
+// which exceed them by less than 0.1. (A subnormal c counts as nearly 2^-126, whose last bit is no higher than its
+// own.)
+inline word product_far_above(float a, float b, float c) {
   const auto magnitude = [](float x) { return bits_of(x) & single_magnitude; };
   const word bound = magnitude(c) + (Single::one + (word{27} << Single::fraction_bits));
-  return (bound - (magnitude(a) + magnitude(b))) | (magnitude(c) - Single::unit);
+  return bound - (magnitude(a) + magnitude(b));
 }
 
 template <class F>
@@ -255,10 +256,9 @@ inline auto fused(float acc, float a, float b) {
     const float p = a * b;
     return Exact<double>{double{apart<30>(p, acc)} + double{apart<30>(acc, p)}, 0, 0, either_sign};
   } else {
-    const word product_zero = mask_zero(a) | mask_zero(b), acc_zero = mask_zero(acc);
-    return Exact<double>{sum_with_product(acc, double{a} * double{b}),
-                         product_far_above(a, b, acc) & ~product_zero & ~acc_zero, product_zero & acc_zero,
-                         either_sign};
+    const word product_zero = mask_zero(a) | mask_zero(b);
+    const word left = product_far_above(a, b, acc) & ~product_zero & ~mask_zero(acc);
+    return Exact<double>{sum_with_product(acc, double{a} * double{b}), left, product_zero, either_sign};
   }
 }
 
@@ -376,8 +376,10 @@ constexpr word mark_of_left = ~word{0};
 template <class F>
 constexpr word mark_of_left = F::bits == 32 ? ~word{0} : (single_bits_of_power(Half::bias + 2) - 1) & ~word{0x1FFF};
 #endif
-// The largest half.
-constexpr word widened_largest = (single_bits_of_power(Half::bias + 1) - 1) & ~word{0x1FFF};
+// The largest number of a format, as a single.
+template <class F>
+constexpr word widened_largest = F::bits == 32 ? Single::largest
+                                               : (single_bits_of_power(Half::bias + 1) - 1) & ~word{0x1FFF};
 
 #ifndef __F16C__
 // Without the processor's own conversion. Adding 0.5, whose last bit is that of subnormal halves, puts those in place.
@@ -424,30 +426,27 @@ inline word settled(const Exact<Wide>& x, const Mode& mode, Seen& seen) {
     if constexpr (sizeof(Wide) == 8) seen.lost_from_doubles |= rounded.dropped;
     if constexpr (sizeof(Wide) == 4) seen.lost |= rounded.dropped;
   }
-  const word magnitude = bits & single_magnitude;
-  Left left;
+  // Singles are judged before rounding, which may end at 0: of a tiny number, or of a NaN, whose fraction carries.
+  const word magnitude = (sizeof(Wide) == 4 ? bits_of(static_cast<float>(x.value)) : bits) & single_magnitude;
+  word tiny;
   if constexpr (F::bits == 32) {
     // Up to the least normal number, for what is just below may have been rounded to it.
-    const word tiny = excess == 0 ? 0 : mask_below(magnitude, Single::unit + 1) & ~x.exact_when_tiny;
-    left = tiny | x.left | left_above(magnitude, single_bits_of_power(Single::greatest_exponent));
+    tiny = excess == 0 ? 0 : mask_below(magnitude, Single::unit + 1);
   } else {
-    // Judged before rounding where that may end at 0.
-    const word unrounded = sizeof(Wide) == 4 ? bits_of(static_cast<float>(x.value)) & single_magnitude : magnitude;
-    const word tiny = unrounded & mask_below(unrounded, single_bits_of_power(Half::least_exponent));
-    left = left_above(magnitude, widened_largest) | ((0 - tiny) & ~x.exact_when_tiny);
+    tiny = 0 - (magnitude & mask_below(magnitude, single_bits_of_power(Half::least_exponent)));
   }
+  const word left = (tiny & ~x.exact_when_tiny) | x.left | left_above(magnitude, widened_largest<F>);
   seen.left |= left;
   return chosen(sign_mask(left), mark_of_left<F>, bits);
 }
 // A half that is rounded to an integer is a half.
 template <class F, class Mode>
 inline word settled(const WholeNumber& x, const Mode&, Seen& seen) {
-  constexpr bool is_half = std::is_same_v<F, Half>;
   const word bits = bits_of(x.value);
-  const word left = sign_mask(left_above(bits & single_magnitude, is_half ? widened_largest : Single::largest));
+  const word left = left_above(bits & single_magnitude, widened_largest<F>);
   seen.left |= left;
   seen.lost |= x.dropped;
-  return chosen(left, mark_of_left<F>, bits);
+  return chosen(sign_mask(left), mark_of_left<F>, bits);
 }
 
 struct HostResult {

@@ -5,6 +5,7 @@
 
 #include <array>
 #include <random>
+#include <utility>
 #include <vector>
 
 #include "float/exact.h"
@@ -54,7 +55,8 @@ inline std::vector<Bits> edges(const exact::Format& f) {
                            infinity + 1,
                            infinity + f.quiet() - 1,
                            infinity + f.quiet(),
-                           infinity + f.quiet() + 5};
+                           infinity + f.quiet() + 5,
+                           f.sign() - 1};
   for (std::size_t i = 0, n = all.size(); i < n; ++i) all.push_back(all[i] + f.sign());
   return all;
 }
@@ -69,6 +71,18 @@ inline Bits near(const exact::Format& f, Bits x, std::mt19937& random) {
 // A number of few bits: its sums and products are ties often.
 inline Bits short_number(const exact::Format& f, Bits x, std::mt19937& random) {
   return x & ~((f.unit() >> random() % 5) - 1);
+}
+
+// The fractions of two numbers whose product, as one of integers, ends in many zeros and a one.
+inline std::pair<Bits, Bits> nearly_short_product(const exact::Format& f, std::mt19937& random) {
+  const Bits zeros = 16 * f.unit() - 1;
+  for (;;) {
+    const Bits x = f.unit() + (random() % f.unit() | 1);
+    Bits inverse = 1;
+    for (int bits = 1; bits < 32; bits *= 2) inverse *= 2 - x * inverse;
+    const Bits y = f.unit() + inverse % f.unit();
+    if ((x * y & zeros) == 1) return {x - f.unit(), y - f.unit()};
+  }
 }
 
 inline std::vector<Case> cases(const exact::Format& f, int operands) {
@@ -99,6 +113,15 @@ inline std::vector<Case> cases(const exact::Format& f, int operands) {
     mpfr_mul(product, p, q, MPFR_RNDN);
     const Bits rounded = exact::round(f, product, MPFR_RNDN).bits;
     all.push_back({near(f, rounded, random), x, y});
+    if (i % 3 == 0) {
+      // acc that takes from the product what it has beyond the format, but for an acc's last bit.
+      mpfr_sub(product, product, exact::Number(f, rounded), MPFR_RNDN);
+      const Bits beyond = exact::round(f, product, MPFR_RNDN).bits;
+      all.push_back({(beyond ^ f.sign()) + random() % 3 - 1, x, y});
+      // acc a few powers above a product that its last bit alone keeps from being a short number.
+      const auto [u, v] = nearly_short_product(f, random);
+      all.push_back({one + (2 + random() % 6) * f.unit() - 1 - random() % 4, one + u, one + v});
+    }
     all.push_back(
         {short_number(f, one, random) - static_cast<Bits>(f.precision - 1 + static_cast<int>(random() % 3)) * f.unit(),
          x, y});

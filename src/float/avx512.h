@@ -34,10 +34,10 @@ constexpr int in_instruction = _MM_FROUND_NO_EXC | (R == to_nearest    ? _MM_FRO
 inline __mmask16 sixteen_lanes() { return 0xFFFF; }
 
 // Where numbers differ. The compiler's own function of this instruction may raise flags: clang makes of a comparison
-// that raises none one that does.
+// that raises none one that does. Volatile, for what only tells flags must not move behind HonestSubnormals either.
 inline __mmask16 differing(__m512 a, __m512 b) {
   __mmask16 differ;
-  asm("vcmpneqps %{sae%}, %2, %1, %0" : "=k"(differ) : "v"(a), "v"(b));
+  asm volatile("vcmpneqps %{sae%}, %2, %1, %0" : "=k"(differ) : "v"(a), "v"(b));
   return differ;
 }
 

@@ -3,7 +3,7 @@
 //
 // A result is inexact when rounding up and rounding down disagree on it. So every vector is computed both
 // ways, and once more to nearest; toward zero is the lesser of the two. The host's flush-to-zero and
-// denormals-are-zero bits alone still count; HonestSubnormals sees to them.
+// denormals-are-zero bits alone still count; with_subnormals sees to them.
 #ifndef KASTARRI_FLOAT_AVX512_H
 #define KASTARRI_FLOAT_AVX512_H
 
@@ -34,10 +34,10 @@ constexpr int in_instruction = _MM_FROUND_NO_EXC | (R == to_nearest    ? _MM_FRO
 inline __mmask16 sixteen_lanes() { return 0xFFFF; }
 
 // Where numbers differ. The compiler's own function of this instruction may raise flags: clang makes of a comparison
-// that raises none one that does. Volatile, for what only tells flags must not move behind HonestSubnormals either.
+// that raises none one that does.
 inline __mmask16 differing(__m512 a, __m512 b) {
   __mmask16 differ;
-  asm volatile("vcmpneqps %{sae%}, %2, %1, %0" : "=k"(differ) : "v"(a), "v"(b));
+  asm("vcmpneqps %{sae%}, %2, %1, %0" : "=k"(differ) : "v"(a), "v"(b));
   return differ;
 }
 
@@ -150,28 +150,27 @@ inline __m512i rounded(const Mode& mode, Rule rule, const Units*... operands) {
 
 // --- A whole vector -----------------------------------------------------------------------------------
 
-// Sees that subnormals are neither read nor written as zeros.
-class HonestSubnormals {
- public:
-  template <class... Pointers>
-  explicit HonestSubnormals(Pointers&... operands_and_results) {
-    asm volatile("stmxcsr %0" : "=m"(found_));
-    if (__builtin_expect(found_ & flushing, 0)) {
-      const word honest = found_ & ~flushing;
-      asm volatile("ldmxcsr %0" : : "m"(honest) : "memory");
-    }
-    (pin(operands_and_results), ...);
-  }
-  ~HonestSubnormals() {
-    if (__builtin_expect(found_ & flushing, 0)) asm volatile("ldmxcsr %0" : : "m"(found_) : "memory");
-  }
-  HonestSubnormals(const HonestSubnormals&) = delete;
-  HonestSubnormals& operator=(const HonestSubnormals&) = delete;
+constexpr word flushing = 0x8040;  // flush-to-zero and denormals-are-zero
 
- private:
-  static constexpr word flushing = 0x8040;
-  word found_;
-};
+// What compute() returns, subnormals being neither read nor written as zeros. A function of its own, so that compilers
+// cannot move arithmetic past the writes (see HostFpu): operands come from memory that is unknown before the one, and
+// results, with what is told of them, have to be in memory before the other.
+template <class Compute>
+[[gnu::noinline, gnu::cold]] HostResult honouring_subnormals(const Compute& compute, word found) {
+  const word honest = found & ~flushing;
+  asm volatile("ldmxcsr %0" : : "m"(honest) : "memory");
+  HostResult result = compute();
+  asm volatile("" : "+m"(result) : : "memory");
+  asm volatile("ldmxcsr %0" : : "m"(found) : "memory");
+  return result;
+}
+
+template <class Compute>
+inline HostResult with_subnormals(const Compute& compute) {
+  word found;
+  asm volatile("stmxcsr %0" : "=m"(found));
+  return __builtin_expect(found & flushing, 0) ? honouring_subnormals(compute, found) : compute();
+}
 
 // Lanes of 16 or 32 bits compared, and chosen: b `where` a bit is 1.
 template <int Bits>
@@ -224,7 +223,6 @@ inline __m512 odd(Rule rule, int from, const Units*... operands) {
 template <Rounding R, class L, class... Ls, class Rule, class... Units>
 [[gnu::flatten]] inline HostResult halves_by_instruction(typename L::container* results, Rule rule,
                                                          const Units*... operands) {
-  const HonestSubnormals honest(results, operands...);
   std::uint32_t all_left = 0, all_inexact = 0;
   const auto sixteen = [&](int from) {
     const __m512 x = odd<R, Ls...>(rule, from, reinterpret_cast<const typename Ls::container*>(operands)...);
@@ -274,7 +272,6 @@ inline HostResult by_instruction(const Mode& mode, typename L::container* result
                                  const Units*... operands) {
   using F = format_of<L>;
   using Tests = LaneTests<L::bits>;
-  const HonestSubnormals honest(results, operands...);
   const Rounding rounding = rounding_of(mode);
   const __m512i up = rounded<L, upward, Ls...>(mode, rule, operands...);
   const __m512i down = rounded<L, downward, Ls...>(mode, rule, operands...);
@@ -297,7 +294,6 @@ inline HostResult by_instruction(const Mode& mode, typename L::container* result
 template <class L, class From, class Units>
 inline HostResult truncated_by_instruction(typename L::container* results, word scale, const Units* operand) {
   constexpr bool is_signed = std::is_signed_v<typename L::container>;
-  const HonestSubnormals honest(results, operand);
   const float power = as_float(single_bits_of_power(static_cast<int>(scale)));
   std::uint32_t left = 0, fractions = 0;
   const auto sixteen = [&](int from) {

@@ -14,14 +14,16 @@ template <class R, class... Ls, class Mode, class Rule, class... Units>
 inline HostResult on_unit(const Mode& mode, typename R::container* results, Rule rule, const Units*... operands) {
   constexpr bool rounds_to_integers =
       std::is_invocable_v<Rule, Mode, decltype(load_sixteen<Ls, to_nearest>(nullptr, 0))...>;
-  if constexpr (R::bits == 16 && !rounds_to_integers)
-    return halves_by_instruction<R, Ls...>(mode, results, rule, operands...);
-  else
-    return by_instruction<R, Ls...>(mode, results, rule, operands...);
+  return with_subnormals([&] {
+    if constexpr (R::bits == 16 && !rounds_to_integers)
+      return halves_by_instruction<R, Ls...>(mode, results, rule, operands...);
+    else
+      return by_instruction<R, Ls...>(mode, results, rule, operands...);
+  });
 }
 template <class R, class From, class Units>
 inline HostResult truncated_on_unit(typename R::container* results, word scale, const Units* operand) {
-  return truncated_by_instruction<R, From>(results, scale, operand);
+  return with_subnormals([&] { return truncated_by_instruction<R, From>(results, scale, operand); });
 }
 #else
 constexpr bool rounds_by_instruction = false;

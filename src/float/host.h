@@ -412,7 +412,7 @@ inline void narrow_all(const word* singles, std::uint16_t* halves) {
 
 // --- Results ------------------------------------------------------------------------------------------
 
-// An exact result rounded to format F, as the bits of a single, all ones in a lane that is left.
+// An exact result rounded to format F, as the bits of a single, or the mark of a lane that is left.
 template <class F, class Wide, class Mode>
 inline word settled(const Exact<Wide>& x, const Mode& mode, Seen& seen) {
   constexpr int wide_bits = sizeof(Wide) == 8 ? double_fraction_bits : Single::fraction_bits;

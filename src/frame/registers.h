@@ -118,19 +118,28 @@ inline Vector<std::uint64_t> next_block(Vector<std::uint64_t> a, Vector<std::uin
   return __builtin_shufflevector(a, b, (I + 2)...);
 }
 
+#if defined __AVX512BW__
+using Register = __m512i;
+inline Register paired_products(Register a, Register b) { return _mm512_madd_epi16(a, b); }
+inline Register upper_products(Register a, Register b, std::int16_t) { return _mm512_mulhi_epi16(a, b); }
+inline Register upper_products(Register a, Register b, std::uint16_t) { return _mm512_mulhi_epu16(a, b); }
+#elif defined __AVX2__
+using Register = __m256i;
+inline Register paired_products(Register a, Register b) { return _mm256_madd_epi16(a, b); }
+inline Register upper_products(Register a, Register b, std::int16_t) { return _mm256_mulhi_epi16(a, b); }
+inline Register upper_products(Register a, Register b, std::uint16_t) { return _mm256_mulhi_epu16(a, b); }
+#else
+using Register = __m128i;
+inline Register paired_products(Register a, Register b) { return _mm_madd_epi16(a, b); }
+inline Register upper_products(Register a, Register b, std::int16_t) { return _mm_mulhi_epi16(a, b); }
+inline Register upper_products(Register a, Register b, std::uint16_t) { return _mm_mulhi_epu16(a, b); }
+#endif
+
 // The sum of two neighbouring products a lane. It passes 2^31 - 1 only if all four factors are -2^15,
 // and then wraps.
 inline Vector<std::int32_t> sums_of_products(Vector<std::int16_t> a, Vector<std::int16_t> b) {
-#if defined __AVX512BW__
   return reinterpret_cast<Vector<std::int32_t>>(
-      _mm512_madd_epi16(reinterpret_cast<__m512i>(a), reinterpret_cast<__m512i>(b)));
-#elif defined __AVX2__
-  return reinterpret_cast<Vector<std::int32_t>>(
-      _mm256_madd_epi16(reinterpret_cast<__m256i>(a), reinterpret_cast<__m256i>(b)));
-#else
-  return reinterpret_cast<Vector<std::int32_t>>(
-      _mm_madd_epi16(reinterpret_cast<__m128i>(a), reinterpret_cast<__m128i>(b)));
-#endif
+      paired_products(reinterpret_cast<Register>(a), reinterpret_cast<Register>(b)));
 }
 
 // The bits that at least two of three hold.
@@ -146,26 +155,25 @@ inline Vector<std::int32_t> majority(Vector<std::int32_t> a, Vector<std::int32_t
 // Counts to shift words by: the lanes' own, or where the target has no such shift one for all. Any count serves that is
 // below 32 or stands for nothing being left. (Compilers take a count that all share through memory in two halves, which
 // a load of both waits for.)
+using Counts = Register;
 #if defined __AVX512BW__
-using Counts = __m512i;
 inline Counts counts_of(std::uint32_t n) { return _mm512_set1_epi32(static_cast<int>(n)); }
-inline Counts counts_of(Vector<std::uint32_t> n) { return reinterpret_cast<Counts>(n); }
-inline __m512i left_by(__m512i v, Counts n) { return _mm512_maskz_sllv_epi32(0xFFFF, v, n); }
-inline __m512i right_by(__m512i v, Counts n, std::uint32_t) { return _mm512_maskz_srlv_epi32(0xFFFF, v, n); }
-inline __m512i right_by(__m512i v, Counts n, std::int32_t) { return _mm512_maskz_srav_epi32(0xFFFF, v, n); }
+inline Register left_by(Register v, Counts n) { return _mm512_maskz_sllv_epi32(0xFFFF, v, n); }
+inline Register right_by(Register v, Counts n, std::uint32_t) { return _mm512_maskz_srlv_epi32(0xFFFF, v, n); }
+inline Register right_by(Register v, Counts n, std::int32_t) { return _mm512_maskz_srav_epi32(0xFFFF, v, n); }
 #elif defined __AVX2__
-using Counts = __m256i;
 inline Counts counts_of(std::uint32_t n) { return _mm256_set1_epi32(static_cast<int>(n)); }
-inline Counts counts_of(Vector<std::uint32_t> n) { return reinterpret_cast<Counts>(n); }
-inline __m256i left_by(__m256i v, Counts n) { return _mm256_sllv_epi32(v, n); }
-inline __m256i right_by(__m256i v, Counts n, std::uint32_t) { return _mm256_srlv_epi32(v, n); }
-inline __m256i right_by(__m256i v, Counts n, std::int32_t) { return _mm256_srav_epi32(v, n); }
+inline Register left_by(Register v, Counts n) { return _mm256_sllv_epi32(v, n); }
+inline Register right_by(Register v, Counts n, std::uint32_t) { return _mm256_srlv_epi32(v, n); }
+inline Register right_by(Register v, Counts n, std::int32_t) { return _mm256_srav_epi32(v, n); }
 #else
-using Counts = __m128i;
 inline Counts counts_of(std::uint32_t n) { return _mm_cvtsi32_si128(static_cast<int>(n)); }
-inline __m128i left_by(__m128i v, Counts n) { return _mm_sll_epi32(v, n); }
-inline __m128i right_by(__m128i v, Counts n, std::uint32_t) { return _mm_srl_epi32(v, n); }
-inline __m128i right_by(__m128i v, Counts n, std::int32_t) { return _mm_sra_epi32(v, n); }
+inline Register left_by(Register v, Counts n) { return _mm_sll_epi32(v, n); }
+inline Register right_by(Register v, Counts n, std::uint32_t) { return _mm_srl_epi32(v, n); }
+inline Register right_by(Register v, Counts n, std::int32_t) { return _mm_sra_epi32(v, n); }
+#endif
+#if defined __AVX2__
+inline Counts counts_of(Vector<std::uint32_t> n) { return reinterpret_cast<Counts>(n); }
 #endif
 template <class Lane>
 inline Vector<Lane> shifted_left(Vector<Lane> v, Counts n) {
@@ -177,29 +185,10 @@ inline Vector<Lane> shifted_right(Vector<Lane> v, Counts n) {
 }
 
 // The upper halves of 32-bit products.
-inline Vector<std::int16_t> upper_halves(Vector<std::int16_t> a, Vector<std::int16_t> b) {
-#if defined __AVX512BW__
-  return reinterpret_cast<Vector<std::int16_t>>(
-      _mm512_mulhi_epi16(reinterpret_cast<__m512i>(a), reinterpret_cast<__m512i>(b)));
-#elif defined __AVX2__
-  return reinterpret_cast<Vector<std::int16_t>>(
-      _mm256_mulhi_epi16(reinterpret_cast<__m256i>(a), reinterpret_cast<__m256i>(b)));
-#else
-  return reinterpret_cast<Vector<std::int16_t>>(
-      _mm_mulhi_epi16(reinterpret_cast<__m128i>(a), reinterpret_cast<__m128i>(b)));
-#endif
-}
-inline Vector<std::uint16_t> upper_halves(Vector<std::uint16_t> a, Vector<std::uint16_t> b) {
-#if defined __AVX512BW__
-  return reinterpret_cast<Vector<std::uint16_t>>(
-      _mm512_mulhi_epu16(reinterpret_cast<__m512i>(a), reinterpret_cast<__m512i>(b)));
-#elif defined __AVX2__
-  return reinterpret_cast<Vector<std::uint16_t>>(
-      _mm256_mulhi_epu16(reinterpret_cast<__m256i>(a), reinterpret_cast<__m256i>(b)));
-#else
-  return reinterpret_cast<Vector<std::uint16_t>>(
-      _mm_mulhi_epu16(reinterpret_cast<__m128i>(a), reinterpret_cast<__m128i>(b)));
-#endif
+template <class Lane>
+inline Vector<Lane> upper_halves(Vector<Lane> a, Vector<Lane> b) {
+  return reinterpret_cast<Vector<Lane>>(
+      upper_products(reinterpret_cast<Register>(a), reinterpret_cast<Register>(b), Lane{}));
 }
 
 // The low 24 bits of a word, the low 48 of a pair of words, sign-extended. Where a target can multiply some lanes and

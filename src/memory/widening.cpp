@@ -1,27 +1,31 @@
 // Loads that widen lanes and stores that narrow them.
+#include "frame/packs.h"
 #include "memory/kernels.h"
 
 namespace {
 
-// Clamps the lanes of a vector to half their width, that of Lane. Processors have single instructions for it that
-// compilers do not find.
+template <class V>
+inline V clamped(V a, V b, std::int8_t to) {
+  return pack_halves(a, b, to);
+}
+template <class V>
+inline V clamped(V a, V b, std::int16_t to) {
+  return pack_words(a, b, to);
+}
+
+// Clamps the lanes of a vector to half their width, that of Lane.
 template <class Lane>
 inline void store_saturated(const void* vector, void* to) {
 #if defined __AVX2__
   const auto* half = static_cast<const __m256i*>(vector);
-  const __m256i low = _mm256_loadu_si256(half);
-  const __m256i high = _mm256_loadu_si256(half + 1);
-  const __m256i packed = sizeof(Lane) == 1 ? _mm256_packs_epi16(low, high) : _mm256_packs_epi32(low, high);
-  // packs works within 128 bits: put the quarters back in order.
+  const __m256i packed = clamped(_mm256_loadu_si256(half), _mm256_loadu_si256(half + 1), Lane{});
+  // Packed within 128 bits: the quarters are put back in order.
   _mm256_storeu_si256(static_cast<__m256i*>(to), _mm256_permute4x64_epi64(packed, 0xD8));
 #else
   const auto* quarter = static_cast<const __m128i*>(vector);
-  for (int k = 0; k < 2; ++k) {
-    const __m128i low = _mm_loadu_si128(quarter + 2 * k);
-    const __m128i high = _mm_loadu_si128(quarter + 2 * k + 1);
-    const __m128i packed = sizeof(Lane) == 1 ? _mm_packs_epi16(low, high) : _mm_packs_epi32(low, high);
-    _mm_storeu_si128(static_cast<__m128i*>(to) + k, packed);
-  }
+  for (int k = 0; k < 2; ++k)
+    _mm_storeu_si128(static_cast<__m128i*>(to) + k,
+                     clamped(_mm_loadu_si128(quarter + 2 * k), _mm_loadu_si128(quarter + 2 * k + 1), Lane{}));
 #endif
 }
 

@@ -38,7 +38,7 @@ struct Products {
 
   template <int Half>
   static Vector<std::int16_t> of_bytes(Bytes a, Bytes b) {
-    if constexpr (a_signed && b_signed) return upper_halves(at_top<Half>(a), at_top<Half>(b));
+    if constexpr (a_signed && b_signed) return upper_halves<std::int16_t>(at_top<Half>(a), at_top<Half>(b));
     return reinterpret_cast<Vector<std::int16_t>>(widened<Half, a_signed>(a) * widened<Half, b_signed>(b));
   }
   // Bytes as 2^8 times themselves, and as themselves.
@@ -57,11 +57,12 @@ struct Products {
   static Bytes upper(Bytes a, Bytes b) {
     const auto x = as<std::int16_t>(a), y = as<std::int16_t>(b);
     if constexpr (a_signed && b_signed)
-      return bits_of(upper_halves(x, y));
+      return bits_of(upper_halves<std::int16_t>(x, y));
     else if constexpr (b_signed)
-      return bits_of(as<std::uint16_t>(bits_of(upper_halves(x, y))) + as<std::uint16_t>(bits_of(y & x >> 15)));
+      return bits_of(as<std::uint16_t>(bits_of(upper_halves<std::int16_t>(x, y))) +
+                     as<std::uint16_t>(bits_of(y & x >> 15)));
     else
-      return bits_of(upper_halves(as<std::uint16_t>(a), as<std::uint16_t>(b)));
+      return bits_of(upper_halves<std::uint16_t>(as<std::uint16_t>(a), as<std::uint16_t>(b)));
   }
 };
 

@@ -44,9 +44,9 @@ class HostState {
     asm volatile("fnstsw %0" : "=m"(state.status) : : "memory");
   }
 
-  // As a program starts; flush-to-zero and denormals-are-zero, as fast-math sets them; each other
-  // rounding mode, with flags raised, and singles on the x87 unit; all exceptions unmasked, so that any
-  // that escapes ends the test.
+  // As a program starts, and once it has rounded; flush-to-zero and denormals-are-zero, as fast-math sets them; each
+  // other rounding mode, with flags raised, and singles on the x87 unit; all exceptions unmasked, so that any that
+  // escapes ends the test.
   static constexpr State states[] = {{0x1F80, 0x037F, 0}, {0x9FC0, 0x037F, 0}, {0x3FA1, 0x047F, 0}, {0x1FA0, 0x037F, 0},
                                      {0x5FBF, 0x087F, 0}, {0xFFC8, 0x0C7F, 0}, {0x0000, 0x0340, 0}};
   static constexpr unsigned count = sizeof states / sizeof *states;

@@ -20,7 +20,7 @@
 #pragma GCC diagnostic pop
 #endif
 
-#include "float/host.h"
+#include "float/bits.h"
 
 namespace {
 

@@ -1,13 +1,14 @@
-// The host's floating-point unit as a fast path for whole vectors.
+// The host's floating-point unit as a fast path for whole vectors, a register at a time.
 //
 // Its control word (MXCSR) is the host program's: rounding, and flags that have to be found as they were left.
 // To write it, or to read flags that have just been raised, costs more than a whole vector does. So the unit
 // computes exactly, in a format with room enough: then no rounding mode counts and no flag is raised. The
-// rounding is done afterwards, on the bits of the result (rounded_off), and what it drops tells whether it is inexact.
+// rounding is done afterwards, on the bits of the result, and what it drops tells whether it is inexact.
 //
 //   halves    are computed as singles, 24 bits, in which every half is a number and the product of two exact;
 //   singles   as doubles, 53 bits, in which the product of two is exact;
-//   sums      of numbers too far apart for that have the lesser one replaced (apart).
+//   sums      have room there when the exponents of their terms are near; when a lane's are not, the vector
+//             is computed again in the long way, in which a term far below the other is lifted (apart).
 //
 // Lanes for which this does not hold are left to the reference: operands or results that are infinite or
 // NaNs, results that overflow or come near, tiny ones that need not be exact. They, and subnormal operands, raise
@@ -15,14 +16,17 @@
 #ifndef KASTARRI_FLOAT_HOST_H
 #define KASTARRI_FLOAT_HOST_H
 
+#ifndef __AVX512F__
+
 #include <immintrin.h>
 
-#include <cstdint>
-#include <cstring>
+#include <algorithm>
+#include <type_traits>
 
-#include "float/formats.h"
+#include "float/bits.h"
 #include "frame/lanes.h"
-#include "frame/scale.h"
+#include "frame/packs.h"
+#include "frame/registers.h"
 
 namespace {
 
@@ -64,436 +68,706 @@ class HostFpu {
   const word found_;
 };
 
-template <class To, class From>
-inline To same_bits_as(From from) {
-  static_assert(sizeof(To) == sizeof(From));
-  To to;
-  std::memcpy(&to, &from, sizeof to);
-  return to;
-}
-inline float as_float(word bits) { return same_bits_as<float>(bits); }
-inline double as_float(std::uint64_t bits) { return same_bits_as<double>(bits); }
-inline word bits_of(float x) { return same_bits_as<word>(x); }
-inline std::uint64_t bits_of(double x) { return same_bits_as<std::uint64_t>(x); }
+// --- Registers ----------------------------------------------------------------------------------------
 
-// Rules for whole vectors choose between values by masks made of signs. Of a comparison the compiler
-// makes a branch when that spares it a floating-point operation, and does not vectorise the branch.
-template <class T>
-constexpr T sign_mask(T x) {
-  return static_cast<T>(static_cast<std::make_signed_t<T>>(x) >> (8 * sizeof(T) - 1));
+using Words = Vector<word>;
+using Integers = Vector<std::int32_t>;
+using Singles = Vector<float>;
+using Doubles = Vector<double>;
+using DoubleBits = Vector<std::uint64_t>;
+
+constexpr int step = lanes_in_register<word>;  // lanes that are computed at a time
+
+template <class To, class From>
+inline To in_bits(From v) {
+  return reinterpret_cast<To>(v);
 }
-// All ones where x < y, as signed numbers whose difference is one; where x, below the top bit, is not 0.
-template <class T>
-constexpr T mask_below(T x, T y) {
-  return sign_mask(static_cast<T>(x - y));
-}
-template <class T>
-constexpr T mask_not_zero(T x) {
-  return sign_mask(static_cast<T>(0 - x));
-}
-template <class T>
-constexpr T chosen(T mask, T where_set, T elsewhere) {
+inline Words words_of(Singles x) { return in_bits<Words>(x); }
+
+// Lanes of ones where the sign is set.
+inline Words sign_masks(Words x) { return in_bits<Words>(in_bits<Integers>(x) >> 31); }
+inline DoubleBits sign_masks(DoubleBits x) { return in_bits<DoubleBits>(in_bits<Vector<std::int64_t>>(x) < 0); }
+
+// Where the mask is set the one, elsewhere the other.
+template <class V>
+inline V chosen(V mask, V where_set, V elsewhere) {
   return (mask & where_set) | (~mask & elsewhere);
 }
 
-constexpr word single_sign = Single::sign;
-constexpr word single_magnitude = Single::sign - 1;
-constexpr std::uint64_t double_sign = std::uint64_t{1} << 63;
-constexpr std::uint64_t double_magnitude = double_sign - 1;
-constexpr int double_fraction_bits = 52;
-
-constexpr word single_bits_of_power(int exponent) {
-  return static_cast<word>(exponent + Single::bias) << Single::fraction_bits;
+// Whether a lane of words, or of halves of words, has its top bit set.
+template <class Lane>
+inline bool any_sign(Vector<Lane> x) {
+  constexpr unsigned tops = sizeof(Lane) == 2 ? 0xAAAAAAAA : 0x88888888;
+#ifdef __AVX2__
+  return (static_cast<unsigned>(_mm256_movemask_epi8(in_bits<Register>(x))) & tops) != 0;
+#else
+  return (static_cast<unsigned>(_mm_movemask_epi8(in_bits<Register>(x))) & tops) != 0;
+#endif
 }
 
-// What a loop learns about its lanes: bit 31 of `left` is set when one is left to the reference, a bit of `lost` when
-// a result is inexact.
-struct Seen {
-  word left = 0;
-  word lost = 0;
-  std::uint64_t lost_from_doubles = 0;
+inline bool any_bit(Words x) { return any_sign<word>(in_bits<Words>(x != 0)); }
+
+// The first or the last half of the lanes at an address, as doubles.
+constexpr int half_a_step = step / 2;
+inline Doubles doubles_at(const float* singles) {
+#ifdef __AVX2__
+  return in_bits<Doubles>(_mm256_cvtps_pd(_mm_loadu_ps(singles)));
+#else
+  return in_bits<Doubles>(_mm_cvtps_pd(_mm_castpd_ps(_mm_load_sd(reinterpret_cast<const double*>(singles)))));
+#endif
+}
+inline Doubles doubles_at(const std::int32_t* integers) {
+#ifdef __AVX2__
+  return in_bits<Doubles>(_mm256_cvtepi32_pd(_mm_loadu_si128(reinterpret_cast<const __m128i*>(integers))));
+#else
+  return in_bits<Doubles>(_mm_cvtepi32_pd(_mm_loadl_epi64(reinterpret_cast<const __m128i*>(integers))));
+#endif
+}
+
+// Masks of words as masks of pairs of words: those of the first (Half = 0) or the last half of the lanes.
+template <int Half>
+inline DoubleBits pair_masks(Words masks) {
+  const auto v = in_bits<Register>(masks);
+#ifdef __AVX2__
+  return in_bits<DoubleBits>(
+      _mm256_cvtepi32_epi64(Half == 0 ? _mm256_castsi256_si128(v) : _mm256_extracti128_si256(v, 1)));
+#else
+  return in_bits<DoubleBits>(Half == 0 ? _mm_unpacklo_epi32(v, v) : _mm_unpackhi_epi32(v, v));
+#endif
+}
+
+// x shifted right, and what that drops, at the top of a word. By 0 to 32 (more, and nothing is left of the first).
+struct Parted {
+  Words kept, dropped;
 };
-// All magnitudes are below 2^31, so a difference of two has its sign in bit 31.
-constexpr word left_above(word magnitude, word bound) { return bound - magnitude; }
+#ifdef __AVX2__
+inline Parted parted(Words x, Words right) {
+  return {shifted_right<word>(x, counts_of(right)), shifted_left<word>(x, counts_of(32 - right))};
+}
+#else
+// Without shifts by a count a lane: the halves of a product with 2^(32 - right), by the number with that exponent, whose
+// conversion is exact.
+inline Parted parted(Words x, Words right) {
+  const Words left = 32 - right;
+  const auto number = in_bits<Singles>(((left & 15) + Single::bias) << Single::fraction_bits);
+  const auto low_power = in_bits<Words>(__builtin_convertvector(number, Integers));
+  const Words by_16 = in_bits<Words>((left & 16) != 0), nothing = in_bits<Words>(right == 0);
+  const Words power = chosen(by_16, low_power << 16, low_power);
+  const auto products = [](DoubleBits a, DoubleBits b) {
+    return in_bits<DoubleBits>(_mm_mul_epu32(in_bits<Register>(a), in_bits<Register>(b)));
+  };
+  const auto pairs = in_bits<DoubleBits>(x), powers = in_bits<DoubleBits>(power);
+  const DoubleBits even = products(pairs, powers), odd = products(pairs >> 32, powers >> 32);
+  const auto low = in_bits<Words>((even & 0xFFFFFFFF) | odd << 32);
+  const auto high = in_bits<Words>(even >> 32 | (odd & ~std::uint64_t{0xFFFFFFFF}));
+  return {chosen(nothing, x, high), low & ~nothing};
+}
+#endif
 
 // --- Rounding -----------------------------------------------------------------------------------------
 
-// What is added to the bits of a number before the lowest are dropped, so that it is rounded: bits of a
-// number, a carry from its fraction included, count as an integer does.
+constexpr int rest_bits = 29;  // of what a single drops of a double
+constexpr word all_of_rest = (word{1} << rest_bits) - 1, half_of_rest = word{1} << (rest_bits - 1);
+
+// Two ways to round: what is added to the bits of a number before its lowest Count are dropped, for bits of a number,
+// a carry from its fraction included, count as an integer does; and the greatest of the numbers of rest_bits bits
+// that are dropped without rounding up.
 struct ToNearest {
-  template <int Count, class Bits>
-  static constexpr Bits increment(Bits bits) {
-    return (Bits{1} << (Count - 1)) - 1 + (bits >> Count & 1);
+  template <int Count>
+  Words increment(Words bits) const {
+    return (bits >> Count & 1) + ((word{1} << (Count - 1)) - 1);
   }
+  Words greatest_down(Words kept, Words) const { return half_of_rest - (kept & 1); }
   // Bits of a sum, which is +0 when it is 0 but for signs that agree.
-  static constexpr word sum_bits(word bits, word) { return bits; }
+  Words sum_bits(Words bits, Words) const { return bits; }
 };
 
 struct TiesAway {
-  template <int Count, class Bits>
-  static constexpr Bits increment(Bits) {
-    return Bits{1} << (Count - 1);
-  }
+  Words greatest_down(Words, Words) const { return Words{} + (half_of_rest - 1); }
 };
 
 struct Directed {
   explicit Directed(Rounding rounding)
-      : away(rounding == toward_zero ? 0 : ~std::uint64_t{0}),
-        up(rounding == upward ? ~std::uint64_t{0} : 0),
+      : by_sign(rounding == toward_zero ? 0 : ~word{0}),
+        of_positive(rounding == upward ? ~word{0} : 0),
         sign_of_zero(rounding == downward ? single_sign : 0) {}
-  template <int Count, class Bits>
-  constexpr Bits increment(Bits bits) const {
-    return (sign_mask(bits) ^ static_cast<Bits>(up)) & static_cast<Bits>(away) & ((Bits{1} << Count) - 1);
+  // Ones where a number is rounded away from 0.
+  Words away(Words bits) const { return (sign_masks(bits) & by_sign) ^ of_positive; }
+  template <int Count>
+  Words increment(Words bits) const {
+    constexpr word low = (word{1} << Count) - 1;
+    return (sign_masks(bits) & (by_sign & low)) ^ (of_positive & low);
   }
-  word sum_bits(word bits, word either_sign) const {
-    return bits | (either_sign & sign_of_zero & ~mask_not_zero(bits & single_magnitude));
+  Words greatest_down(Words, Words signs) const {
+    return (sign_masks(signs) & (by_sign & all_of_rest)) ^ (~of_positive & all_of_rest);
+  }
+  Words sum_bits(Words bits, Words either_sign) const {
+    return bits | (either_sign & sign_of_zero & in_bits<Words>((bits & single_magnitude) == 0));
   }
 
-  std::uint64_t away, up;
-  word sign_of_zero;
+  word by_sign, of_positive, sign_of_zero;
 };
 
-template <class Bits>
-struct Dropped {
-  Bits kept, dropped;
+// What a loop learns about its lanes: bit 31 of `left` is set when one is left to the reference, a bit of `lost` when
+// a result is inexact.
+struct Seen {
+  Words left = {};
+  Words lost = {};
 };
-template <int Count, class Bits, class Mode>
-inline Dropped<Bits> rounded_off(Bits bits, const Mode& mode) {
-  constexpr Bits low = (Bits{1} << Count) - 1;
-  return {(bits + mode.template increment<Count>(bits)) & ~low, bits & low};
+
+// `kept` with the rest, rest_bits of it, rounded away.
+template <class Mode>
+inline Words rounded(Words kept, Words rest, Words signs, const Mode& mode) {
+  return kept - in_bits<Words>(in_bits<Integers>(rest) > in_bits<Integers>(mode.greatest_down(kept, signs)));
 }
 
-// --- Exact arithmetic: format of the operands -----------------------------------------------------------
+// --- Operands -----------------------------------------------------------------------------------------
+
+// Of sums: `measured` operands tell where they are far apart, `near` ones are not, `any` may be.
+enum class Reach { measured, near, any };
+
+// `step` lanes of an operand of layout L, from number `from` on.
+template <class L, Reach R, class = typename L::number>
+class Lanes;
+
+template <class L, Reach R>
+class Lanes<L, R, single_float> {
+ public:
+  static constexpr Reach reach = R;
+  using format = Single;
+  Lanes(const void* operand, int from) : at_(static_cast<const in_memory<word>*>(operand) + from) {}
+  Words bits() const { return load_register<word>(at_, 0); }
+  Singles value() const { return load_register<float>(at_, 0); }
+  Doubles lower() const { return doubles_at(singles()); }
+  Doubles upper() const { return doubles_at(singles() + half_a_step); }
+
+ private:
+  const float* singles() const { return reinterpret_cast<const float*>(at_); }
+  const in_memory<word>* at_;
+};
+
+// Halves widened.
+template <class L, Reach R>
+class Lanes<L, R, half_float> {
+ public:
+  static constexpr Reach reach = R;
+  using format = Half;
+  Lanes(const void* operand, int from) : at_(static_cast<const in_memory<std::uint16_t>*>(operand) + from) {}
+  Vector<std::uint16_t> bits() const { return load_register<std::uint16_t>(at_, 0); }  // of twice as many
+  Singles value() const {
+    const auto* halves = reinterpret_cast<const __m128i*>(at_);
+#ifdef __F16C__
+    return in_bits<Singles>(_mm256_cvtph_ps(_mm_loadu_si128(halves)));
+#else
+    // A half in the low bits of a single is 2^-112 times itself; only the exponent of infinities and NaNs
+    // has to be told, which near operands are not.
+    const __m128i at_top = _mm_unpacklo_epi16(_mm_setzero_si128(), _mm_loadl_epi64(halves));
+    const Words spread = in_bits<Words>(in_bits<Integers>(at_top) >> 3) & 0x8FFFE000;
+    if constexpr (R == Reach::near) return in_bits<Singles>(spread) * 0x1p112f;
+    const Words special = in_bits<Words>(in_bits<Integers>(spread & single_magnitude) > (word{Half::largest} << 13));
+    return in_bits<Singles>(spread | (special & Single::infinity)) * 0x1p112f;
+#endif
+  }
+
+ private:
+  const in_memory<std::uint16_t>* at_;
+};
+
+template <class L, Reach R>
+class Lanes<L, R, integer> {
+ public:
+  using lane = typename L::container;
+  Lanes(const void* operand, int from) : at_(static_cast<const in_memory<lane>*>(operand) + from) {}
+  // Of 16 bits.
+  Singles value() const {
+    const auto* lanes = reinterpret_cast<const __m128i*>(at_);
+#ifdef __AVX2__
+    const __m128i all = _mm_loadu_si128(lanes);
+    const __m256i words = std::is_signed_v<lane> ? _mm256_cvtepi16_epi32(all) : _mm256_cvtepu16_epi32(all);
+#else
+    const __m128i at_top = _mm_unpacklo_epi16(_mm_setzero_si128(), _mm_loadl_epi64(lanes));
+    const __m128i words = std::is_signed_v<lane> ? _mm_srai_epi32(at_top, 16) : _mm_srli_epi32(at_top, 16);
+#endif
+    return __builtin_convertvector(in_bits<Integers>(words), Singles);
+  }
+  // Of 32 bits.
+  Doubles lower() const { return doubles(0); }
+  Doubles upper() const { return doubles(half_a_step); }
+
+ private:
+  Doubles doubles(int from) const {
+    std::int32_t integers[half_a_step];
+    for (int i = 0; i < half_a_step; ++i)
+      integers[i] = static_cast<std::int32_t>(static_cast<word>(at_[from + i]) ^ (std::is_signed_v<lane> ? 0 : single_sign));
+    return doubles_at(integers) + (std::is_signed_v<lane> ? 0.0 : 0x1p31);
+  }
+  const in_memory<lane>* at_;
+};
+
+// An operand with its signs turned.
+template <class Operand>
+struct Negated {
+  static constexpr Reach reach = Operand::reach;
+  using format = typename Operand::format;
+  auto bits() const { return operand.bits() ^ static_cast<typename format::lane>(format::sign); }
+  Singles value() const { return -operand.value(); }
+  Doubles lower() const { return -operand.lower(); }
+  Doubles upper() const { return -operand.upper(); }
+
+  Operand operand;
+};
+template <class L, Reach R>
+inline Negated<Lanes<L, R>> operator-(const Lanes<L, R>& x) {
+  return {x};
+}
+
+// --- Exact arithmetic -----------------------------------------------------------------------------------
+
+// Of results below the normal numbers: exact ones are kept, or all but 0 are left.
+enum class Tiny { is_exact, is_left };
 
 // The exact result, or another number that rounds as it does.
-template <class Wide>
-struct Exact {
-  Wide value;
-  word left;             // bit 31 is set where it is neither: the lane is left
-  word exact_when_tiny;  // all ones where a result below the normal numbers is not left, since it is exact
-  word either_sign;      // of a sum: the signs of both, where the bits of value do not tell it when it is 0
+template <Tiny T>
+struct ExactSingles {
+  static constexpr Tiny tiny = T;
+  Singles value;
 };
-constexpr word always = ~word{0};
+template <Tiny T>
+struct ExactDoubles {
+  static constexpr Tiny tiny = T;
+  Doubles lower, upper;
+};
+// Of a sum: also the signs of both terms, where the bits of value do not tell that of a 0.
+template <class Exact>
+struct ExactSum {
+  Exact value;
+  Words either_sign;
+};
+// Also bit 31 of the lanes for which it is neither.
+template <class Exact>
+struct ExactBut {
+  Exact value;
+  Words left;
+};
+
+// What measured operands yield: the top bit of every lane that cannot be computed as near.
+template <class Lane>
+struct Far {
+  Vector<Lane> where;
+};
+template <class T>
+constexpr bool is_far = false;
+template <class Lane>
+constexpr bool is_far<Far<Lane>> = true;
+// Whether a rule tells far operands from near ones.
+template <class Rule, class... Measured>
+constexpr bool measures = [] {
+  if constexpr (std::is_invocable_v<Rule, Measured...>) return is_far<std::invoke_result_t<Rule, Measured...>>;
+  return false;
+}();
+
+// Lanes beyond +-limit; no lane is as far off as to come round.
+template <class Lane>
+inline Vector<Lane> beyond(Vector<Lane> x, word limit) {
+  return (static_cast<Lane>(limit) - x) | (static_cast<Lane>(limit) + x);
+}
+
+template <class F>
+constexpr word powers_of_two(int count) {
+  return word(count) << F::fraction_bits;
+}
+template <class F, class V>
+inline V magnitudes(V bits) {
+  return bits & static_cast<typename F::lane>(F::sign - 1);
+}
 
 // The bits of x, but where x is not 0 and lies more than Gap powers of two below y, a number that lies Gap below.
 // Beside y it counts no more than any other: sums with y round alike as long as they keep less than Gap bits. Of
 // numbers no farther apart the sum has room in a format of Gap bits more than x has.
-template <class F, int Gap>
-inline typename F::lane apart(typename F::lane x, typename F::lane y) {
-  using Signed = std::make_signed_t<typename F::lane>;
-  const auto magnitude = static_cast<Signed>(x & (F::sign - 1));
-  const auto least = static_cast<Signed>((y & F::infinity) - (word{Gap} << F::fraction_bits));
-  const Signed lifted = magnitude < least ? least : magnitude;
-  return static_cast<typename F::lane>((x & F::sign) | static_cast<word>(magnitude == 0 ? Signed{0} : lifted));
-}
 template <int Gap>
-inline float apart(float x, float y) {
-  return as_float(apart<Single, Gap>(bits_of(x), bits_of(y)));
+inline Words apart(Words x, Words y) {
+  const auto magnitude = in_bits<Integers>(x & single_magnitude);
+  const auto least = in_bits<Integers>((y & Single::infinity) - powers_of_two<Single>(Gap));
+  const auto lifted = in_bits<Words>(magnitude < least ? least : magnitude);
+  return (x & single_sign) | (lifted & in_bits<Words>(magnitude != 0));
 }
 
-// Halves whose sum has room in a single. (That of a power of two and the lesser one, where they differ in sign, may
-// become a tie, between that power and the number below it; it goes to the power, which is right.)
-template <class L>
-struct ApartHalves {
-  ApartHalves(const void* a_lanes, const void* b_lanes) {
-    const Read<L> x(a_lanes), y(b_lanes);
-    KASTARRI_LANES_INDEPENDENT
-    for (int i = 0; i < L::count; ++i) {
-      a[i] = apart<Half, 12>(x[i], y[i]);
-      b[i] = apart<Half, 12>(y[i], x[i]);
-    }
-  }
-  alignas(64) std::uint16_t a[L::count], b[L::count];
-};
+// Singles that have been computed, as doubles.
+template <Tiny T>
+inline ExactDoubles<T> as_doubles(Words singles) {
+  alignas(64) float each[step];
+  store_register(each, 0, singles);
+  return {doubles_at(each), doubles_at(each + half_a_step)};
+}
 
-template <class F>
-inline auto sum(float a, float b) {
-  const word either_sign = (bits_of(a) | bits_of(b)) & single_sign;
-  if constexpr (std::is_same_v<F, Half>) {
-    return Exact<float>{a + b, 0, always, either_sign};  // of ApartHalves
+// In the top bit: a half that is an infinity or a NaN, which near operands are not where they have no instruction that
+// widens them.
+template <class F, class V>
+inline V unless_narrow_tells([[maybe_unused]] V magnitude) {
+#ifndef __F16C__
+  if constexpr (F::bits == 16) return static_cast<typename F::lane>(F::largest) - magnitude;
+#endif
+  return V{};
+}
+
+template <class F, class A, class B>
+inline auto sum(const A& a, const B& b) {
+  if constexpr (A::reach == Reach::measured) {
+    // In a format of n bits two numbers of m have room up to n - m - 1 powers of two apart.
+    const auto x = magnitudes<F>(a.bits()), y = magnitudes<F>(b.bits());
+    return Far<typename F::lane>{beyond<typename F::lane>(x - y, powers_of_two<F>(F::bits == 16 ? 12 : 28)) |
+                                 unless_narrow_tells<F>(x) | unless_narrow_tells<F>(y)};
+  } else if constexpr (F::bits == 16) {
+    using Exact = ExactSingles<Tiny::is_exact>;
+    const Singles x = a.value(), y = b.value();
+    const Words signs = words_of(x) | words_of(y);
+    if constexpr (A::reach == Reach::near) return ExactSum<Exact>{{x + y}, signs};
+    // (That of a power of two and the lesser one, where they differ in sign, may become a tie, between that power and
+    // the number below it; it goes to the power, which is right.)
+    const auto lifted = [](Singles u, Singles v) { return in_bits<Singles>(apart<12>(words_of(u), words_of(v))); };
+    return ExactSum<Exact>{{lifted(x, y) + lifted(y, x)}, signs};
   } else {
-    return Exact<double>{double{apart<28>(a, b)} + double{apart<28>(b, a)}, 0, always, either_sign};
+    using Exact = ExactDoubles<Tiny::is_left>;
+    const Words signs = a.bits() | b.bits();
+    if constexpr (A::reach == Reach::near) return ExactSum<Exact>{{a.lower() + b.lower(), a.upper() + b.upper()}, signs};
+    const auto x = as_doubles<Tiny::is_left>(apart<28>(a.bits(), b.bits()));
+    const auto y = as_doubles<Tiny::is_left>(apart<28>(b.bits(), a.bits()));
+    return ExactSum<Exact>{{x.lower + y.lower, x.upper + y.upper}, signs};
   }
 }
 
-inline word mask_zero(float x) { return ~mask_not_zero(bits_of(x) & single_magnitude); }
-
-template <class F>
-inline auto product(float a, float b) {
-  if constexpr (std::is_same_v<F, Half>) {
-    return Exact<float>{a * b, 0, 0, 0};
+template <class F, class A, class B>
+inline auto product(const A& a, const B& b) {
+  if constexpr (F::bits == 16) {
+    return ExactSingles<Tiny::is_left>{a.value() * b.value()};
   } else {
-    return Exact<double>{double{a} * double{b}, 0, mask_zero(a) | mask_zero(b), 0};
+    return ExactDoubles<Tiny::is_left>{a.lower() * b.lower(), a.upper() * b.upper()};
   }
+}
+
+// Numbers with the lowest Count bits cut off where the mask is set, and the last that is kept set where that cuts
+// anything. Beside a greater number, whose sum with it is rounded two places above at least, they count as before.
+template <int Count, class V>
+inline V cut_odd(V bits, V mask) {
+  const V cut = mask & ((decltype(bits[0] + 0u){1} << Count) - 1);
+  return (bits | ((bits & cut) + cut)) & ~cut;
+}
+
+// Of acc + a * b: by how much acc is the greater, as exponents tell with fractions for their logarithms. It is at most
+// 0.18 too great, and acc and product have exponents whose difference is less than 1 from what it is truly.
+template <class F, class V>
+inline V headroom(V acc, V a, V b) {
+  return magnitudes<F>(acc) - magnitudes<F>(a) - magnitudes<F>(b) + static_cast<typename F::lane>(F::one);
 }
 
 // c + p for the product p of two singles, 48 bits, which has room unless it is the greater by 2^28. Where c is the
 // greater by 2^3, of p counts what a single holds and whether there is more, which the last bit says: it lies below all
 // that decides how the sum, half of c at the least, is rounded. Where c is the greater by 2^28 not even that counts.
-inline double sum_with_product(double c, double p) {
-  constexpr std::uint64_t power = std::uint64_t{1} << double_fraction_bits, cut_off = (std::uint64_t{1} << 29) - 1;
-  const std::uint64_t c_magnitude = bits_of(c) & double_magnitude, p_magnitude = bits_of(p) & double_magnitude;
-  const std::uint64_t odd = (p_magnitude | ((p_magnitude & cut_off) + cut_off)) & ~cut_off;
-  const std::uint64_t least = (c_magnitude & ~(power - 1)) - 28 * power;
-  const std::uint64_t lifted = chosen(sign_mask(odd - least), least, odd) & mask_not_zero(p_magnitude);
-  const std::uint64_t kept = chosen(sign_mask(p_magnitude + 3 * power - c_magnitude), lifted, p_magnitude);
-  return c + as_float(kept | (bits_of(p) & double_sign));
+inline Doubles sum_with_product(Doubles c, Doubles p) {
+  constexpr std::uint64_t sign = std::uint64_t{1} << 63, power = std::uint64_t{1} << 52;
+  const auto c_magnitude = in_bits<DoubleBits>(c) & ~sign, p_magnitude = in_bits<DoubleBits>(p) & ~sign;
+  const DoubleBits odd = cut_odd<rest_bits>(p_magnitude, ~DoubleBits{});
+  const DoubleBits least = (c_magnitude & ~(power - 1)) - 28 * power;
+  const DoubleBits lifted = chosen(sign_masks(odd - least), least, odd) & sign_masks(0 - p_magnitude);
+  const DoubleBits kept = chosen(sign_masks(p_magnitude + 3 * power - c_magnitude), lifted, p_magnitude);
+  return c + in_bits<Doubles>(kept | (in_bits<DoubleBits>(p) & sign));
 }
 
-// In bit 31: whether a * b is greater than c by 2^27, if not 0, as exponents tell with fractions for their logarithms,
-// which exceed them by less than 0.1. (A subnormal c counts as nearly 2^-126, whose last bit is no higher than its
-// own.)
-inline word product_far_above(float a, float b, float c) {
-  const auto magnitude = [](float x) { return bits_of(x) & single_magnitude; };
-  const word bound = magnitude(c) + (Single::one + (word{27} << Single::fraction_bits));
-  return bound - (magnitude(a) + magnitude(b));
-}
-
-template <class F>
-inline auto fused(float acc, float a, float b) {
-  const word either_sign = ((bits_of(a) ^ bits_of(b)) | bits_of(acc)) & single_sign;
-  if constexpr (std::is_same_v<F, Half>) {
-    const float p = a * b;
-    return Exact<double>{double{apart<30>(p, acc)} + double{apart<30>(acc, p)}, 0, 0, either_sign};
+// acc + a * b for halves.
+template <class C, class A, class B>
+inline auto fused_halves(const C& acc, const A& a, const B& b) {
+  const Singles c = acc.value(), p = a.value() * b.value();
+  const Words c_bits = words_of(c), p_bits = words_of(p), signs = c_bits | p_bits;
+  if constexpr (C::reach == Reach::near) {
+    // In singles there is room if p, of 22 bits, is at most twice below c; where it is lower, its first 12 do.
+    const auto bound = in_bits<Integers>((magnitudes<Single>(p_bits) | (Single::unit - 1)) + Single::unit);
+    const auto below = in_bits<Words>(in_bits<Integers>(magnitudes<Single>(c_bits)) > bound);
+    using Exact = ExactSingles<Tiny::is_left>;
+    return ExactSum<Exact>{{c + in_bits<Singles>(cut_odd<12>(p_bits, below))}, signs};
   } else {
-    const word product_zero = mask_zero(a) | mask_zero(b);
-    const word left = product_far_above(a, b, acc) & ~product_zero & ~mask_zero(acc);
-    return Exact<double>{sum_with_product(acc, double{a} * double{b}), left, product_zero, either_sign};
+    using Exact = ExactDoubles<Tiny::is_left>;
+    const auto x = as_doubles<Tiny::is_left>(apart<30>(p_bits, c_bits));
+    const auto y = as_doubles<Tiny::is_left>(apart<30>(c_bits, p_bits));
+    return ExactSum<Exact>{{x.lower + y.lower, x.upper + y.upper}, signs};
+  }
+}
+
+// acc + a * b for singles.
+template <class C, class A, class B>
+inline auto fused_singles(const C& acc, const A& a, const B& b) {
+  using Exact = ExactDoubles<Tiny::is_left>;
+  const Doubles lower = a.lower() * b.lower(), upper = a.upper() * b.upper();
+  const Words c_bits = acc.bits(), signs = (a.bits() ^ b.bits()) | c_bits;
+  const auto ahead = in_bits<Integers>(headroom<Single>(c_bits, a.bits(), b.bits()));
+  if constexpr (C::reach == Reach::near) {
+    // From 3 powers of two on the product may be cut; up to 4 there is room for all of it.
+    const auto below = in_bits<Words>(ahead > static_cast<std::int32_t>(powers_of_two<Single>(7) / 2));
+    const auto cut = [](Doubles p, DoubleBits masks) {
+      return in_bits<Doubles>(cut_odd<rest_bits>(in_bits<DoubleBits>(p), masks));
+    };
+    return ExactSum<Exact>{
+        {acc.lower() + cut(lower, pair_masks<0>(below)), acc.upper() + cut(upper, pair_masks<1>(below))}, signs};
+  } else {
+    // Where the product is the greater by 2^27, if neither is 0, there is no room. (A subnormal acc counts as nearly
+    // 2^-126, whose last bit is no higher than its own.)
+    const auto zero = [](Words x) { return in_bits<Words>(magnitudes<Single>(x) == 0); };
+    const Words too_far = in_bits<Words>(ahead) + powers_of_two<Single>(27);
+    return ExactBut<ExactSum<Exact>>{{{sum_with_product(acc.lower(), lower), sum_with_product(acc.upper(), upper)}, signs},
+                                     too_far & ~zero(a.bits()) & ~zero(b.bits()) & ~zero(c_bits)};
+  }
+}
+
+template <class F, class C, class A, class B>
+inline auto fused(const C& acc, const A& a, const B& b) {
+  if constexpr (C::reach == Reach::measured) {
+    // Exponents of factors that are not normal do not tell that of the product.
+    using Lane = typename F::lane;
+    const auto c = acc.bits(), x = a.bits(), y = b.bits();
+    const auto least = static_cast<Lane>(F::unit);
+    return Far<Lane>{beyond<Lane>(headroom<F>(c, x, y), powers_of_two<F>(F::bits == 16 ? 11 : 26)) |
+                     (magnitudes<F>(x) - least) | (magnitudes<F>(y) - least) | unless_narrow_tells<F>(magnitudes<F>(c)) |
+                     unless_narrow_tells<F>(magnitudes<F>(x)) | unless_narrow_tells<F>(magnitudes<F>(y))};
+  } else if constexpr (F::bits == 16) {
+    return fused_halves(acc, a, b);
+  } else {
+    return fused_singles(acc, a, b);
   }
 }
 
 // --- Integers -----------------------------------------------------------------------------------------
 
 // An integer divided by a power of two.
-template <class T>
-inline auto scaled_single(T integer, float unit) {
-  using Wide = std::conditional_t<sizeof(T) == 4, double, float>;
-  return Exact<Wide>{static_cast<Wide>(integer) * Wide{unit}, 0, always, 0};
+template <class L, Reach R>
+inline auto scaled_single(const Lanes<L, R>& integers, float unit) {
+  if constexpr (L::bits == 32) {
+    return ExactDoubles<Tiny::is_left>{integers.lower() * double{unit}, integers.upper() * double{unit}};
+  } else {
+    return ExactSingles<Tiny::is_exact>{integers.value() * unit};
+  }
 }
 
 // A number as it is.
-inline Exact<float> exact_single_of(float x) { return {x, 0, 0, 0}; }
+template <class L, Reach R>
+inline ExactSingles<Tiny::is_left> exact_single_of(const Lanes<L, R>& x) {
+  return {x.value()};
+}
 
 // The exponent of a number is `Single::bias` less than this.
-constexpr word biased_exponent(word magnitude) { return magnitude >> Single::fraction_bits; }
+inline Words biased_exponent(Words magnitude) { return magnitude >> Single::fraction_bits; }
 // With the hidden bit; 0 for zero. Of subnormals too, which are too small to tell from other small numbers here.
-constexpr word significand(word magnitude) {
-  return (magnitude & (Single::unit - 1)) | (mask_not_zero(magnitude) & Single::unit);
+inline Words significand(Words magnitude) {
+  return ((magnitude & (Single::unit - 1)) | Single::unit) & in_bits<Words>(magnitude != 0);
 }
-constexpr word at_most(word x, word bound) { return chosen(mask_below(x, bound), x, bound); }
+inline Words at_most(Words x, std::int32_t bound) {
+  const auto signed_x = in_bits<Integers>(x), bounds = Integers{} + bound;
+  return in_bits<Words>(signed_x < bounds ? signed_x : bounds);
+}
 
 // x * 2^scale truncated to an integer of To. Out of range, or a NaN, it is left.
-template <class To>
-inline word truncated(float x, word scale, Seen& seen) {
+template <class To, class Operand>
+inline Words truncated(const Operand& x, word scale, Seen& seen) {
   constexpr bool is_signed = std::is_signed_v<typename To::container>;
-  constexpr bool fills_word = !is_signed && To::bits == 32;
-  const word magnitude = bits_of(x) & single_magnitude, negative = sign_mask(bits_of(x));
+  const Words number = words_of(x.value()), magnitude = number & single_magnitude, negative = sign_masks(number);
   // |x| * 2^scale is the significand, its first bit the word's, times 2^-right.
-  const word right = Single::bias + 31 - biased_exponent(magnitude) - scale, bits = significand(magnitude) << 8;
-  const word least = is_signed ? 33 - To::bits : chosen<word>(negative, 32, 32 - To::bits);
-  seen.left |= mask_below(right, least);
-  const word count = at_most(right, 32);
-  const Scaled32 parts(bits, 32 - count);  // but for a count of 0, which it takes for 32
-  const word shifted = fills_word ? mask_not_zero(count) : always;
-  seen.lost |= shifted & parts.low;
-  const word integer = chosen(shifted, parts.high, bits);
-  return (integer ^ negative) - negative;
+  const Words right = (Single::bias + 31 - scale) - biased_exponent(magnitude);
+  const Words least = is_signed ? Words{} + (33 - To::bits) : chosen(negative, Words{} + 32, Words{} + (32 - To::bits));
+  seen.left |= right - least;
+  const Parted parts = parted(significand(magnitude) << 8, at_most(right, 32));
+  seen.lost |= parts.dropped;
+  return (parts.kept ^ negative) - negative;
 }
 
 struct WholeNumber {
-  float value;
-  word dropped;
+  Words bits, dropped;
 };
 
 // x rounded to an integer; from 2^23 on it is one.
-template <class Mode>
-inline WholeNumber integral(const Mode& mode, float x) {
-  const word magnitude = bits_of(x) & single_magnitude, sign = bits_of(x) & single_sign;
-  const word small = mask_below(magnitude, single_bits_of_power(Single::fraction_bits));
-  const word right = at_most(Single::bias + Single::fraction_bits - biased_exponent(magnitude), 32);
-  const Scaled32 parts(significand(magnitude) & small, 32 - right);
-  const auto rounded = rounded_off<32>(std::uint64_t{sign} << 32 | std::uint64_t{parts.high} << 32 | parts.low, mode);
-  const auto integer = static_cast<word>(rounded.kept >> 32) & single_magnitude;
-  const float number = static_cast<float>(static_cast<std::int32_t>(integer));
-  return {as_float(sign | chosen(small, bits_of(number), magnitude)), static_cast<word>(rounded.dropped)};
-}
-
-// --- Lanes ------------------------------------------------------------------------------------------
-
-// A half as a single. As the low bits of one it is 2^-112 times itself; only the exponent of infinity
-// and NaN has to be told.
-inline float widen(word half) {
-  const auto spread = static_cast<word>(static_cast<std::int32_t>(half << 16) >> 3);
-  const word special = mask_below(word{Half::largest} << 13, spread & 0x0FFFE000) & Single::infinity;
-  return as_float((spread & 0x8FFFE000) | special) * 0x1p112f;
-}
-
-// The lanes of an operand as the unit takes them: singles and integers where they lie, halves widened.
-template <class L, class = typename L::number>
-class HostOperand {
- public:
-  explicit HostOperand(const void* lanes) : lanes_(static_cast<const in_memory<typename L::container>*>(lanes)) {}
-  auto operator[](int i) const {
-    if constexpr (std::is_same_v<typename L::number, single_float>) {
-      return as_float(lanes_[i]);
-    } else {
-      return typename L::container{lanes_[i]};
-    }
-  }
-
- private:
-  const in_memory<typename L::container>* lanes_;
-};
-
-template <class L>
-class HostOperand<L, half_float> {
- public:
-  explicit HostOperand(const void* lanes) {
-    const in_memory<std::uint16_t>* halves = static_cast<const in_memory<std::uint16_t>*>(lanes);
-#if defined __F16C__
-    // A load of part of what has just been stored whole would wait for the store: so it is whole too.
-    for (int i = 0; i < L::count; i += 16) {
-      const __m256i sixteen = _mm256_loadu_si256(reinterpret_cast<const __m256i*>(halves + i));
-      _mm256_store_ps(number_ + i, _mm256_cvtph_ps(_mm256_castsi256_si128(sixteen)));
-      _mm256_store_ps(number_ + i + 8, _mm256_cvtph_ps(_mm256_extracti128_si256(sixteen, 1)));
-    }
-#else
-    KASTARRI_LANES_INDEPENDENT
-    for (int i = 0; i < L::count; ++i) number_[i] = widen(halves[i]);
-#endif
-  }
-  float operator[](int i) const { return number_[i]; }
-
- private:
-  alignas(64) float number_[L::count];
-};
-
-// A lane that is left: a NaN, or what is narrowed to one.
-#ifdef __F16C__
-template <class F>
-constexpr word mark_of_left = ~word{0};
-#else
-template <class F>
-constexpr word mark_of_left = F::bits == 32 ? ~word{0} : (single_bits_of_power(Half::bias + 2) - 1) & ~word{0x1FFF};
-#endif
-// The largest number of a format, as a single.
-template <class F>
-constexpr word widened_largest = F::bits == 32 ? Single::largest
-                                               : (single_bits_of_power(Half::bias + 1) - 1) & ~word{0x1FFF};
-
-#ifndef __F16C__
-// Without the processor's own conversion. Adding 0.5, whose last bit is that of subnormal halves, puts those in place.
-inline word narrow(word single) {
-  const word magnitude = single & single_magnitude;
-  const word small = mask_below(magnitude, single_bits_of_power(Half::least_exponent));
-  const word normal = (magnitude >> 13) - (word{Single::bias - Half::bias} << Half::fraction_bits);
-  const word subnormal = bits_of(as_float(magnitude & small) + 0.5f) - bits_of(0.5f);
-  return chosen(small, subnormal, normal) | (single >> 16 & Half::sign);
-}
-#endif
-
-template <int Count>
-inline void narrow_all(const word* singles, std::uint16_t* halves) {
-#ifdef __F16C__
-  const auto eight = [singles](int i) {
-    return _mm256_cvtps_ph(_mm256_castsi256_ps(_mm256_load_si256(reinterpret_cast<const __m256i*>(singles + i))), 0);
-  };
-  for (int i = 0; i < Count; i += 16)
-    _mm256_storeu_si256(reinterpret_cast<__m256i*>(halves + i), _mm256_set_m128i(eight(i + 8), eight(i)));
-#else
-  // Words first: the compiler would pack each term of the last sum by itself.
-  alignas(64) word words[Count];
-  KASTARRI_LANES_INDEPENDENT
-  for (int i = 0; i < Count; ++i) words[i] = narrow(singles[i]);
-  KASTARRI_LANES_INDEPENDENT
-  for (int i = 0; i < Count; ++i) halves[i] = static_cast<std::uint16_t>(words[i]);
-#endif
+template <class Mode, class Operand>
+inline WholeNumber integral(const Mode& mode, const Operand& x) {
+  const Words number = words_of(x.value()), magnitude = number & single_magnitude, sign = number & single_sign;
+  const Words right = (Single::bias + Single::fraction_bits) - biased_exponent(magnitude);
+  const Words small = ~sign_masks(right - 1);
+  // Of numbers below 2^-5 it is enough that they are not 0.
+  const Parted parts = parted(significand(magnitude) & small, at_most(right, rest_bits) & small);
+  const Words rest = parts.dropped >> (32 - rest_bits);
+  const Singles integer = __builtin_convertvector(in_bits<Integers>(rounded(parts.kept, rest, sign, mode)), Singles);
+  return {sign | chosen(small, words_of(integer), magnitude), rest};
 }
 
 // --- Results ------------------------------------------------------------------------------------------
 
-// An exact result rounded to format F, as the bits of a single, or the mark of a lane that is left.
-template <class F, class Wide, class Mode>
-inline word settled(const Exact<Wide>& x, const Mode& mode, Seen& seen) {
-  constexpr int wide_bits = sizeof(Wide) == 8 ? double_fraction_bits : Single::fraction_bits;
-  constexpr int excess = wide_bits - F::fraction_bits;
-  word bits;
-  if constexpr (excess == 0) {
-    bits = bits_of(x.value);
-  } else {
-    const auto rounded = rounded_off<excess>(bits_of(x.value), mode);
-    bits = mode.sum_bits(bits_of(static_cast<float>(as_float(rounded.kept))), x.either_sign);
-    if constexpr (sizeof(Wide) == 8) seen.lost_from_doubles |= rounded.dropped;
-    if constexpr (sizeof(Wide) == 4) seen.lost |= rounded.dropped;
+// Of lanes that are told by pairs of registers, in their order there: register by register within a block.
+inline Words in_lane_order(Words v) { return in_bits<Words>(in_order<std::uint64_t>(bits_of(v))); }
+
+inline Words tiny_but_not_0(Words magnitude, word least) { return (magnitude - least) & (0 - magnitude); }
+
+constexpr int dropped_from_singles = Single::fraction_bits - Half::fraction_bits;  // bits that halves have not
+
+// Results in the format F, as singles, from exact ones.
+template <class F>
+struct Settled {
+  Words bits;
+  Words left;
+};
+
+// A single is not rounded again.
+template <class F, Tiny T, class Mode>
+inline Settled<F> settled(const ExactSingles<T>& x, const Mode& mode, Seen& seen) {
+  const Words exact = words_of(x.value), magnitude = exact & single_magnitude;
+  Words left = widened_largest<F> - magnitude;
+  if constexpr (F::bits == 32) return {exact, left};
+  constexpr int excess = dropped_from_singles;
+  constexpr word low = (word{1} << excess) - 1;
+  if constexpr (T == Tiny::is_left) left |= tiny_but_not_0(magnitude, single_bits_of_power(Half::least_exponent));
+  seen.lost |= exact;  // low bits of it
+  return {(exact + mode.template increment<excess>(exact)) & ~low, left};
+}
+
+// The leading bits of a double as a single and the rest of it. Below the normal numbers, and from the last few of the
+// finite ones on, it is none; those are left.
+struct Leading {
+  explicit Leading(const Vector<double>& lower, const Vector<double>& upper) {
+    const Words high = every_other_word<1>(bits_of(lower), bits_of(upper));
+    const Words low = every_other_word<0>(bits_of(lower), bits_of(upper));
+    constexpr int of_high = 20;  // bits of the fraction
+    constexpr word rebias = word{1023 - Single::bias} << of_high;
+    const Words magnitude = high & single_magnitude, rebiased = magnitude - rebias;
+    left = tiny_but_not_0(magnitude, rebias + (1 << of_high)) | ((Single::infinity >> 3) - 2 - rebiased);
+    kept = (rebiased & ~sign_masks(rebiased)) << (Single::fraction_bits - of_high) | low >> rest_bits;
+    rest = low & all_of_rest;
+    sign = high & single_sign;
   }
-  // Singles are judged before rounding, which may end at 0: of a tiny number, or of a NaN, whose fraction carries.
-  const word magnitude = (sizeof(Wide) == 4 ? bits_of(static_cast<float>(x.value)) : bits) & single_magnitude;
-  word tiny;
+  Words kept, rest, sign, left;
+};
+
+template <class F, Tiny T, class Mode>
+inline Settled<F> settled(const ExactDoubles<T>& x, const Mode& mode, Seen& seen) {
+  const Leading leading(x.lower, x.upper);
   if constexpr (F::bits == 32) {
-    // Up to the least normal number, for what is just below may have been rounded to it.
-    tiny = excess == 0 ? 0 : mask_below(magnitude, Single::unit + 1);
+    seen.lost |= leading.rest;
+    const Words bits = rounded(leading.kept, leading.rest, leading.sign, mode) | leading.sign;
+    return {in_lane_order(bits), in_lane_order(leading.left)};
   } else {
-    tiny = 0 - (magnitude & mask_below(magnitude, single_bits_of_power(Half::least_exponent)));
+    // A number below the normal singles is among the tiny halves.
+    const Words odd = leading.kept | leading.sign | (in_bits<Words>(leading.rest != 0) & 1);
+    auto half = settled<F>(ExactSingles<T>{in_bits<Singles>(in_lane_order(odd))}, mode, seen);
+    half.left |= in_lane_order(leading.left);
+    return half;
   }
-  const word left = (tiny & ~x.exact_when_tiny) | x.left | left_above(magnitude, widened_largest<F>);
-  seen.left |= left;
-  return chosen(sign_mask(left), mark_of_left<F>, bits);
+}
+
+template <class F, class Exact, class Mode>
+inline Settled<F> settled(const ExactSum<Exact>& x, const Mode& mode, Seen& seen) {
+  auto result = settled<F>(x.value, mode, seen);
+  result.bits = mode.sum_bits(result.bits, x.either_sign);
+  return result;
+}
+template <class F, class Exact, class Mode>
+inline Settled<F> settled(const ExactBut<Exact>& x, const Mode& mode, Seen& seen) {
+  auto result = settled<F>(x.value, mode, seen);
+  result.left |= x.left;
+  return result;
 }
 // A half that is rounded to an integer is a half.
 template <class F, class Mode>
-inline word settled(const WholeNumber& x, const Mode&, Seen& seen) {
-  const word bits = bits_of(x.value);
-  const word left = left_above(bits & single_magnitude, widened_largest<F>);
-  seen.left |= left;
-  seen.lost |= x.dropped;
-  return chosen(sign_mask(left), mark_of_left<F>, bits);
+inline Settled<F> settled(const WholeNumber& x, const Mode&, Seen& seen) {
+  seen.lost |= in_bits<Words>(x.dropped != 0);
+  return {x.bits, widened_largest<F> - (x.bits & single_magnitude)};
 }
 
-struct HostResult {
-  word flags;
-  bool some_left;
-};
+// Singles that are halves, of two steps, as halves.
+inline Vector<std::uint16_t> narrowed(Words first, Words last) {
+#ifdef __F16C__
+  const auto eight = [](Words x) { return _mm256_cvtps_ph(in_bits<__m256>(x), 0); };
+  return in_bits<Vector<std::uint16_t>>(_mm256_set_m128i(eight(last), eight(first)));
+#else
+  // 2^-112 times as much has the exponent of a half, and subnormal halves are subnormal singles; signs by themselves.
+  const auto unsigned_half = [](Words x) {
+    return in_bits<Register>(words_of(in_bits<Singles>(x) * 0x1p-112f) << 1 >> 14);
+  };
+  const auto pack = [](Register a, Register b) {
+    return in_bits<Vector<std::uint16_t>>(pack_words(a, b, std::int16_t{}));
+  };
+  return pack(unsigned_half(first), unsigned_half(last)) |
+         (pack(in_bits<Register>(first), in_bits<Register>(last)) & std::uint16_t{Half::sign});
+#endif
+}
 
-// A rule on lanes, or one that asks for the mode too.
-template <class Rule, class Mode, class... X>
-inline auto by_rule(Rule rule, [[maybe_unused]] const Mode& mode, X... x) {
-  if constexpr (std::is_invocable_v<Rule, Mode, X...>) {
-    return rule(mode, x...);
-  } else {
-    return rule(x...);
+// --- A whole vector -----------------------------------------------------------------------------------
+
+// Whether lanes that operands measure by the rule are far apart.
+template <class F, class... Ls, class Rule, class... Units>
+inline bool any_far(Rule rule, const Units*... operands) {
+  using Lane = typename F::lane;
+  Vector<Lane> far = {};
+  for (int from = 0; from < std::max({Ls::count...}); from += lanes_in_register<Lane>)
+    far |= rule(Lanes<Ls, Reach::measured>(operands, from)...).where;
+  return any_sign<Lane>(far);
+}
+
+// Results of all lanes by a function that yields a step of them.
+template <class R, class OneStep>
+inline void every_step(typename R::container* results, OneStep one_step) {
+  using Lane = typename R::container;
+  for (int from = 0; from < R::count; from += lanes_in_register<Lane>) {
+    if constexpr (R::bits == 32) {
+      store_register(results + from, 0, one_step(from));
+    } else if constexpr (std::is_same_v<typename R::number, half_float>) {
+      const Words first = one_step(from);
+      store_register(results + from, 0, narrowed(first, one_step(from + step)));
+    } else {
+      const auto first = in_bits<Register>(one_step(from));
+      const auto both = bits_of(pack_words(first, in_bits<Register>(one_step(from + step)), Lane{}));
+      store_register(results + from, 0, in_order<std::uint64_t>(both));
+    }
   }
 }
 
-// Result lane i = rule(operand lanes i ...) on the unit, Exact or WholeNumber; for a result of integers
-// rule(seen, operand lanes i ...). The results are apart from the operands. Flattened: a call within a
-// loop over lanes would keep it from being vectorised.
+template <Reach R>
+using Operands = std::integral_constant<Reach, R>;
+
+// Result lane i = rule(operand lanes i ...) on the unit, exact numbers; for a result of integers
+// rule(operand lanes i ..., seen), the integers. The results are apart from the operands. Flattened: a call within a
+// loop over lanes passes registers through memory.
 template <class R, class... Ls, class Mode, class Rule, class... Units>
 [[gnu::flatten]] inline HostResult on_host_in(const Mode& mode, typename R::container* results, Rule rule,
                                               const Units*... operands) {
+  using F = format_of<R>;
+  constexpr bool integers = std::is_same_v<typename R::number, integer>;
   Seen seen;
-  const auto every_lane = [&](const auto&... x) {
-    if constexpr (std::is_same_v<typename R::number, integer>) {
-      KASTARRI_LANES_INDEPENDENT
-      for (int i = 0; i < R::count; ++i) results[i] = static_cast<typename R::container>(rule(seen, x[i]...));
-    } else {
-      const auto singles = [&](word* to) {
-        KASTARRI_LANES_INDEPENDENT
-        for (int i = 0; i < R::count; ++i) to[i] = settled<format_of<R>>(by_rule(rule, mode, x[i]...), mode, seen);
-      };
-      if constexpr (R::bits == 32) {
-        singles(results);
+  alignas(64) word left[R::count];
+  const auto compute = [&](auto reach) {
+    every_step<R>(results, [&](int from) {
+      if constexpr (integers) {
+        return rule(Lanes<Ls, reach.value>(operands, from)..., seen);
       } else {
-        alignas(64) word halves[R::count];
-        singles(halves);
-        narrow_all<R::count>(halves, results);
+        const auto exact = by_rule(rule, mode, Lanes<Ls, reach.value>(operands, from)...);
+        const Settled<F> lanes = settled<F>(exact, mode, seen);
+        seen.left |= lanes.left;
+        store_register(left + from, 0, lanes.left);
+        return lanes.bits;
       }
-    }
+    });
   };
   {
     const HostFpu fpu(results, operands...);
-    every_lane(HostOperand<Ls>(operands)...);
+    if constexpr (measures<Rule, Lanes<Ls, Reach::measured>...>) {
+      if (any_far<F, Ls...>(rule, operands...)) {
+        compute(Operands<Reach::any>());
+      } else {
+        compute(Operands<Reach::near>());
+      }
+    } else {
+      compute(Operands<Reach::any>());
+    }
   }
-  return {(seen.lost | seen.lost_from_doubles) != 0 ? word{inexact} : 0, sign_mask(seen.left) != 0};
+  const bool some_left = any_sign<word>(seen.left);
+  if (!integers && __builtin_expect(some_left, 0)) {
+    for (int i = 0; i < R::count; ++i)
+      if (sign_mask(left[i]) != 0) results[i] = static_cast<typename R::container>(~word{0});
+  }
+  constexpr word lost_bits = !integers && R::bits == 16 ? (word{1} << dropped_from_singles) - 1 : ~word{0};
+  return {any_bit(seen.lost & lost_bits) ? word{inexact} : 0, some_left};
 }
 
 template <class R, class... Ls, class Rule, class... Units>
@@ -507,5 +781,7 @@ inline HostResult on_host(Rounding rounding, typename R::container* results, Rul
 }
 
 }  // namespace
+
+#endif
 
 #endif

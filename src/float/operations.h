@@ -22,6 +22,13 @@ inline bool fast_on_unit(Environment& env, typename L::container* results, Rule 
   return host.some_left;
 }
 
+// A float of the unit, its sign turned.
+template <bool Turned, class T>
+inline auto turned_if(const T& x) {
+  if constexpr (Turned) return -x;
+  else return x;
+}
+
 // a + b, or a - b.
 template <bool Subtract>
 struct Sum {
@@ -31,13 +38,8 @@ struct Sum {
   }
   template <class L, class Units>
   static bool fast(Environment& env, typename L::container* r, const Units* a, const Units* b) {
-    const auto rule = [](auto x, auto y) { return sum<format_of<L>>(x, Subtract ? -y : y); };
-    if constexpr (L::bits == 16 && !rounds_by_instruction) {
-      const ApartHalves<L> operands(a, b);
-      return fast_on_unit<L>(env, r, rule, operands.a, operands.b);
-    } else {
-      return fast_on_unit<L>(env, r, rule, a, b);
-    }
+    return fast_on_unit<L>(
+        env, r, [](auto x, auto y) { return sum<format_of<L>>(x, turned_if<Subtract>(y)); }, a, b);
   }
 };
 using ADD = Sum<false>;
@@ -65,7 +67,8 @@ struct Fused {
   template <class L, class... Units>
   static bool fast(Environment& env, typename L::container* r, const Units*... operands) {
     return fast_on_unit<L>(
-        env, r, [](auto acc, auto a, auto b) { return fused<format_of<L>>(acc, Subtract ? -a : a, b); }, operands...);
+        env, r, [](auto acc, auto a, auto b) { return fused<format_of<L>>(acc, turned_if<Subtract>(a), b); },
+        operands...);
   }
 };
 using MULA = Fused<false>;

@@ -105,7 +105,13 @@ inline bool any_sign(Vector<Lane> x) {
 #endif
 }
 
-inline bool any_bit(Words x) { return any_sign<word>(in_bits<Words>(x != 0)); }
+inline bool any_bit(Words x) {
+#ifdef __AVX2__
+  return _mm256_testz_si256(in_bits<Register>(x), in_bits<Register>(x)) == 0;
+#else
+  return any_sign<word>(in_bits<Words>(x != 0));
+#endif
+}
 
 // The first or the last half of the lanes at an address, as doubles.
 constexpr int half_a_step = step / 2;
@@ -187,12 +193,6 @@ struct TiesAway {
 };
 
 struct Directed {
-  explicit Directed(Rounding rounding)
-      : by_sign(rounding == toward_zero ? 0 : ~word{0}),
-        of_positive(rounding == upward ? ~word{0} : 0),
-        sign_of_zero(rounding == downward ? single_sign : 0) {}
-  // Ones where a number is rounded away from 0.
-  Words away(Words bits) const { return (sign_masks(bits) & by_sign) ^ of_positive; }
   template <int Count>
   Words increment(Words bits) const {
     constexpr word low = (word{1} << Count) - 1;
@@ -205,15 +205,11 @@ struct Directed {
     return bits | (either_sign & sign_of_zero & in_bits<Words>((bits & single_magnitude) == 0));
   }
 
+  // All ones where the sign decides whether numbers are rounded away from 0, and where positive ones are.
   word by_sign, of_positive, sign_of_zero;
 };
-
-// What a loop learns about its lanes: bit 31 of `left` is set when one is left to the reference, a bit of `lost` when
-// a result is inexact.
-struct Seen {
-  Words left = {};
-  Words lost = {};
-};
+// By RoundMode.
+constexpr Directed directed[] = {{}, {0, 0, 0}, {~word{0}, ~word{0}, 0}, {~word{0}, 0, single_sign}};
 
 // `kept` with the rest, rest_bits of it, rounded away.
 template <class Mode>
@@ -563,18 +559,22 @@ inline Words at_most(Words x, std::int32_t bound) {
   return in_bits<Words>(signed_x < bounds ? signed_x : bounds);
 }
 
+struct Truncated {
+  Words integers;
+  Words dropped;
+  Words left;  // in the top bit
+};
+
 // x * 2^scale truncated to an integer of To. Out of range, or a NaN, it is left.
 template <class To, class Operand>
-inline Words truncated(const Operand& x, word scale, Seen& seen) {
+inline Truncated truncated(const Operand& x, word scale) {
   constexpr bool is_signed = std::is_signed_v<typename To::container>;
   const Words number = words_of(x.value()), magnitude = number & single_magnitude, negative = sign_masks(number);
   // |x| * 2^scale is the significand, its first bit the word's, times 2^-right.
   const Words right = (Single::bias + 31 - scale) - biased_exponent(magnitude);
   const Words least = is_signed ? Words{} + (33 - To::bits) : chosen(negative, Words{} + 32, Words{} + (32 - To::bits));
-  seen.left |= right - least;
   const Parted parts = parted(significand(magnitude) << 8, at_most(right, 32));
-  seen.lost |= parts.dropped;
-  return (parts.kept ^ negative) - negative;
+  return {(parts.kept ^ negative) - negative, parts.dropped, right - least};
 }
 
 struct WholeNumber {
@@ -596,83 +596,129 @@ inline WholeNumber integral(const Mode& mode, const Operand& x) {
 
 // --- Results ------------------------------------------------------------------------------------------
 
-// Of lanes that are told by pairs of registers, in their order there: register by register within a block.
+// Magnitudes between which a lane has its result: from Least on, or 0, up to Greatest. Others are left.
+template <word Least, word Greatest>
+struct Range {
+  static constexpr word greatest = Greatest;
+  static constexpr bool holds(word magnitude) { return magnitude <= Greatest && (magnitude >= Least || magnitude == 0); }
+};
+
+// Whether magnitudes that have been seen are all in the range.
+template <class R>
+class Within;
+template <word Least, word Greatest>
+class Within<Range<Least, Greatest>> {
+ public:
+#ifdef __AVX2__
+  void see(Words magnitudes) {
+    const auto next = in_bits<Integers>(magnitudes), next_least = in_bits<Integers>(magnitudes + below);
+    greatest_ = next > greatest_ ? next : greatest_;
+    if constexpr (Least > 0) least_ = next_least < least_ ? next_least : least_;
+  }
+  bool some_not() const {
+    auto outside = greatest_ > static_cast<std::int32_t>(Greatest);
+    if constexpr (Least > 0) outside |= least_ < static_cast<std::int32_t>(Least + below);
+    return any_bit(in_bits<Words>(outside));
+  }
+
+ private:
+  // Added to all, it makes 0 the greatest.
+  static constexpr word below = 0x7FFFFFFF;
+  Integers greatest_ = {}, least_ = Integers{} + INT32_MAX;
+#else
+  void see(Words magnitudes) {
+    outside_ |= Greatest - magnitudes;
+    if constexpr (Least > 0) outside_ |= (magnitudes - Least) & (0 - magnitudes);
+  }
+  bool some_not() const { return any_sign<word>(outside_); }
+
+ private:
+  Words outside_ = {};
+#endif
+};
+
+// Results in a format, as the bits of singles, with the magnitudes that tell which of them are left and what has been
+// dropped from them.
+template <class R, bool Paired = false>
+struct Settled {
+  using range = R;
+  // Whether lanes come register by register within a block, as pairs of registers tell them.
+  static constexpr bool paired = Paired;
+  Words bits, magnitudes, dropped;
+};
 inline Words in_lane_order(Words v) { return in_bits<Words>(in_order<std::uint64_t>(bits_of(v))); }
 
-inline Words tiny_but_not_0(Words magnitude, word least) { return (magnitude - least) & (0 - magnitude); }
+template <class F, Tiny T>
+using Singly = Range<F::bits == 32 || T == Tiny::is_exact ? 0 : single_bits_of_power(Half::least_exponent), widened_largest<F>>;
 
-constexpr int dropped_from_singles = Single::fraction_bits - Half::fraction_bits;  // bits that halves have not
-
-// Results in the format F, as singles, from exact ones.
-template <class F>
-struct Settled {
-  Words bits;
-  Words left;
-};
-
-// A single is not rounded again.
+// Singles rounded to halves; singles are not rounded again.
 template <class F, Tiny T, class Mode>
-inline Settled<F> settled(const ExactSingles<T>& x, const Mode& mode, Seen& seen) {
+inline auto settled(const ExactSingles<T>& x, const Mode& mode) {
+  using Result = Settled<Singly<F, T>>;
   const Words exact = words_of(x.value), magnitude = exact & single_magnitude;
-  Words left = widened_largest<F> - magnitude;
-  if constexpr (F::bits == 32) return {exact, left};
-  constexpr int excess = dropped_from_singles;
+  if constexpr (F::bits == 32) return Result{exact, magnitude, {}};
+  constexpr int excess = Single::fraction_bits - Half::fraction_bits;
   constexpr word low = (word{1} << excess) - 1;
-  if constexpr (T == Tiny::is_left) left |= tiny_but_not_0(magnitude, single_bits_of_power(Half::least_exponent));
-  seen.lost |= exact;  // low bits of it
-  return {(exact + mode.template increment<excess>(exact)) & ~low, left};
+  return Result{(exact + mode.template increment<excess>(exact)) & ~low, magnitude, exact & low};
 }
 
-// The leading bits of a double as a single and the rest of it. Below the normal numbers, and from the last few of the
-// finite ones on, it is none; those are left.
+// Doubles as their upper words, and the leading bits of them as singles with the rest. Where a number is below the
+// normal singles, or among the last few of them, these are not right.
 struct Leading {
-  explicit Leading(const Vector<double>& lower, const Vector<double>& upper) {
+  static constexpr int of_high = 20;  // bits of the fraction
+  static constexpr word rebias = word{1023 - Single::bias} << of_high;
+  using range = Range<rebias + (1 << of_high), rebias + (Single::infinity >> 3) - 2>;
+
+  Leading(const Doubles& lower, const Doubles& upper) {
     const Words high = every_other_word<1>(bits_of(lower), bits_of(upper));
     const Words low = every_other_word<0>(bits_of(lower), bits_of(upper));
-    constexpr int of_high = 20;  // bits of the fraction
-    constexpr word rebias = word{1023 - Single::bias} << of_high;
-    const Words magnitude = high & single_magnitude, rebiased = magnitude - rebias;
-    left = tiny_but_not_0(magnitude, rebias + (1 << of_high)) | ((Single::infinity >> 3) - 2 - rebiased);
-    kept = (rebiased & ~sign_masks(rebiased)) << (Single::fraction_bits - of_high) | low >> rest_bits;
+    magnitude = high & single_magnitude;
+    sign = high ^ magnitude;
+    const auto rebiased = in_bits<Integers>(magnitude - rebias);
+    const auto exponent_and_fraction = in_bits<Words>(rebiased > 0 ? rebiased : Integers{});
+    kept = exponent_and_fraction << (Single::fraction_bits - of_high) | low >> rest_bits;
     rest = low & all_of_rest;
-    sign = high & single_sign;
   }
-  Words kept, rest, sign, left;
+  Words magnitude, sign, kept, rest;
 };
 
 template <class F, Tiny T, class Mode>
-inline Settled<F> settled(const ExactDoubles<T>& x, const Mode& mode, Seen& seen) {
+inline auto settled(const ExactDoubles<T>& x, const Mode& mode) {
   const Leading leading(x.lower, x.upper);
   if constexpr (F::bits == 32) {
-    seen.lost |= leading.rest;
     const Words bits = rounded(leading.kept, leading.rest, leading.sign, mode) | leading.sign;
-    return {in_lane_order(bits), in_lane_order(leading.left)};
+    return Settled<Leading::range, true>{in_lane_order(bits), leading.magnitude, leading.rest};
   } else {
-    // A number below the normal singles is among the tiny halves.
-    const Words odd = leading.kept | leading.sign | (in_bits<Words>(leading.rest != 0) & 1);
-    auto half = settled<F>(ExactSingles<T>{in_bits<Singles>(in_lane_order(odd))}, mode, seen);
-    half.left |= in_lane_order(leading.left);
-    return half;
+    // Infinities and NaNs have to be told; no sum or product of halves is below the normal singles.
+    const Words finite = in_bits<Words>(in_bits<Integers>(leading.magnitude) <= std::int32_t{Leading::range::greatest});
+    const Words odd = leading.kept | (in_bits<Words>(leading.rest != 0) & 1) | (~finite & Single::infinity);
+    return settled<F>(ExactSingles<T>{in_bits<Singles>(in_lane_order(odd | leading.sign))}, mode);
   }
 }
 
 template <class F, class Exact, class Mode>
-inline Settled<F> settled(const ExactSum<Exact>& x, const Mode& mode, Seen& seen) {
-  auto result = settled<F>(x.value, mode, seen);
+inline auto settled(const ExactSum<Exact>& x, const Mode& mode) {
+  auto result = settled<F>(x.value, mode);
   result.bits = mode.sum_bits(result.bits, x.either_sign);
   return result;
 }
 template <class F, class Exact, class Mode>
-inline Settled<F> settled(const ExactBut<Exact>& x, const Mode& mode, Seen& seen) {
-  auto result = settled<F>(x.value, mode, seen);
-  result.left |= x.left;
+inline auto settled(const ExactBut<Exact>& x, const Mode& mode) {
+  auto result = settled<F>(x.value, mode);
+  const Words left = sign_masks(x.left);
+  result.magnitudes |= (result.paired ? in_lane_order(left) : left) & single_magnitude;
   return result;
 }
 // A half that is rounded to an integer is a half.
 template <class F, class Mode>
-inline Settled<F> settled(const WholeNumber& x, const Mode&, Seen& seen) {
-  seen.lost |= in_bits<Words>(x.dropped != 0);
-  return {x.bits, widened_largest<F> - (x.bits & single_magnitude)};
+inline auto settled(const WholeNumber& x, const Mode&) {
+  return Settled<Range<0, widened_largest<F>>>{x.bits, x.bits & single_magnitude, x.dropped};
+}
+
+// Where lane i of a step is in the order of pairs.
+constexpr int paired_lane(int i) {
+  const int pair = i / 2;
+  return 2 * (pair % blocks_in_register * 2 + pair / blocks_in_register) + i % 2;
 }
 
 // Singles that are halves, of two steps, as halves.
@@ -723,51 +769,59 @@ inline void every_step(typename R::container* results, OneStep one_step) {
   }
 }
 
-template <Reach R>
-using Operands = std::integral_constant<Reach, R>;
+// By the rule, which yields exact numbers.
+template <class R, Reach Are, class... Ls, class Mode, class Rule, class... Units>
+inline HostResult numbers_on_host(const Mode& mode, typename R::container* results, Rule rule, const Units*... operands) {
+  using F = format_of<R>;
+  const auto settled_step = [&](int from) {
+    return settled<F>(by_rule(rule, mode, Lanes<Ls, Are>(operands, from)...), mode);
+  };
+  using Result = decltype(settled_step(0));
+  alignas(64) word magnitudes[R::count];
+  Within<typename Result::range> within;
+  Words dropped = {};
+  every_step<R>(results, [&](int from) {
+    const Result result = settled_step(from);
+    store_register(magnitudes + from, 0, result.magnitudes);
+    within.see(result.magnitudes);
+    dropped |= result.dropped;
+    return result.bits;
+  });
+  const bool some_left = within.some_not();
+  if (__builtin_expect(some_left, 0)) {
+    for (int i = 0; i < R::count; ++i) {
+      const int at = Result::paired ? i / step * step + paired_lane(i % step) : i;
+      if (!Result::range::holds(magnitudes[at])) results[i] = static_cast<typename R::container>(~word{0});
+    }
+  }
+  return {any_bit(dropped) ? word{inexact} : 0, some_left};
+}
 
-// Result lane i = rule(operand lanes i ...) on the unit, exact numbers; for a result of integers
-// rule(operand lanes i ..., seen), the integers. The results are apart from the operands. Flattened: a call within a
-// loop over lanes passes registers through memory.
+// Result lane i = rule(operand lanes i ...) on the unit, exact numbers. The results are apart from the operands.
+// Flattened: calls would pass registers through memory.
 template <class R, class... Ls, class Mode, class Rule, class... Units>
 [[gnu::flatten]] inline HostResult on_host_in(const Mode& mode, typename R::container* results, Rule rule,
                                               const Units*... operands) {
-  using F = format_of<R>;
-  constexpr bool integers = std::is_same_v<typename R::number, integer>;
-  Seen seen;
-  alignas(64) word left[R::count];
-  const auto compute = [&](auto reach) {
-    every_step<R>(results, [&](int from) {
-      if constexpr (integers) {
-        return rule(Lanes<Ls, reach.value>(operands, from)..., seen);
-      } else {
-        const auto exact = by_rule(rule, mode, Lanes<Ls, reach.value>(operands, from)...);
-        const Settled<F> lanes = settled<F>(exact, mode, seen);
-        seen.left |= lanes.left;
-        store_register(left + from, 0, lanes.left);
-        return lanes.bits;
-      }
-    });
-  };
-  {
-    const HostFpu fpu(results, operands...);
-    if constexpr (measures<Rule, Lanes<Ls, Reach::measured>...>) {
-      if (any_far<F, Ls...>(rule, operands...)) {
-        compute(Operands<Reach::any>());
-      } else {
-        compute(Operands<Reach::near>());
-      }
-    } else {
-      compute(Operands<Reach::any>());
-    }
+  const HostFpu fpu(results, operands...);
+  if constexpr (measures<Rule, Lanes<Ls, Reach::measured>...>) {
+    if (!any_far<format_of<R>, Ls...>(rule, operands...))
+      return numbers_on_host<R, Reach::near, Ls...>(mode, results, rule, operands...);
   }
-  const bool some_left = any_sign<word>(seen.left);
-  if (!integers && __builtin_expect(some_left, 0)) {
-    for (int i = 0; i < R::count; ++i)
-      if (sign_mask(left[i]) != 0) results[i] = static_cast<typename R::container>(~word{0});
-  }
-  constexpr word lost_bits = !integers && R::bits == 16 ? (word{1} << dropped_from_singles) - 1 : ~word{0};
-  return {any_bit(seen.lost & lost_bits) ? word{inexact} : 0, some_left};
+  return numbers_on_host<R, Reach::any, Ls...>(mode, results, rule, operands...);
+}
+
+// Numbers times a power of two, truncated to integers.
+template <class R, class From, class Units>
+[[gnu::flatten]] inline HostResult truncated_on_host(typename R::container* results, word scale, const Units* operand) {
+  const HostFpu fpu(results, operand);
+  Words dropped = {}, left = {};
+  every_step<R>(results, [&](int from) {
+    const Truncated result = truncated<R>(Lanes<From, Reach::any>(operand, from), scale);
+    dropped |= result.dropped;
+    left |= result.left;
+    return result.integers;
+  });
+  return {any_bit(dropped) ? word{inexact} : 0, any_sign<word>(left)};
 }
 
 template <class R, class... Ls, class Rule, class... Units>
@@ -777,7 +831,7 @@ inline HostResult on_host(TiesAway mode, typename R::container* results, Rule ru
 template <class R, class... Ls, class Rule, class... Units>
 inline HostResult on_host(Rounding rounding, typename R::container* results, Rule rule, const Units*... operands) {
   if (rounding == to_nearest) return on_host_in<R, Ls...>(ToNearest(), results, rule, operands...);
-  return on_host_in<R, Ls...>(Directed(rounding), results, rule, operands...);
+  return on_host_in<R, Ls...>(directed[rounding & 3], results, rule, operands...);
 }
 
 }  // namespace

@@ -34,8 +34,7 @@ inline HostResult on_unit(const Mode& mode, typename R::container* results, Rule
 }
 template <class R, class From, class Units>
 inline HostResult truncated_on_unit(typename R::container* results, word scale, const Units* operand) {
-  return on_host_in<R, From>(
-      ToNearest(), results, [scale](auto x, Seen& seen) { return truncated<R>(x, scale, seen); }, operand);
+  return truncated_on_host<R, From>(results, scale, operand);
 }
 #endif
 

@@ -184,8 +184,6 @@ struct ToNearest {
     return (bits >> Count & 1) + ((word{1} << (Count - 1)) - 1);
   }
   Words greatest_down(Words kept, Words) const { return half_of_rest - (kept & 1); }
-  // Bits of a sum, which is +0 when it is 0 but for signs that agree.
-  Words sum_bits(Words bits, Words) const { return bits; }
 };
 
 struct TiesAway {
@@ -201,15 +199,11 @@ struct Directed {
   Words greatest_down(Words, Words signs) const {
     return (sign_masks(signs) & (by_sign & all_of_rest)) ^ (~of_positive & all_of_rest);
   }
-  Words sum_bits(Words bits, Words either_sign) const {
-    return bits | (either_sign & sign_of_zero & in_bits<Words>((bits & single_magnitude) == 0));
-  }
-
   // All ones where the sign decides whether numbers are rounded away from 0, and where positive ones are.
-  word by_sign, of_positive, sign_of_zero;
+  word by_sign, of_positive;
 };
 // By RoundMode.
-constexpr Directed directed[] = {{}, {0, 0, 0}, {~word{0}, ~word{0}, 0}, {~word{0}, 0, single_sign}};
+constexpr Directed directed[] = {{}, {0, 0}, {~word{0}, ~word{0}}, {~word{0}, 0}};
 
 // `kept` with the rest, rest_bits of it, rounded away.
 template <class Mode>
@@ -333,12 +327,6 @@ struct ExactDoubles {
   static constexpr Tiny tiny = T;
   Doubles lower, upper;
 };
-// Of a sum: also the signs of both terms, where the bits of value do not tell that of a 0.
-template <class Exact>
-struct ExactSum {
-  Exact value;
-  Words either_sign;
-};
 // Also bit 31 of the lanes for which it is neither.
 template <class Exact>
 struct ExactBut {
@@ -346,19 +334,20 @@ struct ExactBut {
   Words left;
 };
 
-// What measured operands yield: the top bit of every lane that cannot be computed as near.
+// What measured operands of a sum yield.
 template <class Lane>
-struct Far {
-  Vector<Lane> where;
+struct Measured {
+  Vector<Lane> far;          // in the top bit: lanes that cannot be computed as near
+  Vector<Lane> either_sign;  // there too: the signs of both terms together
 };
 template <class T>
-constexpr bool is_far = false;
+constexpr bool is_measured = false;
 template <class Lane>
-constexpr bool is_far<Far<Lane>> = true;
-// Whether a rule tells far operands from near ones.
-template <class Rule, class... Measured>
+constexpr bool is_measured<Measured<Lane>> = true;
+// Whether a rule is a sum.
+template <class Rule, class... Operands>
 constexpr bool measures = [] {
-  if constexpr (std::is_invocable_v<Rule, Measured...>) return is_far<std::invoke_result_t<Rule, Measured...>>;
+  if constexpr (std::is_invocable_v<Rule, Operands...>) return is_measured<std::invoke_result_t<Rule, Operands...>>;
   return false;
 }();
 
@@ -396,14 +385,20 @@ inline ExactDoubles<T> as_doubles(Words singles) {
   return {doubles_at(each), doubles_at(each + half_a_step)};
 }
 
-// In the top bit: a half that is an infinity or a NaN, which near operands are not where they have no instruction that
-// widens them.
-template <class F, class V>
-inline V unless_narrow_tells([[maybe_unused]] V magnitude) {
-#ifndef __F16C__
-  if constexpr (F::bits == 16) return static_cast<typename F::lane>(F::largest) - magnitude;
+// Where there is no instruction that widens halves, near ones must not be infinities or NaNs. In the top bit: one that is.
+#ifdef __F16C__
+template <class F>
+constexpr bool has_far_specials = false;
+#else
+template <class F>
+constexpr bool has_far_specials = F::bits == 16;
 #endif
-  return V{};
+template <class F, class V, class... More>
+inline V far_specials(V magnitude, More... magnitudes) {
+  if constexpr (!has_far_specials<F>) return V{};
+  const V special = static_cast<typename F::lane>(F::largest) - magnitude;
+  if constexpr (sizeof...(More) > 0) return special | far_specials<F>(magnitudes...);
+  return special;
 }
 
 template <class F, class A, class B>
@@ -411,30 +406,30 @@ inline auto sum(const A& a, const B& b) {
   if constexpr (A::reach == Reach::measured) {
     // In a format of n bits two numbers of m have room up to n - m - 1 powers of two apart.
     const auto x = magnitudes<F>(a.bits()), y = magnitudes<F>(b.bits());
-    return Far<typename F::lane>{beyond<typename F::lane>(x - y, powers_of_two<F>(F::bits == 16 ? 12 : 28)) |
-                                 unless_narrow_tells<F>(x) | unless_narrow_tells<F>(y)};
+    const auto far = beyond<typename F::lane>(x - y, powers_of_two<F>(F::bits == 16 ? 12 : 28));
+    return Measured<typename F::lane>{far | far_specials<F>(x, y), a.bits() | b.bits()};
   } else if constexpr (F::bits == 16) {
     using Exact = ExactSingles<Tiny::is_exact>;
     const Singles x = a.value(), y = b.value();
-    const Words signs = words_of(x) | words_of(y);
-    if constexpr (A::reach == Reach::near) return ExactSum<Exact>{{x + y}, signs};
+    if constexpr (A::reach == Reach::near) return Exact{x + y};
     // (That of a power of two and the lesser one, where they differ in sign, may become a tie, between that power and
     // the number below it; it goes to the power, which is right.)
     const auto lifted = [](Singles u, Singles v) { return in_bits<Singles>(apart<12>(words_of(u), words_of(v))); };
-    return ExactSum<Exact>{{lifted(x, y) + lifted(y, x)}, signs};
+    return Exact{lifted(x, y) + lifted(y, x)};
   } else {
     using Exact = ExactDoubles<Tiny::is_left>;
-    const Words signs = a.bits() | b.bits();
-    if constexpr (A::reach == Reach::near) return ExactSum<Exact>{{a.lower() + b.lower(), a.upper() + b.upper()}, signs};
+    if constexpr (A::reach == Reach::near) return Exact{a.lower() + b.lower(), a.upper() + b.upper()};
     const auto x = as_doubles<Tiny::is_left>(apart<28>(a.bits(), b.bits()));
     const auto y = as_doubles<Tiny::is_left>(apart<28>(b.bits(), a.bits()));
-    return ExactSum<Exact>{{x.lower + y.lower, x.upper + y.upper}, signs};
+    return Exact{x.lower + y.lower, x.upper + y.upper};
   }
 }
 
 template <class F, class A, class B>
 inline auto product(const A& a, const B& b) {
-  if constexpr (F::bits == 16) {
+  if constexpr (has_far_specials<F> && A::reach == Reach::measured) {
+    return Measured<typename F::lane>{far_specials<F>(magnitudes<F>(a.bits()), magnitudes<F>(b.bits())), {}};
+  } else if constexpr (F::bits == 16) {
     return ExactSingles<Tiny::is_left>{a.value() * b.value()};
   } else {
     return ExactDoubles<Tiny::is_left>{a.lower() * b.lower(), a.upper() * b.upper()};
@@ -473,18 +468,18 @@ inline Doubles sum_with_product(Doubles c, Doubles p) {
 template <class C, class A, class B>
 inline auto fused_halves(const C& acc, const A& a, const B& b) {
   const Singles c = acc.value(), p = a.value() * b.value();
-  const Words c_bits = words_of(c), p_bits = words_of(p), signs = c_bits | p_bits;
+  const Words c_bits = words_of(c), p_bits = words_of(p);
   if constexpr (C::reach == Reach::near) {
     // In singles there is room if p, of 22 bits, is at most twice below c; where it is lower, its first 12 do.
     const auto bound = in_bits<Integers>((magnitudes<Single>(p_bits) | (Single::unit - 1)) + Single::unit);
     const auto below = in_bits<Words>(in_bits<Integers>(magnitudes<Single>(c_bits)) > bound);
     using Exact = ExactSingles<Tiny::is_left>;
-    return ExactSum<Exact>{{c + in_bits<Singles>(cut_odd<12>(p_bits, below))}, signs};
+    return Exact{c + in_bits<Singles>(cut_odd<12>(p_bits, below))};
   } else {
     using Exact = ExactDoubles<Tiny::is_left>;
     const auto x = as_doubles<Tiny::is_left>(apart<30>(p_bits, c_bits));
     const auto y = as_doubles<Tiny::is_left>(apart<30>(c_bits, p_bits));
-    return ExactSum<Exact>{{x.lower + y.lower, x.upper + y.upper}, signs};
+    return Exact{x.lower + y.lower, x.upper + y.upper};
   }
 }
 
@@ -493,7 +488,7 @@ template <class C, class A, class B>
 inline auto fused_singles(const C& acc, const A& a, const B& b) {
   using Exact = ExactDoubles<Tiny::is_left>;
   const Doubles lower = a.lower() * b.lower(), upper = a.upper() * b.upper();
-  const Words c_bits = acc.bits(), signs = (a.bits() ^ b.bits()) | c_bits;
+  const Words c_bits = acc.bits();
   const auto ahead = in_bits<Integers>(headroom<Single>(c_bits, a.bits(), b.bits()));
   if constexpr (C::reach == Reach::near) {
     // From 3 powers of two on the product may be cut; up to 4 there is room for all of it.
@@ -501,15 +496,14 @@ inline auto fused_singles(const C& acc, const A& a, const B& b) {
     const auto cut = [](Doubles p, DoubleBits masks) {
       return in_bits<Doubles>(cut_odd<rest_bits>(in_bits<DoubleBits>(p), masks));
     };
-    return ExactSum<Exact>{
-        {acc.lower() + cut(lower, pair_masks<0>(below)), acc.upper() + cut(upper, pair_masks<1>(below))}, signs};
+    return Exact{acc.lower() + cut(lower, pair_masks<0>(below)), acc.upper() + cut(upper, pair_masks<1>(below))};
   } else {
     // Where the product is the greater by 2^27, if neither is 0, there is no room. (A subnormal acc counts as nearly
     // 2^-126, whose last bit is no higher than its own.)
     const auto zero = [](Words x) { return in_bits<Words>(magnitudes<Single>(x) == 0); };
     const Words too_far = in_bits<Words>(ahead) + powers_of_two<Single>(27);
-    return ExactBut<ExactSum<Exact>>{{{sum_with_product(acc.lower(), lower), sum_with_product(acc.upper(), upper)}, signs},
-                                     too_far & ~zero(a.bits()) & ~zero(b.bits()) & ~zero(c_bits)};
+    return ExactBut<Exact>{{sum_with_product(acc.lower(), lower), sum_with_product(acc.upper(), upper)},
+                           too_far & ~zero(a.bits()) & ~zero(b.bits()) & ~zero(c_bits)};
   }
 }
 
@@ -518,11 +512,10 @@ inline auto fused(const C& acc, const A& a, const B& b) {
   if constexpr (C::reach == Reach::measured) {
     // Exponents of factors that are not normal do not tell that of the product.
     using Lane = typename F::lane;
-    const auto c = acc.bits(), x = a.bits(), y = b.bits();
+    const auto c = acc.bits(), x = a.bits(), y = b.bits(), m = magnitudes<F>(x), n = magnitudes<F>(y);
     const auto least = static_cast<Lane>(F::unit);
-    return Far<Lane>{beyond<Lane>(headroom<F>(c, x, y), powers_of_two<F>(F::bits == 16 ? 11 : 26)) |
-                     (magnitudes<F>(x) - least) | (magnitudes<F>(y) - least) | unless_narrow_tells<F>(magnitudes<F>(c)) |
-                     unless_narrow_tells<F>(magnitudes<F>(x)) | unless_narrow_tells<F>(magnitudes<F>(y))};
+    const auto far = beyond<Lane>(headroom<F>(c, x, y), powers_of_two<F>(F::bits == 16 ? 11 : 26));
+    return Measured<Lane>{far | (m - least) | (n - least) | far_specials<F>(m, n, magnitudes<F>(c)), (x ^ y) | c};
   } else if constexpr (F::bits == 16) {
     return fused_halves(acc, a, b);
   } else {
@@ -697,12 +690,6 @@ inline auto settled(const ExactDoubles<T>& x, const Mode& mode) {
 }
 
 template <class F, class Exact, class Mode>
-inline auto settled(const ExactSum<Exact>& x, const Mode& mode) {
-  auto result = settled<F>(x.value, mode);
-  result.bits = mode.sum_bits(result.bits, x.either_sign);
-  return result;
-}
-template <class F, class Exact, class Mode>
 inline auto settled(const ExactBut<Exact>& x, const Mode& mode) {
   auto result = settled<F>(x.value, mode);
   const Words left = sign_masks(x.left);
@@ -741,19 +728,37 @@ inline Vector<std::uint16_t> narrowed(Words first, Words last) {
 
 // --- A whole vector -----------------------------------------------------------------------------------
 
-// Whether lanes that operands measure by the rule are far apart.
+// What operands measure by the rule, register by register of the format.
+template <class F, class... Ls, class Rule, class Use, class... Units>
+[[gnu::always_inline]] inline void measure(Rule rule, Use use, const Units*... operands) {
+  for (int from = 0; from < std::min({Ls::count...}); from += lanes_in_register<typename F::lane>)
+    use(from, rule(Lanes<Ls, Reach::measured>(operands, from)...));
+}
 template <class F, class... Ls, class Rule, class... Units>
-inline bool any_far(Rule rule, const Units*... operands) {
-  using Lane = typename F::lane;
-  Vector<Lane> far = {};
-  for (int from = 0; from < std::max({Ls::count...}); from += lanes_in_register<Lane>)
-    far |= rule(Lanes<Ls, Reach::measured>(operands, from)...).where;
-  return any_sign<Lane>(far);
+[[gnu::always_inline]] inline bool any_far(Rule rule, const Units*... operands) {
+  Vector<typename F::lane> far = {};
+  measure<F, Ls...>(
+      rule, [&](int, auto measured) { far |= measured.far; }, operands...);
+  return any_sign<typename F::lane>(far);
+}
+
+// Sums that are 0, rounded downward: -0 but for terms that are both +0.
+template <class F, class... Ls, class Rule, class... Units>
+[[gnu::always_inline]] inline void turn_zeros(typename F::lane* results, Rule rule, const Units*... operands) {
+  measure<F, Ls...>(
+      rule,
+      [&](int from, auto measured) {
+        using Lane = typename F::lane;
+        const auto result = load_register<Lane>(results + from, 0);
+        const auto zero = in_bits<Vector<Lane>>(magnitudes<F>(result) == 0);
+        store_register(results + from, 0, result | (zero & measured.either_sign & static_cast<Lane>(F::sign)));
+      },
+      operands...);
 }
 
 // Results of all lanes by a function that yields a step of them.
 template <class R, class OneStep>
-inline void every_step(typename R::container* results, OneStep one_step) {
+[[gnu::always_inline]] inline void every_step(typename R::container* results, OneStep one_step) {
   using Lane = typename R::container;
   for (int from = 0; from < R::count; from += lanes_in_register<Lane>) {
     if constexpr (R::bits == 32) {
@@ -771,7 +776,7 @@ inline void every_step(typename R::container* results, OneStep one_step) {
 
 // By the rule, which yields exact numbers.
 template <class R, Reach Are, class... Ls, class Mode, class Rule, class... Units>
-inline HostResult numbers_on_host(const Mode& mode, typename R::container* results, Rule rule, const Units*... operands) {
+[[gnu::always_inline]] inline HostResult numbers_on_host(Mode mode, typename R::container* results, Rule rule, const Units*... operands) {
   using F = format_of<R>;
   const auto settled_step = [&](int from) {
     return settled<F>(by_rule(rule, mode, Lanes<Ls, Are>(operands, from)...), mode);
@@ -787,27 +792,34 @@ inline HostResult numbers_on_host(const Mode& mode, typename R::container* resul
     dropped |= result.dropped;
     return result.bits;
   });
-  const bool some_left = within.some_not();
-  if (__builtin_expect(some_left, 0)) {
-    for (int i = 0; i < R::count; ++i) {
-      const int at = Result::paired ? i / step * step + paired_lane(i % step) : i;
-      if (!Result::range::holds(magnitudes[at])) results[i] = static_cast<typename R::container>(~word{0});
-    }
+  const word flags = any_bit(dropped) ? word{inexact} : 0;
+  if (__builtin_expect(!within.some_not(), 1)) return {flags, false};
+  for (int i = 0; i < R::count; ++i) {
+    const int at = Result::paired ? i / step * step + paired_lane(i % step) : i;
+    if (!Result::range::holds(magnitudes[at])) results[i] = static_cast<typename R::container>(~word{0});
   }
-  return {any_bit(dropped) ? word{inexact} : 0, some_left};
+  return {flags, true};
+}
+
+template <class R, class... Ls, class Mode, class Rule, class... Units>
+[[gnu::noinline, gnu::flatten]] HostResult far_on_host(const Mode& mode, typename R::container* results, Rule rule,
+                                                       const Units*... operands) {
+  return numbers_on_host<R, Reach::any, Ls...>(mode, results, rule, operands...);
 }
 
 // Result lane i = rule(operand lanes i ...) on the unit, exact numbers. The results are apart from the operands.
 // Flattened: calls would pass registers through memory.
 template <class R, class... Ls, class Mode, class Rule, class... Units>
-[[gnu::flatten]] inline HostResult on_host_in(const Mode& mode, typename R::container* results, Rule rule,
-                                              const Units*... operands) {
+[[gnu::always_inline, gnu::flatten]] inline HostResult on_host_in(const Mode& mode, typename R::container* results,
+                                                                  Rule rule, const Units*... operands) {
   const HostFpu fpu(results, operands...);
   if constexpr (measures<Rule, Lanes<Ls, Reach::measured>...>) {
-    if (!any_far<format_of<R>, Ls...>(rule, operands...))
-      return numbers_on_host<R, Reach::near, Ls...>(mode, results, rule, operands...);
+    if (__builtin_expect(any_far<format_of<R>, Ls...>(rule, operands...), 0))
+      return far_on_host<R, Ls...>(mode, results, rule, operands...);
+    return numbers_on_host<R, Reach::near, Ls...>(mode, results, rule, operands...);
+  } else {
+    return numbers_on_host<R, Reach::any, Ls...>(mode, results, rule, operands...);
   }
-  return numbers_on_host<R, Reach::any, Ls...>(mode, results, rule, operands...);
 }
 
 // Numbers times a power of two, truncated to integers.
@@ -825,13 +837,16 @@ template <class R, class From, class Units>
 }
 
 template <class R, class... Ls, class Rule, class... Units>
-inline HostResult on_host(TiesAway mode, typename R::container* results, Rule rule, const Units*... operands) {
+[[gnu::always_inline]] inline HostResult on_host(TiesAway mode, typename R::container* results, Rule rule, const Units*... operands) {
   return on_host_in<R, Ls...>(mode, results, rule, operands...);
 }
 template <class R, class... Ls, class Rule, class... Units>
-inline HostResult on_host(Rounding rounding, typename R::container* results, Rule rule, const Units*... operands) {
+[[gnu::always_inline]] inline HostResult on_host(Rounding rounding, typename R::container* results, Rule rule, const Units*... operands) {
   if (rounding == to_nearest) return on_host_in<R, Ls...>(ToNearest(), results, rule, operands...);
-  return on_host_in<R, Ls...>(directed[rounding & 3], results, rule, operands...);
+  const HostResult host = on_host_in<R, Ls...>(directed[rounding & 3], results, rule, operands...);
+  if constexpr (measures<Rule, Lanes<Ls, Reach::measured>...>)
+    if (rounding == downward) turn_zeros<format_of<R>, Ls...>(results, rule, operands...);
+  return host;
 }
 
 }  // namespace

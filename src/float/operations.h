@@ -16,7 +16,7 @@ using same_layout = L;
 
 // A rule of two or three floats on the unit: results and flags into the register and env.
 template <class L, class Rule, class... Units>
-inline bool fast_on_unit(Environment& env, typename L::container* results, Rule rule, const Units*... operands) {
+[[gnu::always_inline]] inline bool fast_on_unit(Environment& env, typename L::container* results, Rule rule, const Units*... operands) {
   const HostResult host = on_unit<L, same_layout<L, Units>...>(env.rounding, results, rule, operands...);
   env.raise(host.flags);
   return host.some_left;
@@ -37,7 +37,7 @@ struct Sum {
     return add<F>(env, a, Subtract ? negated<F>(b) : b);
   }
   template <class L, class Units>
-  static bool fast(Environment& env, typename L::container* r, const Units* a, const Units* b) {
+  [[gnu::always_inline]] static bool fast(Environment& env, typename L::container* r, const Units* a, const Units* b) {
     return fast_on_unit<L>(
         env, r, [](auto x, auto y) { return sum<format_of<L>>(x, turned_if<Subtract>(y)); }, a, b);
   }
@@ -51,7 +51,7 @@ struct MUL {
     return multiply<F>(env, a, b);
   }
   template <class L, class... Units>
-  static bool fast(Environment& env, typename L::container* r, const Units*... ab) {
+  [[gnu::always_inline]] static bool fast(Environment& env, typename L::container* r, const Units*... ab) {
     return fast_on_unit<L>(
         env, r, [](auto a, auto b) { return product<format_of<L>>(a, b); }, ab...);
   }
@@ -65,7 +65,7 @@ struct Fused {
     return multiply_add<F>(env, acc, Subtract ? negated<F>(a) : a, b);
   }
   template <class L, class... Units>
-  static bool fast(Environment& env, typename L::container* r, const Units*... operands) {
+  [[gnu::always_inline]] static bool fast(Environment& env, typename L::container* r, const Units*... operands) {
     return fast_on_unit<L>(
         env, r, [](auto acc, auto a, auto b) { return fused<format_of<L>>(acc, turned_if<Subtract>(a), b); },
         operands...);
@@ -175,7 +175,7 @@ struct Integral {
     return to_integral<F>(env, a, rounding(env), D == Direction::by_mode);
   }
   template <class L, class Units>
-  static bool fast(Environment& env, typename L::container* r, const Units* a) {
+  [[gnu::always_inline]] static bool fast(Environment& env, typename L::container* r, const Units* a) {
     const auto rule = [](const auto& mode, auto x) { return integral(mode, x); };
     const HostResult host =
         D == Direction::away ? on_unit<L, L>(TiesAway(), r, rule, a) : on_unit<L, L>(rounding(env), r, rule, a);

@@ -29,7 +29,7 @@ inline HostResult truncated_on_unit(typename R::container* results, word scale, 
 constexpr bool rounds_by_instruction = false;
 
 template <class R, class... Ls, class Mode, class Rule, class... Units>
-inline HostResult on_unit(const Mode& mode, typename R::container* results, Rule rule, const Units*... operands) {
+[[gnu::always_inline]] inline HostResult on_unit(const Mode& mode, typename R::container* results, Rule rule, const Units*... operands) {
   return on_host<R, Ls...>(mode, results, rule, operands...);
 }
 template <class R, class From, class Units>

@@ -2,6 +2,8 @@
 #ifndef KASTARRI_FLOAT_VECTORS_H
 #define KASTARRI_FLOAT_VECTORS_H
 
+#include <cstring>
+
 #include "float/operations.h"
 #include "tables/float_constants.h"
 
@@ -16,29 +18,45 @@ constexpr bool is_fast_alone = false;
 template <bool Subtract>
 constexpr bool is_fast_alone<Fused<Subtract>, f32x1> = rounds_by_instruction;
 
-// results[i] = Op of lanes i of the operands. The results are apart from the operands.
+// Lanes of a result on their way.
+template <class L>
+struct Results {
+  alignas(64) lane_of<L> lane[L::count];
+};
+
+// Results with the lanes that the fast path left, which are NaNs, by the reference. By value, for what is passed by its
+// address cannot stay in registers.
 template <class L, class Op, class... Units>
-inline void compute(Environment& env, lane_of<L>* results, const Units*... operands) {
+[[gnu::noinline, gnu::cold]] Results<L> completed(Environment& env, Results<L> results, const Units*... operands) {
   using F = format_of<L>;
+  for (int i = 0; i < L::count; ++i)
+    if (is_nan<F>(results.lane[i]))
+      results.lane[i] = static_cast<lane_of<L>>(Op::template exact<F>(env, Read<L>(operands)[i]...));
+  return results;
+}
+
+// Lane i = Op of lanes i of the operands.
+template <class L, class Op, class... Units>
+[[gnu::always_inline, gnu::flatten]] inline Results<L> compute(Environment& env, const Units*... operands) {
+  using F = format_of<L>;
+  Results<L> results;
   if constexpr (L::count == 1 && !is_fast_alone<Op, L>) {
-    results[0] = static_cast<lane_of<L>>(Op::template exact<F>(env, Read<L>(operands)[0]...));
-  } else if (__builtin_expect(Op::template fast<L>(env, results, operands...), 0)) {
-    for (int i = 0; i < L::count; ++i)
-      if (is_nan<F>(results[i]))
-        results[i] = static_cast<lane_of<L>>(Op::template exact<F>(env, Read<L>(operands)[i]...));
+    results.lane[0] = static_cast<lane_of<L>>(Op::template exact<F>(env, Read<L>(operands)[0]...));
+  } else if (__builtin_expect(Op::template fast<L>(env, results.lane, operands...), 0)) {
+    const Results<L> all = completed<L, Op>(env, results, operands...);
+    results = all;
   }
+  return results;
 }
 
 template <class L, class Op, class Unit, class... Units>
-inline void apply(Environment& env, Unit* out, const Units*... operands) {
-  alignas(64) lane_of<L> results[L::count];
-  compute<L, Op>(env, results, operands...);
-  lanes<L::count>(
-      Write<L>(out), [](auto lane) { return lane; }, Read<L>(results));
+[[gnu::always_inline]] inline void apply(Environment& env, Unit* out, const Units*... operands) {
+  const Results<L> results = compute<L, Op>(env, operands...);
+  std::memcpy(out, results.lane, sizeof results.lane);
 }
 
 template <class L, class Op, class Unit, class... Units>
-inline void apply(Unit* out, const Units*... operands) {
+[[gnu::always_inline]] inline void apply(Unit* out, const Units*... operands) {
   Environment env;
   apply<L, Op>(env, out, operands...);
 }
@@ -61,10 +79,9 @@ template <class L, class Op, class Unit, class PredicateUnit, class... Units>
 inline void apply(UnitsUnder<Unit, PredicateUnit, false> out, const Units*... operands) {
   LaneMask<L::bits, L::count> enabled;
   enabled.expand(out.predicate);
-  alignas(64) lane_of<L> results[L::count];
   Environment env;
-  compute<L, Op>(env, results, EnabledLanes<L>(operands, enabled).lane...);
-  const Read<L> result(results), old(out.units);
+  const Results<L> results = compute<L, Op>(env, EnabledLanes<L>(operands, enabled).lane...);
+  const Read<L> result(results.lane), old(out.units);
   const Write<L> to(out.units);
   KASTARRI_LANES_INDEPENDENT
   for (int i = 0; i < L::count; ++i)  // by masks: of a choice the compiler makes a store under a branch

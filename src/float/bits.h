@@ -43,6 +43,18 @@ template <class F>
 constexpr word widened_largest = F::bits == 32 ? Single::largest
                                                : (single_bits_of_power(Half::bias + 1) - 1) & ~word{0x1FFF};
 
+// In place of a Rounding: to the nearest integer, ties away from 0.
+struct TiesAway {};
+
+template <class L>
+using lane_of = typename L::container;
+
+// Lanes of a result on their way.
+template <class L>
+struct Results {
+  alignas(64) lane_of<L> lane[L::count];
+};
+
 // What a vector computed on the unit tells: the flags to raise, and whether a lane is left to the reference. Such a
 // lane holds a NaN.
 struct HostResult {

@@ -2,8 +2,11 @@
 #ifndef KASTARRI_FLOAT_CONVERT_H
 #define KASTARRI_FLOAT_CONVERT_H
 
+#include <cstring>
+
 #include "float/reference.h"
 #include "float/unit.h"
+#include "frame/lanes.h"
 
 namespace {
 
@@ -33,25 +36,32 @@ inline typename To::container convert_lane(Environment& env, typename From::cont
 
 // --- On the unit: a whole vector -----------------------------------------------------------------------
 
+// All lanes by the reference, exact(env, lane).
+template <class From, class To, class Units, class Exact>
+[[gnu::noinline, gnu::cold]] Results<To> converted(Environment& env, const Units* in, Exact exact) {
+  Results<To> results;
+  for (int i = 0; i < To::count; ++i) results.lane[i] = exact(env, Read<From>(in)[i]);
+  return results;
+}
+
 // A whole vector on the unit, or, when it leaves a lane, by the reference altogether: a lane that
 // is left may have raised flags of its own.
 template <class From, class To, class Out, class Units, class Fast, class Exact>
-inline void convert_vector(Out* out, const Units* in, Fast fast, Exact exact) {
-  alignas(64) typename To::container results[To::count];
+[[gnu::always_inline, gnu::flatten]] inline void convert_vector(Out* out, const Units* in, Fast fast, Exact exact) {
+  Results<To> results;
   Environment env;
-  const HostResult host = fast(env.rounding, results);
+  const HostResult host = fast(env.rounding, results.lane);
   if (__builtin_expect(host.some_left, 0)) {
-    const Read<From> from(in);
-    for (int i = 0; i < To::count; ++i) results[i] = exact(env, from[i]);
+    const Results<To> all = converted<From, To>(env, in, exact);
+    results = all;
   } else {
     env.raise(host.flags);
   }
-  lanes<To::count>(
-      Write<To>(out), [](auto lane) { return lane; }, Read<To>(results));
+  std::memcpy(out, results.lane, sizeof results.lane);
 }
 
 template <class From, class To, class Out, class Units>
-inline void convert_register(Out* out, const Units* in, word scale) {
+[[gnu::always_inline]] inline void convert_register(Out* out, const Units* in, word scale) {
   const auto exact = [scale](Environment& env, auto lane) { return convert_lane<From, To>(env, lane, scale); };
   if constexpr (From::count == 1 || To::count == 1) {
     Environment env;

@@ -186,7 +186,7 @@ struct ToNearest {
   Words greatest_down(Words kept, Words) const { return half_of_rest - (kept & 1); }
 };
 
-struct TiesAway {
+struct ToNearestAway {
   Words greatest_down(Words, Words) const { return Words{} + (half_of_rest - 1); }
 };
 
@@ -313,18 +313,16 @@ inline Negated<Lanes<L, R>> operator-(const Lanes<L, R>& x) {
 
 // --- Exact arithmetic -----------------------------------------------------------------------------------
 
-// Of results below the normal numbers: exact ones are kept, or all but 0 are left.
-enum class Tiny { is_exact, is_left };
+// Which results are left: those that overflow or come near, and also those but 0 that are below the normal numbers,
+// unless these are exact.
+enum class Left { none, great, great_and_tiny };
 
 // The exact result, or another number that rounds as it does.
-template <Tiny T>
+template <Left Which>
 struct ExactSingles {
-  static constexpr Tiny tiny = T;
   Singles value;
 };
-template <Tiny T>
-struct ExactDoubles {
-  static constexpr Tiny tiny = T;
+struct ExactDoubles {  // great and tiny ones are left
   Doubles lower, upper;
 };
 // Also bit 31 of the lanes for which it is neither.
@@ -378,14 +376,23 @@ inline Words apart(Words x, Words y) {
 }
 
 // Singles that have been computed, as doubles.
-template <Tiny T>
-inline ExactDoubles<T> as_doubles(Words singles) {
+inline ExactDoubles as_doubles(Words singles) {
   alignas(64) float each[step];
   store_register(each, 0, singles);
   return {doubles_at(each), doubles_at(each + half_a_step)};
 }
 
-// Where there is no instruction that widens halves, near ones must not be infinities or NaNs. In the top bit: one that is.
+// In the top bit: magnitudes that are greater.
+template <class F, class V>
+inline V above(V magnitudes, word bound) {
+  return static_cast<typename F::lane>(bound) - magnitudes;
+}
+// In the top bit: infinities and NaNs.
+template <class F, class... V>
+inline auto specials(V... magnitudes) {
+  return (above<F>(magnitudes, F::largest) | ...);
+}
+// Where no instruction widens halves, near ones must not be special.
 #ifdef __F16C__
 template <class F>
 constexpr bool has_far_specials = false;
@@ -393,46 +400,55 @@ constexpr bool has_far_specials = false;
 template <class F>
 constexpr bool has_far_specials = F::bits == 16;
 #endif
-template <class F, class V, class... More>
-inline V far_specials(V magnitude, More... magnitudes) {
-  if constexpr (!has_far_specials<F>) return V{};
-  const V special = static_cast<typename F::lane>(F::largest) - magnitude;
-  if constexpr (sizeof...(More) > 0) return special | far_specials<F>(magnitudes...);
-  return special;
+
+template <class A, class B>
+inline auto sum_of_halves(const A& a, const B& b) {
+  const Singles x = a.value(), y = b.value();
+  if constexpr (A::reach == Reach::near) {
+    return ExactSingles<Left::none>{x + y};
+  } else {
+    // (The sum of a power of two and a number that has been lifted, where they differ in sign, may become a tie, between
+    // that power and the number below it; it goes to the power, which is right.)
+    const auto lifted = [](Singles u, Singles v) { return in_bits<Singles>(apart<12>(words_of(u), words_of(v))); };
+    return ExactSingles<Left::great>{lifted(x, y) + lifted(y, x)};
+  }
+}
+
+template <class A, class B>
+inline ExactDoubles sum_of_singles(const A& a, const B& b) {
+  if constexpr (A::reach == Reach::near) {
+    return {a.lower() + b.lower(), a.upper() + b.upper()};
+  } else {
+    const ExactDoubles x = as_doubles(apart<28>(a.bits(), b.bits())), y = as_doubles(apart<28>(b.bits(), a.bits()));
+    return {x.lower + y.lower, x.upper + y.upper};
+  }
 }
 
 template <class F, class A, class B>
 inline auto sum(const A& a, const B& b) {
   if constexpr (A::reach == Reach::measured) {
-    // In a format of n bits two numbers of m have room up to n - m - 1 powers of two apart.
+    // In a format of n bits two numbers of m have room up to n - m - 1 powers of two apart. Halves are also so small that
+    // their sum does not overflow.
+    using Lane = typename F::lane;
     const auto x = magnitudes<F>(a.bits()), y = magnitudes<F>(b.bits());
-    const auto far = beyond<typename F::lane>(x - y, powers_of_two<F>(F::bits == 16 ? 12 : 28));
-    return Measured<typename F::lane>{far | far_specials<F>(x, y), a.bits() | b.bits()};
+    auto far = beyond<Lane>(x - y, powers_of_two<F>(F::bits == 16 ? 12 : 28));
+    if constexpr (F::bits == 16) far |= above<F>(x, F::largest - F::unit) | above<F>(y, F::largest - F::unit);
+    return Measured<Lane>{far, a.bits() | b.bits()};
   } else if constexpr (F::bits == 16) {
-    using Exact = ExactSingles<Tiny::is_exact>;
-    const Singles x = a.value(), y = b.value();
-    if constexpr (A::reach == Reach::near) return Exact{x + y};
-    // (That of a power of two and the lesser one, where they differ in sign, may become a tie, between that power and
-    // the number below it; it goes to the power, which is right.)
-    const auto lifted = [](Singles u, Singles v) { return in_bits<Singles>(apart<12>(words_of(u), words_of(v))); };
-    return Exact{lifted(x, y) + lifted(y, x)};
+    return sum_of_halves(a, b);
   } else {
-    using Exact = ExactDoubles<Tiny::is_left>;
-    if constexpr (A::reach == Reach::near) return Exact{a.lower() + b.lower(), a.upper() + b.upper()};
-    const auto x = as_doubles<Tiny::is_left>(apart<28>(a.bits(), b.bits()));
-    const auto y = as_doubles<Tiny::is_left>(apart<28>(b.bits(), a.bits()));
-    return Exact{x.lower + y.lower, x.upper + y.upper};
+    return sum_of_singles(a, b);
   }
 }
 
 template <class F, class A, class B>
 inline auto product(const A& a, const B& b) {
-  if constexpr (has_far_specials<F> && A::reach == Reach::measured) {
-    return Measured<typename F::lane>{far_specials<F>(magnitudes<F>(a.bits()), magnitudes<F>(b.bits())), {}};
-  } else if constexpr (F::bits == 16) {
-    return ExactSingles<Tiny::is_left>{a.value() * b.value()};
+  if constexpr (F::bits == 32) {
+    return ExactDoubles{a.lower() * b.lower(), a.upper() * b.upper()};
+  } else if constexpr (has_far_specials<F> && A::reach == Reach::measured) {
+    return Measured<typename F::lane>{specials<F>(magnitudes<F>(a.bits()), magnitudes<F>(b.bits())), {}};
   } else {
-    return ExactDoubles<Tiny::is_left>{a.lower() * b.lower(), a.upper() * b.upper()};
+    return ExactSingles<Left::great_and_tiny>{a.value() * b.value()};
   }
 }
 
@@ -473,20 +489,17 @@ inline auto fused_halves(const C& acc, const A& a, const B& b) {
     // In singles there is room if p, of 22 bits, is at most twice below c; where it is lower, its first 12 do.
     const auto bound = in_bits<Integers>((magnitudes<Single>(p_bits) | (Single::unit - 1)) + Single::unit);
     const auto below = in_bits<Words>(in_bits<Integers>(magnitudes<Single>(c_bits)) > bound);
-    using Exact = ExactSingles<Tiny::is_left>;
-    return Exact{c + in_bits<Singles>(cut_odd<12>(p_bits, below))};
+    return ExactSingles<Left::great_and_tiny>{c + in_bits<Singles>(cut_odd<12>(p_bits, below))};
   } else {
-    using Exact = ExactDoubles<Tiny::is_left>;
-    const auto x = as_doubles<Tiny::is_left>(apart<30>(p_bits, c_bits));
-    const auto y = as_doubles<Tiny::is_left>(apart<30>(c_bits, p_bits));
-    return Exact{x.lower + y.lower, x.upper + y.upper};
+    const auto x = as_doubles(apart<30>(p_bits, c_bits));
+    const auto y = as_doubles(apart<30>(c_bits, p_bits));
+    return ExactDoubles{x.lower + y.lower, x.upper + y.upper};
   }
 }
 
 // acc + a * b for singles.
 template <class C, class A, class B>
 inline auto fused_singles(const C& acc, const A& a, const B& b) {
-  using Exact = ExactDoubles<Tiny::is_left>;
   const Doubles lower = a.lower() * b.lower(), upper = a.upper() * b.upper();
   const Words c_bits = acc.bits();
   const auto ahead = in_bits<Integers>(headroom<Single>(c_bits, a.bits(), b.bits()));
@@ -496,13 +509,13 @@ inline auto fused_singles(const C& acc, const A& a, const B& b) {
     const auto cut = [](Doubles p, DoubleBits masks) {
       return in_bits<Doubles>(cut_odd<rest_bits>(in_bits<DoubleBits>(p), masks));
     };
-    return Exact{acc.lower() + cut(lower, pair_masks<0>(below)), acc.upper() + cut(upper, pair_masks<1>(below))};
+    return ExactDoubles{acc.lower() + cut(lower, pair_masks<0>(below)), acc.upper() + cut(upper, pair_masks<1>(below))};
   } else {
     // Where the product is the greater by 2^27, if neither is 0, there is no room. (A subnormal acc counts as nearly
     // 2^-126, whose last bit is no higher than its own.)
     const auto zero = [](Words x) { return in_bits<Words>(magnitudes<Single>(x) == 0); };
     const Words too_far = in_bits<Words>(ahead) + powers_of_two<Single>(27);
-    return ExactBut<Exact>{{sum_with_product(acc.lower(), lower), sum_with_product(acc.upper(), upper)},
+    return ExactBut<ExactDoubles>{{sum_with_product(acc.lower(), lower), sum_with_product(acc.upper(), upper)},
                            too_far & ~zero(a.bits()) & ~zero(b.bits()) & ~zero(c_bits)};
   }
 }
@@ -514,8 +527,9 @@ inline auto fused(const C& acc, const A& a, const B& b) {
     using Lane = typename F::lane;
     const auto c = acc.bits(), x = a.bits(), y = b.bits(), m = magnitudes<F>(x), n = magnitudes<F>(y);
     const auto least = static_cast<Lane>(F::unit);
-    const auto far = beyond<Lane>(headroom<F>(c, x, y), powers_of_two<F>(F::bits == 16 ? 11 : 26));
-    return Measured<Lane>{far | (m - least) | (n - least) | far_specials<F>(m, n, magnitudes<F>(c)), (x ^ y) | c};
+    auto far = beyond<Lane>(headroom<F>(c, x, y), powers_of_two<F>(F::bits == 16 ? 11 : 26)) | (m - least) | (n - least);
+    if constexpr (has_far_specials<F>) far |= specials<F>(m, n, magnitudes<F>(c));
+    return Measured<Lane>{far, (x ^ y) | c};
   } else if constexpr (F::bits == 16) {
     return fused_halves(acc, a, b);
   } else {
@@ -529,15 +543,15 @@ inline auto fused(const C& acc, const A& a, const B& b) {
 template <class L, Reach R>
 inline auto scaled_single(const Lanes<L, R>& integers, float unit) {
   if constexpr (L::bits == 32) {
-    return ExactDoubles<Tiny::is_left>{integers.lower() * double{unit}, integers.upper() * double{unit}};
+    return ExactDoubles{integers.lower() * double{unit}, integers.upper() * double{unit}};
   } else {
-    return ExactSingles<Tiny::is_exact>{integers.value() * unit};
+    return ExactSingles<Left::great>{integers.value() * unit};
   }
 }
 
 // A number as it is.
 template <class L, Reach R>
-inline ExactSingles<Tiny::is_left> exact_single_of(const Lanes<L, R>& x) {
+inline ExactSingles<Left::great_and_tiny> exact_single_of(const Lanes<L, R>& x) {
   return {x.value()};
 }
 
@@ -590,8 +604,10 @@ inline WholeNumber integral(const Mode& mode, const Operand& x) {
 // --- Results ------------------------------------------------------------------------------------------
 
 // Magnitudes between which a lane has its result: from Least on, or 0, up to Greatest. Others are left.
+constexpr word no_bound = ~word{0};
 template <word Least, word Greatest>
 struct Range {
+  static constexpr bool has_outside = Greatest != no_bound;
   static constexpr word greatest = Greatest;
   static constexpr bool holds(word magnitude) { return magnitude <= Greatest && (magnitude >= Least || magnitude == 0); }
 };
@@ -604,11 +620,13 @@ class Within<Range<Least, Greatest>> {
  public:
 #ifdef __AVX2__
   void see(Words magnitudes) {
+    if constexpr (Greatest == no_bound) return;
     const auto next = in_bits<Integers>(magnitudes), next_least = in_bits<Integers>(magnitudes + below);
     greatest_ = next > greatest_ ? next : greatest_;
     if constexpr (Least > 0) least_ = next_least < least_ ? next_least : least_;
   }
   bool some_not() const {
+    if constexpr (Greatest == no_bound) return false;
     auto outside = greatest_ > static_cast<std::int32_t>(Greatest);
     if constexpr (Least > 0) outside |= least_ < static_cast<std::int32_t>(Least + below);
     return any_bit(in_bits<Words>(outside));
@@ -620,6 +638,7 @@ class Within<Range<Least, Greatest>> {
   Integers greatest_ = {}, least_ = Integers{} + INT32_MAX;
 #else
   void see(Words magnitudes) {
+    if constexpr (Greatest == no_bound) return;
     outside_ |= Greatest - magnitudes;
     if constexpr (Least > 0) outside_ |= (magnitudes - Least) & (0 - magnitudes);
   }
@@ -641,13 +660,14 @@ struct Settled {
 };
 inline Words in_lane_order(Words v) { return in_bits<Words>(in_order<std::uint64_t>(bits_of(v))); }
 
-template <class F, Tiny T>
-using Singly = Range<F::bits == 32 || T == Tiny::is_exact ? 0 : single_bits_of_power(Half::least_exponent), widened_largest<F>>;
+template <class F, Left Which>
+using Kept = Range<F::bits == 16 && Which == Left::great_and_tiny ? single_bits_of_power(Half::least_exponent) : 0,
+                   Which == Left::none ? no_bound : widened_largest<F>>;
 
 // Singles rounded to halves; singles are not rounded again.
-template <class F, Tiny T, class Mode>
-inline auto settled(const ExactSingles<T>& x, const Mode& mode) {
-  using Result = Settled<Singly<F, T>>;
+template <class F, Left Which, class Mode>
+inline auto settled(const ExactSingles<Which>& x, const Mode& mode) {
+  using Result = Settled<Kept<F, Which>>;
   const Words exact = words_of(x.value), magnitude = exact & single_magnitude;
   if constexpr (F::bits == 32) return Result{exact, magnitude, {}};
   constexpr int excess = Single::fraction_bits - Half::fraction_bits;
@@ -675,8 +695,8 @@ struct Leading {
   Words magnitude, sign, kept, rest;
 };
 
-template <class F, Tiny T, class Mode>
-inline auto settled(const ExactDoubles<T>& x, const Mode& mode) {
+template <class F, class Mode>
+inline auto settled(const ExactDoubles& x, const Mode& mode) {
   const Leading leading(x.lower, x.upper);
   if constexpr (F::bits == 32) {
     const Words bits = rounded(leading.kept, leading.rest, leading.sign, mode) | leading.sign;
@@ -685,7 +705,7 @@ inline auto settled(const ExactDoubles<T>& x, const Mode& mode) {
     // Infinities and NaNs have to be told; no sum or product of halves is below the normal singles.
     const Words finite = in_bits<Words>(in_bits<Integers>(leading.magnitude) <= std::int32_t{Leading::range::greatest});
     const Words odd = leading.kept | (in_bits<Words>(leading.rest != 0) & 1) | (~finite & Single::infinity);
-    return settled<F>(ExactSingles<T>{in_bits<Singles>(in_lane_order(odd | leading.sign))}, mode);
+    return settled<F>(ExactSingles<Left::great_and_tiny>{in_bits<Singles>(in_lane_order(odd | leading.sign))}, mode);
   }
 }
 
@@ -787,7 +807,7 @@ template <class R, Reach Are, class... Ls, class Mode, class Rule, class... Unit
   Words dropped = {};
   every_step<R>(results, [&](int from) {
     const Result result = settled_step(from);
-    store_register(magnitudes + from, 0, result.magnitudes);
+    if constexpr (Result::range::has_outside) store_register(magnitudes + from, 0, result.magnitudes);
     within.see(result.magnitudes);
     dropped |= result.dropped;
     return result.bits;
@@ -837,8 +857,9 @@ template <class R, class From, class Units>
 }
 
 template <class R, class... Ls, class Rule, class... Units>
-[[gnu::always_inline]] inline HostResult on_host(TiesAway mode, typename R::container* results, Rule rule, const Units*... operands) {
-  return on_host_in<R, Ls...>(mode, results, rule, operands...);
+[[gnu::always_inline]] inline HostResult on_host(TiesAway, typename R::container* results, Rule rule,
+                                                 const Units*... operands) {
+  return on_host_in<R, Ls...>(ToNearestAway(), results, rule, operands...);
 }
 template <class R, class... Ls, class Rule, class... Units>
 [[gnu::always_inline]] inline HostResult on_host(Rounding rounding, typename R::container* results, Rule rule, const Units*... operands) {

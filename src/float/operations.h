@@ -8,6 +8,7 @@
 
 #include "float/reference.h"
 #include "float/unit.h"
+#include "frame/lanes.h"
 
 namespace {
 

@@ -9,20 +9,11 @@
 
 namespace {
 
-template <class L>
-using lane_of = typename L::container;
-
 // One lane is quickest by the reference, but for the fused operations on singles, whose exact sum is long.
 template <class Op, class L>
 constexpr bool is_fast_alone = false;
 template <bool Subtract>
 constexpr bool is_fast_alone<Fused<Subtract>, f32x1> = rounds_by_instruction;
-
-// Lanes of a result on their way.
-template <class L>
-struct Results {
-  alignas(64) lane_of<L> lane[L::count];
-};
 
 // Results with the lanes that the fast path left, which are NaNs, by the reference. By value, for what is passed by its
 // address cannot stay in registers.

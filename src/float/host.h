@@ -30,24 +30,29 @@
 
 namespace {
 
-// What the pointer leads to is unknown before, and memory may be read after.
+// What the pointer leads to is unknown before.
 template <class Pointer>
-inline void pin(Pointer& pointer) {
+inline void pin_operand(Pointer& pointer) {
   asm volatile("" : "+r"(pointer) : : "memory");
+}
+// The register is computed before.
+template <class V>
+inline V pinned(V result) {
+  asm volatile("" : "+x"(result));
+  return result;
 }
 
 // While it lives, subnormals are honoured, every exception is masked, and sums of 0 are +0. Afterwards MXCSR is as
 // it was before. It is written only where it differs.
 // Compilers know nothing of MXCSR and move arithmetic past its writes; they cannot where operands are read through
-// pointers, and results written through them, that pass here as outputs of an assembler statement between the
-// writes: what a load yields is unknown before the one write, and a store must be done before the other, which may
-// read any memory.
+// pointers, and results pass through registers, that are outputs of assembler statements between the writes: what a
+// load yields is unknown before the one write, and a result is known before the other.
 class HostFpu {
  public:
   template <class... Pointers>
-  explicit HostFpu(Pointers&... operands_and_results) : found_(read()) {
+  explicit HostFpu(Pointers&... operands) : found_(read()) {
     if (__builtin_expect((found_ & ~flags) != all_masked, 0)) write(all_masked);
-    (pin(operands_and_results), ...);
+    (pin_operand(operands), ...);
   }
   ~HostFpu() {
     if (__builtin_expect(read() != found_, 0)) write(found_);
@@ -122,11 +127,14 @@ inline Doubles doubles_at(const float* singles) {
   return in_bits<Doubles>(_mm_cvtps_pd(_mm_castpd_ps(_mm_load_sd(reinterpret_cast<const double*>(singles)))));
 #endif
 }
-inline Doubles doubles_at(const std::int32_t* integers) {
+// Of integers whose bits are the words with those of `turned` turned.
+inline Doubles doubles_at(const in_memory<word>* words, word turned) {
+  const auto* at = reinterpret_cast<const __m128i*>(words);
+  const __m128i turn = _mm_set1_epi32(static_cast<int>(turned));
 #ifdef __AVX2__
-  return in_bits<Doubles>(_mm256_cvtepi32_pd(_mm_loadu_si128(reinterpret_cast<const __m128i*>(integers))));
+  return in_bits<Doubles>(_mm256_cvtepi32_pd(_mm_xor_si128(_mm_loadu_si128(at), turn)));
 #else
-  return in_bits<Doubles>(_mm_cvtepi32_pd(_mm_loadl_epi64(reinterpret_cast<const __m128i*>(integers))));
+  return in_bits<Doubles>(_mm_cvtepi32_pd(_mm_xor_si128(_mm_loadl_epi64(at), turn)));
 #endif
 }
 
@@ -286,10 +294,9 @@ class Lanes<L, R, integer> {
 
  private:
   Doubles doubles(int from) const {
-    std::int32_t integers[half_a_step];
-    for (int i = 0; i < half_a_step; ++i)
-      integers[i] = static_cast<std::int32_t>(static_cast<word>(at_[from + i]) ^ (std::is_signed_v<lane> ? 0 : single_sign));
-    return doubles_at(integers) + (std::is_signed_v<lane> ? 0.0 : 0x1p31);
+    const auto* words = reinterpret_cast<const in_memory<word>*>(at_ + from);
+    if constexpr (std::is_signed_v<lane>) return doubles_at(words, 0);
+    return doubles_at(words, single_sign) + 0x1p31;
   }
   const in_memory<lane>* at_;
 };
@@ -782,14 +789,14 @@ template <class R, class OneStep>
   using Lane = typename R::container;
   for (int from = 0; from < R::count; from += lanes_in_register<Lane>) {
     if constexpr (R::bits == 32) {
-      store_register(results + from, 0, one_step(from));
+      store_register(results + from, 0, pinned(one_step(from)));
     } else if constexpr (std::is_same_v<typename R::number, half_float>) {
       const Words first = one_step(from);
-      store_register(results + from, 0, narrowed(first, one_step(from + step)));
+      store_register(results + from, 0, pinned(narrowed(first, one_step(from + step))));
     } else {
       const auto first = in_bits<Register>(one_step(from));
       const auto both = bits_of(pack_words(first, in_bits<Register>(one_step(from + step)), Lane{}));
-      store_register(results + from, 0, in_order<std::uint64_t>(both));
+      store_register(results + from, 0, pinned(in_order<std::uint64_t>(both)));
     }
   }
 }
@@ -832,10 +839,15 @@ template <class R, class... Ls, class Mode, class Rule, class... Units>
 template <class R, class... Ls, class Mode, class Rule, class... Units>
 [[gnu::always_inline, gnu::flatten]] inline HostResult on_host_in(const Mode& mode, typename R::container* results,
                                                                   Rule rule, const Units*... operands) {
-  const HostFpu fpu(results, operands...);
+  const HostFpu fpu(operands...);
   if constexpr (measures<Rule, Lanes<Ls, Reach::measured>...>) {
-    if (__builtin_expect(any_far<format_of<R>, Ls...>(rule, operands...), 0))
-      return far_on_host<R, Ls...>(mode, results, rule, operands...);
+    if (__builtin_expect(any_far<format_of<R>, Ls...>(rule, operands...), 0)) {
+      // By themselves: what is passed by its address has to be in memory from the beginning.
+      Results<R> far;
+      const HostResult host = far_on_host<R, Ls...>(mode, far.lane, rule, operands...);
+      std::memcpy(results, far.lane, sizeof far.lane);
+      return host;
+    }
     return numbers_on_host<R, Reach::near, Ls...>(mode, results, rule, operands...);
   } else {
     return numbers_on_host<R, Reach::any, Ls...>(mode, results, rule, operands...);
@@ -845,7 +857,7 @@ template <class R, class... Ls, class Mode, class Rule, class... Units>
 // Numbers times a power of two, truncated to integers.
 template <class R, class From, class Units>
 [[gnu::flatten]] inline HostResult truncated_on_host(typename R::container* results, word scale, const Units* operand) {
-  const HostFpu fpu(results, operand);
+  const HostFpu fpu(operand);
   Words dropped = {}, left = {};
   every_step<R>(results, [&](int from) {
     const Truncated result = truncated<R>(Lanes<From, Reach::any>(operand, from), scale);

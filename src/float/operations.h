@@ -17,7 +17,8 @@ using same_layout = L;
 
 // A rule of two or three floats on the unit: results and flags into the register and env.
 template <class L, class Rule, class... Units>
-[[gnu::always_inline]] inline bool fast_on_unit(Environment& env, typename L::container* results, Rule rule, const Units*... operands) {
+[[gnu::always_inline]] inline bool fast_on_unit(Environment& env, typename L::container* results, Rule rule,
+                                                const Units*... operands) {
   const HostResult host = on_unit<L, same_layout<L, Units>...>(env.rounding, results, rule, operands...);
   env.raise(host.flags);
   return host.some_left;
@@ -26,8 +27,10 @@ template <class L, class Rule, class... Units>
 // A float of the unit, its sign turned.
 template <bool Turned, class T>
 inline auto turned_if(const T& x) {
-  if constexpr (Turned) return -x;
-  else return x;
+  if constexpr (Turned)
+    return -x;
+  else
+    return x;
 }
 
 // a + b, or a - b.

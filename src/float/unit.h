@@ -2,8 +2,11 @@
 #ifndef KASTARRI_FLOAT_UNIT_H
 #define KASTARRI_FLOAT_UNIT_H
 
+#ifdef __AVX512F__
 #include "float/avx512.h"
+#else
 #include "float/host.h"
+#endif
 
 namespace {
 
@@ -29,7 +32,8 @@ inline HostResult truncated_on_unit(typename R::container* results, word scale, 
 constexpr bool rounds_by_instruction = false;
 
 template <class R, class... Ls, class Mode, class Rule, class... Units>
-[[gnu::always_inline]] inline HostResult on_unit(const Mode& mode, typename R::container* results, Rule rule, const Units*... operands) {
+[[gnu::always_inline]] inline HostResult on_unit(const Mode& mode, typename R::container* results, Rule rule,
+                                                 const Units*... operands) {
   return on_host<R, Ls...>(mode, results, rule, operands...);
 }
 template <class R, class From, class Units>

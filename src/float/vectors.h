@@ -52,8 +52,8 @@ template <class L, class Op, class Unit, class... Units>
   apply<L, Op>(env, out, operands...);
 }
 
-// An operand with 1 in the lanes that are not enabled: it is no special number, nor far from any that are with it in its
-// lane, and no operation here raises a flag for it.
+// An operand with 1 in the lanes that are not enabled: it is no special number, nor far from any that are with it in
+// its lane, and no operation here raises a flag for it.
 template <class L>
 struct EnabledLanes {
   template <class Unit>
@@ -61,7 +61,8 @@ struct EnabledLanes {
     constexpr auto one = static_cast<lane_of<L>>(format_of<L>::one);
     const Read<L> from(operand);
     KASTARRI_LANES_INDEPENDENT
-    for (int i = 0; i < L::count; ++i) lane[i] = static_cast<lane_of<L>>((from[i] & enabled.lane[i]) | (one & ~enabled.lane[i]));
+    for (int i = 0; i < L::count; ++i)
+      lane[i] = static_cast<lane_of<L>>((from[i] & enabled.lane[i]) | (one & ~enabled.lane[i]));
   }
   alignas(64) lane_of<L> lane[L::count];
 };

@@ -1,0 +1,54 @@
+// The host's floating-point control word (MXCSR) while its unit computes.
+#ifndef KASTARRI_FLOAT_HOST_FPU_H
+#define KASTARRI_FLOAT_HOST_FPU_H
+
+#include "float/formats.h"
+
+namespace {
+
+// What the pointer leads to is unknown before.
+template <class Pointer>
+inline void pin_operand(Pointer& pointer) {
+  asm volatile("" : "+r"(pointer) : : "memory");
+}
+// The register is computed before.
+template <class V>
+inline V pinned(V result) {
+  asm volatile("" : "+x"(result));
+  return result;
+}
+
+// While it lives, subnormals are honoured, every exception is masked, and sums of 0 are +0. Afterwards MXCSR is as
+// it was before. It is written only where it differs.
+// Compilers know nothing of MXCSR and move arithmetic past its writes; they cannot where operands are read through
+// pointers, and results pass through registers, that are outputs of assembler statements between the writes: what a
+// load yields is unknown before the one write, and a result is known before the other.
+class HostFpu {
+ public:
+  template <class... Pointers>
+  explicit HostFpu(Pointers&... operands) : found_(read()) {
+    if (__builtin_expect((found_ & ~flags) != all_masked, 0)) write(all_masked);
+    (pin_operand(operands), ...);
+  }
+  ~HostFpu() {
+    if (__builtin_expect(read() != found_, 0)) write(found_);
+  }
+  HostFpu(const HostFpu&) = delete;
+  HostFpu& operator=(const HostFpu&) = delete;
+
+ private:
+  static constexpr word all_masked = 0x1F80, flags = 0x3F;
+
+  static word read() {
+    word mxcsr;
+    asm volatile("stmxcsr %0" : "=m"(mxcsr) : : "memory");
+    return mxcsr;
+  }
+  static void write(word mxcsr) { asm volatile("ldmxcsr %0" : : "m"(mxcsr) : "memory"); }
+
+  const word found_;
+};
+
+}  // namespace
+
+#endif

@@ -1,5 +1,5 @@
-// Arithmetic that is exact: halves in singles, singles in doubles. What the host's rounding mode is does not count then,
-// and no flag is raised.
+// Arithmetic that is exact: halves in singles, singles in doubles. What the host's rounding mode is does not count
+// then, and no flag is raised.
 #ifndef KASTARRI_FLOAT_EXACT_H
 #define KASTARRI_FLOAT_EXACT_H
 
@@ -101,8 +101,8 @@ inline auto sum_of_halves(const A& a, const B& b) {
   if constexpr (A::reach == Reach::near) {
     return ExactSingles<Left::none>{x + y};
   } else {
-    // (The sum of a power of two and a number that has been lifted, where they differ in sign, may become a tie, between
-    // that power and the number below it; it goes to the power, which is right.)
+    // (The sum of a power of two and a number that has been lifted, where they differ in sign, may become a tie,
+    // between that power and the number below it; it goes to the power, which is right.)
     const auto lifted = [](Singles u, Singles v) { return in_bits<Singles>(apart<12>(words_of(u), words_of(v))); };
     return ExactSingles<Left::great>{lifted(x, y) + lifted(y, x)};
   }
@@ -121,8 +121,8 @@ inline ExactDoubles sum_of_singles(const A& a, const B& b) {
 template <class F, class A, class B>
 inline auto sum(const A& a, const B& b) {
   if constexpr (A::reach == Reach::measured) {
-    // In a format of n bits two numbers of m have room up to n - m - 1 powers of two apart. Halves are also so small that
-    // their sum does not overflow.
+    // In a format of n bits two numbers of m have room up to n - m - 1 powers of two apart. Halves are also so small
+    // that their sum does not overflow.
     using Lane = typename F::lane;
     const auto x = magnitudes<F>(a.bits()), y = magnitudes<F>(b.bits());
     auto far = beyond<Lane>(x - y, powers_of_two<F>(F::bits == 16 ? 12 : 28));
@@ -154,8 +154,8 @@ inline V cut_odd(V bits, V mask) {
   return (bits | ((bits & cut) + cut)) & ~cut;
 }
 
-// Of acc + a * b, with normal factors: by how many powers of two acc is the greater, as exponents tell with fractions for
-// their logarithms. It is more than the difference of exponents less 1, and less than that plus 1.18.
+// Of acc + a * b, with normal factors: by how many powers of two acc is the greater, as exponents tell with fractions
+// for their logarithms. It is more than the difference of exponents less 1, and less than that plus 1.18.
 template <class F, class V>
 inline V headroom(V acc, V a, V b) {
   return magnitudes<F>(acc) - magnitudes<F>(a) - magnitudes<F>(b) + static_cast<typename F::lane>(F::one);
@@ -210,7 +210,7 @@ inline auto fused_singles(const C& acc, const A& a, const B& b) {
     const auto zero = [](Words x) { return in_bits<Words>(magnitudes<Single>(x) == 0); };
     const Words too_far = in_bits<Words>(ahead) + powers_of_two<Single>(27);
     return ExactBut<ExactDoubles>{{sum_with_product(acc.lower(), lower), sum_with_product(acc.upper(), upper)},
-                           too_far & ~zero(a.bits()) & ~zero(b.bits()) & ~zero(c_bits)};
+                                  too_far & ~zero(a.bits()) & ~zero(b.bits()) & ~zero(c_bits)};
   }
 }
 
@@ -221,7 +221,8 @@ inline auto fused(const C& acc, const A& a, const B& b) {
     using Lane = typename F::lane;
     const auto c = acc.bits(), x = a.bits(), y = b.bits(), m = magnitudes<F>(x), n = magnitudes<F>(y);
     const auto least = static_cast<Lane>(F::unit);
-    auto far = beyond<Lane>(headroom<F>(c, x, y), powers_of_two<F>(F::bits == 16 ? 11 : 26)) | (m - least) | (n - least);
+    auto far =
+        beyond<Lane>(headroom<F>(c, x, y), powers_of_two<F>(F::bits == 16 ? 11 : 26)) | (m - least) | (n - least);
     if constexpr (has_far_specials<F>) far |= specials<F>(m, n, magnitudes<F>(c));
     return Measured<Lane>{far, (x ^ y) | c};
   } else if constexpr (F::bits == 16) {
@@ -249,28 +250,74 @@ inline ExactSingles<Left::great_and_tiny> exact_single_of(const Lanes<L, R>& x) 
   return {x.value()};
 }
 
-// The exponent of a number is `Single::bias` less than this.
-inline Words biased_exponent(Words magnitude) { return magnitude >> Single::fraction_bits; }
-// With the hidden bit; 0 for zero. Of subnormals too, which are too small to tell from other small numbers here.
-inline Words significand(Words magnitude) {
-  return ((magnitude & (Single::unit - 1)) | Single::unit) & in_bits<Words>(magnitude != 0);
-}
-inline Words at_most(Words x, std::int32_t bound) {
-  const auto signed_x = in_bits<Integers>(x), bounds = Integers{} + bound;
-  return in_bits<Words>(signed_x < bounds ? signed_x : bounds);
-}
-
 struct Truncated {
   Words integers;
   Words dropped;
   Words left;  // in the top bit
 };
+struct WholeNumber {
+  Words bits, magnitudes;  // the magnitudes are those of what has been rounded
+  Words dropped;
+};
+
+inline Words ones_where(Integers mask) { return in_bits<Words>(mask); }
+inline Integers integers_of(Words x) { return in_bits<Integers>(x); }
+
+// --- Halves as integers -------------------------------------------------------------------------------
+
+// Magnitudes of halves times 2^Bits as integers. Those below 2^(10 - Bits), which have a lower bit than that, become 1
+// unless they are 0: a bit that only tells of what is dropped. Infinities and NaNs, and what has no room, become any.
+template <int Bits>
+inline Words fixed_point(Words magnitudes) {
+  const Words whole = ones_where(integers_of(magnitudes) >=
+                                 static_cast<std::int32_t>(single_bits_of_power(Half::fraction_bits - Bits)));
+  constexpr float scale = 1 << Bits;
+  return integers_toward_zero(in_bits<Singles>(magnitudes & whole) * scale) |
+         (ones_where((magnitudes & ~whole) != 0) & 1);
+}
+
+// x * 2^scale truncated to an integer of 16 bits. Out of range, or a NaN, it is left.
+template <class To, class Operand>
+inline Truncated truncated_half(const Operand& x, word scale) {
+  static_assert(To::bits == 16);
+  const Words bits = words_of(x.value() * as_float(single_bits_of_power(static_cast<int>(scale))));
+  const Words magnitude = bits & single_magnitude, negative = sign_masks(bits);
+  constexpr bool is_signed = std::is_signed_v<typename To::container>;
+  const Words all = Words{} + (single_bits_of_power(is_signed ? 15 : 16) - 1);
+  const Words greatest = is_signed ? all : chosen(negative, Words{} + (single_bits_of_power(0) - 1), all);
+  constexpr int point = Half::fraction_bits;
+  const Words fixed = fixed_point<point>(magnitude);
+  return {((fixed >> point) ^ negative) - negative, fixed & ((1u << point) - 1), greatest - magnitude};
+}
+
+// x rounded to an integer; from 2^10 on it is one.
+template <class Mode, class Operand>
+inline WholeNumber integral_half(const Mode& mode, const Operand& x) {
+  const Words number = words_of(x.value()), magnitude = number & single_magnitude, sign = number ^ magnitude;
+  constexpr int point = 12;
+  const Words fixed = fixed_point<point>(magnitude), rest = fixed << (32 - point) >> (32 - rest_bits);
+  const Words integer = rounded(fixed >> point, rest, sign, mode);
+  return {words_of(__builtin_convertvector(integers_of(integer), Singles)) | sign, magnitude, rest};
+}
+
+// --- Singles as integers ------------------------------------------------------------------------------
+
+// The exponent of a number is `Single::bias` less than this.
+inline Words biased_exponent(Words magnitude) { return magnitude >> Single::fraction_bits; }
+// With the hidden bit; 0 for zero. Of subnormals too, which are too small to tell from other small numbers here.
+inline Words significand(Words magnitude) {
+  return ((magnitude & (Single::unit - 1)) | Single::unit) & ones_where(magnitude != 0);
+}
+inline Words at_most(Words x, std::int32_t bound) {
+  const auto bounds = Integers{} + bound;
+  return in_bits<Words>(integers_of(x) < bounds ? integers_of(x) : bounds);
+}
 
 // x * 2^scale truncated to an integer of To. Out of range, or a NaN, it is left.
 template <class To, class Operand>
-inline Truncated truncated(const Operand& x, word scale) {
+inline Truncated truncated_single(const Operand& x, word scale) {
   constexpr bool is_signed = std::is_signed_v<typename To::container>;
-  const Words number = words_of(x.value()), magnitude = number & single_magnitude, negative = sign_masks(number);
+  const Words number = x.bits(), magnitude = number & single_magnitude, negative = sign_masks(number);
   // |x| * 2^scale is the significand, its first bit the word's, times 2^-right.
   const Words right = (Single::bias + 31 - scale) - biased_exponent(magnitude);
   const Words least = is_signed ? Words{} + (33 - To::bits) : chosen(negative, Words{} + 32, Words{} + (32 - To::bits));
@@ -278,21 +325,29 @@ inline Truncated truncated(const Operand& x, word scale) {
   return {(parts.kept ^ negative) - negative, parts.dropped, right - least};
 }
 
-struct WholeNumber {
-  Words bits, dropped;
-};
-
 // x rounded to an integer; from 2^23 on it is one.
 template <class Mode, class Operand>
-inline WholeNumber integral(const Mode& mode, const Operand& x) {
-  const Words number = words_of(x.value()), magnitude = number & single_magnitude, sign = number & single_sign;
+inline WholeNumber integral_single(const Mode& mode, const Operand& x) {
+  const Words number = x.bits(), magnitude = number & single_magnitude, sign = number ^ magnitude;
   const Words right = (Single::bias + Single::fraction_bits) - biased_exponent(magnitude);
   const Words small = ~sign_masks(right - 1);
   // Of numbers below 2^-5 it is enough that they are not 0.
   const Parted parts = parted(significand(magnitude) & small, at_most(right, rest_bits) & small);
   const Words rest = parts.dropped >> (32 - rest_bits);
-  const Singles integer = __builtin_convertvector(in_bits<Integers>(rounded(parts.kept, rest, sign, mode)), Singles);
-  return {sign | chosen(small, words_of(integer), magnitude), rest};
+  const Words integer = rounded(parts.kept, rest, sign, mode);
+  return {sign | chosen(small, words_of(__builtin_convertvector(integers_of(integer), Singles)), magnitude), magnitude,
+          rest};
+}
+
+template <class To, class Operand>
+inline Truncated truncated(const Operand& x, word scale) {
+  if constexpr (Operand::format::bits == 16) return truncated_half<To>(x, scale);
+  if constexpr (Operand::format::bits == 32) return truncated_single<To>(x, scale);
+}
+template <class Mode, class Operand>
+inline WholeNumber integral(const Mode& mode, const Operand& x) {
+  if constexpr (Operand::format::bits == 16) return integral_half(mode, x);
+  if constexpr (Operand::format::bits == 32) return integral_single(mode, x);
 }
 
 }  // namespace

@@ -145,7 +145,7 @@ inline auto settled(const ExactBut<Exact>& x, const Mode& mode) {
 // A half that is rounded to an integer is a half.
 template <class F, class Mode>
 inline auto settled(const WholeNumber& x, const Mode&) {
-  return Settled<Range<0, widened_largest<F>>>{x.bits, x.bits & single_magnitude, x.dropped};
+  return Settled<Range<0, widened_largest<F>>>{x.bits, x.magnitudes, x.dropped};
 }
 
 // Where lane i of a step is in the order of pairs.

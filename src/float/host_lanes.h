@@ -1,5 +1,5 @@
-// Floats register by register: operands as the host's unit takes them, and the rounding of what it has computed. For the
-// targets whose instructions do not carry their own rounding.
+// Floats register by register: operands as the host's unit takes them, and the rounding of what it has computed. For
+// the targets whose instructions do not carry their own rounding.
 #ifndef KASTARRI_FLOAT_HOST_LANES_H
 #define KASTARRI_FLOAT_HOST_LANES_H
 
@@ -56,6 +56,15 @@ inline bool any_bit(Words x) {
 #endif
 }
 
+// By the instruction, which has an answer for numbers that have no room in an integer too.
+inline Words integers_toward_zero(Singles x) {
+#ifdef __AVX2__
+  return in_bits<Words>(_mm256_cvttps_epi32(in_bits<__m256>(x)));
+#else
+  return in_bits<Words>(_mm_cvttps_epi32(in_bits<__m128>(x)));
+#endif
+}
+
 // The first or the last half of the lanes at an address, as doubles.
 constexpr int half_a_step = step / 2;
 inline Doubles doubles_at(const float* singles) {
@@ -97,12 +106,12 @@ inline Parted parted(Words x, Words right) {
   return {shifted_right<word>(x, counts_of(right)), shifted_left<word>(x, counts_of(32 - right))};
 }
 #else
-// Without shifts by a count a lane: the halves of a product with 2^(32 - right), by the number with that exponent, whose
-// conversion is exact.
+// Without shifts by a count a lane: the halves of a product with 2^(32 - right), by the number with that exponent,
+// whose conversion is exact.
 inline Parted parted(Words x, Words right) {
   const Words left = 32 - right;
   const auto number = in_bits<Singles>(((left & 15) + Single::bias) << Single::fraction_bits);
-  const auto low_power = in_bits<Words>(__builtin_convertvector(number, Integers));
+  const Words low_power = integers_toward_zero(number);
   const Words by_16 = in_bits<Words>((left & 16) != 0), nothing = in_bits<Words>(right == 0);
   const Words power = chosen(by_16, low_power << 16, low_power);
   const auto products = [](DoubleBits a, DoubleBits b) {

@@ -1,9 +1,9 @@
 // The AVX-512 unit, whose instructions carry their rounding and raise no flags: the control word, the writing of
 // which costs as much as a whole vector does, is left alone unless the host flushes subnormals.
 //
-// A result is inexact when rounding up and rounding down disagree on it. So every vector is computed both
-// ways, and once more to nearest; toward zero is the lesser of the two. The host's flush-to-zero and
-// denormals-are-zero bits alone still count; with_subnormals sees to them.
+// A result is inexact when rounding up and rounding down disagree on it. So every vector is computed both ways, and
+// as the mode has it. The host's flush-to-zero and denormals-are-zero bits alone still count; with_subnormals sees to
+// them.
 #ifndef KASTARRI_FLOAT_AVX512_H
 #define KASTARRI_FLOAT_AVX512_H
 
@@ -21,6 +21,7 @@
 #endif
 
 #include "float/bits.h"
+#include "frame/lanes.h"
 
 namespace {
 
@@ -88,12 +89,9 @@ inline Sixteen<R> integral(Rounding, Sixteen<R> x) {
 
 // --- Lanes ------------------------------------------------------------------------------------------
 
-// A load of part of what has just been stored whole would wait for the store: so it is whole too.
 template <class L>
 inline __m256i half_register(const typename L::container* lanes, int from) {
-  if constexpr (L::count == 16) return _mm256_loadu_si256(reinterpret_cast<const __m256i*>(lanes));
-  const __m512i all = _mm512_loadu_si512(lanes);
-  return from == 0 ? _mm512_castsi512_si256(all) : _mm512_maskz_extracti64x4_epi64(0xF, all, 1);
+  return _mm256_loadu_si256(reinterpret_cast<const __m256i*>(lanes + from));
 }
 
 // Sixteen lanes of layout L from number `from` on, as singles; a lane alone sixteen times.
@@ -134,165 +132,196 @@ inline __m256i halves_of(Sixteen<R> x) {
   return halves;
 }
 
-// A register of results of layout L, rounded by R.
-template <class L, Rounding R, class... Ls, class Mode, class Rule, class... Units>
-inline __m512i rounded(const Mode& mode, Rule rule, const Units*... operands) {
-  const auto sixteen = [&](int from) {
-    return by_rule(rule, mode, load_sixteen<Ls, R>(reinterpret_cast<const typename Ls::container*>(operands), from)...);
-  };
-  if constexpr (L::bits == 32) {
-    return _mm512_castps_si512(sixteen(0).v);
-  } else {
-    const __m512i low = _mm512_zextsi256_si512(halves_of(sixteen(0)));
-    return L::count == 32 ? _mm512_inserti64x4(low, halves_of(sixteen(16)), 1) : low;
-  }
-}
-
 // --- A whole vector -----------------------------------------------------------------------------------
 
 constexpr word flushing = 0x8040;  // flush-to-zero and denormals-are-zero
 
-// What compute() returns, subnormals being neither read nor written as zeros. A function of its own, so that compilers
-// cannot move arithmetic past the writes (see HostFpu): operands come from memory that is unknown before the one, and
-// results, with what is told of them, have to be in memory before the other.
-template <class Compute>
-[[gnu::noinline, gnu::cold]] HostResult honouring_subnormals(const Compute& compute, word found) {
-  const word honest = found & ~flushing;
-  asm volatile("ldmxcsr %0" : : "m"(honest) : "memory");
-  HostResult result = compute();
-  asm volatile("" : "+m"(result) : : "memory");
-  asm volatile("ldmxcsr %0" : : "m"(found) : "memory");
-  return result;
-}
+// What the unit makes of a vector: a register of results, and a bit a lane for those that are inexact and for those
+// that are left to the reference.
+struct Computed {
+  __m512i lanes;
+  std::uint32_t inexact;
+  std::uint32_t left;
+};
 
-template <class Compute>
-inline HostResult with_subnormals(const Compute& compute) {
-  word found;
-  asm volatile("stmxcsr %0" : "=m"(found));
-  return __builtin_expect(found & flushing, 0) ? honouring_subnormals(compute, found) : compute();
+inline word control_word() {
+  word mxcsr;
+  asm volatile("stmxcsr %0" : "=m"(mxcsr));
+  return mxcsr;
 }
+inline void set_control_word(word mxcsr) { asm volatile("ldmxcsr %0" : : "m"(mxcsr) : "memory"); }
 
-// Lanes of 16 or 32 bits compared, and chosen: b `where` a bit is 1.
+// Words of one or two lanes of the same bits each.
 template <int Bits>
-struct LaneTests;
-template <>
-struct LaneTests<16> {
-  static __m512i all(word x) { return _mm512_set1_epi16(static_cast<short>(x)); }
-  static std::uint32_t differ(__m512i a, __m512i b) { return _mm512_cmpneq_epu16_mask(a, b); }
-  static std::uint32_t above(__m512i a, __m512i b) { return _mm512_cmpgt_epu16_mask(a, b); }
-  static __m512i chosen(__m512i a, std::uint32_t where, __m512i b) { return _mm512_mask_mov_epi16(a, where, b); }
-  static __m512i greater(__m512i a, __m512i b) { return _mm512_max_epu16(a, b); }
-};
-template <>
-struct LaneTests<32> {
-  static __m512i all(word x) { return _mm512_set1_epi32(static_cast<int>(x)); }
-  static std::uint32_t differ(__m512i a, __m512i b) { return _mm512_cmpneq_epu32_mask(a, b); }
-  static std::uint32_t above(__m512i a, __m512i b) { return _mm512_cmpgt_epu32_mask(a, b); }
-  static __m512i chosen(__m512i a, std::uint32_t where, __m512i b) {
-    return _mm512_mask_mov_epi32(a, static_cast<__mmask16>(where), b);
-  }
-  static __m512i greater(__m512i a, __m512i b) { return _mm512_maskz_max_epu32(sixteen_lanes(), a, b); }
-};
+inline __m512i every_lane(word x) {
+  return _mm512_set1_epi32(static_cast<int>(Bits == 16 ? x * 0x10001 : x));
+}
+
+// Those of some lanes of 16 or 32 bits whose numbers, without their signs, are not from `least` to `greatest`.
+template <int Bits>
+inline std::uint32_t outside(std::uint32_t some, __m512i lanes, word least, word greatest) {
+  const __m512i from = every_lane<Bits>(2 * least), range = every_lane<Bits>(2 * (greatest - least));
+  if constexpr (Bits == 16)
+    return _mm512_mask_cmpgt_epu16_mask(some, _mm512_sub_epi16(_mm512_add_epi16(lanes, lanes), from), range);
+  else
+    return _mm512_mask_cmpgt_epu32_mask(static_cast<__mmask16>(some),
+                                        _mm512_sub_epi32(_mm512_add_epi32(lanes, lanes), from), range);
+}
 
 template <class L>
-inline void store_lanes(typename L::container* results, __m512i lanes) {
+inline void store_lanes(void* results, __m512i lanes) {
   if constexpr (L::count == 1) {
-    *results = static_cast<typename L::container>(_mm_cvtsi128_si32(_mm512_castsi512_si128(lanes)));
+    *static_cast<in_memory<typename L::container>*>(results) =
+        static_cast<typename L::container>(_mm_cvtsi128_si32(_mm512_castsi512_si128(lanes)));
   } else if constexpr (L::count * L::bits == 256) {
-    _mm256_storeu_si256(reinterpret_cast<__m256i*>(results), _mm512_castsi512_si256(lanes));
+    _mm256_storeu_si256(static_cast<__m256i*>(results), _mm512_castsi512_si256(lanes));
   } else {
     _mm512_storeu_si512(results, lanes);
   }
 }
 
-// --- Halves -------------------------------------------------------------------------------------------
+template <class L>
+inline __m512i load_lanes(const void* lanes) {
+  using Lane = in_memory<typename L::container>;
+  if constexpr (L::count == 1) return _mm512_set1_epi32(static_cast<int>(*static_cast<const Lane*>(lanes)));
+  return _mm512_loadu_si512(lanes);
+}
 
-// Sixteen results in single precision, to be rounded by R to halves: rounded to odd first, so that rounding again is
-// rounding once. Odd is truncated, and the last bit set where that is inexact.
+// Sixteen numbers by the rule, rounded by R.
 template <Rounding R, class... Ls, class Rule, class... Units>
-inline __m512 odd(Rule rule, int from, const Units*... operands) {
-  const auto rounded_by = [&](auto... x) { return rule(x...).v; };
-  const __m512 up = rounded_by(load_sixteen<Ls, upward>(operands, from)...);
-  const __m512 down = rounded_by(load_sixteen<Ls, downward>(operands, from)...);
-  const __m512i zeroward = _mm512_castps_si512(rounded_by(load_sixteen<Ls, toward_zero>(operands, from)...));
-  const __m512i exact = R == downward ? _mm512_castps_si512(down) : zeroward;  // which differ where they are 0
-  return _mm512_castsi512_ps(_mm512_mask_or_epi32(exact, differing(up, down), zeroward, _mm512_set1_epi32(1)));
+inline __m512 rounded(Rule rule, int from, const Units*... operands) {
+  return rule(load_sixteen<Ls, R>(reinterpret_cast<const typename Ls::container*>(operands), from)...).v;
 }
 
-// Lanes that overflow, and tiny ones that are inexact, are left.
-template <Rounding R, class L, class... Ls, class Rule, class... Units>
-[[gnu::flatten]] inline HostResult halves_by_instruction(typename L::container* results, Rule rule,
-                                                         const Units*... operands) {
-  std::uint32_t all_left = 0, all_inexact = 0;
-  const auto sixteen = [&](int from) {
-    const __m512 x = odd<R, Ls...>(rule, from, reinterpret_cast<const typename Ls::container*>(operands)...);
-    const __m256i halves = halves_of(Sixteen<R>{x});
-    const __m512i bits = _mm512_castps_si512(x);
-    const __m512i magnitude = _mm512_and_si512(bits, _mm512_set1_epi32(single_magnitude));
-    const __mmask16 inexact = _mm512_cmpneq_epi32_mask(
-        bits, _mm512_castps_si512(_mm512_maskz_cvt_roundph_ps(sixteen_lanes(), halves, _MM_FROUND_NO_EXC)));
-    const __mmask16 tiny =
-        _mm512_mask_cmplt_epi32_mask(inexact, magnitude, _mm512_set1_epi32(single_bits_of_power(Half::least_exponent)));
-    const __mmask16 left = tiny | _mm512_cmpgt_epi32_mask(magnitude, _mm512_set1_epi32(widened_largest<Half>));
-    all_left |= left;
-    all_inexact |= inexact & ~left;
-    // A branch, so that the halves need not wait for what tells whether they are left.
-    return __builtin_expect(left != 0, 0) ? _mm256_mask_mov_epi16(halves, left, _mm256_set1_epi32(-1)) : halves;
-  };
-  __m512i halves = _mm512_zextsi256_si512(sixteen(0));
-  if constexpr (L::count == 32) halves = _mm512_inserti64x4(halves, sixteen(16), 1);
-  store_lanes<L>(results, halves);
-  return {all_inexact != 0 ? word{inexact} : 0, all_left != 0};
+// Sixteen numbers as singles, rounded up and down.
+struct Bounds {
+  __m512 up;
+  __m512 down;
+};
+template <class... Ls, class Rule, class... Units>
+inline Bounds bounds(Rule rule, int from, const Units*... operands) {
+  return {rounded<upward, Ls...>(rule, from, operands...), rounded<downward, Ls...>(rule, from, operands...)};
 }
 
-template <class L, class... Ls, class Rule, class... Units>
-inline HostResult halves_by_instruction(Rounding rounding, typename L::container* results, Rule rule,
-                                        const Units*... operands) {
-  switch (rounding) {
-    case upward:
-      return halves_by_instruction<upward, L, Ls...>(results, rule, operands...);
-    case downward:
-      return halves_by_instruction<downward, L, Ls...>(results, rule, operands...);
-    case toward_zero:
-      return halves_by_instruction<toward_zero, L, Ls...>(results, rule, operands...);
-    default:
-      return halves_by_instruction<to_nearest, L, Ls...>(results, rule, operands...);
+// The bound that R rounds to, or either if R is to nearest. Sums of 0 are rounded up to +0 and down to -0.
+template <Rounding R>
+inline Sixteen<R> either_of(const Bounds& x) {
+  if constexpr (R == downward) return {x.down};
+  if constexpr (R != toward_zero) return {x.up};
+  return {_mm512_castsi512_ps(
+      _mm512_maskz_min_epu32(sixteen_lanes(), _mm512_castps_si512(x.up), _mm512_castps_si512(x.down)))};
+}
+
+// Where a number has been moved up to the middle of two halves.
+inline __mmask16 moved_to_middle(const Bounds& x) {
+  const __m512i up = _mm512_castps_si512(x.up), down = _mm512_castps_si512(x.down);
+  const __m512i dropped = _mm512_and_si512(up, _mm512_set1_epi32(0x1FFF));
+  return _mm512_mask_cmpneq_epi32_mask(_mm512_cmpeq_epi32_mask(dropped, _mm512_set1_epi32(0x1000)), up, down);
+}
+
+inline __m512 singles_of(__m256i halves) {
+  return _mm512_maskz_cvt_roundph_ps(sixteen_lanes(), halves, _MM_FROUND_NO_EXC);
+}
+inline __mmask16 other_than(__m256i halves, const Bounds& x) {
+  const __m512 singles = singles_of(halves);
+  return static_cast<__mmask16>(differing(x.up, singles) | differing(x.down, singles));
+}
+
+// A register of 16-bit lanes and a mask of its lanes, of their parts.
+template <class L>
+inline __m512i joined(__m256i low, __m256i high) {
+  const __m512i lower = _mm512_castsi256_si512(low);
+  return L::count == 32 ? _mm512_inserti64x4(lower, high, 1) : lower;
+}
+template <class L>
+inline std::uint32_t joined(__mmask16 low, __mmask16 high) {
+  return L::count == 32 ? _mm512_kunpackw(high, low) : low;
+}
+
+// Results, and the lanes that are inexact or hold NaNs.
+struct Told {
+  __m512i lanes;
+  std::uint32_t inexact;
+};
+
+// Halves are rounded twice, as singles before. That is rounding once, and to nearest either bound will do, unless a
+// number is moved to the middle of two halves, to which sums and products of two do not come near without being
+// singles. What the results wait for is computed first.
+template <class L, Rounding R, class... Ls, class Rule, class... Units>
+inline Told halves_by_rule(Rule rule, const Units*... operands) {
+  const Bounds low = bounds<Ls...>(rule, 0, operands...), high = bounds<Ls...>(rule, L::count - 16, operands...);
+  const __m256i low_halves = halves_of(either_of<R>(low)), high_halves = halves_of(either_of<R>(high));
+  __m512i lanes = joined<L>(low_halves, high_halves);
+  if constexpr (R == to_nearest && sizeof...(Ls) > 2) {
+    const __mmask16 low_moved = moved_to_middle(low), high_moved = moved_to_middle(high);
+    if (__builtin_expect(!_mm512_kortestz(low_moved, high_moved), 0))
+      lanes = joined<L>(halves_of(Sixteen<R>{_mm512_mask_mov_ps(low.up, low_moved, low.down)}),
+                        halves_of(Sixteen<R>{_mm512_mask_mov_ps(high.up, high_moved, high.down)}));
+  }
+  return {lanes, joined<L>(other_than(low_halves, low), other_than(high_halves, high))};
+}
+
+template <Rounding R, class... Ls, class Rule, class... Units>
+inline Told singles_by_rule(Rule rule, const Units*... operands) {
+  const Bounds x = bounds<Ls...>(rule, 0, operands...);
+  return {_mm512_castps_si512(rounded<R, Ls...>(rule, 0, operands...)), differing(x.up, x.down)};
+}
+
+// Integers among the numbers of a format are numbers of that format.
+template <class L, Rounding R, class Mode, class Rule, class Units>
+inline Told integers_by_rule(const Mode& mode, Rule rule, const Units* operand) {
+  const auto* lanes = reinterpret_cast<const typename L::container*>(operand);
+  const Sixteen<R> x = load_sixteen<L, R>(lanes, 0), low = rule(mode, x);
+  if constexpr (L::bits == 32) return {_mm512_castps_si512(low.v), differing(x.v, low.v)};
+  if constexpr (L::bits == 16) {
+    const Sixteen<R> y = load_sixteen<L, R>(lanes, 16), high = rule(mode, y);
+    return {joined<L>(halves_of(low), halves_of(high)), joined<L>(differing(x.v, low.v), differing(y.v, high.v))};
   }
 }
 
-// --- All ----------------------------------------------------------------------------------------------
+// compute(R) for a mode, with the rounding of instructions as a constant.
+template <class Compute>
+[[gnu::always_inline]] inline Computed by_rounding(Rounding rounding, const Compute& compute) {
+  switch (rounding) {
+    case upward:
+      return compute(std::integral_constant<Rounding, upward>());
+    case downward:
+      return compute(std::integral_constant<Rounding, downward>());
+    case toward_zero:
+      return compute(std::integral_constant<Rounding, toward_zero>());
+    default:
+      return compute(std::integral_constant<Rounding, to_nearest>());
+  }
+}
+template <class Compute>
+[[gnu::always_inline]] inline Computed by_rounding(TiesAway, const Compute& compute) {
+  return compute(std::integral_constant<Rounding, to_nearest>());
+}
 
-constexpr Rounding rounding_of(Rounding rounding) { return rounding; }
-constexpr Rounding rounding_of(TiesAway) { return toward_zero; }
-
-// Result lane i = rule(operand lanes i ...), as on_host. Lanes that overflow, or whose inexact result may be
-// tiny, are left.
-template <class L, class... Ls, class Mode, class Rule, class... Units>
-inline HostResult by_instruction(const Mode& mode, typename L::container* results, Rule rule,
-                                 const Units*... operands) {
+// Result lane i = rule(operand lanes i ...), as on_host. NaNs are left, and inexact results that may be due to overflow
+// or be tiny. What is told of lanes is told of the enabled ones.
+template <class L, Rounding R, class... Ls, class Mode, class Rule, class... Units>
+[[gnu::always_inline]] inline Computed by_instruction(const Mode& mode, std::uint32_t enabled, Rule rule,
+                                                      const Units*... operands) {
   using F = format_of<L>;
-  using Tests = LaneTests<L::bits>;
-  const Rounding rounding = rounding_of(mode);
-  const __m512i up = rounded<L, upward, Ls...>(mode, rule, operands...);
-  const __m512i down = rounded<L, downward, Ls...>(mode, rule, operands...);
-  const __m512i magnitude_mask = Tests::all(F::sign - 1);
-  const __m512i up_magnitude = _mm512_and_si512(up, magnitude_mask);
-  const __m512i down_magnitude = _mm512_and_si512(down, magnitude_mask);
-  const __m512i greater = Tests::greater(up_magnitude, down_magnitude);
-  const std::uint32_t differ = Tests::differ(up_magnitude, down_magnitude);
-  const std::uint32_t left =
-      Tests::above(greater, Tests::all(F::largest)) | (differ & ~Tests::above(greater, Tests::all(F::unit)));
-  const __m512i result = rounding == to_nearest ? rounded<L, to_nearest, Ls...>(mode, rule, operands...)
-                         : rounding == upward   ? up
-                         : rounding == downward ? down
-                                                : Tests::chosen(up, Tests::above(up_magnitude, down_magnitude), down);
-  store_lanes<L>(results, Tests::chosen(result, left, _mm512_set1_epi32(-1)));
-  return {(differ & ~left) != 0 ? word{inexact} : 0, left != 0};
+  constexpr bool to_integers = std::is_invocable_v<Rule, Mode, decltype(load_sixteen<Ls, R>(nullptr, 0))...>;
+  const Told results = [&] {
+    if constexpr (to_integers)
+      return integers_by_rule<L, R>(mode, rule, operands...);
+    else if constexpr (L::bits == 16)
+      return halves_by_rule<L, R, Ls...>(rule, operands...);
+    else
+      return singles_by_rule<R, Ls...>(rule, operands...);
+  }();
+  const std::uint32_t told = results.inexact & enabled;
+  const std::uint32_t left = to_integers ? outside<L::bits>(told, results.lanes, 0, F::infinity)
+                                         : outside<L::bits>(told, results.lanes, F::unit + 1, F::largest - 1);
+  return {results.lanes, told, left};
 }
 
 // Numbers times a power of two, truncated to integers of layout L. Lanes that have no such integer are left.
 template <class L, class From, class Units>
-inline HostResult truncated_by_instruction(typename L::container* results, word scale, const Units* operand) {
+inline Computed truncated_by_instruction(word scale, const Units* operand) {
   constexpr bool is_signed = std::is_signed_v<typename L::container>;
   const float power = as_float(single_bits_of_power(static_cast<int>(scale)));
   std::uint32_t left = 0, fractions = 0;
@@ -314,16 +343,101 @@ inline HostResult truncated_by_instruction(typename L::container* results, word 
     const __mmask16 unfit = L::bits == 16
                                 ? _mm512_cmpneq_epu32_mask(integers, fitting)
                                 : _mm512_cmpeq_epu32_mask(integers, _mm512_set1_epi32(whole_word ? -1 : INT32_MIN));
-    left |= unfit;
-    fractions |= ~unfit & differing(x, back);
+    left |= std::uint32_t{unfit} << from;
+    fractions |= std::uint32_t{differing(x, back)} << from;
     return integers;
   };
   __m512i integers = sixteen(0);
   if constexpr (L::bits == 16)
     integers = _mm512_inserti64x4(_mm512_zextsi256_si512(_mm512_maskz_cvtepi32_epi16(sixteen_lanes(), integers)),
                                   _mm512_maskz_cvtepi32_epi16(sixteen_lanes(), sixteen(16)), 1);
-  store_lanes<L>(results, integers);
-  return {fractions != 0 ? word{inexact} : 0, left != 0};
+  return {integers, fractions, left};
+}
+
+// A bit a lane of layout L. A lane alone is there sixteen times.
+template <class L, class Unit>
+inline std::uint32_t enabled_lanes(const Unit*) {
+  return ~std::uint32_t{0};
+}
+template <class L, class Unit, class PredicateUnit>
+inline std::uint32_t enabled_lanes(UnitsUnder<Unit, PredicateUnit, false> out) {
+  return L::count == 1 ? *out.predicate & 1u : *out.predicate;
+}
+
+// A vector of results in a register, with what the unit tells of them. Of lanes that are not enabled it tells nothing,
+// and what lies there is kept.
+template <class L>
+class RegisterResults {
+ public:
+  template <class Out>
+  explicit RegisterResults(Out out) : enabled_(enabled_lanes<L>(out)) {}
+
+  // compute(enabled lanes), and what it tells.
+  template <class Compute>
+  [[gnu::always_inline]] HostResult take(const Compute& compute) {
+    const Computed computed = compute(enabled_);
+    lanes_ = computed.lanes;
+    left_ = computed.left;
+    return {(computed.inexact & ~left_) != 0 ? word{inexact} : 0, left_ != 0};
+  }
+
+  // Lanes that are left, by exact(number of the lane).
+  template <class Exact>
+  void complete(const Exact& exact) {
+    using Lane = typename L::container;
+    alignas(64) Lane lane[sizeof lanes_ / sizeof(Lane)];
+    _mm512_store_si512(lane, lanes_);
+    for (int i = 0; i < L::count; ++i)
+      if ((left_ >> i & 1) != 0) lane[i] = static_cast<Lane>(exact(i));
+    lanes_ = _mm512_load_si512(lane);
+  }
+
+  template <class Unit>
+  void store(Unit* out) const {
+    store_lanes<L>(out, lanes_);
+  }
+  template <class Unit, class PredicateUnit>
+  void store(UnitsUnder<Unit, PredicateUnit, false> out) const {
+    const __m512i old = load_lanes<L>(out.units);
+    store_lanes<L>(out.units, L::bits == 16 ? _mm512_mask_mov_epi16(old, enabled_, lanes_)
+                                            : _mm512_mask_mov_epi32(old, static_cast<__mmask16>(enabled_), lanes_));
+  }
+
+ private:
+  __m512i lanes_;
+  std::uint32_t left_;
+  std::uint32_t enabled_;
+};
+
+// Results by fast(results), which says whether it has left a lane, and such lanes by exact(number of the lane). What is
+// seldom wanted is in functions apart, which take copies: what they had by reference would have to be in memory always.
+template <class L, class Out, class Exact>
+[[gnu::noinline]] void store_completed(Out out, RegisterResults<L> results, Exact exact) {
+  results.complete(exact);
+  results.store(out);
+}
+
+// With subnormals neither read nor written as zeros. Compilers cannot move arithmetic past the writes (see HostFpu):
+// operands come from memory that is unknown before the one, and results, with what is told of them, have to be in
+// memory before the other.
+template <class L, class Out, class Fast, class Exact>
+[[gnu::noinline]] void store_honouring_subnormals(Out out, Fast fast, Exact exact) {
+  const word found = control_word();
+  set_control_word(found & ~flushing);
+  RegisterResults<L> results(out);
+  const bool some_left = fast(results);
+  asm volatile("" : "+m"(results) : : "memory");
+  set_control_word(found);
+  if (some_left) results.complete(exact);
+  results.store(out);
+}
+
+template <class L, class Out, class Fast, class Exact>
+[[gnu::always_inline]] inline void store_by_register(Out out, Fast fast, Exact exact) {
+  if (__builtin_expect(control_word() & flushing, 0)) return store_honouring_subnormals<L>(out, fast, exact);
+  RegisterResults<L> results(out);
+  if (__builtin_expect(fast(results), 0)) return store_completed<L>(out, results, exact);
+  results.store(out);
 }
 
 }  // namespace

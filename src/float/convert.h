@@ -44,20 +44,29 @@ template <class From, class To, class Units, class Exact>
   return results;
 }
 
-// A whole vector on the unit, or, when it leaves a lane, by the reference altogether: a lane that
-// is left may have raised flags of its own.
+// A whole vector on the unit, with lanes that it leaves by the reference; or, where results are in memory, by the
+// reference altogether: a lane that is left may have raised flags of its own, and need not show in them.
 template <class From, class To, class Out, class Units, class Fast, class Exact>
 [[gnu::always_inline, gnu::flatten]] inline void convert_vector(Out* out, const Units* in, Fast fast, Exact exact) {
-  Results<To> results;
   Environment env;
-  const HostResult host = fast(env.rounding, results.lane);
-  if (__builtin_expect(host.some_left, 0)) {
-    const Results<To> all = converted<From, To>(env, in, exact);
-    results = all;
+  if constexpr (rounds_by_instruction) {
+    const auto fast_in = [ =, &env ](auto& results) __attribute__((always_inline)) {
+      const HostResult host = fast(env.rounding, results);
+      env.raise(host.flags);
+      return host.some_left;
+    };
+    store_by_register<To>(out, fast_in, [=, &env](int i) { return static_cast<word>(exact(env, Read<From>(in)[i])); });
   } else {
-    env.raise(host.flags);
+    Results<To> results;
+    const HostResult host = fast(env.rounding, results.lane);
+    if (__builtin_expect(host.some_left, 0)) {
+      const Results<To> all = converted<From, To>(env, in, exact);
+      results = all;
+    } else {
+      env.raise(host.flags);
+    }
+    std::memcpy(out, results.lane, sizeof results.lane);
   }
-  std::memcpy(out, results.lane, sizeof results.lane);
 }
 
 template <class From, class To, class Out, class Units>
@@ -69,7 +78,7 @@ template <class From, class To, class Out, class Units>
     lanes<To::count>(
         Write<To>(out), [](auto same) { return same; }, Same(lane));
   } else if constexpr (!is_float<To>) {
-    const auto fast = [=](Rounding, auto* results) { return truncated_on_unit<To, From>(results, scale, in); };
+    const auto fast = [=](Rounding, auto& results) { return truncated_on_unit<To, From>(results, scale, in); };
     convert_vector<From, To>(out, in, fast, exact);
   } else {
     const float unit = as_float(single_bits_of_power(-static_cast<int>(scale)));
@@ -77,7 +86,7 @@ template <class From, class To, class Out, class Units>
       if constexpr (is_float<From>) return exact_single_of(x);
       if constexpr (!is_float<From>) return scaled_single(x, unit);
     };
-    const auto fast = [=](Rounding rounding, auto* results) { return on_unit<To, From>(rounding, results, rule, in); };
+    const auto fast = [=](Rounding rounding, auto& results) { return on_unit<To, From>(rounding, results, rule, in); };
     convert_vector<From, To>(out, in, fast, exact);
   }
 }

@@ -15,9 +15,12 @@ namespace {
 template <class L, class>
 using same_layout = L;
 
+// Operations whose fast path is the unit. It leaves results where on_unit does.
+struct OnUnit {};
+
 // A rule of two or three floats on the unit: results and flags into the register and env.
-template <class L, class Rule, class... Units>
-[[gnu::always_inline]] inline bool fast_on_unit(Environment& env, typename L::container* results, Rule rule,
+template <class L, class Results, class Rule, class... Units>
+[[gnu::always_inline]] inline bool fast_on_unit(Environment& env, Results& results, Rule rule,
                                                 const Units*... operands) {
   const HostResult host = on_unit<L, same_layout<L, Units>...>(env.rounding, results, rule, operands...);
   env.raise(host.flags);
@@ -35,13 +38,13 @@ inline auto turned_if(const T& x) {
 
 // a + b, or a - b.
 template <bool Subtract>
-struct Sum {
+struct Sum : OnUnit {
   template <class F>
   static word exact(Environment& env, word a, word b) {
     return add<F>(env, a, Subtract ? negated<F>(b) : b);
   }
-  template <class L, class Units>
-  [[gnu::always_inline]] static bool fast(Environment& env, typename L::container* r, const Units* a, const Units* b) {
+  template <class L, class Results, class Units>
+  [[gnu::always_inline]] static bool fast(Environment& env, Results& r, const Units* a, const Units* b) {
     return fast_on_unit<L>(
         env, r, [](auto x, auto y) { return sum<format_of<L>>(x, turned_if<Subtract>(y)); }, a, b);
   }
@@ -49,13 +52,13 @@ struct Sum {
 using ADD = Sum<false>;
 using SUB = Sum<true>;
 
-struct MUL {
+struct MUL : OnUnit {
   template <class F>
   static word exact(Environment& env, word a, word b) {
     return multiply<F>(env, a, b);
   }
-  template <class L, class... Units>
-  [[gnu::always_inline]] static bool fast(Environment& env, typename L::container* r, const Units*... ab) {
+  template <class L, class Results, class... Units>
+  [[gnu::always_inline]] static bool fast(Environment& env, Results& r, const Units*... ab) {
     return fast_on_unit<L>(
         env, r, [](auto a, auto b) { return product<format_of<L>>(a, b); }, ab...);
   }
@@ -63,13 +66,13 @@ struct MUL {
 
 // acc +- a * b
 template <bool Subtract>
-struct Fused {
+struct Fused : OnUnit {
   template <class F>
   static word exact(Environment& env, word acc, word a, word b) {
     return multiply_add<F>(env, acc, Subtract ? negated<F>(a) : a, b);
   }
-  template <class L, class... Units>
-  [[gnu::always_inline]] static bool fast(Environment& env, typename L::container* r, const Units*... operands) {
+  template <class L, class Results, class... Units>
+  [[gnu::always_inline]] static bool fast(Environment& env, Results& r, const Units*... operands) {
     return fast_on_unit<L>(
         env, r, [](auto acc, auto a, auto b) { return fused<format_of<L>>(acc, turned_if<Subtract>(a), b); },
         operands...);
@@ -166,7 +169,7 @@ struct CLSFY {
 enum class Direction { away, up, down, zero, by_mode };
 
 template <Direction D>
-struct Integral {
+struct Integral : OnUnit {
   static Rounding rounding(const Environment& env) {
     return D == Direction::away   ? ties_away
            : D == Direction::up   ? upward
@@ -178,8 +181,8 @@ struct Integral {
   static word exact(Environment& env, word a) {
     return to_integral<F>(env, a, rounding(env), D == Direction::by_mode);
   }
-  template <class L, class Units>
-  [[gnu::always_inline]] static bool fast(Environment& env, typename L::container* r, const Units* a) {
+  template <class L, class Results, class Units>
+  [[gnu::always_inline]] static bool fast(Environment& env, Results& r, const Units* a) {
     const auto rule = [](const auto& mode, auto x) { return integral(mode, x); };
     const HostResult host =
         D == Direction::away ? on_unit<L, L>(TiesAway(), r, rule, a) : on_unit<L, L>(rounding(env), r, rule, a);

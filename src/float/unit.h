@@ -13,23 +13,25 @@ namespace {
 #ifdef __AVX512F__
 constexpr bool rounds_by_instruction = true;
 
-template <class R, class... Ls, class Mode, class Rule, class... Units>
-inline HostResult on_unit(const Mode& mode, typename R::container* results, Rule rule, const Units*... operands) {
-  constexpr bool rounds_to_integers =
-      std::is_invocable_v<Rule, Mode, decltype(load_sixteen<Ls, to_nearest>(nullptr, 0))...>;
-  return with_subnormals([&] {
-    if constexpr (R::bits == 16 && !rounds_to_integers)
-      return halves_by_instruction<R, Ls...>(mode, results, rule, operands...);
-    else
-      return by_instruction<R, Ls...>(mode, results, rule, operands...);
+template <class R, class... Ls, class Results, class Mode, class Rule, class... Units>
+[[gnu::always_inline]] inline HostResult on_unit(const Mode& mode, Results& results, Rule rule,
+                                                 const Units*... operands) {
+  return results.take([=](std::uint32_t enabled) __attribute__((always_inline)) {
+    return by_rounding(
+        mode, [=](auto rounding) __attribute__((always_inline)) {
+          return by_instruction<R, decltype(rounding)::value, Ls...>(mode, enabled, rule, operands...);
+        });
   });
 }
-template <class R, class From, class Units>
-inline HostResult truncated_on_unit(typename R::container* results, word scale, const Units* operand) {
-  return with_subnormals([&] { return truncated_by_instruction<R, From>(results, scale, operand); });
+template <class R, class From, class Results, class Units>
+[[gnu::always_inline]] inline HostResult truncated_on_unit(Results& results, word scale, const Units* operand) {
+  return results.take([=](std::uint32_t) { return truncated_by_instruction<R, From>(scale, operand); });
 }
 #else
 constexpr bool rounds_by_instruction = false;
+
+template <class L, class Out, class Fast, class Exact>
+void store_by_register(Out out, Fast fast, Exact exact);  // which this unit has no use for
 
 template <class R, class... Ls, class Mode, class Rule, class... Units>
 [[gnu::always_inline]] inline HostResult on_unit(const Mode& mode, typename R::container* results, Rule rule,

@@ -15,6 +15,23 @@ constexpr bool is_fast_alone = false;
 template <bool Subtract>
 constexpr bool is_fast_alone<Fused<Subtract>, f32x1> = rounds_by_instruction;
 
+// --- Results in a register ---------------------------------------------------------------------------
+
+template <class L, class Op>
+constexpr bool is_by_register = (L::count > 1 ||
+                                 is_fast_alone<Op, L>)&&rounds_by_instruction&& std::is_base_of_v<OnUnit, Op>;
+
+template <class L, class Op, class Out, class... Units>
+[[gnu::always_inline]] inline void apply_by_register(Environment& env, Out out, const Units*... operands) {
+  store_by_register<L>(
+      out, [ =, &env ](auto& results) __attribute__((always_inline)) {
+        return Op::template fast<L>(env, results, operands...);
+      },
+      [=, &env](int i) { return Op::template exact<format_of<L>>(env, Read<L>(operands)[i]...); });
+}
+
+// --- Results in memory -------------------------------------------------------------------------------
+
 // Results with the lanes that the fast path left, which are NaNs, by the reference. By value, for what is passed by its
 // address cannot stay in registers.
 template <class L, class Op, class... Units>
@@ -42,8 +59,12 @@ template <class L, class Op, class... Units>
 
 template <class L, class Op, class Unit, class... Units>
 [[gnu::always_inline]] inline void apply(Environment& env, Unit* out, const Units*... operands) {
-  const Results<L> results = compute<L, Op>(env, operands...);
-  std::memcpy(out, results.lane, sizeof results.lane);
+  if constexpr (is_by_register<L, Op>) {
+    apply_by_register<L, Op>(env, out, operands...);
+  } else {
+    const Results<L> results = compute<L, Op>(env, operands...);
+    std::memcpy(out, results.lane, sizeof results.lane);
+  }
 }
 
 template <class L, class Op, class Unit, class... Units>
@@ -69,15 +90,19 @@ struct EnabledLanes {
 
 template <class L, class Op, class Unit, class PredicateUnit, class... Units>
 inline void apply(UnitsUnder<Unit, PredicateUnit, false> out, const Units*... operands) {
-  LaneMask<L::bits, L::count> enabled;
-  enabled.expand(out.predicate);
   Environment env;
-  const Results<L> results = compute<L, Op>(env, EnabledLanes<L>(operands, enabled).lane...);
-  const Read<L> result(results.lane), old(out.units);
-  const Write<L> to(out.units);
-  KASTARRI_LANES_INDEPENDENT
-  for (int i = 0; i < L::count; ++i)  // by masks: of a choice the compiler makes a store under a branch
-    to.put(i, static_cast<lane_of<L>>(old[i] ^ ((old[i] ^ result[i]) & enabled.lane[i])));
+  if constexpr (is_by_register<L, Op>) {
+    apply_by_register<L, Op>(env, out, operands...);
+  } else {
+    LaneMask<L::bits, L::count> enabled;
+    enabled.expand(out.predicate);
+    const Results<L> results = compute<L, Op>(env, EnabledLanes<L>(operands, enabled).lane...);
+    const Read<L> result(results.lane), old(out.units);
+    const Write<L> to(out.units);
+    KASTARRI_LANES_INDEPENDENT
+    for (int i = 0; i < L::count; ++i)  // by masks: of a choice the compiler makes a store under a branch
+      to.put(i, static_cast<lane_of<L>>(old[i] ^ ((old[i] ^ result[i]) & enabled.lane[i])));
+  }
 }
 
 // An operation on bits alone, without flags, as a rule on lanes.

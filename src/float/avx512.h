@@ -2,8 +2,8 @@
 // which costs as much as a whole vector does, is left alone unless the host flushes subnormals.
 //
 // A result is inexact when rounding up and rounding down disagree on it. So every vector is computed both ways, and
-// as the mode has it. The host's flush-to-zero and denormals-are-zero bits alone still count; with_subnormals sees to
-// them.
+// as the mode has it. The flush-to-zero and denormals-are-zero bits alone of the host still count;
+// store_honouring_subnormals sees to them.
 #ifndef KASTARRI_FLOAT_AVX512_H
 #define KASTARRI_FLOAT_AVX512_H
 
@@ -412,7 +412,7 @@ class RegisterResults {
 // Results by fast(results), which says whether it has left a lane, and such lanes by exact(number of the lane). What is
 // seldom wanted is in functions apart, which take copies: what they had by reference would have to be in memory always.
 template <class L, class Out, class Exact>
-[[gnu::noinline]] void store_completed(Out out, RegisterResults<L> results, Exact exact) {
+[[gnu::noinline, gnu::cold]] void store_completed(Out out, RegisterResults<L> results, Exact exact) {
   results.complete(exact);
   results.store(out);
 }
@@ -421,14 +421,14 @@ template <class L, class Out, class Exact>
 // operands come from memory that is unknown before the one, and results, with what is told of them, have to be in
 // memory before the other.
 template <class L, class Out, class Fast, class Exact>
-[[gnu::noinline]] void store_honouring_subnormals(Out out, Fast fast, Exact exact) {
+[[gnu::noinline, gnu::cold]] void store_honouring_subnormals(Out out, Fast fast, Exact exact) {
   const word found = control_word();
   set_control_word(found & ~flushing);
   RegisterResults<L> results(out);
   const bool some_left = fast(results);
   asm volatile("" : "+m"(results) : : "memory");
   set_control_word(found);
-  if (some_left) results.complete(exact);
+  if (some_left) return store_completed<L>(out, results, exact);
   results.store(out);
 }
 

@@ -36,12 +36,21 @@ inline S shift_right_sticky(S x, int s) {
   return static_cast<S>(x >> s) | ((x & ((S{1} << s) - 1)) != 0);
 }
 
-template <class F, class S = word>
-inline Number<S> unpack(word x) {
+template <class F>
+inline Number<word> unpack(word x) {
   const word field = magnitude<F>(x) >> F::fraction_bits;
   const word fraction = x & (F::unit - 1);
-  return field == 0 ? Number<S>{is_negative<F>(x), F::least_quantum, fraction}
-                    : Number<S>{is_negative<F>(x), F::least_quantum + static_cast<int>(field) - 1, fraction | F::unit};
+  if (__builtin_expect(field == 0, 0)) return {is_negative<F>(x), F::least_quantum, fraction};
+  return {is_negative<F>(x), F::least_quantum + static_cast<int>(field) - 1, fraction | F::unit};
+}
+
+// What is added to a magnitude so that dropping its last Count bits rounds it: the carry is the rounding.
+template <int Count>
+inline word increment(word magnitude, bool negative, Rounding rounding) {
+  constexpr word half = word{1} << (Count - 1);
+  if (__builtin_expect(rounding == to_nearest, 1)) return half - 1 + (magnitude >> Count & 1);
+  if (rounding == ties_away) return half;
+  return rounding == (negative ? downward : upward) ? 2 * half - 1 : 0;
 }
 
 struct Integer {
@@ -55,27 +64,7 @@ inline Integer round_at(const Number<word>& x, int quantum, Rounding rounding) {
   if (shift <= 0) return {x.significand << -shift, true};
   // Twice the result with a sticky bit below: a half, and more than nothing beyond it.
   const word doubled = shift == 1 ? x.significand << 1 : shift_right_sticky(x.significand, shift - 2);
-  const word below = doubled >> 2;
-  const word rest = doubled & 3;
-  if (rest == 0) return {below, true};
-  bool up = false;
-  switch (rounding) {
-    case to_nearest:
-      up = rest + (below & 1) > 2;
-      break;
-    case ties_away:
-      up = rest >= 2;
-      break;
-    case toward_zero:
-      break;
-    case upward:
-      up = !x.negative;
-      break;
-    case downward:
-      up = x.negative;
-      break;
-  }
-  return {below + up, false};
+  return {(doubled + increment<2>(doubled, x.negative, rounding)) >> 2, (doubled & 3) == 0};
 }
 
 template <class F>
@@ -85,30 +74,30 @@ inline word overflowed(Environment& env, bool negative) {
   return (finite ? F::largest : F::infinity) | (negative ? F::sign : 0);
 }
 
-// Tiny: below the least normal number when rounded as if exponents had no bound. `top` is the exponent
-// of x's highest bit.
-template <class F>
-inline bool is_tiny(const Number<word>& x, int top, Rounding rounding) {
-  if (top >= F::least_exponent) return false;
-  if (top < F::least_exponent - 1) return true;
-  return round_at(x, top - F::fraction_bits, rounding).value < 2 * F::unit;
-}
-
 // The one rounding step: x in the format F.
 template <class F>
 inline word round_pack(Environment& env, const Number<word>& x) {
   const word sign = x.negative ? F::sign : 0;
-  if (x.significand == 0) return sign;
-  const int top = x.exponent + highest_bit(x.significand);
-  if (top > F::greatest_exponent) return overflowed<F>(env, x.negative);
-  const int quantum = top < F::least_exponent ? F::least_quantum : top - F::fraction_bits;
-  const Integer kept = round_at(x, quantum, env.rounding);
-  // The integer holds the hidden bit: it adds one to the exponent field, or two when rounding has
-  // carried into it, and none for a subnormal.
-  const word bits = kept.value + (static_cast<word>(quantum - F::least_quantum) << F::fraction_bits);
-  if (kept.exact) return sign | bits;
-  if (bits >= F::infinity) return overflowed<F>(env, x.negative);
-  env.raise(is_tiny<F>(x, top, env.rounding) ? inexact | underflow : inexact);
+  if (__builtin_expect(x.significand == 0, 0)) return sign;
+  // All but `dropped` bits are the format's, once the highest is bit 30.
+  constexpr int dropped = 30 - F::fraction_bits;
+  const int lead = 30 - highest_bit(x.significand);
+  word significand = x.significand << lead;
+  int above = x.exponent + 30 - lead - F::least_exponent;
+  bool tiny = false;
+  if (__builtin_expect(static_cast<word>(above) > word{F::greatest_exponent - F::least_exponent}, 0)) {
+    if (above > 0) return overflowed<F>(env, x.negative);
+    // Tiny: below the least normal number when rounded as if exponents had no bound.
+    tiny = above < -1 || (significand + increment<dropped>(significand, x.negative, env.rounding)) >> 31 == 0;
+    significand = shift_right_sticky(significand, -above);
+    above = 0;
+  }
+  const word rounded = significand + increment<dropped>(significand, x.negative, env.rounding);
+  // What is kept holds the hidden bit: it adds one to the exponent field, or two when rounding has carried into it, and
+  // none for a subnormal.
+  const word bits = (rounded >> dropped) + (static_cast<word>(above) << F::fraction_bits);
+  if (__builtin_expect(bits >= F::infinity, 0)) return overflowed<F>(env, x.negative);
+  if ((significand & ((word{1} << dropped) - 1)) != 0) env.raise(tiny ? inexact | underflow : inexact);
   return sign | bits;
 }
 
@@ -116,6 +105,8 @@ inline word round_pack(Environment& env, const Number<word>& x) {
 template <class F>
 inline word round_pack(Environment& env, const Number<std::uint64_t>& x) {
   const auto high = static_cast<word>(x.significand >> 32), low = static_cast<word>(x.significand);
+  if (__builtin_expect(high >> (F::fraction_bits + 2) != 0, 1))  // bits enough, and a sticky one
+    return round_pack<F>(env, Number<word>{x.negative, x.exponent + 32, high | (low != 0)});
   if (high != 0) {
     const int lead = 30 - highest_bit(high);
     const word kept = high << lead | low >> 1 >> (31 - lead);
@@ -155,34 +146,38 @@ constexpr word negated(word x) {
 
 // --- Sums and products --------------------------------------------------------------------------------
 
-// x + y with the last bit sticky. The number of the greater exponent is shifted to that of the other. Where there is
-// no room for all of it, its highest bit comes to lie two below the top, which leaves room for a carry, and the other
-// loses bits; it is the lesser by far then, so that a difference keeps all but one of the leading bits: five more, at
-// least, than the formats have.
+// Sums are made of significands that lie as high as S has room for them, below the top bit and one for a carry: of
+// numbers of the format, and of products of two. The one of the lesser exponent is shifted to the other's. It loses bits
+// only where the other's hidden bit outweighs it by far, so that a difference keeps all but one of the leading bits:
+// two more, at least, than the format has; or where the other is subnormal or 0, and what is lost lies below the
+// quantum of all results. (A product of 0 has the least exponent of all, lest it have the greater one.)
 template <class S>
-inline Number<S> sum(Number<S> x, Number<S> y, Rounding rounding) {
-  if (x.significand == 0 && y.significand == 0)
-    return {x.negative == y.negative ? x.negative : rounding == downward, x.exponent, 0};
-  if (x.significand == 0) return y;
-  if (y.significand == 0) return x;
-  if (x.exponent < y.exponent) std::swap(x, y);
-  const int apart = x.exponent - y.exponent, room = static_cast<int>(8 * sizeof(S)) - 3 - highest_bit(x.significand);
-  x.significand <<= apart < room ? apart : room;
-  x.exponent = y.exponent;
-  if (apart > room) {
-    x.exponent += apart - room;
-    y.significand = shift_right_sticky(y.significand, apart - room);
-  }
-  if (x.negative == y.negative) return {x.negative, x.exponent, x.significand + y.significand};
-  if (x.significand == y.significand) return {rounding == downward, x.exponent, 0};
-  if (x.significand > y.significand) return {x.negative, x.exponent, x.significand - y.significand};
-  return {y.negative, x.exponent, y.significand - x.significand};
+constexpr int summand_bits = 8 * sizeof(S) - 2;
+
+template <class F, class S = word>
+inline Number<S> summand(word x) {
+  constexpr int lift = summand_bits<S> - (F::fraction_bits + 1);
+  const Number<word> number = unpack<F>(x);
+  return {number.negative, number.exponent - lift, static_cast<S>(number.significand) << lift};
 }
 
 template <class F, class P = ProductSignificand<F>>
 inline Number<P> product(word a, word b) {
-  const Number<P> x = unpack<F, P>(a), y = unpack<F, P>(b);
-  return {x.negative != y.negative, x.exponent + y.exponent, x.significand * y.significand};
+  constexpr int lift = summand_bits<P> / 2 - (F::fraction_bits + 1);
+  const Number<word> x = unpack<F>(a), y = unpack<F>(b);
+  const P significand = static_cast<P>(x.significand << lift) * (y.significand << lift);
+  const int exponent = significand == 0 ? 2 * F::least_quantum : x.exponent + y.exponent;
+  return {x.negative != y.negative, exponent - 2 * lift, significand};
+}
+
+template <class S>
+inline Number<S> sum(Number<S> x, Number<S> y, Rounding rounding) {
+  if (x.exponent < y.exponent) std::swap(x, y);
+  y.significand = shift_right_sticky(y.significand, x.exponent - y.exponent);
+  if (x.negative == y.negative) return {x.negative, x.exponent, x.significand + y.significand};
+  if (x.significand == y.significand) return {rounding == downward, x.exponent, 0};
+  if (x.significand > y.significand) return {x.negative, x.exponent, x.significand - y.significand};
+  return {y.negative, x.exponent, y.significand - x.significand};
 }
 
 // Neither infinite nor NaNs.
@@ -194,7 +189,7 @@ constexpr bool all_finite(X... x) {
 template <class F>
 inline word add(Environment& env, word a, word b) {
   if (__builtin_expect(all_finite<F>(a, b), 1))
-    return round_pack<F>(env, sum(unpack<F>(a), unpack<F>(b), env.rounding));
+    return round_pack<F>(env, sum(summand<F>(a), summand<F>(b), env.rounding));
   if (any_nan<F>(a, b)) return nan_of<F>(env, a, b);
   if (is_infinite<F>(a)) return is_infinite<F>(b) && a != b ? invalid_result<F>(env) : a;
   return b;
@@ -211,7 +206,7 @@ inline word multiply(Environment& env, word a, word b) {
 template <class F>
 inline word multiply_add(Environment& env, word acc, word a, word b) {
   if (__builtin_expect(all_finite<F>(a, b, acc), 1))
-    return round_pack<F>(env, sum(product<F>(a, b), unpack<F, ProductSignificand<F>>(acc), env.rounding));
+    return round_pack<F>(env, sum(product<F>(a, b), summand<F, ProductSignificand<F>>(acc), env.rounding));
   if (any_nan<F>(a, b, acc)) return nan_of<F>(env, a, b, acc);
   if (is_infinite<F>(a) || is_infinite<F>(b)) {
     if (is_zero<F>(a) || is_zero<F>(b)) return invalid_result<F>(env);

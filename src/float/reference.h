@@ -5,6 +5,7 @@
 #ifndef KASTARRI_FLOAT_REFERENCE_H
 #define KASTARRI_FLOAT_REFERENCE_H
 
+#include <algorithm>
 #include <cstdint>
 #include <utility>
 
@@ -12,13 +13,14 @@
 
 namespace {
 
-// The finite number +-significand * 2^exponent, exact; or, where its last bit is sticky, a number
-// within one unit of it that rounds to the same. The significand leaves the top bit of S free.
+// The finite number +-significand * 2^exponent; where bits have been lost, one that lies between it and the next
+// significand. The significand leaves the top bit of S free.
 template <class S>
 struct Number {
-  bool negative;
+  word negative;  // all ones or 0
   int exponent;
   S significand;
+  bool lost = false;
 };
 
 // Every sum, and every product of halves, has room in a word for all that rounding asks of it; products
@@ -26,8 +28,7 @@ struct Number {
 template <class F>
 using ProductSignificand = std::conditional_t<F::bits == 16, word, std::uint64_t>;
 
-inline int highest_bit(word x) { return 31 - __builtin_clz(x); }
-inline int highest_bit(std::uint64_t x) { return 63 - __builtin_clzll(x); }
+inline int highest_bit(word x) { return 31 ^ __builtin_clz(x); }
 
 // x shifted right by s > 0, the last bit sticky: 1 when any bit was lost.
 template <class S>
@@ -36,17 +37,27 @@ inline S shift_right_sticky(S x, int s) {
   return static_cast<S>(x >> s) | ((x & ((S{1} << s) - 1)) != 0);
 }
 
+// Less than that of any product, lest 0 count as the greater of two numbers.
+constexpr int exponent_of_zero = -1000;
+
+// All ones for a number below 0 and for -0, else 0.
+template <class F>
+constexpr word sign_of(word x) {
+  return static_cast<word>(static_cast<std::int32_t>(x << (32 - F::bits)) >> 31);
+}
+
 template <class F>
 inline Number<word> unpack(word x) {
   const word field = magnitude<F>(x) >> F::fraction_bits;
   const word fraction = x & (F::unit - 1);
-  if (__builtin_expect(field == 0, 0)) return {is_negative<F>(x), F::least_quantum, fraction};
-  return {is_negative<F>(x), F::least_quantum + static_cast<int>(field) - 1, fraction | F::unit};
+  if (__builtin_expect(field == 0, 0))
+    return {sign_of<F>(x), fraction == 0 ? exponent_of_zero : F::least_quantum, fraction};
+  return {sign_of<F>(x), F::least_quantum + static_cast<int>(field) - 1, fraction | F::unit};
 }
 
 // What is added to a magnitude so that dropping its last Count bits rounds it: the carry is the rounding.
 template <int Count>
-inline word increment(word magnitude, bool negative, Rounding rounding) {
+[[gnu::always_inline]] inline word increment(word magnitude, word negative, Rounding rounding) {
   constexpr word half = word{1} << (Count - 1);
   if (__builtin_expect(rounding == to_nearest, 1)) return half - 1 + (magnitude >> Count & 1);
   if (rounding == ties_away) return half;
@@ -68,21 +79,24 @@ inline Integer round_at(const Number<word>& x, int quantum, Rounding rounding) {
 }
 
 template <class F>
-inline word overflowed(Environment& env, bool negative) {
+inline word overflowed(Environment& env, word negative) {
   env.raise(overflow | inexact);
   const bool finite = env.rounding == toward_zero || env.rounding == (negative ? upward : downward);
-  return (finite ? F::largest : F::infinity) | (negative ? F::sign : 0);
+  return (finite ? F::largest : F::infinity) | (negative & F::sign);
 }
 
 // The one rounding step: x in the format F.
 template <class F>
-inline word round_pack(Environment& env, const Number<word>& x) {
-  const word sign = x.negative ? F::sign : 0;
-  if (__builtin_expect(x.significand == 0, 0)) return sign;
+[[gnu::always_inline]] inline word round_pack(Environment& env, const Number<word>& x) {
+  const word sign = x.negative & F::sign;
+  if (__builtin_expect(x.significand == 0, 0)) {
+    if (!x.lost) return sign;
+    return round_pack<F>(env, Number<word>{x.negative, x.exponent - 1, 1});
+  }
   // All but `dropped` bits are the format's, once the highest is bit 30.
   constexpr int dropped = 30 - F::fraction_bits;
   const int lead = 30 - highest_bit(x.significand);
-  word significand = x.significand << lead;
+  word significand = x.significand << lead | x.lost;
   int above = x.exponent + 30 - lead - F::least_exponent;
   bool tiny = false;
   if (__builtin_expect(static_cast<word>(above) > word{F::greatest_exponent - F::least_exponent}, 0)) {
@@ -95,25 +109,26 @@ inline word round_pack(Environment& env, const Number<word>& x) {
   const word rounded = significand + increment<dropped>(significand, x.negative, env.rounding);
   // What is kept holds the hidden bit: it adds one to the exponent field, or two when rounding has carried into it, and
   // none for a subnormal.
-  const word bits = (rounded >> dropped) + (static_cast<word>(above) << F::fraction_bits);
+  const word field = static_cast<word>(above) << F::fraction_bits;
+  const word bits = (rounded >> dropped) + field;
   if (__builtin_expect(bits >= F::infinity, 0)) return overflowed<F>(env, x.negative);
   if ((significand & ((word{1} << dropped) - 1)) != 0) env.raise(tiny ? inexact | underflow : inexact);
-  return sign | bits;
+  return (rounded >> dropped) + (field | sign);
 }
 
 // The same for more bits: all but the first 31 become the sticky one.
 template <class F>
-inline word round_pack(Environment& env, const Number<std::uint64_t>& x) {
+[[gnu::always_inline]] inline word round_pack(Environment& env, const Number<std::uint64_t>& x) {
   const auto high = static_cast<word>(x.significand >> 32), low = static_cast<word>(x.significand);
   if (__builtin_expect(high >> (F::fraction_bits + 2) != 0, 1))  // bits enough, and a sticky one
-    return round_pack<F>(env, Number<word>{x.negative, x.exponent + 32, high | (low != 0)});
+    return round_pack<F>(env, Number<word>{x.negative, x.exponent + 32, high, low != 0 || x.lost});
   if (high != 0) {
     const int lead = 30 - highest_bit(high);
     const word kept = high << lead | low >> 1 >> (31 - lead);
-    return round_pack<F>(env, Number<word>{x.negative, x.exponent + 32 - lead, kept | ((low << lead) != 0)});
+    return round_pack<F>(env, Number<word>{x.negative, x.exponent + 32 - lead, kept, low << lead != 0 || x.lost});
   }
-  if (low >> 31 != 0) return round_pack<F>(env, Number<word>{x.negative, x.exponent + 1, low >> 1 | (low & 1)});
-  return round_pack<F>(env, Number<word>{x.negative, x.exponent, low});
+  if (low >> 31 != 0) return round_pack<F>(env, Number<word>{x.negative, x.exponent + 1, low >> 1, (low & 1) != 0 || x.lost});
+  return round_pack<F>(env, Number<word>{x.negative, x.exponent, low, x.lost});
 }
 
 // --- NaN ----------------------------------------------------------------------------------------------
@@ -149,8 +164,8 @@ constexpr word negated(word x) {
 // Sums are made of significands that lie as high as S has room for them, below the top bit and one for a carry: of
 // numbers of the format, and of products of two. The one of the lesser exponent is shifted to the other's. It loses bits
 // only where the other's hidden bit outweighs it by far, so that a difference keeps all but one of the leading bits:
-// two more, at least, than the format has; or where the other is subnormal or 0, and what is lost lies below the
-// quantum of all results. (A product of 0 has the least exponent of all, lest it have the greater one.)
+// two more, at least, than the format has; or where the other is subnormal, and what is lost lies below the
+// quantum of all results.
 template <class S>
 constexpr int summand_bits = 8 * sizeof(S) - 2;
 
@@ -162,22 +177,32 @@ inline Number<S> summand(word x) {
 }
 
 template <class F, class P = ProductSignificand<F>>
-inline Number<P> product(word a, word b) {
+[[gnu::always_inline]] inline Number<P> product(word a, word b) {
   constexpr int lift = summand_bits<P> / 2 - (F::fraction_bits + 1);
   const Number<word> x = unpack<F>(a), y = unpack<F>(b);
-  const P significand = static_cast<P>(x.significand << lift) * (y.significand << lift);
-  const int exponent = significand == 0 ? 2 * F::least_quantum : x.exponent + y.exponent;
-  return {x.negative != y.negative, exponent - 2 * lift, significand};
+  return {x.negative ^ y.negative, x.exponent + y.exponent - 2 * lift,
+          static_cast<P>(x.significand << lift) * (y.significand << lift)};
 }
 
 template <class S>
-inline Number<S> sum(Number<S> x, Number<S> y, Rounding rounding) {
+[[gnu::always_inline]] inline Number<S> sum(Number<S> x, Number<S> y, Rounding rounding) {
+  using Signed = std::make_signed_t<S>;
   if (x.exponent < y.exponent) std::swap(x, y);
-  y.significand = shift_right_sticky(y.significand, x.exponent - y.exponent);
-  if (x.negative == y.negative) return {x.negative, x.exponent, x.significand + y.significand};
-  if (x.significand == y.significand) return {rounding == downward, x.exponent, 0};
-  if (x.significand > y.significand) return {x.negative, x.exponent, x.significand - y.significand};
-  return {y.negative, x.exponent, y.significand - x.significand};
+  int apart = x.exponent - y.exponent;
+  if (__builtin_expect(apart >= static_cast<int>(8 * sizeof(S)), 0)) {
+    y.significand = y.significand != 0;
+    apart = 1;
+  }
+  const bool lost = (y.significand & ((S{1} << apart) - 1)) != 0;
+  // ~((y - 1) >> n) is -y >> n, both rounded down.
+  const word differ = x.negative ^ y.negative;
+  const auto minus_one = static_cast<S>(static_cast<Signed>(static_cast<std::int32_t>(differ)));
+  const auto shifted = static_cast<S>(static_cast<Signed>(y.significand + minus_one) >> apart) ^ minus_one;
+  const S total = x.significand + shifted;
+  if (__builtin_expect(static_cast<Signed>(total) > 0, 1)) return {x.negative, x.exponent, total, lost};
+  if (total == 0 && !lost) return {differ != 0 ? (rounding == downward ? ~word{0} : 0) : x.negative, x.exponent, 0};
+  if (total == 0) return {x.negative, x.exponent, 0, true};
+  return {y.negative, x.exponent, ~total + !lost, lost};
 }
 
 // Neither infinite nor NaNs.
@@ -187,7 +212,7 @@ constexpr bool all_finite(X... x) {
 }
 
 template <class F>
-inline word add(Environment& env, word a, word b) {
+[[gnu::always_inline]] inline word add(Environment& env, word a, word b) {
   if (__builtin_expect(all_finite<F>(a, b), 1))
     return round_pack<F>(env, sum(summand<F>(a), summand<F>(b), env.rounding));
   if (any_nan<F>(a, b)) return nan_of<F>(env, a, b);
@@ -196,7 +221,7 @@ inline word add(Environment& env, word a, word b) {
 }
 
 template <class F>
-inline word multiply(Environment& env, word a, word b) {
+[[gnu::always_inline]] inline word multiply(Environment& env, word a, word b) {
   if (__builtin_expect(all_finite<F>(a, b), 1)) return round_pack<F>(env, product<F>(a, b));
   if (any_nan<F>(a, b)) return nan_of<F>(env, a, b);
   return is_zero<F>(a) || is_zero<F>(b) ? invalid_result<F>(env) : ((a ^ b) & F::sign) | F::infinity;
@@ -204,9 +229,11 @@ inline word multiply(Environment& env, word a, word b) {
 
 // acc + a * b, rounded once.
 template <class F>
-inline word multiply_add(Environment& env, word acc, word a, word b) {
-  if (__builtin_expect(all_finite<F>(a, b, acc), 1))
-    return round_pack<F>(env, sum(product<F>(a, b), summand<F, ProductSignificand<F>>(acc), env.rounding));
+[[gnu::always_inline]] inline word multiply_add(Environment& env, word acc, word a, word b) {
+  if (__builtin_expect(all_finite<F>(a, b, acc), 1)) {
+    const auto exact_product = product<F>(a, b);
+    return round_pack<F>(env, sum(exact_product, summand<F, ProductSignificand<F>>(acc), env.rounding));
+  }
   if (any_nan<F>(a, b, acc)) return nan_of<F>(env, a, b, acc);
   if (is_infinite<F>(a) || is_infinite<F>(b)) {
     if (is_zero<F>(a) || is_zero<F>(b)) return invalid_result<F>(env);
@@ -264,7 +291,7 @@ inline word to_integral(Environment& env, word x, Rounding rounding, bool tells_
 template <class F>
 inline word from_integer(Environment& env, std::int64_t value, word scale) {
   const std::uint64_t bits = static_cast<std::uint64_t>(value);
-  return round_pack<F>(env, Number<std::uint64_t>{value < 0, -static_cast<int>(scale), value < 0 ? -bits : bits});
+  return round_pack<F>(env, Number<std::uint64_t>{value < 0 ? ~word{0} : 0, -static_cast<int>(scale), value < 0 ? -bits : bits});
 }
 
 // x * 2^scale truncated, as an integer of that width and signedness; out of range, the bound. A NaN

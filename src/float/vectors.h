@@ -16,12 +16,18 @@ constexpr bool is_fast_alone = false;
 template <bool Subtract>
 constexpr bool is_fast_alone<Fused<Subtract>, f32x1> = rounds_by_instruction;
 
+// A lane alone in a whole word: compilers would compute in 16 bits, where constants hold processors' decoders up.
+inline word in_word(word lane) {
+  asm("" : "+r"(lane));
+  return lane;
+}
+
 // results[i] = Op of lanes i of the operands. The results are apart from the operands.
 template <class L, class Op, class... Units>
 inline void compute(Environment& env, lane_of<L>* results, const Units*... operands) {
   using F = format_of<L>;
   if constexpr (L::count == 1 && !is_fast_alone<Op, L>) {
-    results[0] = static_cast<lane_of<L>>(Op::template exact<F>(env, Read<L>(operands)[0]...));
+    results[0] = static_cast<lane_of<L>>(Op::template exact<F>(env, in_word(Read<L>(operands)[0])...));
   } else if (__builtin_expect(Op::template fast<L>(env, results, operands...), 0)) {
     for (int i = 0; i < L::count; ++i)
       if (is_nan<F>(results[i]))

@@ -55,13 +55,13 @@ inline Number<word> unpack(word x) {
   return {sign_of<F>(x), F::least_quantum + static_cast<int>(field) - 1, fraction | F::unit};
 }
 
-// What is added to a magnitude so that dropping its last Count bits rounds it: the carry is the rounding.
+// The magnitude with its last Count bits such that to drop them rounds it.
 template <int Count>
-[[gnu::always_inline]] inline word increment(word magnitude, word negative, Rounding rounding) {
+[[gnu::always_inline]] inline word rounded_up(word magnitude, word negative, Rounding rounding) {
   constexpr word half = word{1} << (Count - 1);
-  if (__builtin_expect(rounding == to_nearest, 1)) return half - 1 + (magnitude >> Count & 1);
-  if (rounding == ties_away) return half;
-  return rounding == (negative ? downward : upward) ? 2 * half - 1 : 0;
+  if (__builtin_expect(rounding == to_nearest, 1)) return magnitude + (half - 1) + (magnitude >> Count & 1);
+  if (rounding == ties_away) return magnitude + half;
+  return magnitude + (rounding == (negative ? downward : upward) ? 2 * half - 1 : 0);
 }
 
 struct Integer {
@@ -75,7 +75,7 @@ inline Integer round_at(const Number<word>& x, int quantum, Rounding rounding) {
   if (shift <= 0) return {x.significand << -shift, true};
   // Twice the result with a sticky bit below: a half, and more than nothing beyond it.
   const word doubled = shift == 1 ? x.significand << 1 : shift_right_sticky(x.significand, shift - 2);
-  return {(doubled + increment<2>(doubled, x.negative, rounding)) >> 2, (doubled & 3) == 0};
+  return {rounded_up<2>(doubled, x.negative, rounding) >> 2, (doubled & 3) == 0};
 }
 
 template <class F>
@@ -89,24 +89,25 @@ inline word overflowed(Environment& env, word negative) {
 template <class F>
 [[gnu::always_inline]] inline word round_pack(Environment& env, const Number<word>& x) {
   const word sign = x.negative & F::sign;
-  if (__builtin_expect(x.significand == 0, 0)) {
+  word significand = x.significand;
+  if (__builtin_expect(significand == 0, 0)) {
     if (!x.lost) return sign;
-    return round_pack<F>(env, Number<word>{x.negative, x.exponent - 1, 1});
+    significand = 1;  // as well as any that is below the quantum by far
   }
   // All but `dropped` bits are the format's, once the highest is bit 30.
   constexpr int dropped = 30 - F::fraction_bits;
-  const int lead = 30 - highest_bit(x.significand);
-  word significand = x.significand << lead | x.lost;
+  const int lead = 30 - highest_bit(significand);
+  significand = significand << lead | x.lost;
   int above = x.exponent + 30 - lead - F::least_exponent;
   bool tiny = false;
   if (__builtin_expect(static_cast<word>(above) > word{F::greatest_exponent - F::least_exponent}, 0)) {
     if (above > 0) return overflowed<F>(env, x.negative);
     // Tiny: below the least normal number when rounded as if exponents had no bound.
-    tiny = above < -1 || (significand + increment<dropped>(significand, x.negative, env.rounding)) >> 31 == 0;
+    tiny = above < -1 || rounded_up<dropped>(significand, x.negative, env.rounding) >> 31 == 0;
     significand = shift_right_sticky(significand, -above);
     above = 0;
   }
-  const word rounded = significand + increment<dropped>(significand, x.negative, env.rounding);
+  const word rounded = rounded_up<dropped>(significand, x.negative, env.rounding);
   // What is kept holds the hidden bit: it adds one to the exponent field, or two when rounding has carried into it, and
   // none for a subnormal.
   const word field = static_cast<word>(above) << F::fraction_bits;
@@ -116,19 +117,35 @@ template <class F>
   return (rounded >> dropped) + (field | sign);
 }
 
-// The same for more bits: all but the first 31 become the sticky one.
+// Whether a number has bits enough for the format, and two more, which with what is lost tell how it is rounded.
 template <class F>
-[[gnu::always_inline]] inline word round_pack(Environment& env, const Number<std::uint64_t>& x) {
+constexpr bool is_long_enough(word significand) {
+  return significand >> (F::fraction_bits + 2) != 0;
+}
+
+inline Number<word> upper_word(const Number<std::uint64_t>& x) {
   const auto high = static_cast<word>(x.significand >> 32), low = static_cast<word>(x.significand);
-  if (__builtin_expect(high >> (F::fraction_bits + 2) != 0, 1))  // bits enough, and a sticky one
-    return round_pack<F>(env, Number<word>{x.negative, x.exponent + 32, high, low != 0 || x.lost});
-  if (high != 0) {
-    const int lead = 30 - highest_bit(high);
-    const word kept = high << lead | low >> 1 >> (31 - lead);
-    return round_pack<F>(env, Number<word>{x.negative, x.exponent + 32 - lead, kept, low << lead != 0 || x.lost});
-  }
-  if (low >> 31 != 0) return round_pack<F>(env, Number<word>{x.negative, x.exponent + 1, low >> 1, (low & 1) != 0 || x.lost});
-  return round_pack<F>(env, Number<word>{x.negative, x.exponent, low, x.lost});
+  return {x.negative, x.exponent + 32, high, low != 0 || x.lost};
+}
+
+template <class F>
+inline Number<word> narrowed(const Number<word>& x) {
+  return x;
+}
+template <class F>
+inline Number<word> narrowed(const Number<std::uint64_t>& x) {
+  const Number<word> upper = upper_word(x);
+  if (__builtin_expect(is_long_enough<F>(upper.significand), 1)) return upper;
+  const auto low = static_cast<word>(x.significand);
+  if (upper.significand == 0 && low >> 31 == 0) return {x.negative, x.exponent, low, x.lost};
+  const int lead = upper.significand == 0 ? 31 : 30 - highest_bit(upper.significand);
+  const word kept = upper.significand << lead | low >> 1 >> (31 - lead);
+  return {x.negative, upper.exponent - lead, kept, low << lead != 0 || x.lost};
+}
+
+template <class F>
+inline word round_pack(Environment& env, const Number<std::uint64_t>& x) {
+  return round_pack<F>(env, narrowed<F>(x));
 }
 
 // --- NaN ----------------------------------------------------------------------------------------------
@@ -193,16 +210,30 @@ template <class S>
     y.significand = y.significand != 0;
     apart = 1;
   }
-  const bool lost = (y.significand & ((S{1} << apart) - 1)) != 0;
-  // ~((y - 1) >> n) is -y >> n, both rounded down.
-  const word differ = x.negative ^ y.negative;
-  const auto minus_one = static_cast<S>(static_cast<Signed>(static_cast<std::int32_t>(differ)));
-  const auto shifted = static_cast<S>(static_cast<Signed>(y.significand + minus_one) >> apart) ^ minus_one;
-  const S total = x.significand + shifted;
+  const bool lost = x.lost || y.lost || (y.significand & ((S{1} << apart) - 1)) != 0;
+  // ~((y - 1) >> n) is -y >> n, both rounded down; if y has lost something, so is ~(y >> n).
+  const auto differ = static_cast<S>(static_cast<Signed>(static_cast<std::int32_t>(x.negative ^ y.negative)));
+  const S less = y.lost ? y.significand : y.significand + differ;
+  const S total = x.significand + (static_cast<S>(static_cast<Signed>(less) >> apart) ^ differ);
   if (__builtin_expect(static_cast<Signed>(total) > 0, 1)) return {x.negative, x.exponent, total, lost};
   if (total == 0 && !lost) return {differ != 0 ? (rounding == downward ? ~word{0} : 0) : x.negative, x.exponent, 0};
   if (total == 0) return {x.negative, x.exponent, 0, true};
   return {y.negative, x.exponent, ~total + !lost, lost};
+}
+
+template <class F>
+[[gnu::always_inline]] inline Number<word> sum_with_product(word acc, const Number<word>& p, Rounding rounding) {
+  return sum(p, summand<F>(acc), rounding);
+}
+// Of a product of two words the upper one will do, unless both summands lose bits or few remain.
+template <class F>
+[[gnu::always_inline]] inline Number<word> sum_with_product(word acc, const Number<std::uint64_t>& p, Rounding rounding) {
+  const Number<word> upper = upper_word(p), c = summand<F>(acc);
+  if (__builtin_expect(upper.exponent - c.exponent <= summand_bits<word> - (F::fraction_bits + 1), 1)) {
+    const Number<word> total = sum(upper, c, rounding);
+    if (__builtin_expect(is_long_enough<F>(total.significand), 1)) return total;
+  }
+  return narrowed<F>(sum(p, summand<F, std::uint64_t>(acc), rounding));
 }
 
 // Neither infinite nor NaNs.
@@ -230,10 +261,8 @@ template <class F>
 // acc + a * b, rounded once.
 template <class F>
 [[gnu::always_inline]] inline word multiply_add(Environment& env, word acc, word a, word b) {
-  if (__builtin_expect(all_finite<F>(a, b, acc), 1)) {
-    const auto exact_product = product<F>(a, b);
-    return round_pack<F>(env, sum(exact_product, summand<F, ProductSignificand<F>>(acc), env.rounding));
-  }
+  if (__builtin_expect(all_finite<F>(a, b, acc), 1))
+    return round_pack<F>(env, sum_with_product<F>(acc, product<F>(a, b), env.rounding));
   if (any_nan<F>(a, b, acc)) return nan_of<F>(env, a, b, acc);
   if (is_infinite<F>(a) || is_infinite<F>(b)) {
     if (is_zero<F>(a) || is_zero<F>(b)) return invalid_result<F>(env);

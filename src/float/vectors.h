@@ -10,12 +10,6 @@ namespace {
 template <class L>
 using lane_of = typename L::container;
 
-// One lane is quickest by the reference, but for the fused operations on singles, whose exact sum is long.
-template <class Op, class L>
-constexpr bool is_fast_alone = false;
-template <bool Subtract>
-constexpr bool is_fast_alone<Fused<Subtract>, f32x1> = rounds_by_instruction;
-
 // A lane alone in a whole word: compilers would compute in 16 bits, where constants hold processors' decoders up.
 inline word in_word(word lane) {
   asm("" : "+r"(lane));
@@ -26,7 +20,7 @@ inline word in_word(word lane) {
 template <class L, class Op, class... Units>
 inline void compute(Environment& env, lane_of<L>* results, const Units*... operands) {
   using F = format_of<L>;
-  if constexpr (L::count == 1 && !is_fast_alone<Op, L>) {
+  if constexpr (L::count == 1) {  // by the reference, which is quicker for one
     results[0] = static_cast<lane_of<L>>(Op::template exact<F>(env, in_word(Read<L>(operands)[0])...));
   } else if (__builtin_expect(Op::template fast<L>(env, results, operands...), 0)) {
     for (int i = 0; i < L::count; ++i)

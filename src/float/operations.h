@@ -8,6 +8,7 @@
 
 #include "float/reference.h"
 #include "float/unit.h"
+#include "frame/registers.h"
 
 namespace {
 
@@ -82,22 +83,16 @@ constexpr typename F::lane nan_mask(typename F::lane x, typename F::lane y) {
   return mask_below(static_cast<Lane>(F::infinity), static_cast<Lane>(greater));
 }
 
-// The lanes of the rule on numbers; a lane with a NaN operand is left.
-template <class L, class Rule, class Units>
-inline bool fast_ordered(typename L::container* results, Rule rule, const Units* a, const Units* b) {
-  using F = format_of<L>;
+// Lanes whose top bit is set where one of v is a NaN.
+template <class F>
+inline Vector<typename F::lane> nan_signs(Vector<typename F::lane> v) {
   using Lane = typename F::lane;
-  const Read<L> x(a), y(b);
-  Lane left = 0;
-  KASTARRI_LANES_INDEPENDENT
-  for (int i = 0; i < L::count; ++i) {
-    const Lane a_lane = x[i], b_lane = y[i];
-    const Lane nan = nan_mask<F>(a_lane, b_lane);
-    left = static_cast<Lane>(left | nan);
-    results[i] = static_cast<Lane>((rule(order<F>(a_lane), order<F>(b_lane)) ? a_lane : b_lane) | nan);
-  }
-  return left != 0;
+  return (v & static_cast<Lane>(F::sign - 1)) + static_cast<Lane>(F::sign - 1 - F::infinity);
 }
+
+// Lanes as signed integers.
+inline Vector<std::int16_t> ordered(Vector<std::uint16_t> v) { return reinterpret_cast<Vector<std::int16_t>>(v); }
+inline Vector<std::int32_t> ordered(Vector<std::uint32_t> v) { return reinterpret_cast<Vector<std::int32_t>>(v); }
 
 template <bool Less, bool NumberWins>
 struct Extreme {
@@ -106,12 +101,18 @@ struct Extreme {
     constexpr auto choose = Less ? minimum<F> : maximum<F>;
     return NumberWins ? number_of<F>(env, a, b, choose) : choose(env, a, b);
   }
-  template <class L, class Units>
-  static bool fast(Environment&, typename L::container* r, const Units* a, const Units* b) {
-    return fast_ordered<L>(
-        r, [](auto x, auto y) { return Less ? x < y : x > y; }, a, b);
+  // Numbers are in the order of their bits as integers, unless both are negative: then of the others, those turned.
+  template <class V>
+  static V of_numbers(V a, V b) {
+    const auto turned = ordered(a & b) >> (8 * sizeof(a[0]) - 1);
+    const auto x = ordered(a) ^ turned, y = ordered(b) ^ turned;
+    return reinterpret_cast<V>((Less ? (x < y ? x : y) : (x > y ? x : y)) ^ turned);
   }
 };
+template <class Op>
+constexpr bool is_of_numbers = false;
+template <bool Less, bool NumberWins>
+constexpr bool is_of_numbers<Extreme<Less, NumberWins>> = true;
 using MIN = Extreme<true, false>;
 using MAX = Extreme<false, false>;
 using MINNUM = Extreme<true, true>;

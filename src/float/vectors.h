@@ -20,27 +20,93 @@ inline word in_word(word lane) {
 template <class L, class Op, class... Units>
 inline void compute(Environment& env, lane_of<L>* results, const Units*... operands) {
   using F = format_of<L>;
-  if constexpr (L::count == 1) {  // by the reference, which is quicker for one
-    results[0] = static_cast<lane_of<L>>(Op::template exact<F>(env, in_word(Read<L>(operands)[0])...));
-  } else if (__builtin_expect(Op::template fast<L>(env, results, operands...), 0)) {
+  if (__builtin_expect(Op::template fast<L>(env, results, operands...), 0)) {
     for (int i = 0; i < L::count; ++i)
       if (is_nan<F>(results[i]))
         results[i] = static_cast<lane_of<L>>(Op::template exact<F>(env, Read<L>(operands)[i]...));
   }
 }
 
+// Where results go by registers: all lanes.
+template <class L, class Unit>
+struct EveryLane {
+  explicit EveryLane(Unit* out) : units(out) {}
+  template <class V>
+  V enabled(V lanes, int) const {
+    return lanes;
+  }
+  bool is_enabled(int) const { return true; }
+  template <class V>
+  void store(int k, V result) const {
+    store_register(units, k, result);
+  }
+  Unit* units;
+};
+
+// The enabled lanes.
+template <class L, class Unit>
+struct EnabledLane {
+  template <class PredicateUnit>
+  explicit EnabledLane(UnitsUnder<Unit, PredicateUnit, false> out) : units(out.units) {
+    mask.expand(out.predicate);
+  }
+  template <class V>
+  V enabled(V lanes, int k) const {
+    return lanes & load_register<lane_of<L>>(mask.lane, k);
+  }
+  bool is_enabled(int i) const { return mask.lane[i] != 0; }
+  template <class V>
+  void store(int k, V result) const {
+    const V old = load_register<lane_of<L>>(units, k);
+    store_register(units, k, old ^ enabled(old ^ result, k));
+  }
+  Unit* units;
+  LaneMask<L::bits, L::count> mask;
+};
+
+// Results of an operation on numbers, by registers; the reference is for the lanes with a NaN. The result may lie where
+// an operand does: all are read before the first store.
+template <class L, class Op, class Destination, class Units>
+inline void apply_to_numbers(const Destination& to, const Units* a, const Units* b) {
+  using F = format_of<L>;
+  using Lane = lane_of<L>;
+  constexpr int registers = L::count * static_cast<int>(sizeof(Lane)) / register_bytes;
+  Vector<Lane> results[registers], nans{};
+  for (int k = 0; k < registers; ++k) {
+    const Vector<Lane> x = load_register<Lane>(a, k), y = load_register<Lane>(b, k);
+    nans |= to.enabled(nan_signs<F>(x) | nan_signs<F>(y), k);
+    results[k] = Op::of_numbers(x, y);
+  }
+  if (__builtin_expect(any_sign<Lane>(nans), 0)) {
+    Environment env;
+    const Read<L> x(a), y(b);
+    const Write<L> result(results);
+    for (int i = 0; i < L::count; ++i)
+      if (any_nan<F>(x[i], y[i]) && to.is_enabled(i)) result.put(i, Op::template exact<F>(env, x[i], y[i]));
+  }
+  for (int k = 0; k < registers; ++k) to.store(k, results[k]);
+}
+
 template <class L, class Op, class Unit, class... Units>
 inline void apply(Environment& env, Unit* out, const Units*... operands) {
-  alignas(64) lane_of<L> results[L::count];
-  compute<L, Op>(env, results, operands...);
-  lanes<L::count>(
-      Write<L>(out), [](auto lane) { return lane; }, Read<L>(results));
+  if constexpr (L::count == 1) {  // by the reference, which is quicker for one
+    Write<L>(out).put(0, Op::template exact<format_of<L>>(env, in_word(Read<L>(operands)[0])...));
+  } else {
+    alignas(64) lane_of<L> results[L::count];
+    compute<L, Op>(env, results, operands...);
+    lanes<L::count>(
+        Write<L>(out), [](auto lane) { return lane; }, Read<L>(results));
+  }
 }
 
 template <class L, class Op, class Unit, class... Units>
 inline void apply(Unit* out, const Units*... operands) {
-  Environment env;
-  apply<L, Op>(env, out, operands...);
+  if constexpr (L::count > 1 && is_of_numbers<Op>) {
+    apply_to_numbers<L, Op>(EveryLane<L, Unit>(out), operands...);
+  } else {
+    Environment env;
+    apply<L, Op>(env, out, operands...);
+  }
 }
 
 // An operand with +0 in the lanes that are not enabled. No operation here raises a flag for zeros.
@@ -57,16 +123,22 @@ struct EnabledLanes {
 
 template <class L, class Op, class Unit, class PredicateUnit, class... Units>
 inline void apply(UnitsUnder<Unit, PredicateUnit, false> out, const Units*... operands) {
-  LaneMask<L::bits, L::count> enabled;
-  enabled.expand(out.predicate);
-  alignas(64) lane_of<L> results[L::count];
-  Environment env;
-  compute<L, Op>(env, results, EnabledLanes<L>(operands, enabled).lane...);
-  const Read<L> result(results), old(out.units);
-  const Write<L> to(out.units);
-  KASTARRI_LANES_INDEPENDENT
-  for (int i = 0; i < L::count; ++i)  // by masks: of a choice the compiler makes a store under a branch
-    to.put(i, static_cast<lane_of<L>>(old[i] ^ ((old[i] ^ result[i]) & enabled.lane[i])));
+  if constexpr (L::count == 1) {
+    if ((out.predicate[0] & 1) != 0) apply<L, Op>(out.units, operands...);
+  } else if constexpr (is_of_numbers<Op>) {
+    apply_to_numbers<L, Op>(EnabledLane<L, Unit>(out), operands...);
+  } else {
+    LaneMask<L::bits, L::count> enabled;
+    enabled.expand(out.predicate);
+    alignas(64) lane_of<L> results[L::count];
+    Environment env;
+    compute<L, Op>(env, results, EnabledLanes<L>(operands, enabled).lane...);
+    const Read<L> result(results), old(out.units);
+    const Write<L> to(out.units);
+    KASTARRI_LANES_INDEPENDENT
+    for (int i = 0; i < L::count; ++i)  // by masks: of a choice the compiler makes a store under a branch
+      to.put(i, static_cast<lane_of<L>>(old[i] ^ ((old[i] ^ result[i]) & enabled.lane[i])));
+  }
 }
 
 // An operation on bits alone, without flags, as a rule on lanes.

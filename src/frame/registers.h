@@ -50,6 +50,20 @@ inline void store_register(void* to, int k, V v) {
   std::memcpy(static_cast<unsigned char*>(to) + k * register_bytes, &v, sizeof v);
 }
 
+// Whether the top bit of any lane is set.
+template <class Lane>
+inline bool any_sign(Vector<Lane> v) {
+  constexpr Lane sign = static_cast<Lane>(Lane{1} << (8 * sizeof(Lane) - 1));
+  const auto signs = v & sign;
+#if defined __AVX512BW__
+  return _mm512_test_epi32_mask(reinterpret_cast<__m512i>(signs), reinterpret_cast<__m512i>(signs)) != 0;
+#elif defined __AVX2__
+  return _mm256_testz_si256(reinterpret_cast<__m256i>(signs), reinterpret_cast<__m256i>(signs)) == 0;
+#else
+  return _mm_movemask_epi8(reinterpret_cast<__m128i>(signs)) != 0;
+#endif
+}
+
 // Words that fill a block, one after the other and again, and that block over and over.
 template <int Words, std::size_t... I>
 inline __m128i block_of(const std::uint32_t* words, std::index_sequence<I...>) {

@@ -27,64 +27,68 @@ inline void compute(Environment& env, lane_of<L>* results, const Units*... opera
   }
 }
 
-// Where results go by registers: all lanes.
-template <class L, class Unit>
-struct EveryLane {
-  explicit EveryLane(Unit* out) : units(out) {}
-  template <class V>
-  V enabled(V lanes, int) const {
-    return lanes;
-  }
+// Where results go, by registers: to all lanes, or to the enabled ones.
+template <class L, class Out>
+class Destination {
+ public:
+  explicit Destination(Out units) : units_(units) {}
+
+  Vector<lane_of<L>> enabled(Vector<lane_of<L>> lanes, int) const { return lanes; }
   bool is_enabled(int) const { return true; }
-  template <class V>
-  void store(int k, V result) const {
-    store_register(units, k, result);
+  void store(int k, Vector<lane_of<L>> result) const { store_register(units_, k, result); }
+
+ private:
+  Out units_;
+};
+template <class L, class Unit, class PredicateUnit>
+class Destination<L, UnitsUnder<Unit, PredicateUnit, false>> {
+ public:
+  explicit Destination(UnitsUnder<Unit, PredicateUnit, false> out) : units_(out.units) { mask_.expand(out.predicate); }
+
+  Vector<lane_of<L>> enabled(Vector<lane_of<L>> lanes, int k) const {
+    return lanes & load_register<lane_of<L>>(mask_.lane, k);
   }
-  Unit* units;
+  bool is_enabled(int i) const { return mask_.lane[i] != 0; }
+  void store(int k, Vector<lane_of<L>> result) const {
+    const auto old = load_register<lane_of<L>>(units_, k);
+    store_register(units_, k, old ^ enabled(old ^ result, k));
+  }
+
+ private:
+  Unit* units_;
+  LaneMask<L::bits, L::count> mask_;
 };
 
-// The enabled lanes.
-template <class L, class Unit>
-struct EnabledLane {
-  template <class PredicateUnit>
-  explicit EnabledLane(UnitsUnder<Unit, PredicateUnit, false> out) : units(out.units) {
-    mask.expand(out.predicate);
-  }
-  template <class V>
-  V enabled(V lanes, int k) const {
-    return lanes & load_register<lane_of<L>>(mask.lane, k);
-  }
-  bool is_enabled(int i) const { return mask.lane[i] != 0; }
-  template <class V>
-  void store(int k, V result) const {
-    const V old = load_register<lane_of<L>>(units, k);
-    store_register(units, k, old ^ enabled(old ^ result, k));
-  }
-  Unit* units;
-  LaneMask<L::bits, L::count> mask;
-};
+template <class L>
+constexpr int registers_of = L::count * static_cast<int>(sizeof(lane_of<L>)) / register_bytes;
 
-// Results of an operation on numbers, by registers; the reference is for the lanes with a NaN. The result may lie where
-// an operand does: all are read before the first store.
-template <class L, class Op, class Destination, class Units>
-inline void apply_to_numbers(const Destination& to, const Units* a, const Units* b) {
-  using F = format_of<L>;
+// The lanes with a NaN by the reference.
+template <class L, class Op, class Out, class Units>
+[[gnu::noinline]] void apply_with_nans(Out out, const Units* a, const Units* b) {
+  alignas(64) lane_of<L> results[L::count];
+  for (int k = 0; k < registers_of<L>; ++k)
+    store_register(results, k,
+                   Op::of_numbers(load_register<lane_of<L>>(a, k), load_register<lane_of<L>>(b, k)));
+  const Destination<L, Out> to(out);
+  const Read<L> x(a), y(b);
+  Environment env;
+  for (int i = 0; i < L::count; ++i)
+    if (any_nan<format_of<L>>(x[i], y[i]) && to.is_enabled(i))
+      results[i] = static_cast<lane_of<L>>(Op::template exact<format_of<L>>(env, x[i], y[i]));
+  for (int k = 0; k < registers_of<L>; ++k) to.store(k, load_register<lane_of<L>>(results, k));
+}
+
+// Results of an operation on numbers, by registers. They may lie where one of the operands does.
+template <class L, class Op, class Out, class Units>
+inline void apply_to_numbers(Out out, const Units* a, const Units* b) {
   using Lane = lane_of<L>;
-  constexpr int registers = L::count * static_cast<int>(sizeof(Lane)) / register_bytes;
-  Vector<Lane> results[registers], nans{};
-  for (int k = 0; k < registers; ++k) {
-    const Vector<Lane> x = load_register<Lane>(a, k), y = load_register<Lane>(b, k);
-    nans |= to.enabled(nan_signs<F>(x) | nan_signs<F>(y), k);
-    results[k] = Op::of_numbers(x, y);
-  }
-  if (__builtin_expect(any_sign<Lane>(nans), 0)) {
-    Environment env;
-    const Read<L> x(a), y(b);
-    const Write<L> result(results);
-    for (int i = 0; i < L::count; ++i)
-      if (any_nan<F>(x[i], y[i]) && to.is_enabled(i)) result.put(i, Op::template exact<F>(env, x[i], y[i]));
-  }
-  for (int k = 0; k < registers; ++k) to.store(k, results[k]);
+  const Destination<L, Out> to(out);
+  const auto nans = [](const Units* v, int k) { return nan_signs<format_of<L>>(load_register<Lane>(v, k)); };
+  Vector<Lane> left{};
+  for (int k = 0; k < registers_of<L>; ++k) left |= to.enabled(nans(a, k) | nans(b, k), k);
+  if (__builtin_expect(any_sign<Lane>(left), 0)) return apply_with_nans<L, Op>(out, a, b);
+  for (int k = 0; k < registers_of<L>; ++k)
+    to.store(k, Op::of_numbers(load_register<Lane>(a, k), load_register<Lane>(b, k)));
 }
 
 template <class L, class Op, class Unit, class... Units>
@@ -102,7 +106,7 @@ inline void apply(Environment& env, Unit* out, const Units*... operands) {
 template <class L, class Op, class Unit, class... Units>
 inline void apply(Unit* out, const Units*... operands) {
   if constexpr (L::count > 1 && is_of_numbers<Op>) {
-    apply_to_numbers<L, Op>(EveryLane<L, Unit>(out), operands...);
+    apply_to_numbers<L, Op>(out, operands...);
   } else {
     Environment env;
     apply<L, Op>(env, out, operands...);
@@ -126,7 +130,7 @@ inline void apply(UnitsUnder<Unit, PredicateUnit, false> out, const Units*... op
   if constexpr (L::count == 1) {
     if ((out.predicate[0] & 1) != 0) apply<L, Op>(out.units, operands...);
   } else if constexpr (is_of_numbers<Op>) {
-    apply_to_numbers<L, Op>(EnabledLane<L, Unit>(out), operands...);
+    apply_to_numbers<L, Op>(out, operands...);
   } else {
     LaneMask<L::bits, L::count> enabled;
     enabled.expand(out.predicate);

@@ -140,18 +140,18 @@ struct MOV {
 };
 
 // One bit for the class: bits 0-4 -infinity, -normal, -subnormal, -0, +0, bits 5-7 +subnormal, +normal,
-// +infinity, bits 8 and 9 the signalling and the quiet NaN.
+// +infinity, bits 8 and 9 the signalling and the quiet NaN. By masks, so that compilers vectorise it.
 struct CLSFY {
-  template <class F>
-  static constexpr word on_bits(word a) {
-    const word m = magnitude<F>(a);
-    const auto either = [a](word positive, word negative) { return is_negative<F>(a) ? negative : positive; };
-    return m == 0             ? either(1 << 4, 1 << 3)
-           : m < F::unit      ? either(1 << 5, 1 << 2)
-           : m < F::infinity  ? either(1 << 6, 1 << 1)
-           : m == F::infinity ? either(1 << 7, 1 << 0)
-           : m & F::quiet     ? 1 << 9
-                              : 1 << 8;
+  template <class F, class Lane>
+  static constexpr Lane on_bits(Lane a) {
+    const auto m = static_cast<Lane>(magnitude<F>(a));
+    const auto above = [m](word bound) { return mask_below(static_cast<Lane>(bound), m); };
+    const Lane some = above(0), normal = above(F::unit - 1), infinite = above(F::largest), nan = above(F::infinity);
+    const auto up_from_zero = static_cast<Lane>(1 - (some + 2 * (normal + 2 * infinite)));  // 1, 2, 4, 8
+    const auto down_from_zero = static_cast<Lane>(9 - ((some ^ infinite) & 3) - up_from_zero);
+    const auto positive = static_cast<Lane>(up_from_zero << 4);
+    const auto quiet = static_cast<Lane>(256 + (a & F::quiet) / (F::quiet / 256));
+    return chosen(nan, quiet, chosen(mask_below(m, a), down_from_zero, positive));
   }
 };
 

@@ -147,7 +147,12 @@ inline void apply(UnitsUnder<Unit, PredicateUnit, false> out, const Units*... op
 
 // An operation on bits alone, without flags, as a rule on lanes.
 template <class Op, class L>
-constexpr auto bits_rule = [](lane_of<L> lane) { return Op::template on_bits<format_of<L>>(lane); };
+constexpr auto bits_rule = [](lane_of<L> lane) {
+  if constexpr (L::count == 1)
+    return Op::template on_bits<format_of<L>>(in_word(lane));
+  else
+    return Op::template on_bits<format_of<L>>(lane);
+};
 
 // Constant `number` in the layout's format.
 template <class L>

@@ -74,15 +74,6 @@ using MULS = Fused<true>;
 
 // --- Order --------------------------------------------------------------------------------------------
 
-// All ones where one of them is a NaN.
-template <class F>
-constexpr typename F::lane nan_mask(typename F::lane x, typename F::lane y) {
-  using Lane = typename F::lane;
-  using Signed = std::make_signed_t<Lane>;  // of which more targets have the greater one
-  const auto greater = std::max(static_cast<Signed>(magnitude<F>(x)), static_cast<Signed>(magnitude<F>(y)));
-  return mask_below(static_cast<Lane>(F::infinity), static_cast<Lane>(greater));
-}
-
 // Lanes whose top bit is set where one of v is a NaN.
 template <class F>
 inline Vector<typename F::lane> nan_signs(Vector<typename F::lane> v) {
@@ -196,18 +187,20 @@ template <class Holds, bool Unordered, bool Signalling>
 struct Relation {
   // Unlike order(), both zeros are 0.
   template <class F>
-  static constexpr auto key(typename F::lane x) {
-    using Lane = typename F::lane;
-    const Lane sign = sign_mask(x);
-    return static_cast<std::make_signed_t<Lane>>(((x & (F::sign - 1)) ^ sign) - sign);
+  static auto key(Vector<typename F::lane> v) {
+    return signed_as(ordered(v & static_cast<typename F::lane>(F::sign - 1)), ordered(v));
   }
   template <class F>
-  static bool on_numbers(typename F::lane a, typename F::lane b) {
+  static auto key(word x) {
+    return static_cast<std::int32_t>((magnitude<F>(x) ^ sign_of<F>(x)) - sign_of<F>(x));
+  }
+  template <class F>
+  static auto on_numbers(Vector<typename F::lane> a, Vector<typename F::lane> b) {
     return Holds()(key<F>(a), key<F>(b));
   }
   template <class F>
   static bool exact(Environment& env, word a, word b) {
-    if (!any_nan<F>(a, b)) return on_numbers<F>(static_cast<typename F::lane>(a), static_cast<typename F::lane>(b));
+    if (!any_nan<F>(a, b)) return Holds()(key<F>(a), key<F>(b));
     if (Signalling || is_signalling<F>(a) || is_signalling<F>(b)) env.raise(invalid);
     return Unordered;
   }
@@ -215,44 +208,44 @@ struct Relation {
 
 struct Equal {
   template <class T>
-  constexpr bool operator()(T x, T y) const {
+  constexpr auto operator()(T x, T y) const {
     return x == y;
   }
 };
 struct Less {
   template <class T>
-  constexpr bool operator()(T x, T y) const {
+  constexpr auto operator()(T x, T y) const {
     return x < y;
   }
 };
 struct LessOrEqual {
   template <class T>
-  constexpr bool operator()(T x, T y) const {
+  constexpr auto operator()(T x, T y) const {
     return x <= y;
   }
 };
 struct Greater {
   template <class T>
-  constexpr bool operator()(T x, T y) const {
+  constexpr auto operator()(T x, T y) const {
     return x > y;
   }
 };
 struct GreaterOrEqual {
   template <class T>
-  constexpr bool operator()(T x, T y) const {
+  constexpr auto operator()(T x, T y) const {
     return x >= y;
   }
 };
 struct NotEqual {
   template <class T>
-  constexpr bool operator()(T x, T y) const {
+  constexpr auto operator()(T x, T y) const {
     return x != y;
   }
 };
 struct Never {
   template <class T>
-  constexpr bool operator()(T, T) const {
-    return false;
+  constexpr auto operator()(T, T) const {
+    return T{} != T{};
   }
 };
 

@@ -165,26 +165,44 @@ constexpr word constant(word number) {
 template <class Unit>
 using layout_of_unit = std::conditional_t<sizeof(Unit) == 2, f16x1, f32x1>;
 
+// The lanes for which the relation holds, by registers; those with a NaN aside.
+template <class L, class Op>
+struct Related : LaneMask<L::bits, L::count> {
+  template <class Units>
+  Related(const Units* a, const Units* b) {
+    using Lane = lane_of<L>;
+    Vector<Lane> nans{};
+    for (int k = 0; k < registers_of<L>; ++k) {
+      const auto x = load_register<Lane>(a, k), y = load_register<Lane>(b, k);
+      nans |= nan_signs<format_of<L>>(x) | nan_signs<format_of<L>>(y);
+      store_register(this->lane, k, Op::template on_numbers<format_of<L>>(x, y));
+    }
+    some_nan = any_sign<Lane>(nans);
+  }
+  bool some_nan;
+};
+
+template <class L, class Op, class Bits, class Units>
+[[gnu::noinline]] void compare_with_nans(Bits* out, const Units* a, const Units* b) {
+  using F = format_of<L>;
+  Related<L, Op> holds(a, b);
+  const Read<L> x(a), y(b);
+  Environment env;
+  for (int i = 0; i < L::count; ++i)
+    if (any_nan<F>(x[i], y[i]))
+      holds.lane[i] = static_cast<lane_of<L>>(Op::template exact<F>(env, x[i], y[i]) ? -1 : 0);
+  holds.collect(out);
+}
+
 // Bit i of the predicate = the relation of lanes i.
 template <class L, class Op, class Bits, class Units>
 inline void compare(Bits* out, const Units* a, const Units* b) {
-  using F = format_of<L>;
-  const Read<L> x(a), y(b);
   if constexpr (L::count == 1) {
     Environment env;
-    out[0] = static_cast<Bits>(Op::template exact<F>(env, x[0], y[0]));
+    out[0] = static_cast<Bits>(Op::template exact<format_of<L>>(env, in_word(Read<L>(a)[0]), in_word(Read<L>(b)[0])));
   } else {
-    LaneMask<L::bits, L::count> holds;
-    KASTARRI_LANES_INDEPENDENT
-    for (int i = 0; i < L::count; ++i)
-      holds.lane[i] = static_cast<lane_of<L>>(Op::template on_numbers<F>(x[i], y[i]) ? -1 : 0);
-    lane_of<L> left = 0;
-    for (int i = 0; i < L::count; ++i) left = static_cast<lane_of<L>>(left | nan_mask<F>(x[i], y[i]));
-    if (__builtin_expect(left != 0, 0)) {
-      Environment env;
-      for (int i = 0; i < L::count; ++i)
-        holds.lane[i] = static_cast<lane_of<L>>(Op::template exact<F>(env, x[i], y[i]) ? -1 : 0);
-    }
+    const Related<L, Op> holds(a, b);
+    if (__builtin_expect(holds.some_nan, 0)) return compare_with_nans<L, Op>(out, a, b);
     holds.collect(out);
   }
 }

@@ -64,6 +64,24 @@ inline bool any_sign(Vector<Lane> v) {
 #endif
 }
 
+// Magnitudes with the signs of v, where it is not 0.
+#if defined __AVX2__ && !defined __AVX512BW__
+inline Vector<std::int16_t> signed_as(Vector<std::int16_t> magnitudes, Vector<std::int16_t> v) {
+  return reinterpret_cast<Vector<std::int16_t>>(
+      _mm256_sign_epi16(reinterpret_cast<__m256i>(magnitudes), reinterpret_cast<__m256i>(v)));
+}
+inline Vector<std::int32_t> signed_as(Vector<std::int32_t> magnitudes, Vector<std::int32_t> v) {
+  return reinterpret_cast<Vector<std::int32_t>>(
+      _mm256_sign_epi32(reinterpret_cast<__m256i>(magnitudes), reinterpret_cast<__m256i>(v)));
+}
+#else
+template <class V>
+inline V signed_as(V magnitudes, V v) {
+  const V negative = v >> (8 * static_cast<int>(sizeof(v[0])) - 1);
+  return (magnitudes ^ negative) - negative;
+}
+#endif
+
 // Words that fill a block, one after the other and again, and that block over and over.
 template <int Words, std::size_t... I>
 inline __m128i block_of(const std::uint32_t* words, std::index_sequence<I...>) {

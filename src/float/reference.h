@@ -179,9 +179,9 @@ constexpr word negated(word x) {
 // --- Sums and products --------------------------------------------------------------------------------
 
 // Sums are made of significands that lie as high as S has room for them, below the top bit and one for a carry: of
-// numbers of the format, and of products of two. The one of the lesser exponent is shifted to the other's. It loses bits
-// only where the other's hidden bit outweighs it by far, so that a difference keeps all but one of the leading bits:
-// two more, at least, than the format has; or where the other is subnormal, and what is lost lies below the
+// numbers of the format, and of products of two. The one of the lesser exponent is shifted to the other's. It loses
+// bits only where the other's hidden bit outweighs it by far, so that a difference keeps all but one of the leading
+// bits: two more, at least, than the format has; or where the other is subnormal, and what is lost lies below the
 // quantum of all results.
 template <class S>
 constexpr int summand_bits = 8 * sizeof(S) - 2;
@@ -227,7 +227,8 @@ template <class F>
 }
 // Of a product of two words the upper one will do, unless both summands lose bits or few remain.
 template <class F>
-[[gnu::always_inline]] inline Number<word> sum_with_product(word acc, const Number<std::uint64_t>& p, Rounding rounding) {
+[[gnu::always_inline]] inline Number<word> sum_with_product(word acc, const Number<std::uint64_t>& p,
+                                                            Rounding rounding) {
   const Number<word> upper = upper_word(p), c = summand<F>(acc);
   if (__builtin_expect(upper.exponent - c.exponent <= summand_bits<word> - (F::fraction_bits + 1), 1)) {
     const Number<word> total = sum(upper, c, rounding);
@@ -320,7 +321,8 @@ inline word to_integral(Environment& env, word x, Rounding rounding, bool tells_
 template <class F>
 inline word from_integer(Environment& env, std::int64_t value, word scale) {
   const std::uint64_t bits = static_cast<std::uint64_t>(value);
-  return round_pack<F>(env, Number<std::uint64_t>{value < 0 ? ~word{0} : 0, -static_cast<int>(scale), value < 0 ? -bits : bits});
+  return round_pack<F>(
+      env, Number<std::uint64_t>{value < 0 ? ~word{0} : 0, -static_cast<int>(scale), value < 0 ? -bits : bits});
 }
 
 // x * 2^scale truncated, as an integer of that width and signedness; out of range, the bound. A NaN

@@ -60,15 +60,14 @@ class Destination<L, UnitsUnder<Unit, PredicateUnit, false>> {
 };
 
 template <class L>
-constexpr int registers_of = L::count * static_cast<int>(sizeof(lane_of<L>)) / register_bytes;
+constexpr int registers_of = L::count* static_cast<int>(sizeof(lane_of<L>)) / register_bytes;
 
 // The lanes with a NaN by the reference.
 template <class L, class Op, class Out, class Units>
 [[gnu::noinline]] void apply_with_nans(Out out, const Units* a, const Units* b) {
   alignas(64) lane_of<L> results[L::count];
   for (int k = 0; k < registers_of<L>; ++k)
-    store_register(results, k,
-                   Op::of_numbers(load_register<lane_of<L>>(a, k), load_register<lane_of<L>>(b, k)));
+    store_register(results, k, Op::of_numbers(load_register<lane_of<L>>(a, k), load_register<lane_of<L>>(b, k)));
   const Destination<L, Out> to(out);
   const Read<L> x(a), y(b);
   Environment env;

@@ -27,7 +27,7 @@ inline bool fast_on_unit(Environment& env, typename L::container* results, Rule 
 template <bool Subtract>
 struct Sum {
   template <class F>
-  static word exact(Environment& env, word a, word b) {
+  [[gnu::always_inline]] static word exact(Environment& env, word a, word b) {
     return add<F>(env, a, Subtract ? negated<F>(b) : b);
   }
   template <class L, class Units>
@@ -46,7 +46,7 @@ using SUB = Sum<true>;
 
 struct MUL {
   template <class F>
-  static word exact(Environment& env, word a, word b) {
+  [[gnu::always_inline]] static word exact(Environment& env, word a, word b) {
     return multiply<F>(env, a, b);
   }
   template <class L, class... Units>
@@ -60,7 +60,7 @@ struct MUL {
 template <bool Subtract>
 struct Fused {
   template <class F>
-  static word exact(Environment& env, word acc, word a, word b) {
+  [[gnu::always_inline]] static word exact(Environment& env, word acc, word a, word b) {
     return multiply_add<F>(env, acc, Subtract ? negated<F>(a) : a, b);
   }
   template <class L, class... Units>

@@ -16,6 +16,12 @@ inline word in_word(word lane) {
   return lane;
 }
 
+// A lane of a vector, which is one of many places: there the reference is called, alone it is inlined.
+template <class Op, class F, class... X>
+[[gnu::noinline]] word exact_lane(Environment& env, X... x) {
+  return Op::template exact<F>(env, x...);
+}
+
 // results[i] = Op of lanes i of the operands. The results are apart from the operands.
 template <class L, class Op, class... Units>
 inline void compute(Environment& env, lane_of<L>* results, const Units*... operands) {
@@ -23,7 +29,7 @@ inline void compute(Environment& env, lane_of<L>* results, const Units*... opera
   if (__builtin_expect(Op::template fast<L>(env, results, operands...), 0)) {
     for (int i = 0; i < L::count; ++i)
       if (is_nan<F>(results[i]))
-        results[i] = static_cast<lane_of<L>>(Op::template exact<F>(env, Read<L>(operands)[i]...));
+        results[i] = static_cast<lane_of<L>>(exact_lane<Op, F>(env, word{Read<L>(operands)[i]}...));
   }
 }
 

@@ -20,7 +20,7 @@ struct Number {
   word negative;  // all ones or 0
   int exponent;
   S significand;
-  bool lost = false;
+  word lost = 0;  // 1 where bits have been lost
 };
 
 // Every sum, and every product of halves, has room in a word for all that rounding asks of it; products
@@ -91,7 +91,7 @@ template <class F>
   const word sign = x.negative & F::sign;
   word significand = x.significand;
   if (__builtin_expect(significand == 0, 0)) {
-    if (!x.lost) return sign;
+    if (x.lost == 0) return sign;
     significand = 1;  // as well as any that is below the quantum by far
   }
   // All but `dropped` bits are the format's, once the highest is bit 30.
@@ -125,7 +125,7 @@ constexpr bool is_long_enough(word significand) {
 
 inline Number<word> upper_word(const Number<std::uint64_t>& x) {
   const auto high = static_cast<word>(x.significand >> 32), low = static_cast<word>(x.significand);
-  return {x.negative, x.exponent + 32, high, low != 0 || x.lost};
+  return {x.negative, x.exponent + 32, high, word{low != 0} | x.lost};
 }
 
 template <class F>
@@ -140,7 +140,7 @@ inline Number<word> narrowed(const Number<std::uint64_t>& x) {
   if (upper.significand == 0 && low >> 31 == 0) return {x.negative, x.exponent, low, x.lost};
   const int lead = upper.significand == 0 ? 31 : 30 - highest_bit(upper.significand);
   const word kept = upper.significand << lead | low >> 1 >> (31 - lead);
-  return {x.negative, upper.exponent - lead, kept, low << lead != 0 || x.lost};
+  return {x.negative, upper.exponent - lead, kept, word{low << lead != 0} | x.lost};
 }
 
 template <class F>
@@ -210,15 +210,15 @@ template <class S>
     y.significand = y.significand != 0;
     apart = 1;
   }
-  const bool lost = x.lost || y.lost || (y.significand & ((S{1} << apart) - 1)) != 0;
+  const word lost = x.lost | y.lost | word{(y.significand & ((S{1} << apart) - 1)) != 0};
   // ~((y - 1) >> n) is -y >> n, both rounded down; if y has lost something, so is ~(y >> n).
   const auto differ = static_cast<S>(static_cast<Signed>(static_cast<std::int32_t>(x.negative ^ y.negative)));
-  const S less = y.lost ? y.significand : y.significand + differ;
+  const S less = y.lost != 0 ? y.significand : y.significand + differ;
   const S total = x.significand + (static_cast<S>(static_cast<Signed>(less) >> apart) ^ differ);
   if (__builtin_expect(static_cast<Signed>(total) > 0, 1)) return {x.negative, x.exponent, total, lost};
-  if (total == 0 && !lost) return {differ != 0 ? (rounding == downward ? ~word{0} : 0) : x.negative, x.exponent, 0};
-  if (total == 0) return {x.negative, x.exponent, 0, true};
-  return {y.negative, x.exponent, ~total + !lost, lost};
+  if (total == 0 && lost == 0) return {differ != 0 ? (rounding == downward ? ~word{0} : 0) : x.negative, x.exponent, 0};
+  if (total == 0) return {x.negative, x.exponent, 0, lost};
+  return {y.negative, x.exponent, ~total + 1 - lost, lost};
 }
 
 template <class F>

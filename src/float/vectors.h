@@ -97,7 +97,7 @@ inline void apply_to_numbers(Out out, const Units* a, const Units* b) {
 }
 
 template <class L, class Op, class Unit, class... Units>
-inline void apply(Environment& env, Unit* out, const Units*... operands) {
+[[gnu::always_inline]] inline void apply(Environment& env, Unit* out, const Units*... operands) {
   if constexpr (L::count == 1) {  // by the reference, which is quicker for one
     Write<L>(out).put(0, Op::template exact<format_of<L>>(env, in_word(Read<L>(operands)[0])...));
   } else {

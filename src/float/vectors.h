@@ -40,7 +40,6 @@ class Destination {
   explicit Destination(Out units) : units_(units) {}
 
   Vector<lane_of<L>> enabled(Vector<lane_of<L>> lanes, int) const { return lanes; }
-  bool is_enabled(int) const { return true; }
   void store(int k, Vector<lane_of<L>> result) const { store_register(units_, k, result); }
 
  private:
@@ -54,7 +53,6 @@ class Destination<L, UnitsUnder<Unit, PredicateUnit, false>> {
   Vector<lane_of<L>> enabled(Vector<lane_of<L>> lanes, int k) const {
     return lanes & load_register<lane_of<L>>(mask_.lane, k);
   }
-  bool is_enabled(int i) const { return mask_.lane[i] != 0; }
   void store(int k, Vector<lane_of<L>> result) const {
     const auto old = load_register<lane_of<L>>(units_, k);
     store_register(units_, k, old ^ enabled(old ^ result, k));
@@ -71,16 +69,20 @@ constexpr int registers_of = L::count* static_cast<int>(sizeof(lane_of<L>)) / re
 // The lanes with a NaN by the reference.
 template <class L, class Op, class Out, class Units>
 [[gnu::noinline]] void apply_with_nans(Out out, const Units* a, const Units* b) {
-  alignas(64) lane_of<L> results[L::count];
-  for (int k = 0; k < registers_of<L>; ++k)
-    store_register(results, k, Op::of_numbers(load_register<lane_of<L>>(a, k), load_register<lane_of<L>>(b, k)));
+  using F = format_of<L>;
+  using Lane = lane_of<L>;
   const Destination<L, Out> to(out);
-  const Read<L> x(a), y(b);
+  alignas(64) Lane results[L::count], left[L::count];
+  for (int k = 0; k < registers_of<L>; ++k) {
+    const auto x = load_register<Lane>(a, k), y = load_register<Lane>(b, k);
+    store_register(left, k, to.enabled(nan_signs<F>(x) | nan_signs<F>(y), k));
+    store_register(results, k, Op::of_numbers(x, y));
+  }
   Environment env;
   for (int i = 0; i < L::count; ++i)
-    if (any_nan<format_of<L>>(x[i], y[i]) && to.is_enabled(i))
-      results[i] = static_cast<lane_of<L>>(Op::template exact<format_of<L>>(env, x[i], y[i]));
-  for (int k = 0; k < registers_of<L>; ++k) to.store(k, load_register<lane_of<L>>(results, k));
+    if (is_negative<F>(left[i]))
+      results[i] = static_cast<Lane>(exact_lane<Op, F>(env, word{Read<L>(a)[i]}, word{Read<L>(b)[i]}));
+  for (int k = 0; k < registers_of<L>; ++k) to.store(k, load_register<Lane>(results, k));
 }
 
 // Results of an operation on numbers, by registers. They may lie where one of the operands does.

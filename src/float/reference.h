@@ -117,10 +117,10 @@ template <class F>
   return (rounded >> dropped) + (field | sign);
 }
 
-// Whether a number has bits enough for the format, and two more, which with what is lost tell how it is rounded.
+// Whether a number has bits enough for the format, and one more, which with what is lost tells how it is rounded.
 template <class F>
 constexpr bool is_long_enough(word significand) {
-  return significand >> (F::fraction_bits + 2) != 0;
+  return significand >> (F::fraction_bits + 1) != 0;
 }
 
 inline Number<word> upper_word(const Number<std::uint64_t>& x) {

@@ -1,9 +1,9 @@
 // The operations. Each has `exact`, one number by the reference, and may have `fast`, a whole vector at
-// once: it leaves a NaN in every lane that is not for it and says whether there is any.
+// once: it leaves a NaN in every lane that is not for it and says whether there is any. Those that only a NaN
+// keeps from integers have `of_numbers` or `on_numbers`, a register of numbers.
 #ifndef KASTARRI_FLOAT_OPERATIONS_H
 #define KASTARRI_FLOAT_OPERATIONS_H
 
-#include <algorithm>
 #include <type_traits>
 
 #include "float/reference.h"

@@ -5,7 +5,6 @@
 #ifndef KASTARRI_FLOAT_REFERENCE_H
 #define KASTARRI_FLOAT_REFERENCE_H
 
-#include <algorithm>
 #include <cstdint>
 #include <utility>
 

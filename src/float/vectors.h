@@ -64,7 +64,7 @@ class Destination<L, UnitsUnder<Unit, PredicateUnit, false>> {
 };
 
 template <class L>
-constexpr int registers_of = L::count* static_cast<int>(sizeof(lane_of<L>)) / register_bytes;
+constexpr int registers_of = L::count / lanes_in_register<lane_of<L>>;
 
 // The lanes with a NaN by the reference.
 template <class L, class Op, class Out, class Units>

@@ -9,18 +9,8 @@
 
 #ifdef __AVX512F__
 
-// g++ takes what its own header leaves undefined on purpose for a mistake.
-#ifndef __clang__
-#pragma GCC diagnostic push
-#pragma GCC diagnostic ignored "-Wuninitialized"
-#pragma GCC diagnostic ignored "-Wmaybe-uninitialized"
-#endif
-#include <immintrin.h>
-#ifndef __clang__
-#pragma GCC diagnostic pop
-#endif
-
 #include "float/bits.h"
+#include "frame/intrinsics.h"
 #include "frame/lanes.h"
 
 namespace {
@@ -433,7 +423,7 @@ template <class L, class Out, class Fast, class Exact>
 }
 
 template <class L, class Out, class Fast, class Exact>
-[[gnu::always_inline]] inline void store_by_register(Out out, Fast fast, Exact exact) {
+[[gnu::always_inline]] inline void store_results(Out out, Fast fast, Exact exact) {
   if (__builtin_expect(control_word() & flushing, 0)) return store_honouring_subnormals<L>(out, fast, exact);
   RegisterResults<L> results(out);
   if (__builtin_expect(fast(results), 0)) return store_completed<L>(out, results, exact);

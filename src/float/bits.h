@@ -31,6 +31,11 @@ constexpr T mask_below(T x, T y) {
   return sign_mask(static_cast<T>(x - y));
 }
 
+template <class T>
+constexpr T chosen(T mask, T where_set, T elsewhere) {
+  return (mask & where_set) | (~mask & elsewhere);
+}
+
 constexpr word single_sign = Single::sign;
 constexpr word single_magnitude = Single::sign - 1;
 
@@ -46,17 +51,7 @@ constexpr word widened_largest = F::bits == 32 ? Single::largest
 // In place of a Rounding: to the nearest integer, ties away from 0.
 struct TiesAway {};
 
-template <class L>
-using lane_of = typename L::container;
-
-// Lanes of a result on their way.
-template <class L>
-struct Results {
-  alignas(64) lane_of<L> lane[L::count];
-};
-
-// What a vector computed on the unit tells: the flags to raise, and whether a lane is left to the reference. Such a
-// lane holds a NaN.
+// What a vector computed on the unit tells: the flags to raise, and whether a lane is left to the reference.
 struct HostResult {
   word flags;
   bool some_left;

@@ -2,8 +2,6 @@
 #ifndef KASTARRI_FLOAT_CONVERT_H
 #define KASTARRI_FLOAT_CONVERT_H
 
-#include <cstring>
-
 #include "float/reference.h"
 #include "float/unit.h"
 #include "frame/lanes.h"
@@ -36,37 +34,16 @@ inline typename To::container convert_lane(Environment& env, typename From::cont
 
 // --- On the unit: a whole vector -----------------------------------------------------------------------
 
-// All lanes by the reference, exact(env, lane).
-template <class From, class To, class Units, class Exact>
-[[gnu::noinline, gnu::cold]] Results<To> converted(Environment& env, const Units* in, Exact exact) {
-  Results<To> results;
-  for (int i = 0; i < To::count; ++i) results.lane[i] = exact(env, Read<From>(in)[i]);
-  return results;
-}
-
-// A whole vector on the unit, with lanes that it leaves by the reference; or, where results are in memory, by the
-// reference altogether: a lane that is left may have raised flags of its own, and need not show in them.
+// A whole vector on the unit.
 template <class From, class To, class Out, class Units, class Fast, class Exact>
-[[gnu::always_inline, gnu::flatten]] inline void convert_vector(Out* out, const Units* in, Fast fast, Exact exact) {
+[[gnu::always_inline]] inline void convert_vector(Out* out, const Units* in, Fast fast, Exact exact) {
   Environment env;
-  if constexpr (rounds_by_instruction) {
-    const auto fast_in = [ =, &env ](auto& results) __attribute__((always_inline)) {
-      const HostResult host = fast(env.rounding, results);
-      env.raise(host.flags);
-      return host.some_left;
-    };
-    store_by_register<To>(out, fast_in, [=, &env](int i) { return static_cast<word>(exact(env, Read<From>(in)[i])); });
-  } else {
-    Results<To> results;
-    const HostResult host = fast(env.rounding, results.lane);
-    if (__builtin_expect(host.some_left, 0)) {
-      const Results<To> all = converted<From, To>(env, in, exact);
-      results = all;
-    } else {
-      env.raise(host.flags);
-    }
-    std::memcpy(out, results.lane, sizeof results.lane);
-  }
+  const auto fast_in = [ =, &env ](auto& results) __attribute__((always_inline)) {
+    const HostResult host = fast(env.rounding, results);
+    env.raise(host.flags);
+    return host.some_left;
+  };
+  store_results<To>(out, fast_in, [=, &env](int i) { return static_cast<word>(exact(env, Read<From>(in)[i])); });
 }
 
 template <class From, class To, class Out, class Units>

@@ -244,10 +244,15 @@ inline auto scaled_single(const Lanes<L, R>& integers, float unit) {
   }
 }
 
-// A number as it is.
+// A number as it is, but of a NaN, which is left, nothing that could be dropped.
 template <class L, Reach R>
 inline ExactSingles<Left::great_and_tiny> exact_single_of(const Lanes<L, R>& x) {
-  return {x.value()};
+  if constexpr (L::bits == 16) {
+    return {x.value()};
+  } else {
+    const auto nans = in_bits<Integers>(x.bits() & single_magnitude) > static_cast<std::int32_t>(Single::infinity);
+    return {in_bits<Singles>(x.bits() & ~(in_bits<Words>(nans) & (Single::quiet - 1)))};
+  }
 }
 
 struct Truncated {
@@ -255,6 +260,9 @@ struct Truncated {
   Words dropped;
   Words left;  // in the top bit
 };
+inline Truncated truncated_but(Words integers, Words dropped, Words left) {
+  return {integers, dropped & ~sign_masks(left), left};
+}
 struct WholeNumber {
   Words bits, magnitudes;  // the magnitudes are those of what has been rounded
   Words dropped;
@@ -287,7 +295,7 @@ inline Truncated truncated_half(const Operand& x, word scale) {
   const Words greatest = is_signed ? all : chosen(negative, Words{} + (single_bits_of_power(0) - 1), all);
   constexpr int point = Half::fraction_bits;
   const Words fixed = fixed_point<point>(magnitude);
-  return {((fixed >> point) ^ negative) - negative, fixed & ((1u << point) - 1), greatest - magnitude};
+  return truncated_but(((fixed >> point) ^ negative) - negative, fixed & ((1u << point) - 1), greatest - magnitude);
 }
 
 // x rounded to an integer; from 2^10 on it is one.
@@ -322,7 +330,7 @@ inline Truncated truncated_single(const Operand& x, word scale) {
   const Words right = (Single::bias + 31 - scale) - biased_exponent(magnitude);
   const Words least = is_signed ? Words{} + (33 - To::bits) : chosen(negative, Words{} + 32, Words{} + (32 - To::bits));
   const Parted parts = parted(significand(magnitude) << 8, at_most(right, 32));
-  return {(parts.kept ^ negative) - negative, parts.dropped, right - least};
+  return truncated_but((parts.kept ^ negative) - negative, parts.dropped, right - least);
 }
 
 // x rounded to an integer; from 2^23 on it is one.

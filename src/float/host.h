@@ -19,6 +19,7 @@
 #include <algorithm>
 #include <cstring>
 
+#include "float/destination.h"
 #include "float/exact.h"
 #include "float/host_fpu.h"
 #include "frame/packs.h"
@@ -174,56 +175,89 @@ inline Vector<std::uint16_t> narrowed(Words first, Words last) {
 
 // --- A whole vector -----------------------------------------------------------------------------------
 
-// What operands measure by the rule, register by register of the format.
-template <class F, class... Ls, class Rule, class Use, class... Units>
-[[gnu::always_inline]] inline void measure(Rule rule, Use use, const Units*... operands) {
-  for (int from = 0; from < std::min({Ls::count...}); from += lanes_in_register<typename F::lane>)
-    use(from, rule(Lanes<Ls, Reach::measured>(operands, from)...));
-}
+// Whether operands that measure by the rule are far apart in any lane.
 template <class F, class... Ls, class Rule, class... Units>
-[[gnu::always_inline]] inline bool any_far(Rule rule, const Units*... operands) {
-  Vector<typename F::lane> far = {};
-  measure<F, Ls...>(
-      rule, [&](int, auto measured) { far |= measured.far; }, operands...);
-  return any_sign<typename F::lane>(far);
+[[gnu::always_inline, gnu::flatten]] inline bool any_far(Rule rule, const Units*... operands) {
+  using Lane = typename F::lane;
+  Vector<Lane> far = {};
+  for (int from = 0; from < std::min({Ls::count...}); from += lanes_in_register<Lane>)
+    far |= rule(Lanes<Ls, Reach::measured>(operands, from)...).far;
+  return any_sign<Lane>(far);
 }
 
-// Sums that are 0, rounded downward: -0 but for terms that are both +0.
-template <class F, class... Ls, class Rule, class... Units>
-[[gnu::always_inline]] inline void turn_zeros(typename F::lane* results, Rule rule, const Units*... operands) {
-  measure<F, Ls...>(
-      rule,
-      [&](int from, auto measured) {
-        using Lane = typename F::lane;
-        const auto result = load_register<Lane>(results + from, 0);
-        const auto zero = in_bits<Vector<Lane>>(magnitudes<F>(result) == 0);
-        store_register(results + from, 0, result | (zero & measured.either_sign & static_cast<Lane>(F::sign)));
-      },
-      operands...);
-}
+// A vector of results in registers, and a bit for each lane that is left.
+template <class L, class Out>
+class RegisterResults : public Destination<L, Out> {
+ public:
+  using Destination<L, Out>::Destination;
 
-// Results of all lanes by a function that yields a step of them.
+  // Lanes that are left, by exact(number of the lane).
+  template <class Exact>
+  void complete(const Exact& exact) {
+    alignas(64) lane_of<L> lane[L::count];
+    for (int k = 0; k < registers_of<L>; ++k) store_register(lane, k, number[k]);
+    for (int i = 0; i < L::count; ++i)
+      if ((left >> i & 1) != 0) lane[i] = static_cast<lane_of<L>>(exact(i));
+    for (int k = 0; k < registers_of<L>; ++k) number[k] = load_register<lane_of<L>>(lane, k);
+  }
+  void take(const RegisterResults& other) {
+    for (int k = 0; k < registers_of<L>; ++k) number[k] = other.number[k];
+    left = other.left;
+  }
+  void store() const { store(std::make_index_sequence<registers_of<L>>()); }
+
+  Vector<lane_of<L>> number[registers_of<L>];
+  std::uint32_t left = 0;
+
+ private:
+  template <std::size_t... K>
+  void store(std::index_sequence<K...>) const {
+    (Destination<L, Out>::store(K, number[K]), ...);
+  }
+};
+
+// An operand with 1 in the lanes that are not enabled: it is no special number, nor far from any that are with it in
+// its lane, and no operation here raises a flag for it.
+template <class L>
+struct EnabledLanes {
+  template <class Unit, class Results>
+  EnabledLanes(const Unit* operand, const Results& results) {
+    constexpr auto one = static_cast<lane_of<L>>(format_of<L>::one);
+    for (int k = 0; k < registers_of<L>; ++k)
+      store_register(lane, k, results.enabled(load_register<lane_of<L>>(operand, k) ^ one, k) ^ one);
+  }
+  alignas(64) lane_of<L> lane[L::count];
+};
+
+// Register number k of results, by a function that yields the step of them from lane `from` on.
 template <class R, class OneStep>
-[[gnu::always_inline]] inline void every_step(typename R::container* results, OneStep one_step) {
-  using Lane = typename R::container;
-  for (int from = 0; from < R::count; from += lanes_in_register<Lane>) {
-    if constexpr (R::bits == 32) {
-      store_register(results + from, 0, pinned(one_step(from)));
-    } else if constexpr (std::is_same_v<typename R::number, half_float>) {
-      const Words first = one_step(from);
-      store_register(results + from, 0, pinned(narrowed(first, one_step(from + step))));
-    } else {
-      const auto first = in_bits<Register>(one_step(from));
-      const auto both = bits_of(pack_words(first, in_bits<Register>(one_step(from + step)), Lane{}));
-      store_register(results + from, 0, pinned(in_order<std::uint64_t>(both)));
-    }
+[[gnu::always_inline, gnu::flatten]] inline auto result_register(int k, OneStep one_step) {
+  using Lane = lane_of<R>;
+  const int from = k * lanes_in_register<Lane>;
+  const Words first = one_step(from);
+  if constexpr (R::bits == 32) {
+    return in_bits<Vector<Lane>>(first);
+  } else if constexpr (std::is_same_v<typename R::number, half_float>) {
+    return narrowed(first, one_step(from + step));
+  } else {
+    const auto second = in_bits<Register>(one_step(from + step));
+    return in_bits<Vector<Lane>>(
+        in_order<std::uint64_t>(bits_of(pack_words(in_bits<Register>(first), second, Lane{}))));
   }
 }
 
+// All of them, on operands that are read through the pointers.
+template <class R, class Results, class OneStep, std::size_t... K, class... Pointers>
+[[gnu::always_inline, gnu::flatten]] inline void every_step(Results& results, OneStep one_step,
+                                                            std::index_sequence<K...>, Pointers&... operands) {
+  const HostFpu fpu(operands...);
+  ((results.number[K] = pinned(result_register<R>(K, one_step))), ...);
+}
+
 // By the rule, which yields exact numbers.
-template <class R, Reach Are, class... Ls, class Mode, class Rule, class... Units>
-[[gnu::always_inline]] inline HostResult numbers_on_host(Mode mode, typename R::container* results, Rule rule,
-                                                         const Units*... operands) {
+template <class R, Reach Are, class... Ls, class Results, class Mode, class Rule, class... Units>
+[[gnu::always_inline, gnu::flatten]] inline HostResult numbers_on_host(Mode mode, Results& results, Rule rule,
+                                                                       const Units*... operands) {
   using F = format_of<R>;
   const auto settled_step = [&](int from) {
     return settled<F>(by_rule(rule, mode, Lanes<Ls, Are>(operands, from)...), mode);
@@ -232,41 +266,45 @@ template <class R, Reach Are, class... Ls, class Mode, class Rule, class... Unit
   alignas(64) word magnitudes[R::count];
   Within<typename Result::range> within;
   Words dropped = {};
-  every_step<R>(results, [&](int from) {
+  const auto one_step = [&](int from) {
     const Result result = settled_step(from);
     if constexpr (Result::range::has_outside) store_register(magnitudes + from, 0, result.magnitudes);
     within.see(result.magnitudes);
     dropped |= result.dropped;
     return result.bits;
-  });
+  };
+  every_step<R>(results, one_step, std::make_index_sequence<registers_of<R>>(), operands...);
   const word flags = any_bit(dropped) ? word{inexact} : 0;
   if (__builtin_expect(!within.some_not(), 1)) return {flags, false};
   for (int i = 0; i < R::count; ++i) {
     const int at = Result::paired ? i / step * step + paired_lane(i % step) : i;
-    if (!Result::range::holds(magnitudes[at])) results[i] = static_cast<typename R::container>(~word{0});
+    if (!Result::range::holds(magnitudes[at])) results.left |= std::uint32_t{1} << i;
   }
   return {flags, true};
 }
 
-template <class R, class... Ls, class Mode, class Rule, class... Units>
-[[gnu::noinline, gnu::flatten]] HostResult far_on_host(const Mode& mode, typename R::container* results, Rule rule,
-                                                       const Units*... operands) {
-  return numbers_on_host<R, Reach::any, Ls...>(mode, results, rule, operands...);
+// The long way, by itself. By value, for what is passed by its address cannot stay in registers.
+template <class Results>
+struct FarResults {
+  Results results;
+  HostResult host;
+};
+template <class R, class... Ls, class Mode, class Results, class Rule, class... Units>
+[[gnu::noinline, gnu::flatten]] FarResults<Results> far_on_host(Mode mode, Results results, Rule rule,
+                                                                const Units*... operands) {
+  const HostResult host = numbers_on_host<R, Reach::any, Ls...>(mode, results, rule, operands...);
+  return {results, host};
 }
 
-// Result lane i = rule(operand lanes i ...) on the unit, exact numbers. The results are apart from the operands.
-// Flattened: calls would pass registers through memory.
-template <class R, class... Ls, class Mode, class Rule, class... Units>
-[[gnu::always_inline, gnu::flatten]] inline HostResult on_host_in(const Mode& mode, typename R::container* results,
-                                                                  Rule rule, const Units*... operands) {
-  const HostFpu fpu(operands...);
+// Result lane i = rule(operand lanes i ...) on the unit, exact numbers.
+template <class R, class... Ls, class Mode, class Results, class Rule, class... Units>
+[[gnu::always_inline, gnu::flatten]] inline HostResult on_host_in(const Mode& mode, Results& results, Rule rule,
+                                                                  const Units*... operands) {
   if constexpr (measures<Rule, Lanes<Ls, Reach::measured>...>) {
     if (__builtin_expect(any_far<format_of<R>, Ls...>(rule, operands...), 0)) {
-      // By themselves: what is passed by its address has to be in memory from the beginning.
-      Results<R> far;
-      const HostResult host = far_on_host<R, Ls...>(mode, far.lane, rule, operands...);
-      std::memcpy(results, far.lane, sizeof far.lane);
-      return host;
+      const FarResults<Results> far = far_on_host<R, Ls...>(mode, results, rule, operands...);
+      results.take(far.results);
+      return far.host;
     }
     return numbers_on_host<R, Reach::near, Ls...>(mode, results, rule, operands...);
   } else {
@@ -275,32 +313,66 @@ template <class R, class... Ls, class Mode, class Rule, class... Units>
 }
 
 // Numbers times a power of two, truncated to integers.
-template <class R, class From, class Units>
-[[gnu::flatten]] inline HostResult truncated_on_host(typename R::container* results, word scale, const Units* operand) {
-  const HostFpu fpu(operand);
-  Words dropped = {}, left = {};
-  every_step<R>(results, [&](int from) {
+template <class R, class From, class Results, class Units>
+[[gnu::always_inline, gnu::flatten]] inline HostResult truncated_on_host(Results& results, word scale,
+                                                                         const Units* operand) {
+  Words dropped = {}, some_left = {};
+  alignas(64) word left[R::count];
+  const auto one_step = [&](int from) {
     const Truncated result = truncated<R>(Lanes<From, Reach::any>(operand, from), scale);
+    store_register(left + from, 0, result.left);
     dropped |= result.dropped;
-    left |= result.left;
+    some_left |= result.left;
     return result.integers;
-  });
-  return {any_bit(dropped) ? word{inexact} : 0, any_sign<word>(left)};
+  };
+  every_step<R>(results, one_step, std::make_index_sequence<registers_of<R>>(), operand);
+  const word flags = any_bit(dropped) ? word{inexact} : 0;
+  if (__builtin_expect(!any_sign<word>(some_left), 1)) return {flags, false};
+  for (int i = 0; i < R::count; ++i) results.left |= (left[i] >> 31) << i;
+  return {flags, true};
 }
 
-template <class R, class... Ls, class Rule, class... Units>
-[[gnu::always_inline]] inline HostResult on_host(TiesAway, typename R::container* results, Rule rule,
-                                                 const Units*... operands) {
+template <class R, class... Ls, class Results, class Rule, class... Units>
+[[gnu::always_inline]] inline HostResult on_host(TiesAway, Results& results, Rule rule, const Units*... operands) {
   return on_host_in<R, Ls...>(ToNearestAway(), results, rule, operands...);
 }
-template <class R, class... Ls, class Rule, class... Units>
-[[gnu::always_inline]] inline HostResult on_host(Rounding rounding, typename R::container* results, Rule rule,
+
+// Sums that are 0, rounded downward: -0 but for terms that are both +0.
+template <class R, class... Ls, class Results, class Rule, std::size_t... K, class... Units>
+[[gnu::always_inline]] inline void turn_zeros(Results& results, Rule rule, std::index_sequence<K...>,
+                                              const Units*... operands) {
+  using F = format_of<R>;
+  using Lane = typename F::lane;
+  const auto turned = [&](Vector<Lane> result, int k) {
+    const auto measured = rule(Lanes<Ls, Reach::measured>(operands, k * lanes_in_register<Lane>)...);
+    const auto zero = in_bits<Vector<Lane>>(magnitudes<F>(result) == 0);
+    return result | (zero & measured.either_sign & static_cast<Lane>(F::sign));
+  };
+  ((results.number[K] = turned(results.number[K], K)), ...);
+}
+
+template <class R, class... Ls, class Results, class Rule, class... Units>
+[[gnu::always_inline]] inline HostResult on_host(Rounding rounding, Results& results, Rule rule,
                                                  const Units*... operands) {
   if (rounding == to_nearest) return on_host_in<R, Ls...>(ToNearest(), results, rule, operands...);
   const HostResult host = on_host_in<R, Ls...>(directed[rounding & 3], results, rule, operands...);
   if constexpr (measures<Rule, Lanes<Ls, Reach::measured>...>)
-    if (rounding == downward) turn_zeros<format_of<R>, Ls...>(results, rule, operands...);
+    if (rounding == downward)
+      turn_zeros<R, Ls...>(results, rule, std::make_index_sequence<registers_of<R>>(), operands...);
   return host;
+}
+
+// Results by fast(results), which says whether it has left a lane, and such lanes by exact(number of the lane).
+template <class Results, class Exact>
+[[gnu::noinline, gnu::cold]] void store_completed(Results results, Exact exact) {
+  results.complete(exact);
+  results.store();
+}
+template <class L, class Out, class Fast, class Exact>
+[[gnu::always_inline, gnu::flatten]] inline void store_results(Out out, Fast fast, Exact exact) {
+  RegisterResults<L, Out> results(out);
+  if (__builtin_expect(fast(results), 0)) return store_completed(results, exact);
+  results.store();
 }
 
 }  // namespace

@@ -26,11 +26,11 @@ inline V pinned(V result) {
 class HostFpu {
  public:
   template <class... Pointers>
-  explicit HostFpu(Pointers&... operands) : found_(read()) {
+  [[gnu::always_inline]] explicit HostFpu(Pointers&... operands) : found_(read()) {
     if (__builtin_expect((found_ & ~flags) != all_masked, 0)) write(all_masked);
     (pin_operand(operands), ...);
   }
-  ~HostFpu() {
+  [[gnu::always_inline]] ~HostFpu() {
     if (__builtin_expect(read() != found_, 0)) write(found_);
   }
   HostFpu(const HostFpu&) = delete;

@@ -3,11 +3,10 @@
 #ifndef KASTARRI_FLOAT_HOST_LANES_H
 #define KASTARRI_FLOAT_HOST_LANES_H
 
-#include <immintrin.h>
-
 #include <type_traits>
 
 #include "float/bits.h"
+#include "frame/intrinsics.h"
 #include "frame/layouts.h"
 #include "frame/registers.h"
 
@@ -30,23 +29,6 @@ inline Words words_of(Singles x) { return in_bits<Words>(x); }
 // Lanes of ones where the sign is set.
 inline Words sign_masks(Words x) { return in_bits<Words>(in_bits<Integers>(x) >> 31); }
 inline DoubleBits sign_masks(DoubleBits x) { return in_bits<DoubleBits>(in_bits<Vector<std::int64_t>>(x) < 0); }
-
-// Where the mask is set the one, elsewhere the other.
-template <class V>
-inline V chosen(V mask, V where_set, V elsewhere) {
-  return (mask & where_set) | (~mask & elsewhere);
-}
-
-// Whether a lane of words, or of halves of words, has its top bit set.
-template <class Lane>
-inline bool any_sign(Vector<Lane> x) {
-  constexpr unsigned tops = sizeof(Lane) == 2 ? 0xAAAAAAAA : 0x88888888;
-#ifdef __AVX2__
-  return (static_cast<unsigned>(_mm256_movemask_epi8(in_bits<Register>(x))) & tops) != 0;
-#else
-  return (static_cast<unsigned>(_mm_movemask_epi8(in_bits<Register>(x))) & tops) != 0;
-#endif
-}
 
 inline bool any_bit(Words x) {
 #ifdef __AVX2__

@@ -1,14 +1,16 @@
 // The operations. Each has `exact`, one number by the reference, and may have `fast`, a whole vector at
-// once: it leaves a NaN in every lane that is not for it and says whether there is any.
+// once: it leaves a NaN in every lane that is not for it and says whether there is any. Those that only a NaN
+// keeps from integers have `of_numbers` or `on_numbers`, a register of numbers.
 #ifndef KASTARRI_FLOAT_OPERATIONS_H
 #define KASTARRI_FLOAT_OPERATIONS_H
 
-#include <algorithm>
 #include <type_traits>
 
+#include "float/destination.h"
 #include "float/reference.h"
 #include "float/unit.h"
 #include "frame/lanes.h"
+#include "frame/registers.h"
 
 namespace {
 
@@ -40,7 +42,7 @@ inline auto turned_if(const T& x) {
 template <bool Subtract>
 struct Sum : OnUnit {
   template <class F>
-  static word exact(Environment& env, word a, word b) {
+  [[gnu::always_inline]] static word exact(Environment& env, word a, word b) {
     return add<F>(env, a, Subtract ? negated<F>(b) : b);
   }
   template <class L, class Results, class Units>
@@ -54,7 +56,7 @@ using SUB = Sum<true>;
 
 struct MUL : OnUnit {
   template <class F>
-  static word exact(Environment& env, word a, word b) {
+  [[gnu::always_inline]] static word exact(Environment& env, word a, word b) {
     return multiply<F>(env, a, b);
   }
   template <class L, class Results, class... Units>
@@ -68,7 +70,7 @@ struct MUL : OnUnit {
 template <bool Subtract>
 struct Fused : OnUnit {
   template <class F>
-  static word exact(Environment& env, word acc, word a, word b) {
+  [[gnu::always_inline]] static word exact(Environment& env, word acc, word a, word b) {
     return multiply_add<F>(env, acc, Subtract ? negated<F>(a) : a, b);
   }
   template <class L, class Results, class... Units>
@@ -83,31 +85,16 @@ using MULS = Fused<true>;
 
 // --- Order --------------------------------------------------------------------------------------------
 
-// All ones where one of them is a NaN.
+// Lanes whose top bit is set where one of v is a NaN.
 template <class F>
-constexpr typename F::lane nan_mask(typename F::lane x, typename F::lane y) {
+inline Vector<typename F::lane> nan_signs(Vector<typename F::lane> v) {
   using Lane = typename F::lane;
-  using Signed = std::make_signed_t<Lane>;  // of which more targets have the greater one
-  const auto greater = std::max(static_cast<Signed>(magnitude<F>(x)), static_cast<Signed>(magnitude<F>(y)));
-  return mask_below(static_cast<Lane>(F::infinity), static_cast<Lane>(greater));
+  return (v & static_cast<Lane>(F::sign - 1)) + static_cast<Lane>(F::sign - 1 - F::infinity);
 }
 
-// The lanes of the rule on numbers; a lane with a NaN operand is left.
-template <class L, class Rule, class Units>
-inline bool fast_ordered(typename L::container* results, Rule rule, const Units* a, const Units* b) {
-  using F = format_of<L>;
-  using Lane = typename F::lane;
-  const Read<L> x(a), y(b);
-  Lane left = 0;
-  KASTARRI_LANES_INDEPENDENT
-  for (int i = 0; i < L::count; ++i) {
-    const Lane a_lane = x[i], b_lane = y[i];
-    const Lane nan = nan_mask<F>(a_lane, b_lane);
-    left = static_cast<Lane>(left | nan);
-    results[i] = static_cast<Lane>((rule(order<F>(a_lane), order<F>(b_lane)) ? a_lane : b_lane) | nan);
-  }
-  return left != 0;
-}
+// Lanes as signed integers.
+inline Vector<std::int16_t> ordered(Vector<std::uint16_t> v) { return reinterpret_cast<Vector<std::int16_t>>(v); }
+inline Vector<std::int32_t> ordered(Vector<std::uint32_t> v) { return reinterpret_cast<Vector<std::int32_t>>(v); }
 
 template <bool Less, bool NumberWins>
 struct Extreme {
@@ -116,12 +103,18 @@ struct Extreme {
     constexpr auto choose = Less ? minimum<F> : maximum<F>;
     return NumberWins ? number_of<F>(env, a, b, choose) : choose(env, a, b);
   }
-  template <class L, class Units>
-  static bool fast(Environment&, typename L::container* r, const Units* a, const Units* b) {
-    return fast_ordered<L>(
-        r, [](auto x, auto y) { return Less ? x < y : x > y; }, a, b);
+  // Numbers are in the order of their bits as integers, unless both are negative: then of the others, those turned.
+  template <class V>
+  static V of_numbers(V a, V b) {
+    const auto turned = ordered(a & b) >> (8 * sizeof(a[0]) - 1);
+    const auto x = ordered(a) ^ turned, y = ordered(b) ^ turned;
+    return reinterpret_cast<V>((Less ? (x < y ? x : y) : (x > y ? x : y)) ^ turned);
   }
 };
+template <class Op>
+constexpr bool is_of_numbers = false;
+template <bool Less, bool NumberWins>
+constexpr bool is_of_numbers<Extreme<Less, NumberWins>> = true;
 using MIN = Extreme<true, false>;
 using MAX = Extreme<false, false>;
 using MINNUM = Extreme<true, true>;
@@ -149,18 +142,18 @@ struct MOV {
 };
 
 // One bit for the class: bits 0-4 -infinity, -normal, -subnormal, -0, +0, bits 5-7 +subnormal, +normal,
-// +infinity, bits 8 and 9 the signalling and the quiet NaN.
+// +infinity, bits 8 and 9 the signalling and the quiet NaN. By masks, so that compilers vectorise it.
 struct CLSFY {
-  template <class F>
-  static constexpr word on_bits(word a) {
-    const word m = magnitude<F>(a);
-    const auto either = [a](word positive, word negative) { return is_negative<F>(a) ? negative : positive; };
-    return m == 0             ? either(1 << 4, 1 << 3)
-           : m < F::unit      ? either(1 << 5, 1 << 2)
-           : m < F::infinity  ? either(1 << 6, 1 << 1)
-           : m == F::infinity ? either(1 << 7, 1 << 0)
-           : m & F::quiet     ? 1 << 9
-                              : 1 << 8;
+  template <class F, class Lane>
+  static constexpr Lane on_bits(Lane a) {
+    const auto m = static_cast<Lane>(magnitude<F>(a));
+    const auto above = [m](word bound) { return mask_below(static_cast<Lane>(bound), m); };
+    const Lane some = above(0), normal = above(F::unit - 1), infinite = above(F::largest), nan = above(F::infinity);
+    const auto up_from_zero = static_cast<Lane>(1 - (some + 2 * (normal + 2 * infinite)));  // 1, 2, 4, 8
+    const auto down_from_zero = static_cast<Lane>(9 - ((some ^ infinite) & 3) - up_from_zero);
+    const auto positive = static_cast<Lane>(up_from_zero << 4);
+    const auto quiet = static_cast<Lane>(256 + (a & F::quiet) / (F::quiet / 256));
+    return chosen(nan, quiet, chosen(mask_below(m, a), down_from_zero, positive));
   }
 };
 
@@ -205,18 +198,20 @@ template <class Holds, bool Unordered, bool Signalling>
 struct Relation {
   // Unlike order(), both zeros are 0.
   template <class F>
-  static constexpr auto key(typename F::lane x) {
-    using Lane = typename F::lane;
-    const Lane sign = sign_mask(x);
-    return static_cast<std::make_signed_t<Lane>>(((x & (F::sign - 1)) ^ sign) - sign);
+  static auto key(Vector<typename F::lane> v) {
+    return signed_as(ordered(v & static_cast<typename F::lane>(F::sign - 1)), ordered(v));
   }
   template <class F>
-  static bool on_numbers(typename F::lane a, typename F::lane b) {
+  static auto key(word x) {
+    return static_cast<std::int32_t>((magnitude<F>(x) ^ sign_of<F>(x)) - sign_of<F>(x));
+  }
+  template <class F>
+  static auto on_numbers(Vector<typename F::lane> a, Vector<typename F::lane> b) {
     return Holds()(key<F>(a), key<F>(b));
   }
   template <class F>
   static bool exact(Environment& env, word a, word b) {
-    if (!any_nan<F>(a, b)) return on_numbers<F>(static_cast<typename F::lane>(a), static_cast<typename F::lane>(b));
+    if (!any_nan<F>(a, b)) return Holds()(key<F>(a), key<F>(b));
     if (Signalling || is_signalling<F>(a) || is_signalling<F>(b)) env.raise(invalid);
     return Unordered;
   }
@@ -224,44 +219,44 @@ struct Relation {
 
 struct Equal {
   template <class T>
-  constexpr bool operator()(T x, T y) const {
+  constexpr auto operator()(T x, T y) const {
     return x == y;
   }
 };
 struct Less {
   template <class T>
-  constexpr bool operator()(T x, T y) const {
+  constexpr auto operator()(T x, T y) const {
     return x < y;
   }
 };
 struct LessOrEqual {
   template <class T>
-  constexpr bool operator()(T x, T y) const {
+  constexpr auto operator()(T x, T y) const {
     return x <= y;
   }
 };
 struct Greater {
   template <class T>
-  constexpr bool operator()(T x, T y) const {
+  constexpr auto operator()(T x, T y) const {
     return x > y;
   }
 };
 struct GreaterOrEqual {
   template <class T>
-  constexpr bool operator()(T x, T y) const {
+  constexpr auto operator()(T x, T y) const {
     return x >= y;
   }
 };
 struct NotEqual {
   template <class T>
-  constexpr bool operator()(T x, T y) const {
+  constexpr auto operator()(T x, T y) const {
     return x != y;
   }
 };
 struct Never {
   template <class T>
-  constexpr bool operator()(T, T) const {
-    return false;
+  constexpr auto operator()(T, T) const {
+    return T{} != T{};
   }
 };
 

@@ -12,13 +12,14 @@
 
 namespace {
 
-// The finite number +-significand * 2^exponent, exact; or, where its last bit is sticky, a number
-// within one unit of it that rounds to the same. The significand leaves the top bit of S free.
+// The finite number +-significand * 2^exponent; where bits have been lost, one that lies between it and the next
+// significand. The significand leaves the top bit of S free.
 template <class S>
 struct Number {
-  bool negative;
+  word negative;  // all ones or 0
   int exponent;
   S significand;
+  word lost = 0;  // 1 where bits have been lost
 };
 
 // Every sum, and every product of halves, has room in a word for all that rounding asks of it; products
@@ -26,8 +27,7 @@ struct Number {
 template <class F>
 using ProductSignificand = std::conditional_t<F::bits == 16, word, std::uint64_t>;
 
-inline int highest_bit(word x) { return 31 - __builtin_clz(x); }
-inline int highest_bit(std::uint64_t x) { return 63 - __builtin_clzll(x); }
+inline int highest_bit(word x) { return 31 ^ __builtin_clz(x); }
 
 // x shifted right by s > 0, the last bit sticky: 1 when any bit was lost.
 template <class S>
@@ -36,12 +36,31 @@ inline S shift_right_sticky(S x, int s) {
   return static_cast<S>(x >> s) | ((x & ((S{1} << s) - 1)) != 0);
 }
 
-template <class F, class S = word>
-inline Number<S> unpack(word x) {
+// Less than that of any product, lest 0 count as the greater of two numbers.
+constexpr int exponent_of_zero = -1000;
+
+// All ones for a number below 0 and for -0, else 0.
+template <class F>
+constexpr word sign_of(word x) {
+  return static_cast<word>(static_cast<std::int32_t>(x << (32 - F::bits)) >> 31);
+}
+
+template <class F>
+inline Number<word> unpack(word x) {
   const word field = magnitude<F>(x) >> F::fraction_bits;
   const word fraction = x & (F::unit - 1);
-  return field == 0 ? Number<S>{is_negative<F>(x), F::least_quantum, fraction}
-                    : Number<S>{is_negative<F>(x), F::least_quantum + static_cast<int>(field) - 1, fraction | F::unit};
+  if (__builtin_expect(field == 0, 0))
+    return {sign_of<F>(x), fraction == 0 ? exponent_of_zero : F::least_quantum, fraction};
+  return {sign_of<F>(x), F::least_quantum + static_cast<int>(field) - 1, fraction | F::unit};
+}
+
+// The magnitude with its last Count bits such that to drop them rounds it.
+template <int Count>
+[[gnu::always_inline]] inline word rounded_up(word magnitude, word negative, Rounding rounding) {
+  constexpr word half = word{1} << (Count - 1);
+  if (__builtin_expect(rounding == to_nearest, 1)) return magnitude + (half - 1) + (magnitude >> Count & 1);
+  if (rounding == ties_away) return magnitude + half;
+  return magnitude + (rounding == (negative ? downward : upward) ? 2 * half - 1 : 0);
 }
 
 struct Integer {
@@ -55,74 +74,77 @@ inline Integer round_at(const Number<word>& x, int quantum, Rounding rounding) {
   if (shift <= 0) return {x.significand << -shift, true};
   // Twice the result with a sticky bit below: a half, and more than nothing beyond it.
   const word doubled = shift == 1 ? x.significand << 1 : shift_right_sticky(x.significand, shift - 2);
-  const word below = doubled >> 2;
-  const word rest = doubled & 3;
-  if (rest == 0) return {below, true};
-  bool up = false;
-  switch (rounding) {
-    case to_nearest:
-      up = rest + (below & 1) > 2;
-      break;
-    case ties_away:
-      up = rest >= 2;
-      break;
-    case toward_zero:
-      break;
-    case upward:
-      up = !x.negative;
-      break;
-    case downward:
-      up = x.negative;
-      break;
-  }
-  return {below + up, false};
+  return {rounded_up<2>(doubled, x.negative, rounding) >> 2, (doubled & 3) == 0};
 }
 
 template <class F>
-inline word overflowed(Environment& env, bool negative) {
+inline word overflowed(Environment& env, word negative) {
   env.raise(overflow | inexact);
   const bool finite = env.rounding == toward_zero || env.rounding == (negative ? upward : downward);
-  return (finite ? F::largest : F::infinity) | (negative ? F::sign : 0);
-}
-
-// Tiny: below the least normal number when rounded as if exponents had no bound. `top` is the exponent
-// of x's highest bit.
-template <class F>
-inline bool is_tiny(const Number<word>& x, int top, Rounding rounding) {
-  if (top >= F::least_exponent) return false;
-  if (top < F::least_exponent - 1) return true;
-  return round_at(x, top - F::fraction_bits, rounding).value < 2 * F::unit;
+  return (finite ? F::largest : F::infinity) | (negative & F::sign);
 }
 
 // The one rounding step: x in the format F.
 template <class F>
-inline word round_pack(Environment& env, const Number<word>& x) {
-  const word sign = x.negative ? F::sign : 0;
-  if (x.significand == 0) return sign;
-  const int top = x.exponent + highest_bit(x.significand);
-  if (top > F::greatest_exponent) return overflowed<F>(env, x.negative);
-  const int quantum = top < F::least_exponent ? F::least_quantum : top - F::fraction_bits;
-  const Integer kept = round_at(x, quantum, env.rounding);
-  // The integer holds the hidden bit: it adds one to the exponent field, or two when rounding has
-  // carried into it, and none for a subnormal.
-  const word bits = kept.value + (static_cast<word>(quantum - F::least_quantum) << F::fraction_bits);
-  if (kept.exact) return sign | bits;
-  if (bits >= F::infinity) return overflowed<F>(env, x.negative);
-  env.raise(is_tiny<F>(x, top, env.rounding) ? inexact | underflow : inexact);
-  return sign | bits;
+[[gnu::always_inline]] inline word round_pack(Environment& env, const Number<word>& x) {
+  const word sign = x.negative & F::sign;
+  word significand = x.significand;
+  if (__builtin_expect(significand == 0, 0)) {
+    if (x.lost == 0) return sign;
+    significand = 1;  // as well as any that is below the quantum by far
+  }
+  // All but `dropped` bits are the format's, once the highest is bit 30.
+  constexpr int dropped = 30 - F::fraction_bits;
+  const int lead = 30 - highest_bit(significand);
+  significand = significand << lead | x.lost;
+  int above = x.exponent + 30 - lead - F::least_exponent;
+  bool tiny = false;
+  if (__builtin_expect(static_cast<word>(above) > word{F::greatest_exponent - F::least_exponent}, 0)) {
+    if (above > 0) return overflowed<F>(env, x.negative);
+    // Tiny: below the least normal number when rounded as if exponents had no bound.
+    tiny = above < -1 || rounded_up<dropped>(significand, x.negative, env.rounding) >> 31 == 0;
+    significand = shift_right_sticky(significand, -above);
+    above = 0;
+  }
+  const word rounded = rounded_up<dropped>(significand, x.negative, env.rounding);
+  // What is kept holds the hidden bit: it adds one to the exponent field, or two when rounding has carried into it, and
+  // none for a subnormal.
+  const word field = static_cast<word>(above) << F::fraction_bits;
+  const word bits = (rounded >> dropped) + field;
+  if (__builtin_expect(bits >= F::infinity, 0)) return overflowed<F>(env, x.negative);
+  if ((significand & ((word{1} << dropped) - 1)) != 0) env.raise(tiny ? inexact | underflow : inexact);
+  return (rounded >> dropped) + (field | sign);
 }
 
-// The same for more bits: all but the first 31 become the sticky one.
+// Whether a number has bits enough for the format, and one more, which with what is lost tells how it is rounded.
+template <class F>
+constexpr bool is_long_enough(word significand) {
+  return significand >> (F::fraction_bits + 1) != 0;
+}
+
+inline Number<word> upper_word(const Number<std::uint64_t>& x) {
+  const auto high = static_cast<word>(x.significand >> 32), low = static_cast<word>(x.significand);
+  return {x.negative, x.exponent + 32, high, word{low != 0} | x.lost};
+}
+
+template <class F>
+inline Number<word> narrowed(const Number<word>& x) {
+  return x;
+}
+template <class F>
+inline Number<word> narrowed(const Number<std::uint64_t>& x) {
+  const Number<word> upper = upper_word(x);
+  if (__builtin_expect(is_long_enough<F>(upper.significand), 1)) return upper;
+  const auto low = static_cast<word>(x.significand);
+  if (upper.significand == 0 && low >> 31 == 0) return {x.negative, x.exponent, low, x.lost};
+  const int lead = upper.significand == 0 ? 31 : 30 - highest_bit(upper.significand);
+  const word kept = upper.significand << lead | low >> 1 >> (31 - lead);
+  return {x.negative, upper.exponent - lead, kept, word{low << lead != 0} | x.lost};
+}
+
 template <class F>
 inline word round_pack(Environment& env, const Number<std::uint64_t>& x) {
-  const auto high = static_cast<word>(x.significand >> 32), low = static_cast<word>(x.significand);
-  if (high != 0) {
-    const int lead = 30 - highest_bit(high);
-    const word kept = high << lead | low >> 1 >> (31 - lead);
-    return round_pack<F>(env, Number<word>{x.negative, x.exponent + 32 - lead, kept | ((low << lead) != 0)});
-  }
-  if (low >> 31 != 0) return round_pack<F>(env, Number<word>{x.negative, x.exponent + 1, low >> 1 | (low & 1)});
-  return round_pack<F>(env, Number<word>{x.negative, x.exponent, low});
+  return round_pack<F>(env, narrowed<F>(x));
 }
 
 // --- NaN ----------------------------------------------------------------------------------------------
@@ -155,34 +177,63 @@ constexpr word negated(word x) {
 
 // --- Sums and products --------------------------------------------------------------------------------
 
-// x + y with the last bit sticky. The number of the greater exponent is shifted to that of the other. Where there is
-// no room for all of it, its highest bit comes to lie two below the top, which leaves room for a carry, and the other
-// loses bits; it is the lesser by far then, so that a difference keeps all but one of the leading bits: five more, at
-// least, than the formats have.
+// Sums are made of significands that lie as high as S has room for them, below the top bit and one for a carry: of
+// numbers of the format, and of products of two. The one of the lesser exponent is shifted to the other's. It loses
+// bits only where the other's hidden bit outweighs it by far, so that a difference keeps all but one of the leading
+// bits: two more, at least, than the format has; or where the other is subnormal, and what is lost lies below the
+// quantum of all results.
 template <class S>
-inline Number<S> sum(Number<S> x, Number<S> y, Rounding rounding) {
-  if (x.significand == 0 && y.significand == 0)
-    return {x.negative == y.negative ? x.negative : rounding == downward, x.exponent, 0};
-  if (x.significand == 0) return y;
-  if (y.significand == 0) return x;
-  if (x.exponent < y.exponent) std::swap(x, y);
-  const int apart = x.exponent - y.exponent, room = static_cast<int>(8 * sizeof(S)) - 3 - highest_bit(x.significand);
-  x.significand <<= apart < room ? apart : room;
-  x.exponent = y.exponent;
-  if (apart > room) {
-    x.exponent += apart - room;
-    y.significand = shift_right_sticky(y.significand, apart - room);
-  }
-  if (x.negative == y.negative) return {x.negative, x.exponent, x.significand + y.significand};
-  if (x.significand == y.significand) return {rounding == downward, x.exponent, 0};
-  if (x.significand > y.significand) return {x.negative, x.exponent, x.significand - y.significand};
-  return {y.negative, x.exponent, y.significand - x.significand};
+constexpr int summand_bits = 8 * sizeof(S) - 2;
+
+template <class F, class S = word>
+inline Number<S> summand(word x) {
+  constexpr int lift = summand_bits<S> - (F::fraction_bits + 1);
+  const Number<word> number = unpack<F>(x);
+  return {number.negative, number.exponent - lift, static_cast<S>(number.significand) << lift};
 }
 
 template <class F, class P = ProductSignificand<F>>
-inline Number<P> product(word a, word b) {
-  const Number<P> x = unpack<F, P>(a), y = unpack<F, P>(b);
-  return {x.negative != y.negative, x.exponent + y.exponent, x.significand * y.significand};
+[[gnu::always_inline]] inline Number<P> product(word a, word b) {
+  constexpr int lift = summand_bits<P> / 2 - (F::fraction_bits + 1);
+  const Number<word> x = unpack<F>(a), y = unpack<F>(b);
+  return {x.negative ^ y.negative, x.exponent + y.exponent - 2 * lift,
+          static_cast<P>(x.significand << lift) * (y.significand << lift)};
+}
+
+template <class S>
+[[gnu::always_inline]] inline Number<S> sum(Number<S> x, Number<S> y, Rounding rounding) {
+  using Signed = std::make_signed_t<S>;
+  if (x.exponent < y.exponent) std::swap(x, y);
+  int apart = x.exponent - y.exponent;
+  if (__builtin_expect(apart >= static_cast<int>(8 * sizeof(S)), 0)) {
+    y.significand = y.significand != 0;
+    apart = 1;
+  }
+  const word lost = x.lost | y.lost | word{(y.significand & ((S{1} << apart) - 1)) != 0};
+  // ~((y - 1) >> n) is -y >> n, both rounded down; if y has lost something, so is ~(y >> n).
+  const auto differ = static_cast<S>(static_cast<Signed>(static_cast<std::int32_t>(x.negative ^ y.negative)));
+  const S less = y.lost != 0 ? y.significand : y.significand + differ;
+  const S total = x.significand + (static_cast<S>(static_cast<Signed>(less) >> apart) ^ differ);
+  if (__builtin_expect(static_cast<Signed>(total) > 0, 1)) return {x.negative, x.exponent, total, lost};
+  if (total == 0 && lost == 0) return {differ != 0 ? (rounding == downward ? ~word{0} : 0) : x.negative, x.exponent, 0};
+  if (total == 0) return {x.negative, x.exponent, 0, lost};
+  return {y.negative, x.exponent, ~total + 1 - lost, lost};
+}
+
+template <class F>
+[[gnu::always_inline]] inline Number<word> sum_with_product(word acc, const Number<word>& p, Rounding rounding) {
+  return sum(p, summand<F>(acc), rounding);
+}
+// Of a product of two words the upper one will do, unless both summands lose bits or few remain.
+template <class F>
+[[gnu::always_inline]] inline Number<word> sum_with_product(word acc, const Number<std::uint64_t>& p,
+                                                            Rounding rounding) {
+  const Number<word> upper = upper_word(p), c = summand<F>(acc);
+  if (__builtin_expect(upper.exponent - c.exponent <= summand_bits<word> - (F::fraction_bits + 1), 1)) {
+    const Number<word> total = sum(upper, c, rounding);
+    if (__builtin_expect(is_long_enough<F>(total.significand), 1)) return total;
+  }
+  return narrowed<F>(sum(p, summand<F, std::uint64_t>(acc), rounding));
 }
 
 // Neither infinite nor NaNs.
@@ -192,16 +243,16 @@ constexpr bool all_finite(X... x) {
 }
 
 template <class F>
-inline word add(Environment& env, word a, word b) {
+[[gnu::always_inline]] inline word add(Environment& env, word a, word b) {
   if (__builtin_expect(all_finite<F>(a, b), 1))
-    return round_pack<F>(env, sum(unpack<F>(a), unpack<F>(b), env.rounding));
+    return round_pack<F>(env, sum(summand<F>(a), summand<F>(b), env.rounding));
   if (any_nan<F>(a, b)) return nan_of<F>(env, a, b);
   if (is_infinite<F>(a)) return is_infinite<F>(b) && a != b ? invalid_result<F>(env) : a;
   return b;
 }
 
 template <class F>
-inline word multiply(Environment& env, word a, word b) {
+[[gnu::always_inline]] inline word multiply(Environment& env, word a, word b) {
   if (__builtin_expect(all_finite<F>(a, b), 1)) return round_pack<F>(env, product<F>(a, b));
   if (any_nan<F>(a, b)) return nan_of<F>(env, a, b);
   return is_zero<F>(a) || is_zero<F>(b) ? invalid_result<F>(env) : ((a ^ b) & F::sign) | F::infinity;
@@ -209,9 +260,9 @@ inline word multiply(Environment& env, word a, word b) {
 
 // acc + a * b, rounded once.
 template <class F>
-inline word multiply_add(Environment& env, word acc, word a, word b) {
+[[gnu::always_inline]] inline word multiply_add(Environment& env, word acc, word a, word b) {
   if (__builtin_expect(all_finite<F>(a, b, acc), 1))
-    return round_pack<F>(env, sum(product<F>(a, b), unpack<F, ProductSignificand<F>>(acc), env.rounding));
+    return round_pack<F>(env, sum_with_product<F>(acc, product<F>(a, b), env.rounding));
   if (any_nan<F>(a, b, acc)) return nan_of<F>(env, a, b, acc);
   if (is_infinite<F>(a) || is_infinite<F>(b)) {
     if (is_zero<F>(a) || is_zero<F>(b)) return invalid_result<F>(env);
@@ -269,7 +320,8 @@ inline word to_integral(Environment& env, word x, Rounding rounding, bool tells_
 template <class F>
 inline word from_integer(Environment& env, std::int64_t value, word scale) {
   const std::uint64_t bits = static_cast<std::uint64_t>(value);
-  return round_pack<F>(env, Number<std::uint64_t>{value < 0, -static_cast<int>(scale), value < 0 ? -bits : bits});
+  return round_pack<F>(
+      env, Number<std::uint64_t>{value < 0 ? ~word{0} : 0, -static_cast<int>(scale), value < 0 ? -bits : bits});
 }
 
 // x * 2^scale truncated, as an integer of that width and signedness; out of range, the bound. A NaN

@@ -30,16 +30,16 @@ template <class R, class From, class Results, class Units>
 #else
 constexpr bool rounds_by_instruction = false;
 
-template <class L, class Out, class Fast, class Exact>
-void store_by_register(Out out, Fast fast, Exact exact);  // which this unit has no use for
-
-template <class R, class... Ls, class Mode, class Rule, class... Units>
-[[gnu::always_inline]] inline HostResult on_unit(const Mode& mode, typename R::container* results, Rule rule,
+template <class R, class... Ls, class Results, class Mode, class Rule, class... Units>
+[[gnu::always_inline]] inline HostResult on_unit(const Mode& mode, Results& results, Rule rule,
                                                  const Units*... operands) {
-  return on_host<R, Ls...>(mode, results, rule, operands...);
+  if constexpr (Results::is_predicated)
+    return on_host<R, Ls...>(mode, results, rule, EnabledLanes<Ls>(operands, results).lane...);
+  else
+    return on_host<R, Ls...>(mode, results, rule, operands...);
 }
-template <class R, class From, class Units>
-inline HostResult truncated_on_unit(typename R::container* results, word scale, const Units* operand) {
+template <class R, class From, class Results, class Units>
+[[gnu::always_inline]] inline HostResult truncated_on_unit(Results& results, word scale, const Units* operand) {
   return truncated_on_host<R, From>(results, scale, operand);
 }
 #endif

@@ -2,112 +2,98 @@
 #ifndef KASTARRI_FLOAT_VECTORS_H
 #define KASTARRI_FLOAT_VECTORS_H
 
-#include <cstring>
-
 #include "float/operations.h"
 #include "tables/float_constants.h"
 
 namespace {
 
-// One lane is quickest by the reference, but for the fused operations on singles, whose exact sum is long.
+// A lane alone in a whole word: compilers would compute in 16 bits, where constants hold processors' decoders up.
+inline word in_word(word lane) {
+  asm("" : "+r"(lane));
+  return lane;
+}
+
+// A lane of a vector, which is one of many places: there the reference is called, alone it is inlined.
+template <class Op, class F, class... X>
+[[gnu::noinline]] word exact_lane(Environment& env, X... x) {
+  return Op::template exact<F>(env, x...);
+}
+
+// One lane is quickest by the reference, but for the fused operations on singles where instructions carry their
+// rounding.
 template <class Op, class L>
 constexpr bool is_fast_alone = false;
 template <bool Subtract>
 constexpr bool is_fast_alone<Fused<Subtract>, f32x1> = rounds_by_instruction;
 
-// --- Results in a register ---------------------------------------------------------------------------
+// --- Operations on numbers ------------------------------------------------------------------------------
 
-template <class L, class Op>
-constexpr bool is_by_register = (L::count > 1 ||
-                                 is_fast_alone<Op, L>)&&rounds_by_instruction&& std::is_base_of_v<OnUnit, Op>;
+// The lanes with a NaN by the reference.
+template <class L, class Op, class Out, class Units>
+[[gnu::noinline]] void apply_with_nans(Out out, const Units* a, const Units* b) {
+  using F = format_of<L>;
+  using Lane = lane_of<L>;
+  const Destination<L, Out> to(out);
+  alignas(64) Lane results[L::count], left[L::count];
+  for (int k = 0; k < registers_of<L>; ++k) {
+    const auto x = load_register<Lane>(a, k), y = load_register<Lane>(b, k);
+    store_register(left, k, to.enabled(nan_signs<F>(x) | nan_signs<F>(y), k));
+    store_register(results, k, Op::of_numbers(x, y));
+  }
+  Environment env;
+  for (int i = 0; i < L::count; ++i)
+    if (is_negative<F>(left[i]))
+      results[i] = static_cast<Lane>(exact_lane<Op, F>(env, word{Read<L>(a)[i]}, word{Read<L>(b)[i]}));
+  for (int k = 0; k < registers_of<L>; ++k) to.store(k, load_register<Lane>(results, k));
+}
+
+// Results of an operation on numbers, by registers. They may lie where one of the operands does.
+template <class L, class Op, class Out, class Units>
+inline void apply_to_numbers(Out out, const Units* a, const Units* b) {
+  using Lane = lane_of<L>;
+  const Destination<L, Out> to(out);
+  const auto nans = [](const Units* v, int k) { return nan_signs<format_of<L>>(load_register<Lane>(v, k)); };
+  Vector<Lane> left{};
+  for (int k = 0; k < registers_of<L>; ++k) left |= to.enabled(nans(a, k) | nans(b, k), k);
+  if (__builtin_expect(any_sign<Lane>(left), 0)) return apply_with_nans<L, Op>(out, a, b);
+  for (int k = 0; k < registers_of<L>; ++k)
+    to.store(k, Op::of_numbers(load_register<Lane>(a, k), load_register<Lane>(b, k)));
+}
+
+// --- Operations on the unit -----------------------------------------------------------------------------
 
 template <class L, class Op, class Out, class... Units>
-[[gnu::always_inline]] inline void apply_by_register(Environment& env, Out out, const Units*... operands) {
-  store_by_register<L>(
-      out, [ =, &env ](auto& results) __attribute__((always_inline)) {
-        return Op::template fast<L>(env, results, operands...);
-      },
-      [=, &env](int i) { return Op::template exact<format_of<L>>(env, Read<L>(operands)[i]...); });
-}
-
-// --- Results in memory -------------------------------------------------------------------------------
-
-// Results with the lanes that the fast path left, which are NaNs, by the reference. By value, for what is passed by its
-// address cannot stay in registers.
-template <class L, class Op, class... Units>
-[[gnu::noinline, gnu::cold]] Results<L> completed(Environment& env, Results<L> results, const Units*... operands) {
+[[gnu::always_inline]] inline void apply(Environment& env, Out out, const Units*... operands) {
   using F = format_of<L>;
-  for (int i = 0; i < L::count; ++i)
-    if (is_nan<F>(results.lane[i]))
-      results.lane[i] = static_cast<lane_of<L>>(Op::template exact<F>(env, Read<L>(operands)[i]...));
-  return results;
-}
-
-// Lane i = Op of lanes i of the operands.
-template <class L, class Op, class... Units>
-[[gnu::always_inline, gnu::flatten]] inline Results<L> compute(Environment& env, const Units*... operands) {
-  using F = format_of<L>;
-  Results<L> results;
   if constexpr (L::count == 1 && !is_fast_alone<Op, L>) {
-    results.lane[0] = static_cast<lane_of<L>>(Op::template exact<F>(env, Read<L>(operands)[0]...));
-  } else if (__builtin_expect(Op::template fast<L>(env, results.lane, operands...), 0)) {
-    const Results<L> all = completed<L, Op>(env, results, operands...);
-    results = all;
-  }
-  return results;
-}
-
-template <class L, class Op, class Unit, class... Units>
-[[gnu::always_inline]] inline void apply(Environment& env, Unit* out, const Units*... operands) {
-  if constexpr (is_by_register<L, Op>) {
-    apply_by_register<L, Op>(env, out, operands...);
+    Write<L>(units_of(out)).put(0, Op::template exact<F>(env, in_word(Read<L>(operands)[0])...));
   } else {
-    const Results<L> results = compute<L, Op>(env, operands...);
-    std::memcpy(out, results.lane, sizeof results.lane);
+    const auto fast = [ =, &env ](auto& results) __attribute__((always_inline)) {
+      return Op::template fast<L>(env, results, operands...);
+    };
+    store_results<L>(out, fast, [=, &env](int i) { return exact_lane<Op, F>(env, word{Read<L>(operands)[i]}...); });
   }
 }
 
-template <class L, class Op, class Unit, class... Units>
-[[gnu::always_inline]] inline void apply(Unit* out, const Units*... operands) {
-  Environment env;
-  apply<L, Op>(env, out, operands...);
-}
-
-// An operand with 1 in the lanes that are not enabled: it is no special number, nor far from any that are with it in
-// its lane, and no operation here raises a flag for it.
-template <class L>
-struct EnabledLanes {
-  template <class Unit>
-  EnabledLanes(const Unit* operand, const LaneMask<L::bits, L::count>& enabled) {
-    constexpr auto one = static_cast<lane_of<L>>(format_of<L>::one);
-    const Read<L> from(operand);
-    KASTARRI_LANES_INDEPENDENT
-    for (int i = 0; i < L::count; ++i)
-      lane[i] = static_cast<lane_of<L>>((from[i] & enabled.lane[i]) | (one & ~enabled.lane[i]));
-  }
-  alignas(64) lane_of<L> lane[L::count];
-};
-
-template <class L, class Op, class Unit, class PredicateUnit, class... Units>
-inline void apply(UnitsUnder<Unit, PredicateUnit, false> out, const Units*... operands) {
-  Environment env;
-  if constexpr (is_by_register<L, Op>) {
-    apply_by_register<L, Op>(env, out, operands...);
+template <class L, class Op, class Out, class... Units>
+[[gnu::always_inline]] inline void apply(Out out, const Units*... operands) {
+  if constexpr (L::count > 1 && is_of_numbers<Op>) {
+    apply_to_numbers<L, Op>(out, operands...);
   } else {
-    LaneMask<L::bits, L::count> enabled;
-    enabled.expand(out.predicate);
-    const Results<L> results = compute<L, Op>(env, EnabledLanes<L>(operands, enabled).lane...);
-    const Read<L> result(results.lane), old(out.units);
-    const Write<L> to(out.units);
-    KASTARRI_LANES_INDEPENDENT
-    for (int i = 0; i < L::count; ++i)  // by masks: of a choice the compiler makes a store under a branch
-      to.put(i, static_cast<lane_of<L>>(old[i] ^ ((old[i] ^ result[i]) & enabled.lane[i])));
+    if (L::count == 1 && !is_enabled(out)) return;
+    Environment env;
+    apply<L, Op>(env, out, operands...);
   }
 }
 
 // An operation on bits alone, without flags, as a rule on lanes.
 template <class Op, class L>
-constexpr auto bits_rule = [](lane_of<L> lane) { return Op::template on_bits<format_of<L>>(lane); };
+constexpr auto bits_rule = [](lane_of<L> lane) {
+  if constexpr (L::count == 1)
+    return Op::template on_bits<format_of<L>>(in_word(lane));
+  else
+    return Op::template on_bits<format_of<L>>(lane);
+};
 
 // Constant `number` in the layout's format.
 template <class L>
@@ -120,26 +106,44 @@ constexpr word constant(word number) {
 template <class Unit>
 using layout_of_unit = std::conditional_t<sizeof(Unit) == 2, f16x1, f32x1>;
 
+// The lanes for which the relation holds, by registers; those with a NaN aside.
+template <class L, class Op>
+struct Related : LaneMask<L::bits, L::count> {
+  template <class Units>
+  Related(const Units* a, const Units* b) {
+    using Lane = lane_of<L>;
+    Vector<Lane> nans{};
+    for (int k = 0; k < registers_of<L>; ++k) {
+      const auto x = load_register<Lane>(a, k), y = load_register<Lane>(b, k);
+      nans |= nan_signs<format_of<L>>(x) | nan_signs<format_of<L>>(y);
+      store_register(this->lane, k, Op::template on_numbers<format_of<L>>(x, y));
+    }
+    some_nan = any_sign<Lane>(nans);
+  }
+  bool some_nan;
+};
+
+template <class L, class Op, class Bits, class Units>
+[[gnu::noinline]] void compare_with_nans(Bits* out, const Units* a, const Units* b) {
+  using F = format_of<L>;
+  Related<L, Op> holds(a, b);
+  const Read<L> x(a), y(b);
+  Environment env;
+  for (int i = 0; i < L::count; ++i)
+    if (any_nan<F>(x[i], y[i]))
+      holds.lane[i] = static_cast<lane_of<L>>(Op::template exact<F>(env, x[i], y[i]) ? -1 : 0);
+  holds.collect(out);
+}
+
 // Bit i of the predicate = the relation of lanes i.
 template <class L, class Op, class Bits, class Units>
 inline void compare(Bits* out, const Units* a, const Units* b) {
-  using F = format_of<L>;
-  const Read<L> x(a), y(b);
   if constexpr (L::count == 1) {
     Environment env;
-    out[0] = static_cast<Bits>(Op::template exact<F>(env, x[0], y[0]));
+    out[0] = static_cast<Bits>(Op::template exact<format_of<L>>(env, in_word(Read<L>(a)[0]), in_word(Read<L>(b)[0])));
   } else {
-    LaneMask<L::bits, L::count> holds;
-    KASTARRI_LANES_INDEPENDENT
-    for (int i = 0; i < L::count; ++i)
-      holds.lane[i] = static_cast<lane_of<L>>(Op::template on_numbers<F>(x[i], y[i]) ? -1 : 0);
-    lane_of<L> left = 0;
-    for (int i = 0; i < L::count; ++i) left = static_cast<lane_of<L>>(left | nan_mask<F>(x[i], y[i]));
-    if (__builtin_expect(left != 0, 0)) {
-      Environment env;
-      for (int i = 0; i < L::count; ++i)
-        holds.lane[i] = static_cast<lane_of<L>>(Op::template exact<F>(env, x[i], y[i]) ? -1 : 0);
-    }
+    const Related<L, Op> holds(a, b);
+    if (__builtin_expect(holds.some_nan, 0)) return compare_with_nans<L, Op>(out, a, b);
     holds.collect(out);
   }
 }

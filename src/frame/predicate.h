@@ -3,10 +3,9 @@
 #ifndef KASTARRI_FRAME_PREDICATE_H
 #define KASTARRI_FRAME_PREDICATE_H
 
-#include <immintrin.h>
-
 #include <cstdint>
 
+#include "frame/intrinsics.h"
 #include "frame/layouts.h"
 
 namespace {

@@ -3,11 +3,11 @@
 #ifndef KASTARRI_FRAME_REGISTERS_H
 #define KASTARRI_FRAME_REGISTERS_H
 
-#include <immintrin.h>
-
 #include <cstdint>
 #include <cstring>
 #include <utility>
+
+#include "frame/intrinsics.h"
 
 namespace {
 
@@ -49,6 +49,38 @@ template <class V>
 inline void store_register(void* to, int k, V v) {
   std::memcpy(static_cast<unsigned char*>(to) + k * register_bytes, &v, sizeof v);
 }
+
+// Whether the top bit of any lane is set.
+template <class Lane>
+inline bool any_sign(Vector<Lane> v) {
+  constexpr Lane sign = static_cast<Lane>(Lane{1} << (8 * sizeof(Lane) - 1));
+  const auto signs = v & sign;
+#if defined __AVX512BW__
+  return _mm512_test_epi32_mask(reinterpret_cast<__m512i>(signs), reinterpret_cast<__m512i>(signs)) != 0;
+#elif defined __AVX2__
+  return _mm256_testz_si256(reinterpret_cast<__m256i>(signs), reinterpret_cast<__m256i>(signs)) == 0;
+#else
+  return _mm_movemask_epi8(reinterpret_cast<__m128i>(signs)) != 0;
+#endif
+}
+
+// Magnitudes with the signs of v, where it is not 0.
+#if defined __AVX2__ && !defined __AVX512BW__
+inline Vector<std::int16_t> signed_as(Vector<std::int16_t> magnitudes, Vector<std::int16_t> v) {
+  return reinterpret_cast<Vector<std::int16_t>>(
+      _mm256_sign_epi16(reinterpret_cast<__m256i>(magnitudes), reinterpret_cast<__m256i>(v)));
+}
+inline Vector<std::int32_t> signed_as(Vector<std::int32_t> magnitudes, Vector<std::int32_t> v) {
+  return reinterpret_cast<Vector<std::int32_t>>(
+      _mm256_sign_epi32(reinterpret_cast<__m256i>(magnitudes), reinterpret_cast<__m256i>(v)));
+}
+#else
+template <class V>
+inline V signed_as(V magnitudes, V v) {
+  const V negative = v >> (8 * static_cast<int>(sizeof(v[0])) - 1);
+  return (magnitudes ^ negative) - negative;
+}
+#endif
 
 // Words that fill a block, one after the other and again, and that block over and over.
 template <int Words, std::size_t... I>

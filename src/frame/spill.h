@@ -2,8 +2,7 @@
 #ifndef KASTARRI_FRAME_SPILL_H
 #define KASTARRI_FRAME_SPILL_H
 
-#include <immintrin.h>
-
+#include "frame/intrinsics.h"
 #include "frame/lanes.h"
 
 namespace {

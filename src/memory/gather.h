@@ -2,11 +2,10 @@
 #ifndef KASTARRI_MEMORY_GATHER_H
 #define KASTARRI_MEMORY_GATHER_H
 
-#include <immintrin.h>
-
 #include <cstring>
 #include <utility>
 
+#include "frame/intrinsics.h"
 #include "frame/lanes.h"
 
 namespace {

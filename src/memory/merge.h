@@ -2,8 +2,7 @@
 #ifndef KASTARRI_MEMORY_MERGE_H
 #define KASTARRI_MEMORY_MERGE_H
 
-#include <immintrin.h>
-
+#include "frame/intrinsics.h"
 #include "frame/lanes.h"
 #include "kastarri/state.h"
 #include "kastarri/tables.h"

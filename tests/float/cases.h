@@ -113,6 +113,11 @@ inline std::vector<Case> cases(const exact::Format& f, int operands) {
     mpfr_mul(product, p, q, MPFR_RNDN);
     const Bits rounded = exact::round(f, product, MPFR_RNDN).bits;
     all.push_back({near(f, rounded, random), x, y});
+    // acc at every distance from the product, its last bits among the product's or below them; and from a product of 0.
+    const Bits apart = static_cast<Bits>(i % (4 * f.precision) - 2 * f.precision) * f.unit();
+    const Bits distant = one + apart + (random() & 1 ? any() : short_number(f, any(), random)) % f.unit();
+    all.push_back({(distant + (any() & f.sign())) & (2 * f.sign() - 1), x, y});
+    all.push_back({a, b & f.sign(), any()});
     if (i % 3 == 0) {
       // acc that takes from the product what it has beyond the format, but for an acc's last bit.
       mpfr_sub(product, product, exact::Number(f, rounded), MPFR_RNDN);

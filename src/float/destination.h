@@ -12,7 +12,7 @@ using lane_of = typename L::container;
 
 // Registers that hold a vector of layout L.
 template <class L>
-constexpr int registers_of = L::count * L::bits / (8 * register_bytes);
+constexpr int registers_of = L::count* L::bits / (8 * register_bytes);
 
 // By registers.
 template <class L, class Out>

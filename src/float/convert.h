@@ -55,7 +55,9 @@ template <class From, class To, class Out, class Units>
     lanes<To::count>(
         Write<To>(out), [](auto same) { return same; }, Same(lane));
   } else if constexpr (!is_float<To>) {
-    const auto fast = [=](Rounding, auto& results) { return truncated_on_unit<To, From>(results, scale, in); };
+    const auto fast = [=](Rounding, auto& results) __attribute__((always_inline)) {
+      return truncated_on_unit<To, From>(results, scale, in);
+    };
     convert_vector<From, To>(out, in, fast, exact);
   } else {
     const float unit = as_float(single_bits_of_power(-static_cast<int>(scale)));
@@ -63,7 +65,9 @@ template <class From, class To, class Out, class Units>
       if constexpr (is_float<From>) return exact_single_of(x);
       if constexpr (!is_float<From>) return scaled_single(x, unit);
     };
-    const auto fast = [=](Rounding rounding, auto& results) { return on_unit<To, From>(rounding, results, rule, in); };
+    const auto fast = [=](Rounding rounding, auto& results) __attribute__((always_inline)) {
+      return on_unit<To, From>(rounding, results, rule, in);
+    };
     convert_vector<From, To>(out, in, fast, exact);
   }
 }

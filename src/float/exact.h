@@ -260,9 +260,6 @@ struct Truncated {
   Words dropped;
   Words left;  // in the top bit
 };
-inline Truncated truncated_but(Words integers, Words dropped, Words left) {
-  return {integers, dropped & ~sign_masks(left), left};
-}
 struct WholeNumber {
   Words bits, magnitudes;  // the magnitudes are those of what has been rounded
   Words dropped;
@@ -280,8 +277,7 @@ inline Words fixed_point(Words magnitudes) {
   const Words whole = ones_where(integers_of(magnitudes) >=
                                  static_cast<std::int32_t>(single_bits_of_power(Half::fraction_bits - Bits)));
   constexpr float scale = 1 << Bits;
-  return integers_toward_zero(in_bits<Singles>(magnitudes & whole) * scale) |
-         (ones_where((magnitudes & ~whole) != 0) & 1);
+  return integers_toward_zero(in_bits<Singles>(magnitudes & whole) * scale) | (0 - (magnitudes & ~whole)) >> 31;
 }
 
 // x * 2^scale truncated to an integer of 16 bits. Out of range, or a NaN, it is left.
@@ -295,7 +291,7 @@ inline Truncated truncated_half(const Operand& x, word scale) {
   const Words greatest = is_signed ? all : chosen(negative, Words{} + (single_bits_of_power(0) - 1), all);
   constexpr int point = Half::fraction_bits;
   const Words fixed = fixed_point<point>(magnitude);
-  return truncated_but(((fixed >> point) ^ negative) - negative, fixed & ((1u << point) - 1), greatest - magnitude);
+  return {((fixed >> point) ^ negative) - negative, fixed & ((1u << point) - 1), greatest - magnitude};
 }
 
 // x rounded to an integer; from 2^10 on it is one.
@@ -330,7 +326,7 @@ inline Truncated truncated_single(const Operand& x, word scale) {
   const Words right = (Single::bias + 31 - scale) - biased_exponent(magnitude);
   const Words least = is_signed ? Words{} + (33 - To::bits) : chosen(negative, Words{} + 32, Words{} + (32 - To::bits));
   const Parted parts = parted(significand(magnitude) << 8, at_most(right, 32));
-  return truncated_but((parts.kept ^ negative) - negative, parts.dropped, right - least);
+  return {(parts.kept ^ negative) - negative, parts.dropped, right - least};
 }
 
 // x rounded to an integer; from 2^23 on it is one.

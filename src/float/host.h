@@ -254,19 +254,31 @@ template <class R, class Results, class OneStep, std::size_t... K, class... Poin
   ((results.number[K] = pinned(result_register<R>(K, one_step))), ...);
 }
 
+// A bit for each lane whose magnitude is outside of the range. Functions of its kind are called where they are seldom
+// wanted: in the function itself they would take registers from it.
+template <class Result, int Count>
+[[gnu::noinline, gnu::cold]] std::uint32_t lanes_outside(const word* magnitudes) {
+  std::uint32_t outside = 0;
+  for (int i = 0; i < Count; ++i) {
+    const int at = Result::paired ? i / step * step + paired_lane(i % step) : i;
+    if (!Result::range::holds(magnitudes[at])) outside |= std::uint32_t{1} << i;
+  }
+  return outside;
+}
+
 // By the rule, which yields exact numbers.
 template <class R, Reach Are, class... Ls, class Results, class Mode, class Rule, class... Units>
 [[gnu::always_inline, gnu::flatten]] inline HostResult numbers_on_host(Mode mode, Results& results, Rule rule,
                                                                        const Units*... operands) {
   using F = format_of<R>;
-  const auto settled_step = [&](int from) {
+  const auto settled_step = [&](int from) __attribute__((always_inline)) {
     return settled<F>(by_rule(rule, mode, Lanes<Ls, Are>(operands, from)...), mode);
   };
   using Result = decltype(settled_step(0));
   alignas(64) word magnitudes[R::count];
   Within<typename Result::range> within;
   Words dropped = {};
-  const auto one_step = [&](int from) {
+  const auto one_step = [&](int from) __attribute__((always_inline)) {
     const Result result = settled_step(from);
     if constexpr (Result::range::has_outside) store_register(magnitudes + from, 0, result.magnitudes);
     within.see(result.magnitudes);
@@ -276,10 +288,7 @@ template <class R, Reach Are, class... Ls, class Results, class Mode, class Rule
   every_step<R>(results, one_step, std::make_index_sequence<registers_of<R>>(), operands...);
   const word flags = any_bit(dropped) ? word{inexact} : 0;
   if (__builtin_expect(!within.some_not(), 1)) return {flags, false};
-  for (int i = 0; i < R::count; ++i) {
-    const int at = Result::paired ? i / step * step + paired_lane(i % step) : i;
-    if (!Result::range::holds(magnitudes[at])) results.left |= std::uint32_t{1} << i;
-  }
+  results.left = lanes_outside<Result, R::count>(magnitudes);
   return {flags, true};
 }
 
@@ -312,24 +321,47 @@ template <class R, class... Ls, class Mode, class Results, class Rule, class... 
   }
 }
 
+// Which lanes truncating leaves, a bit for each, and whether others are inexact: all of them once more, lane by lane.
+struct LeftLanes {
+  std::uint32_t lanes = 0;
+  bool others_inexact = false;
+};
+template <class R, class From>
+[[gnu::noinline, gnu::cold]] LeftLanes left_by_truncating(word scale, const void* operand) {
+  alignas(64) word dropped[R::count], left[R::count];
+  {
+    const HostFpu fpu(operand);
+    for (int from = 0; from < R::count; from += step) {
+      const Truncated result = truncated<R>(Lanes<From, Reach::any>(operand, from), scale);
+      store_register(dropped + from, 0, pinned(result.dropped));
+      store_register(left + from, 0, pinned(result.left));
+    }
+  }
+  LeftLanes told;
+  for (int i = 0; i < R::count; ++i) {
+    const bool is_left = sign_mask(left[i]) != 0;
+    told.lanes |= std::uint32_t{is_left} << i;
+    told.others_inexact |= !is_left && dropped[i] != 0;
+  }
+  return told;
+}
+
 // Numbers times a power of two, truncated to integers.
 template <class R, class From, class Results, class Units>
 [[gnu::always_inline, gnu::flatten]] inline HostResult truncated_on_host(Results& results, word scale,
                                                                          const Units* operand) {
-  Words dropped = {}, some_left = {};
-  alignas(64) word left[R::count];
-  const auto one_step = [&](int from) {
+  Words dropped = {}, left = {};
+  const auto one_step = [&](int from) __attribute__((always_inline)) {
     const Truncated result = truncated<R>(Lanes<From, Reach::any>(operand, from), scale);
-    store_register(left + from, 0, result.left);
     dropped |= result.dropped;
-    some_left |= result.left;
+    left |= result.left;
     return result.integers;
   };
   every_step<R>(results, one_step, std::make_index_sequence<registers_of<R>>(), operand);
-  const word flags = any_bit(dropped) ? word{inexact} : 0;
-  if (__builtin_expect(!any_sign<word>(some_left), 1)) return {flags, false};
-  for (int i = 0; i < R::count; ++i) results.left |= (left[i] >> 31) << i;
-  return {flags, true};
+  if (__builtin_expect(!any_sign<word>(left), 1)) return {any_bit(dropped) ? word{inexact} : 0, false};
+  const LeftLanes told = left_by_truncating<R, From>(scale, operand);
+  results.left = told.lanes;
+  return {told.others_inexact ? word{inexact} : 0, true};
 }
 
 template <class R, class... Ls, class Results, class Rule, class... Units>
@@ -343,7 +375,7 @@ template <class R, class... Ls, class Results, class Rule, std::size_t... K, cla
                                               const Units*... operands) {
   using F = format_of<R>;
   using Lane = typename F::lane;
-  const auto turned = [&](Vector<Lane> result, int k) {
+  const auto turned = [&](Vector<Lane> result, int k) __attribute__((always_inline)) {
     const auto measured = rule(Lanes<Ls, Reach::measured>(operands, k * lanes_in_register<Lane>)...);
     const auto zero = in_bits<Vector<Lane>>(magnitudes<F>(result) == 0);
     return result | (zero & measured.either_sign & static_cast<Lane>(F::sign));

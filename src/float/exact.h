@@ -3,6 +3,7 @@
 #ifndef KASTARRI_FLOAT_EXACT_H
 #define KASTARRI_FLOAT_EXACT_H
 
+#include "float/host_fpu.h"
 #include "float/host_lanes.h"
 
 namespace {
@@ -95,26 +96,40 @@ template <class F>
 constexpr bool has_far_specials = F::bits == 16;
 #endif
 
+// Operands of the long way: 0 where they would raise flags of the host, in lanes that are left.
+struct Tame {
+  Words bits;
+  Words left;  // in the top bit
+};
+template <class F>
+inline Tame tame(Words singles) {
+  const Words magnitude = singles & single_magnitude;
+  Words left = widened_largest<F> - magnitude;
+  if constexpr (F::bits == 32) left |= (magnitude - F::unit) & (0 - magnitude);  // subnormal
+  return {singles & ~sign_masks(left), left};
+}
+
 template <class A, class B>
 inline auto sum_of_halves(const A& a, const B& b) {
-  const Singles x = a.value(), y = b.value();
   if constexpr (A::reach == Reach::near) {
-    return ExactSingles<Left::none>{x + y};
+    return ExactSingles<Left::none>{a.value() + b.value()};
   } else {
     // (The sum of a power of two and a number that has been lifted, where they differ in sign, may become a tie,
     // between that power and the number below it; it goes to the power, which is right.)
-    const auto lifted = [](Singles u, Singles v) { return in_bits<Singles>(apart<12>(words_of(u), words_of(v))); };
-    return ExactSingles<Left::great>{lifted(x, y) + lifted(y, x)};
+    const Tame x = tame<Half>(words_of(a.value())), y = tame<Half>(words_of(b.value()));
+    const auto lifted = [](Words u, Words v) { return in_bits<Singles>(apart<12>(u, v)); };
+    return ExactBut<ExactSingles<Left::great>>{{lifted(x.bits, y.bits) + lifted(y.bits, x.bits)}, x.left | y.left};
   }
 }
 
 template <class A, class B>
-inline ExactDoubles sum_of_singles(const A& a, const B& b) {
+inline auto sum_of_singles(const A& a, const B& b) {
   if constexpr (A::reach == Reach::near) {
-    return {a.lower() + b.lower(), a.upper() + b.upper()};
+    return ExactDoubles{a.lower() + b.lower(), a.upper() + b.upper()};
   } else {
-    const ExactDoubles x = as_doubles(apart<28>(a.bits(), b.bits())), y = as_doubles(apart<28>(b.bits(), a.bits()));
-    return {x.lower + y.lower, x.upper + y.upper};
+    const Tame x = tame<Single>(a.bits()), y = tame<Single>(b.bits());
+    const ExactDoubles u = as_doubles(apart<28>(x.bits, y.bits)), v = as_doubles(apart<28>(y.bits, x.bits));
+    return ExactBut<ExactDoubles>{{u.lower + v.lower, u.upper + v.upper}, x.left | y.left};
   }
 }
 
@@ -177,40 +192,42 @@ inline Doubles sum_with_product(Doubles c, Doubles p) {
 // acc + a * b for halves.
 template <class C, class A, class B>
 inline auto fused_halves(const C& acc, const A& a, const B& b) {
-  const Singles c = acc.value(), p = a.value() * b.value();
-  const Words c_bits = words_of(c), p_bits = words_of(p);
   if constexpr (C::reach == Reach::near) {
     // In singles there is room if p, of 22 bits, is at most twice below c; where it is lower, its first 12 do.
-    const auto bound = in_bits<Integers>((magnitudes<Single>(p_bits) | (Single::unit - 1)) + Single::unit);
-    const auto below = in_bits<Words>(in_bits<Integers>(magnitudes<Single>(c_bits)) > bound);
-    return ExactSingles<Left::great_and_tiny>{c + in_bits<Singles>(cut_odd<12>(p_bits, below))};
+    const Singles c = acc.value(), p = a.value() * b.value();
+    const auto bound = in_bits<Integers>((magnitudes<Single>(words_of(p)) | (Single::unit - 1)) + Single::unit);
+    const auto below = in_bits<Words>(in_bits<Integers>(magnitudes<Single>(words_of(c))) > bound);
+    return ExactSingles<Left::great_and_tiny>{c + in_bits<Singles>(cut_odd<12>(words_of(p), below))};
   } else {
-    const auto x = as_doubles(apart<30>(p_bits, c_bits));
-    const auto y = as_doubles(apart<30>(c_bits, p_bits));
-    return ExactDoubles{x.lower + y.lower, x.upper + y.upper};
+    const Tame c = tame<Half>(words_of(acc.value()));
+    const Tame x = tame<Half>(words_of(a.value())), y = tame<Half>(words_of(b.value()));
+    const Words p = words_of(in_bits<Singles>(x.bits) * in_bits<Singles>(y.bits));
+    const ExactDoubles u = as_doubles(apart<30>(p, c.bits)), v = as_doubles(apart<30>(c.bits, p));
+    return ExactBut<ExactDoubles>{{u.lower + v.lower, u.upper + v.upper}, c.left | x.left | y.left};
   }
 }
 
 // acc + a * b for singles.
 template <class C, class A, class B>
 inline auto fused_singles(const C& acc, const A& a, const B& b) {
-  const Doubles lower = a.lower() * b.lower(), upper = a.upper() * b.upper();
-  const Words c_bits = acc.bits();
-  const auto ahead = in_bits<Integers>(headroom<Single>(c_bits, a.bits(), b.bits()));
   if constexpr (C::reach == Reach::near) {
     // From 3 powers of two on the product may be cut; up to 4 there is room for all of it.
+    const auto ahead = in_bits<Integers>(headroom<Single>(acc.bits(), a.bits(), b.bits()));
     const auto below = in_bits<Words>(ahead > static_cast<std::int32_t>(powers_of_two<Single>(7) / 2));
     const auto cut = [](Doubles p, DoubleBits masks) {
       return in_bits<Doubles>(cut_odd<rest_bits>(in_bits<DoubleBits>(p), masks));
     };
-    return ExactDoubles{acc.lower() + cut(lower, pair_masks<0>(below)), acc.upper() + cut(upper, pair_masks<1>(below))};
+    return ExactDoubles{acc.lower() + cut(a.lower() * b.lower(), pair_masks<0>(below)),
+                        acc.upper() + cut(a.upper() * b.upper(), pair_masks<1>(below))};
   } else {
-    // Where the product is the greater by 2^27, if neither is 0, there is no room. (A subnormal acc counts as nearly
-    // 2^-126, whose last bit is no higher than its own.)
-    const auto zero = [](Words x) { return in_bits<Words>(magnitudes<Single>(x) == 0); };
-    const Words too_far = in_bits<Words>(ahead) + powers_of_two<Single>(27);
-    return ExactBut<ExactDoubles>{{sum_with_product(acc.lower(), lower), sum_with_product(acc.upper(), upper)},
-                                  too_far & ~zero(a.bits()) & ~zero(b.bits()) & ~zero(c_bits)};
+    const Tame c = tame<Single>(acc.bits()), x = tame<Single>(a.bits()), y = tame<Single>(b.bits());
+    const ExactDoubles u = as_doubles(c.bits), v = as_doubles(x.bits), w = as_doubles(y.bits);
+    // Where the product is the greater by 2^27, if neither is 0, there is no room.
+    const auto zero = [](const Tame& t) { return in_bits<Words>(magnitudes<Single>(t.bits) == 0); };
+    const Words too_far = headroom<Single>(c.bits, x.bits, y.bits) + powers_of_two<Single>(27);
+    return ExactBut<ExactDoubles>{
+        {sum_with_product(u.lower, v.lower * w.lower), sum_with_product(u.upper, v.upper * w.upper)},
+        c.left | x.left | y.left | (too_far & ~zero(x) & ~zero(y) & ~zero(c))};
   }
 }
 
@@ -268,23 +285,30 @@ struct WholeNumber {
 inline Words ones_where(Integers mask) { return in_bits<Words>(mask); }
 inline Integers integers_of(Words x) { return in_bits<Integers>(x); }
 
+inline Words at_most(Words x, std::int32_t bound) {
+  const auto bounds = Integers{} + bound;
+  return in_bits<Words>(integers_of(x) < bounds ? integers_of(x) : bounds);
+}
+
 // --- Halves as integers -------------------------------------------------------------------------------
 
 // Magnitudes of halves times 2^Bits as integers. Those below 2^(10 - Bits), which have a lower bit than that, become 1
-// unless they are 0: a bit that only tells of what is dropped. Infinities and NaNs, and what has no room, become any.
+// unless they are 0: a bit that only tells of what is dropped. What has no room becomes any.
 template <int Bits>
 inline Words fixed_point(Words magnitudes) {
+  // (What has no room would raise a flag of the host.)
+  const Words bounded = at_most(magnitudes, static_cast<std::int32_t>(single_bits_of_power(30 - Bits)));
   const Words whole = ones_where(integers_of(magnitudes) >=
                                  static_cast<std::int32_t>(single_bits_of_power(Half::fraction_bits - Bits)));
   constexpr float scale = 1 << Bits;
-  return integers_toward_zero(in_bits<Singles>(magnitudes & whole) * scale) | (0 - (magnitudes & ~whole)) >> 31;
+  return pinned(integers_toward_zero(in_bits<Singles>(bounded & whole) * scale)) | (0 - (magnitudes & ~whole)) >> 31;
 }
 
 // x * 2^scale truncated to an integer of 16 bits. Out of range, or a NaN, it is left.
 template <class To, class Operand>
 inline Truncated truncated_half(const Operand& x, word scale) {
   static_assert(To::bits == 16);
-  const Words bits = words_of(x.value() * as_float(single_bits_of_power(static_cast<int>(scale))));
+  const Words bits = pinned(words_of(x.value() * as_float(single_bits_of_power(static_cast<int>(scale)))));
   const Words magnitude = bits & single_magnitude, negative = sign_masks(bits);
   constexpr bool is_signed = std::is_signed_v<typename To::container>;
   const Words all = Words{} + (single_bits_of_power(is_signed ? 15 : 16) - 1);
@@ -297,7 +321,7 @@ inline Truncated truncated_half(const Operand& x, word scale) {
 // x rounded to an integer; from 2^10 on it is one.
 template <class Mode, class Operand>
 inline WholeNumber integral_half(const Mode& mode, const Operand& x) {
-  const Words number = words_of(x.value()), magnitude = number & single_magnitude, sign = number ^ magnitude;
+  const Words number = pinned(words_of(x.value())), magnitude = number & single_magnitude, sign = number ^ magnitude;
   constexpr int point = 12;
   const Words fixed = fixed_point<point>(magnitude), rest = fixed << (32 - point) >> (32 - rest_bits);
   const Words integer = rounded(fixed >> point, rest, sign, mode);
@@ -311,10 +335,6 @@ inline Words biased_exponent(Words magnitude) { return magnitude >> Single::frac
 // With the hidden bit; 0 for zero. Of subnormals too, which are too small to tell from other small numbers here.
 inline Words significand(Words magnitude) {
   return ((magnitude & (Single::unit - 1)) | Single::unit) & ones_where(magnitude != 0);
-}
-inline Words at_most(Words x, std::int32_t bound) {
-  const auto bounds = Integers{} + bound;
-  return in_bits<Words>(integers_of(x) < bounds ? integers_of(x) : bounds);
 }
 
 // x * 2^scale truncated to an integer of To. Out of range, or a NaN, it is left.

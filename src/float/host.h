@@ -95,7 +95,7 @@ using Kept = Range<F::bits == 16 && Which == Left::great_and_tiny ? single_bits_
 template <class F, Left Which, class Mode>
 inline auto settled(const ExactSingles<Which>& x, const Mode& mode) {
   using Result = Settled<Kept<F, Which>>;
-  const Words exact = words_of(x.value), magnitude = exact & single_magnitude;
+  const Words exact = pinned(words_of(x.value)), magnitude = exact & single_magnitude;
   if constexpr (F::bits == 32) return Result{exact, magnitude, {}};
   constexpr int excess = Single::fraction_bits - Half::fraction_bits;
   constexpr word low = (word{1} << excess) - 1;
@@ -109,7 +109,8 @@ struct Leading {
   static constexpr word rebias = word{1023 - Single::bias} << of_high;
   using range = Range<rebias + (1 << of_high), rebias + (Single::infinity >> 3) - 2>;
 
-  Leading(const Doubles& lower, const Doubles& upper) {
+  Leading(const Doubles& exact_lower, const Doubles& exact_upper) {
+    const Doubles lower = pinned(exact_lower), upper = pinned(exact_upper);
     const Words high = every_other_word<1>(bits_of(lower), bits_of(upper));
     const Words low = every_other_word<0>(bits_of(lower), bits_of(upper));
     magnitude = high & single_magnitude;
@@ -139,8 +140,9 @@ inline auto settled(const ExactDoubles& x, const Mode& mode) {
 template <class F, class Exact, class Mode>
 inline auto settled(const ExactBut<Exact>& x, const Mode& mode) {
   auto result = settled<F>(x.value, mode);
-  const Words left = sign_masks(x.left);
-  result.magnitudes |= (result.paired ? in_lane_order(left) : left) & single_magnitude;
+  const Words masks = sign_masks(x.left), left = result.paired ? in_lane_order(masks) : masks;
+  result.magnitudes |= left & single_magnitude;
+  result.dropped &= ~left;
   return result;
 }
 // A half that is rounded to an integer is a half.
@@ -186,33 +188,21 @@ template <class F, class... Ls, class Rule, class... Units>
 }
 
 // A vector of results in registers, and a bit for each lane that is left.
-template <class L, class Out>
-class RegisterResults : public Destination<L, Out> {
- public:
-  using Destination<L, Out>::Destination;
-
-  // Lanes that are left, by exact(number of the lane).
-  template <class Exact>
-  void complete(const Exact& exact) {
-    alignas(64) lane_of<L> lane[L::count];
-    for (int k = 0; k < registers_of<L>; ++k) store_register(lane, k, number[k]);
-    for (int i = 0; i < L::count; ++i)
-      if ((left >> i & 1) != 0) lane[i] = static_cast<lane_of<L>>(exact(i));
-    for (int k = 0; k < registers_of<L>; ++k) number[k] = load_register<lane_of<L>>(lane, k);
-  }
-  void take(const RegisterResults& other) {
-    for (int k = 0; k < registers_of<L>; ++k) number[k] = other.number[k];
-    left = other.left;
-  }
-  void store() const { store(std::make_index_sequence<registers_of<L>>()); }
-
+template <class L>
+struct RegisterResults {
   Vector<lane_of<L>> number[registers_of<L>];
   std::uint32_t left = 0;
+};
+// On their way to a destination.
+template <class L, class Out>
+struct ResultsTo : RegisterResults<L>, Destination<L, Out> {
+  using Destination<L, Out>::Destination;
+  void store() const { store_all(std::make_index_sequence<registers_of<L>>()); }
 
  private:
   template <std::size_t... K>
-  void store(std::index_sequence<K...>) const {
-    (Destination<L, Out>::store(K, number[K]), ...);
+  void store_all(std::index_sequence<K...>) const {
+    (Destination<L, Out>::store(K, this->number[K]), ...);
   }
 };
 
@@ -229,29 +219,40 @@ struct EnabledLanes {
   alignas(64) lane_of<L> lane[L::count];
 };
 
-// Register number k of results, by a function that yields the step of them from lane `from` on.
-template <class R, class OneStep>
-[[gnu::always_inline, gnu::flatten]] inline auto result_register(int k, OneStep one_step) {
+// Register number k of results, of the steps of them from a lane on: singles or integers of 32 bits.
+template <class R, class StepFrom>
+[[gnu::always_inline, gnu::flatten]] inline Vector<lane_of<R>> packed(int k, StepFrom step_from) {
   using Lane = lane_of<R>;
   const int from = k * lanes_in_register<Lane>;
-  const Words first = one_step(from);
+  const Words first = step_from(from);
   if constexpr (R::bits == 32) {
     return in_bits<Vector<Lane>>(first);
   } else if constexpr (std::is_same_v<typename R::number, half_float>) {
-    return narrowed(first, one_step(from + step));
+    return narrowed(first, step_from(from + step));
   } else {
-    const auto second = in_bits<Register>(one_step(from + step));
+    const auto second = in_bits<Register>(step_from(from + step));
     return in_bits<Vector<Lane>>(
         in_order<std::uint64_t>(bits_of(pack_words(in_bits<Register>(first), second, Lane{}))));
   }
 }
+template <class R, class Results, class StepFrom, std::size_t... K>
+[[gnu::always_inline, gnu::flatten]] inline void pack(Results& results, StepFrom step_from, std::index_sequence<K...>) {
+  ((results.number[K] = pinned(packed<R>(K, step_from))), ...);
+}
+template <class R, class Results, class StepFrom>
+[[gnu::always_inline, gnu::flatten]] inline void pack(Results& results, StepFrom step_from) {
+  pack<R>(results, step_from, std::make_index_sequence<registers_of<R>>());
+}
 
-// All of them, on operands that are read through the pointers.
-template <class R, class Results, class OneStep, std::size_t... K, class... Pointers>
-[[gnu::always_inline, gnu::flatten]] inline void every_step(Results& results, OneStep one_step,
-                                                            std::index_sequence<K...>, Pointers&... operands) {
-  const HostFpu fpu(operands...);
-  ((results.number[K] = pinned(result_register<R>(K, one_step))), ...);
+// All steps before any is packed.
+template <class R>
+struct Steps {
+  static constexpr int count = R::count / step;
+  Words number[count];
+};
+template <class R, class StepFrom, std::size_t... K>
+[[gnu::always_inline, gnu::flatten]] inline Steps<R> every_step(StepFrom step_from, std::index_sequence<K...>) {
+  return {{step_from(static_cast<int>(K) * step)...}};
 }
 
 // A bit for each lane whose magnitude is outside of the range. Functions of its kind are called where they are seldom
@@ -264,6 +265,11 @@ template <class Result, int Count>
     if (!Result::range::holds(magnitudes[at])) outside |= std::uint32_t{1} << i;
   }
   return outside;
+}
+template <int Count>
+[[gnu::noinline, gnu::cold]] void clear_lanes(word* lanes, std::uint32_t which) {
+  for (int i = 0; i < Count; ++i)
+    if ((which >> i & 1) != 0) lanes[i] = 0;
 }
 
 // By the rule, which yields exact numbers.
@@ -278,31 +284,44 @@ template <class R, Reach Are, class... Ls, class Results, class Mode, class Rule
   alignas(64) word magnitudes[R::count];
   Within<typename Result::range> within;
   Words dropped = {};
-  const auto one_step = [&](int from) __attribute__((always_inline)) {
+  const auto step_from = [&](int from) __attribute__((always_inline)) {
     const Result result = settled_step(from);
     if constexpr (Result::range::has_outside) store_register(magnitudes + from, 0, result.magnitudes);
     within.see(result.magnitudes);
     dropped |= result.dropped;
     return result.bits;
   };
-  every_step<R>(results, one_step, std::make_index_sequence<registers_of<R>>(), operands...);
-  const word flags = any_bit(dropped) ? word{inexact} : 0;
-  if (__builtin_expect(!within.some_not(), 1)) return {flags, false};
-  results.left = lanes_outside<Result, R::count>(magnitudes);
-  return {flags, true};
+  const HostFpu fpu(operands...);
+  if constexpr (R::bits == 16 && Result::range::has_outside) {
+    // To narrow what is outside of the range would raise flags of the host.
+    Steps<R> steps = every_step<R>(step_from, std::make_index_sequence<Steps<R>::count>());
+    if (__builtin_expect(within.some_not(), 0)) {
+      results.left = lanes_outside<Result, R::count>(magnitudes);
+      alignas(64) word lanes[R::count];
+      for (int k = 0; k < Steps<R>::count; ++k) store_register(lanes, k, steps.number[k]);
+      clear_lanes<R::count>(lanes, results.left);
+      for (int k = 0; k < Steps<R>::count; ++k) steps.number[k] = load_register<word>(lanes, k);
+    }
+    pack<R>(
+        results, [&](int from) __attribute__((always_inline)) { return steps.number[from / step]; });
+  } else {
+    pack<R>(results, step_from);
+    if (__builtin_expect(within.some_not(), 0)) results.left = lanes_outside<Result, R::count>(magnitudes);
+  }
+  return {any_bit(dropped) ? word{inexact} : 0, results.left != 0};
 }
 
-// The long way, by itself. By value, for what is passed by its address cannot stay in registers.
-template <class Results>
+// The long way, by itself.
+template <class R>
 struct FarResults {
-  Results results;
+  RegisterResults<R> results;
   HostResult host;
 };
-template <class R, class... Ls, class Mode, class Results, class Rule, class... Units>
-[[gnu::noinline, gnu::flatten]] FarResults<Results> far_on_host(Mode mode, Results results, Rule rule,
-                                                                const Units*... operands) {
-  const HostResult host = numbers_on_host<R, Reach::any, Ls...>(mode, results, rule, operands...);
-  return {results, host};
+template <class R, class... Ls, class Mode, class Rule, class... Units>
+[[gnu::noinline, gnu::flatten]] FarResults<R> far_on_host(Mode mode, Rule rule, const Units*... operands) {
+  FarResults<R> far;
+  far.host = numbers_on_host<R, Reach::any, Ls...>(mode, far.results, rule, operands...);
+  return far;
 }
 
 // Result lane i = rule(operand lanes i ...) on the unit, exact numbers.
@@ -311,8 +330,9 @@ template <class R, class... Ls, class Mode, class Results, class Rule, class... 
                                                                   const Units*... operands) {
   if constexpr (measures<Rule, Lanes<Ls, Reach::measured>...>) {
     if (__builtin_expect(any_far<format_of<R>, Ls...>(rule, operands...), 0)) {
-      const FarResults<Results> far = far_on_host<R, Ls...>(mode, results, rule, operands...);
-      results.take(far.results);
+      const FarResults<R> far = far_on_host<R, Ls...>(mode, rule, operands...);
+      for (int k = 0; k < registers_of<R>; ++k) results.number[k] = far.results.number[k];
+      results.left = far.results.left;
       return far.host;
     }
     return numbers_on_host<R, Reach::near, Ls...>(mode, results, rule, operands...);
@@ -351,13 +371,16 @@ template <class R, class From, class Results, class Units>
 [[gnu::always_inline, gnu::flatten]] inline HostResult truncated_on_host(Results& results, word scale,
                                                                          const Units* operand) {
   Words dropped = {}, left = {};
-  const auto one_step = [&](int from) __attribute__((always_inline)) {
-    const Truncated result = truncated<R>(Lanes<From, Reach::any>(operand, from), scale);
-    dropped |= result.dropped;
-    left |= result.left;
-    return result.integers;
-  };
-  every_step<R>(results, one_step, std::make_index_sequence<registers_of<R>>(), operand);
+  {
+    const HostFpu fpu(operand);
+    pack<R>(
+        results, [&](int from) __attribute__((always_inline)) {
+          const Truncated result = truncated<R>(Lanes<From, Reach::any>(operand, from), scale);
+          dropped |= result.dropped;
+          left |= result.left;
+          return result.integers;
+        });
+  }
   if (__builtin_expect(!any_sign<word>(left), 1)) return {any_bit(dropped) ? word{inexact} : 0, false};
   const LeftLanes told = left_by_truncating<R, From>(scale, operand);
   results.left = told.lanes;
@@ -394,17 +417,24 @@ template <class R, class... Ls, class Results, class Rule, class... Units>
   return host;
 }
 
-// Results by fast(results), which says whether it has left a lane, and such lanes by exact(number of the lane).
-template <class Results, class Exact>
-[[gnu::noinline, gnu::cold]] void store_completed(Results results, Exact exact) {
-  results.complete(exact);
-  results.store();
+// Lanes with those that are left by exact(number of the lane).
+template <class L, class Out, class Exact>
+[[gnu::noinline, gnu::cold]] void store_completed(Out out, lane_of<L>* lanes, std::uint32_t left, Exact exact) {
+  for (int i = 0; i < L::count; ++i)
+    if ((left >> i & 1) != 0) lanes[i] = static_cast<lane_of<L>>(exact(i));
+  const Destination<L, Out> to(out);
+  for (int k = 0; k < registers_of<L>; ++k) to.store(k, load_register<lane_of<L>>(lanes, k));
 }
+
+// Results by fast(results), which says whether it has left a lane. Such lanes are completed from a copy: what is passed
+// by its address cannot stay in registers.
 template <class L, class Out, class Fast, class Exact>
 [[gnu::always_inline, gnu::flatten]] inline void store_results(Out out, Fast fast, Exact exact) {
-  RegisterResults<L, Out> results(out);
-  if (__builtin_expect(fast(results), 0)) return store_completed(results, exact);
-  results.store();
+  ResultsTo<L, Out> results(out);
+  if (__builtin_expect(!fast(results), 1)) return results.store();
+  alignas(64) lane_of<L> lanes[L::count];
+  for (int k = 0; k < registers_of<L>; ++k) store_register(lanes, k, results.number[k]);
+  store_completed<L>(out, lanes, results.left, exact);
 }
 
 }  // namespace

@@ -11,7 +11,7 @@ template <class Pointer>
 inline void pin_operand(Pointer& pointer) {
   asm volatile("" : "+r"(pointer) : : "memory");
 }
-// The register is computed before.
+// The register is computed before, and what is computed of it is not computed of its operands again.
 template <class V>
 inline V pinned(V result) {
   asm volatile("" : "+x"(result));
@@ -21,8 +21,8 @@ inline V pinned(V result) {
 // While it lives, subnormals are honoured, every exception is masked, and sums of 0 are +0. Afterwards MXCSR is as
 // it was before. It is written only where it differs.
 // Compilers know nothing of MXCSR and move arithmetic past its writes; they cannot where operands are read through
-// pointers, and results pass through registers, that are outputs of assembler statements between the writes: what a
-// load yields is unknown before the one write, and a result is known before the other.
+// pointers, and what arithmetic yields passes through registers, that are outputs of assembler statements between the
+// writes: what a load yields is unknown before the one write, and what is computed is known before the other.
 class HostFpu {
  public:
   template <class... Pointers>

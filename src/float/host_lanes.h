@@ -186,13 +186,23 @@ class Lanes<L, R, half_float> {
 #ifdef __F16C__
     return in_bits<Singles>(_mm256_cvtph_ps(_mm_loadu_si128(halves)));
 #else
-    // A half in the low bits of a single is 2^-112 times itself; only the exponent of infinities and NaNs
-    // has to be told, which near operands are not.
+    // A half in the low bits of a single is 2^-112 times itself. That is a subnormal single where the half is one,
+    // which processors are slow to multiply, and in place of infinities and NaNs it is a number: where any are looked
+    // for, the one has its power of two added and taken away again, and the others their exponent.
     const __m128i at_top = _mm_unpacklo_epi16(_mm_setzero_si128(), _mm_loadl_epi64(halves));
     const Words spread = in_bits<Words>(in_bits<Integers>(at_top) >> 3) & 0x8FFFE000;
-    if constexpr (R == Reach::near) return in_bits<Singles>(spread) * 0x1p112f;
-    const Words special = in_bits<Words>(in_bits<Integers>(spread & single_magnitude) > (word{Half::largest} << 13));
-    return in_bits<Singles>(spread | (special & Single::infinity)) * 0x1p112f;
+    if constexpr (R == Reach::near) {
+      return in_bits<Singles>(spread) * 0x1p112f;
+    } else {
+      constexpr word rebias = word{Single::bias - Half::bias} << Single::fraction_bits;
+      constexpr word least_normal = single_bits_of_power(Half::least_exponent);
+      const Words magnitude = spread & single_magnitude, sign = spread ^ magnitude;
+      const Words small = in_bits<Words>(in_bits<Integers>(magnitude) < static_cast<std::int32_t>(Single::unit));
+      const Words special = in_bits<Words>(in_bits<Integers>(magnitude) > (word{Half::largest} << 13));
+      const Words normal = magnitude + rebias + (special & rebias);
+      const Singles subnormal = in_bits<Singles>(magnitude | least_normal) - as_float(least_normal);
+      return in_bits<Singles>(chosen(small, words_of(subnormal), normal) | sign);
+    }
 #endif
   }
 

@@ -349,13 +349,11 @@ struct LeftLanes {
 template <class R, class From>
 [[gnu::noinline, gnu::cold]] LeftLanes left_by_truncating(word scale, const void* operand) {
   alignas(64) word dropped[R::count], left[R::count];
-  {
-    const HostFpu fpu(operand);
-    for (int from = 0; from < R::count; from += step) {
-      const Truncated result = truncated<R>(Lanes<From, Reach::any>(operand, from), scale);
-      store_register(dropped + from, 0, pinned(result.dropped));
-      store_register(left + from, 0, pinned(result.left));
-    }
+  const HostFpu fpu(operand);  // to the end, for without shifts by a count a lane clang makes the bits on the unit too
+  for (int from = 0; from < R::count; from += step) {
+    const Truncated result = truncated<R>(Lanes<From, Reach::any>(operand, from), scale);
+    store_register(dropped + from, 0, pinned(result.dropped));
+    store_register(left + from, 0, pinned(result.left));
   }
   LeftLanes told;
   for (int i = 0; i < R::count; ++i) {

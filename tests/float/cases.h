@@ -3,6 +3,7 @@
 #ifndef KASTARRI_TESTS_FLOAT_CASES_H
 #define KASTARRI_TESTS_FLOAT_CASES_H
 
+#include <algorithm>
 #include <array>
 #include <random>
 #include <utility>
@@ -85,6 +86,47 @@ inline std::pair<Bits, Bits> nearly_short_product(const exact::Format& f, std::m
   }
 }
 
+// Registers of cases whose lanes are all alike in how far the exponents of their terms are apart: of two operands, or
+// of acc and the product of two. What a vector is computed by depends on the farthest lane.
+inline void add_registers_by_distance(std::vector<Case>& all, const exact::Format& f, int operands,
+                                      std::mt19937& random) {
+  constexpr std::size_t lanes = 32;
+  const Bits one = static_cast<Bits>(1 - f.least) * f.unit();
+  const auto fraction = [&]() -> Bits {
+    const Bits few = random() % 4;
+    switch (random() % 5) {
+      case 0:
+        return few;
+      case 1:
+        return f.unit() - 1 - few;
+      case 2:
+        return (f.unit() / 2 + few - 2) % f.unit();
+      case 3:
+        return random() % f.unit() & ~((f.unit() >> random() % 5) - 1);
+      default:
+        return random() % f.unit();
+    }
+  };
+  const auto number = [&](int exponent) {
+    return one + static_cast<Bits>(exponent) * f.unit() + fraction() + (random() & 1 ? f.sign() : 0);
+  };
+  all.resize((all.size() + lanes - 1) / lanes * lanes);
+  const int farthest = std::min(-f.least, f.precision + 8);
+  for (int distance = -farthest; distance <= farthest; ++distance) {
+    const auto far = one + static_cast<Bits>(distance) * f.unit();
+    for (std::size_t i = 0; i < lanes; ++i) all.push_back({far, one, one});  // exact, unless far apart
+    for (std::size_t i = 0; i < 6 * lanes; ++i) {
+      all.push_back({number(distance), number(0), number(0)});
+      if (operands == 2 || i % 4 != 0) continue;
+      const auto [u, v] = nearly_short_product(f, random);
+      all.back() = {all.back()[0], one + u, one + v};
+    }
+  }
+  // A subnormal factor, whose exponent does not tell how far below acc the product is.
+  for (int exponent = f.least; operands == 3 && exponent < f.least + 2 * f.precision; ++exponent)
+    for (std::size_t i = 0; i < lanes; ++i) all.push_back({number(exponent), 1 + random() % 7, number(0)});
+}
+
 inline std::vector<Case> cases(const exact::Format& f, int operands) {
   std::vector<Case> all;
   if (operands == 1 && f.width == 16) {
@@ -132,6 +174,7 @@ inline std::vector<Case> cases(const exact::Format& f, int operands) {
          x, y});
     all.push_back({x, short_number(f, any(), random), one - static_cast<Bits>(f.precision) * f.unit()});
   }
+  if (operands > 1) add_registers_by_distance(all, f, operands, random);
   return all;
 }
 

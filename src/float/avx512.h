@@ -10,6 +10,7 @@
 #ifdef __AVX512F__
 
 #include "float/bits.h"
+#include "float/destination.h"
 #include "frame/intrinsics.h"
 #include "frame/lanes.h"
 
@@ -377,8 +378,7 @@ class RegisterResults {
     using Lane = typename L::container;
     alignas(64) Lane lane[sizeof lanes_ / sizeof(Lane)];
     _mm512_store_si512(lane, lanes_);
-    for (int i = 0; i < L::count; ++i)
-      if ((left_ >> i & 1) != 0) lane[i] = static_cast<Lane>(exact(i));
+    complete_lanes<L>(lane, left_, exact);
     lanes_ = _mm512_load_si512(lane);
   }
 

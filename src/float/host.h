@@ -415,11 +415,10 @@ template <class R, class... Ls, class Results, class Rule, class... Units>
   return host;
 }
 
-// Lanes with those that are left by exact(number of the lane).
+// Lanes, with those that are left completed.
 template <class L, class Out, class Exact>
 [[gnu::noinline, gnu::cold]] void store_completed(Out out, lane_of<L>* lanes, std::uint32_t left, Exact exact) {
-  for (int i = 0; i < L::count; ++i)
-    if ((left >> i & 1) != 0) lanes[i] = static_cast<lane_of<L>>(exact(i));
+  complete_lanes<L>(lanes, left, exact);
   const Destination<L, Out> to(out);
   for (int k = 0; k < registers_of<L>; ++k) to.store(k, load_register<lane_of<L>>(lanes, k));
 }

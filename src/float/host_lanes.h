@@ -112,9 +112,10 @@ inline Parted parted(Words x, Words right) {
 constexpr int rest_bits = 29;  // of what a single drops of a double
 constexpr word all_of_rest = (word{1} << rest_bits) - 1, half_of_rest = word{1} << (rest_bits - 1);
 
-// Two ways to round: what is added to the bits of a number before its lowest Count are dropped, for bits of a number,
-// a carry from its fraction included, count as an integer does; and the greatest of the numbers of rest_bits bits
-// that are dropped without rounding up.
+// The ways to round, each in two forms: what is added to the bits of a number before its lowest Count are dropped, for
+// bits of a number, a carry from its fraction included, count as an integer does; and the greatest of the numbers of
+// rest_bits bits that are dropped without rounding up. To nearest, ties away, integers alone are rounded, in the
+// second.
 struct ToNearest {
   template <int Count>
   Words increment(Words bits) const {
@@ -164,7 +165,6 @@ class Lanes<L, R, single_float> {
   using format = Single;
   Lanes(const void* operand, int from) : at_(static_cast<const in_memory<word>*>(operand) + from) {}
   Words bits() const { return load_register<word>(at_, 0); }
-  Singles value() const { return load_register<float>(at_, 0); }
   Doubles lower() const { return doubles_at(singles()); }
   Doubles upper() const { return doubles_at(singles() + half_a_step); }
 

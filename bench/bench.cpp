@@ -8,8 +8,9 @@
 #include <regex>
 #include <string>
 
+#include "families.h"
 #include "frame/entry.h"
-#include "frame/shapes.h"
+#include "kastarri.h"
 
 namespace {
 

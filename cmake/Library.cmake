@@ -11,18 +11,16 @@ if(CMAKE_CXX_COMPILER_ID STREQUAL GNU)
 endif()
 set(KASTARRI_KNOWN_TARGETS avx512 avx2 sse2)  # best first
 
-# A source of a vector family is compiled for every target, one of the frame once, but for the
-# conversions, which move whole registers.
+# A source of a vector family is compiled for every target, and so are the conversions, which move whole
+# registers; the rest of the frame and the scalar core are compiled once.
 file(GLOB KASTARRI_VECTOR_SOURCES CONFIGURE_DEPENDS
   ${PROJECT_SOURCE_DIR}/src/integer/*.cpp ${PROJECT_SOURCE_DIR}/src/memory/*.cpp
   ${PROJECT_SOURCE_DIR}/src/multiply/*.cpp ${PROJECT_SOURCE_DIR}/src/float/*.cpp)
 list(APPEND KASTARRI_VECTOR_SOURCES ${PROJECT_SOURCE_DIR}/src/frame/conversions.cpp)
-set(KASTARRI_SCALAR_SOURCES library.cpp failure.cpp state.cpp ports.cpp scalar.cpp funnel.cpp access.cpp)
-list(TRANSFORM KASTARRI_SCALAR_SOURCES PREPEND ${PROJECT_SOURCE_DIR}/src/frame/)
 # Tables, and what families export beside their intrinsics, once too.
-file(GLOB KASTARRI_HELPER_SOURCES CONFIGURE_DEPENDS
+file(GLOB KASTARRI_SCALAR_SOURCES CONFIGURE_DEPENDS ${PROJECT_SOURCE_DIR}/src/scalar/*.cpp
   ${PROJECT_SOURCE_DIR}/src/tables/*.cpp ${PROJECT_SOURCE_DIR}/src/*/helpers/*.cpp)
-list(APPEND KASTARRI_SCALAR_SOURCES ${KASTARRI_HELPER_SOURCES})
+list(APPEND KASTARRI_SCALAR_SOURCES ${PROJECT_SOURCE_DIR}/src/frame/library.cpp ${PROJECT_SOURCE_DIR}/src/frame/failure.cpp)
 
 foreach(target IN LISTS KASTARRI_TARGETS)
   if(NOT target IN_LIST KASTARRI_KNOWN_TARGETS)

@@ -1,7 +1,7 @@
 // Floating-point arithmetic on vectors and single lanes.
 #include "float/vectors.h"
 
-#include "frame/stamp.h"
+#include "float/stamp.h"
 
 #include "float/kernels.h"
 

@@ -25,7 +25,7 @@ inline void spread_halves(const std::uint16_t* halves, Out* vector) {
 
 }  // namespace
 
-#include "frame/stamp.h"
+#include "float/stamp.h"
 
 #include "float/kernels.h"
 

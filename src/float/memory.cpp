@@ -21,7 +21,7 @@ inline void load_halves(const Memory* from, UnitsUnder<Unit, PredicateUnit, true
 
 }  // namespace
 
-#include "frame/stamp.h"
+#include "float/stamp.h"
 
 #include "float/kernels.h"
 

@@ -34,7 +34,7 @@ constexpr auto WRITE_STATUS = [](word value) { states.StickyFlags = value >> 7 &
 
 }  // namespace
 
-#include "frame/stamp.h"
+#include "float/stamp.h"
 
 #include "float/kernels.h"
 

@@ -1,8 +1,9 @@
 // The exported symbols of a build for several targets: each is resolved, once, when it is first called
 // or the library loaded, to the entry of the best target that the processor runs.
+#include "families.h"
 #include "frame/entry.h"
 #include "frame/processor.h"
-#include "frame/shapes.h"
+#include "kastarri.h"
 
 #define DECLARE(TARGET, SYMBOL, SHAPE, ...)            \
   namespace kastarri_##TARGET {                        \

@@ -5,7 +5,7 @@
 #define KASTARRI_FRAME_ENTRY_H
 
 #include "frame/layouts.h"
-#include "kastarri.h"
+#include "kastarri/types.h"
 
 #define KASTARRI_SYMBOL(SYMBOL) cstub_Km_ZNB_Orbis_R5_64k__KOR_##SYMBOL
 

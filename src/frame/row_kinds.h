@@ -1,13 +1,31 @@
-// The kinds of row that stand in tables (rows.h).
+// The kinds of row that several families have (rows.h). Further ones are in <family>/row_kinds.h.
 #ifndef KASTARRI_FRAME_ROW_KINDS_H
 #define KASTARRI_FRAME_ROW_KINDS_H
 
-#include "float/row_kinds.h"
-#include "memory/row_kinds.h"
-
 #define ROW(OP, SHAPE, ...) ENTRY(rk_zra32_ZRA_##OP, SHAPE, __VA_ARGS__)
 #define PROTO(NAME, SHAPE, ...) ENTRY(rk_zra32_##NAME, SHAPE, __VA_ARGS__)
-#define SCALAR(PACKAGE, NAME, ...) ENTRY(rk_##PACKAGE##_##NAME, scalar, __VA_ARGS__)
+
+// The four addressing modes of a load or store that tests no alignment.
+#define LOAD_ROWS(OP, ...)           \
+  ROW(OP##_I, load_I, __VA_ARGS__)   \
+  ROW(OP##_X, load_I, __VA_ARGS__)   \
+  ROW(OP##_IP, load_IP, __VA_ARGS__) \
+  ROW(OP##_XP, load_IP, __VA_ARGS__)
+#define LOAD_ROWS_T(OP, ...)           \
+  ROW(OP##_I, load_I_T, __VA_ARGS__)   \
+  ROW(OP##_X, load_I_T, __VA_ARGS__)   \
+  ROW(OP##_IP, load_IP_T, __VA_ARGS__) \
+  ROW(OP##_XP, load_IP_T, __VA_ARGS__)
+#define STORE_ROWS(OP, ...)           \
+  ROW(OP##_I, store_I, __VA_ARGS__)   \
+  ROW(OP##_X, store_I, __VA_ARGS__)   \
+  ROW(OP##_IP, store_IP, __VA_ARGS__) \
+  ROW(OP##_XP, store_IP, __VA_ARGS__)
+#define STORE_ROWS_T(OP, ...)           \
+  ROW(OP##_I, store_I_T, __VA_ARGS__)   \
+  ROW(OP##_X, store_I_T, __VA_ARGS__)   \
+  ROW(OP##_IP, store_IP_T, __VA_ARGS__) \
+  ROW(OP##_XP, store_IP_T, __VA_ARGS__)
 
 // Conversions between registers and from and to host scalars.
 #define REGISTER(FROM, TO) PROTO(FROM##_rtor_##TO, rtor, FROM, TO)

@@ -2,16 +2,10 @@
 // typed operands: hand their unit arrays to the semantic function K. Columns of a row fill in the types.
 //
 // A shape's name tells its operands: a, b, c vectors or scalars; r the result; w a wide vector;
-// p a predicate; _T predicated, with the destination first and the predicate last. Shapes that only one
-// family has are in its own shapes.h.
+// p a predicate; _T predicated, with the destination first and the predicate last. Here are those that
+// several families have; <family>/shapes.h has those of one.
 #ifndef KASTARRI_FRAME_SHAPES_H
 #define KASTARRI_FRAME_SHAPES_H
-
-#include "float/shapes.h"
-#include "frame/scalar_shapes.h"
-#include "integer/shapes.h"
-#include "memory/shapes.h"
-#include "multiply/shapes.h"
 
 #define KASTARRI_SEMANTIC(K) Function_KOR_rk_zra32_ZRA_##K
 
@@ -37,6 +31,59 @@
 
 #define SIG_ab_p(SYMBOL, P, T, K) P SYMBOL(const T& a, const T& b)
 #define BODY_ab_p(P, T, K) BODY_ab_r(P, K)
+
+// From an accumulator, or a register of another type than the result.
+#define SIG_w_r(SYMBOL, R, W, K) R SYMBOL(const W& acc)
+#define BODY_w_r(R, W, K)           \
+  R r;                              \
+  KASTARRI_SEMANTIC(K)(acc._, r._); \
+  return r;
+
+// --- Loads and stores: V the register, M what memory holds, P the predicate -------------------------
+//
+// A post-increment access uses the pointer as it stands, and moves it when all else is done.
+
+#define SIG_load_I(SYMBOL, V, M, K) V SYMBOL(const M* base, int offset)
+#define BODY_load_I(V, M, K)                        \
+  V r;                                              \
+  KASTARRI_SEMANTIC(K)(address(base, offset), r._); \
+  return r;
+
+#define SIG_load_IP(SYMBOL, V, M, K) void SYMBOL(V& r, const M** pointer, int increment)
+#define BODY_load_IP(V, M, K)      \
+  const M* const from = *pointer;  \
+  KASTARRI_SEMANTIC(K)(from, r._); \
+  *pointer = address(from, increment);
+
+#define SIG_load_I_T(SYMBOL, V, M, P, K) V SYMBOL(const M* base, int offset, const P& p)
+#define BODY_load_I_T(V, M, P, K)                               \
+  V r;                                                          \
+  KASTARRI_SEMANTIC(K)(address(base, offset), clear(r._, p._)); \
+  return r;
+
+#define SIG_load_IP_T(SYMBOL, V, M, P, K) void SYMBOL(V& r, const M** pointer, int increment, const P& p)
+#define BODY_load_IP_T(V, M, P, K)             \
+  const M* const from = *pointer;              \
+  KASTARRI_SEMANTIC(K)(from, clear(r._, p._)); \
+  *pointer = address(from, increment);
+
+#define SIG_store_I(SYMBOL, V, M, K) void SYMBOL(const V& v, const M* base, int offset)
+#define BODY_store_I(V, M, K) KASTARRI_SEMANTIC(K)(v._, writable(address(base, offset)));
+
+#define SIG_store_IP(SYMBOL, V, M, K) void SYMBOL(const V& v, M** pointer, int increment)
+#define BODY_store_IP(V, M, K)   \
+  M* const to = *pointer;        \
+  KASTARRI_SEMANTIC(K)(v._, to); \
+  *pointer = address(to, increment);
+
+#define SIG_store_I_T(SYMBOL, V, M, P, K) void SYMBOL(const V& v, const M* base, int offset, const P& p)
+#define BODY_store_I_T(V, M, P, K) KASTARRI_SEMANTIC(K)(v._, p._, writable(address(base, offset)));
+
+#define SIG_store_IP_T(SYMBOL, V, M, P, K) void SYMBOL(const V& v, M** pointer, int increment, const P& p)
+#define BODY_store_IP_T(V, M, P, K)   \
+  M* const to = *pointer;             \
+  KASTARRI_SEMANTIC(K)(v._, p._, to); \
+  *pointer = address(to, increment);
 
 // --- Moves and conversions --------------------------------------------------------------------------
 

@@ -53,7 +53,7 @@ constexpr auto ABSSSUB = [](auto x, auto y) { return ABSS(SUBS(x, y)); };
 
 }  // namespace
 
-#include "frame/stamp.h"
+#include "integer/stamp.h"
 
 #include "integer/arithmetic.def"
 

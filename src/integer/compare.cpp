@@ -11,7 +11,7 @@ constexpr auto GE = [](auto x, auto y) { return x >= y; };
 
 }  // namespace
 
-#include "frame/stamp.h"
+#include "integer/stamp.h"
 
 #include "integer/compare.def"
 

@@ -44,7 +44,7 @@ constexpr Mean<Up> AVGR;
 
 }  // namespace
 
-#include "frame/stamp.h"
+#include "integer/stamp.h"
 
 #include "integer/extremes.def"
 

@@ -44,7 +44,7 @@ struct SLSI {
 
 }  // namespace
 
-#include "frame/stamp.h"
+#include "integer/stamp.h"
 
 #include "integer/immediate_shifts.def"
 

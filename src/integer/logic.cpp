@@ -3,7 +3,7 @@
 
 #include "integer/kernels.h"
 
-#include "frame/stamp.h"
+#include "integer/stamp.h"
 
 #include "integer/logic.def"
 

@@ -21,7 +21,7 @@ constexpr auto ANY = [](auto x, auto y) { return (x | y) != 0; };
 
 }  // namespace
 
-#include "frame/stamp.h"
+#include "integer/stamp.h"
 
 #define KERNEL_whole(OP, RULE, L)                                   \
   template <class Unit, class Bit>                                  \

@@ -34,7 +34,7 @@ constexpr auto CLAMPED = [](auto total) { return saturate<std::int16_t>(static_c
 
 }  // namespace
 
-#include "frame/stamp.h"
+#include "integer/stamp.h"
 
 // The sum of all lanes, or of the enabled ones: result layout, what becomes of the sum, layout of a lane.
 #define KERNEL_sum(OP, R, RULE, L)                                                            \

@@ -3,7 +3,7 @@
 
 #include "frame/lanes.h"
 
-#include "frame/stamp.h"
+#include "integer/stamp.h"
 
 // The lane is read before any is written, for the vector may be the result.
 #define KERNEL_replicate(OP, L)                                                  \

@@ -41,7 +41,7 @@ constexpr auto NSA = [](auto x) {
 
 }  // namespace
 
-#include "frame/stamp.h"
+#include "integer/stamp.h"
 
 #include "integer/rotates.def"
 

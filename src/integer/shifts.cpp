@@ -64,7 +64,7 @@ constexpr auto SLS = [](auto x, auto count) {
 
 }  // namespace
 
-#include "frame/stamp.h"
+#include "integer/stamp.h"
 
 #include "integer/shifts.def"
 

@@ -1,7 +1,7 @@
 // Loads and stores of one element.
 #include "memory/kernels.h"
 
-#include "frame/stamp.h"
+#include "memory/stamp.h"
 
 // Every lane of the result is the one element in memory.
 #define KERNEL_replicate(OP, R, E)                                      \

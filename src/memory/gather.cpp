@@ -2,7 +2,7 @@
 #include "memory/gather.h"
 #include "memory/kernels.h"
 
-#include "frame/stamp.h"
+#include "memory/stamp.h"
 
 // The layout of offsets and gathered units, and the bits of an element, which are the low ones of a unit.
 #define KERNEL_gather(OP, O, BITS)                                                            \

@@ -1,7 +1,7 @@
 // Loads and stores of predicates.
 #include "memory/kernels.h"
 
-#include "frame/stamp.h"
+#include "memory/stamp.h"
 
 #include "memory/predicates.def"
 

@@ -2,28 +2,6 @@
 #ifndef KASTARRI_MEMORY_ROW_KINDS_H
 #define KASTARRI_MEMORY_ROW_KINDS_H
 
-// The four addressing modes of a load or store that tests no alignment.
-#define LOAD_ROWS(OP, ...)           \
-  ROW(OP##_I, load_I, __VA_ARGS__)   \
-  ROW(OP##_X, load_I, __VA_ARGS__)   \
-  ROW(OP##_IP, load_IP, __VA_ARGS__) \
-  ROW(OP##_XP, load_IP, __VA_ARGS__)
-#define LOAD_ROWS_T(OP, ...)           \
-  ROW(OP##_I, load_I_T, __VA_ARGS__)   \
-  ROW(OP##_X, load_I_T, __VA_ARGS__)   \
-  ROW(OP##_IP, load_IP_T, __VA_ARGS__) \
-  ROW(OP##_XP, load_IP_T, __VA_ARGS__)
-#define STORE_ROWS(OP, ...)           \
-  ROW(OP##_I, store_I, __VA_ARGS__)   \
-  ROW(OP##_X, store_I, __VA_ARGS__)   \
-  ROW(OP##_IP, store_IP, __VA_ARGS__) \
-  ROW(OP##_XP, store_IP, __VA_ARGS__)
-#define STORE_ROWS_T(OP, ...)           \
-  ROW(OP##_I, store_I_T, __VA_ARGS__)   \
-  ROW(OP##_X, store_I_T, __VA_ARGS__)   \
-  ROW(OP##_IP, store_IP_T, __VA_ARGS__) \
-  ROW(OP##_XP, store_IP_T, __VA_ARGS__)
-
 // Elements of 16 bits and more: loads test the destination object, and only when they move the pointer;
 // stores test the address of the access.
 #define ELEMENT_LOAD_ROWS(OP, ...)                       \

@@ -1,7 +1,7 @@
 // Scatters.
 #include "memory/gather.h"
 
-#include "frame/stamp.h"
+#include "memory/stamp.h"
 
 // The layout of the offsets, the element, the layout of the data, the first lane of the data.
 #define KERNEL_scatter_from(OP, O, ELEMENT, D, FIRST)                                            \

@@ -31,7 +31,7 @@ inline void store_saturated(const void* vector, void* to) {
 
 }  // namespace
 
-#include "frame/stamp.h"
+#include "memory/stamp.h"
 
 // Lanes of a vector saturated to lanes L of half their width.
 #define KERNEL_saturated(OP, L, V)                                       \

@@ -46,7 +46,7 @@ constexpr auto CONJUGATE = [](auto a, auto b) {
 
 }  // namespace
 
-#include "frame/stamp.h"
+#include "multiply/stamp.h"
 
 #include "multiply/complex.def"
 

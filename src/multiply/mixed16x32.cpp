@@ -19,7 +19,7 @@ constexpr auto ODD_HIGH = [](word pair, auto y) { return ODD<Factor>(pair, y) <<
 
 }  // namespace
 
-#include "frame/stamp.h"
+#include "multiply/stamp.h"
 
 #include "multiply/mixed16x32.def"
 

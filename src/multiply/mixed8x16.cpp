@@ -10,7 +10,7 @@ constexpr auto INTERLEAVED = [](std::uint16_t bytes, std::int16_t b, std::int16_
 
 }  // namespace
 
-#include "frame/stamp.h"
+#include "multiply/stamp.h"
 
 #include "multiply/mixed8x16.def"
 

@@ -23,7 +23,7 @@ constexpr auto SGNS = [](auto a, auto b) {
 
 }  // namespace
 
-#include "frame/stamp.h"
+#include "multiply/stamp.h"
 
 #include "multiply/narrow.def"
 

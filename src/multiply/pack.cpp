@@ -82,7 +82,7 @@ inline void pack(const word* acc, const N& counts, word* r) {
 
 }  // namespace
 
-#include "frame/stamp.h"
+#include "multiply/stamp.h"
 
 // KERNEL(OP, form, result layout, rule, lanes that are packed)
 #define KERNEL_fixed(OP, R, RULE, LANES)                               \

@@ -8,7 +8,7 @@ constexpr auto PAIR_DIFFERENCE = [](auto a, auto b, auto c, auto d) { return ter
 
 }  // namespace
 
-#include "frame/stamp.h"
+#include "multiply/stamp.h"
 
 #include "multiply/pairs.def"
 

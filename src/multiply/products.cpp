@@ -76,7 +76,7 @@ inline void put_products(const word* acc, const word* a, const word* b, word* r)
 
 }  // namespace
 
-#include "frame/stamp.h"
+#include "multiply/stamp.h"
 
 // KERNEL(OP, kind_vectors, result layout, factors' layouts)
 #define KERNEL_fresh_vectors(OP, R, A, B)                                           \

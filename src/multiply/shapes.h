@@ -64,12 +64,6 @@
 
 // --- Packs -------------------------------------------------------------------------------------------
 
-#define SIG_w_r(SYMBOL, R, W, K) R SYMBOL(const W& acc)
-#define BODY_w_r(R, W, K)           \
-  R r;                              \
-  KASTARRI_SEMANTIC(K)(acc._, r._); \
-  return r;
-
 // One count for all lanes, of the scalar type COUNT.
 #define SIG_w_r_shift(SYMBOL, R, W, COUNT, K) R SYMBOL(const W& acc, COUNT shift)
 #define BODY_w_r_shift(R, W, COUNT, K)                        \

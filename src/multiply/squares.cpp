@@ -8,7 +8,7 @@ constexpr auto SQUARES_DIFFERENCE = [](auto a, auto b) { return term(a, a) - ter
 
 }  // namespace
 
-#include "frame/stamp.h"
+#include "multiply/stamp.h"
 
 #include "multiply/squares.def"
 

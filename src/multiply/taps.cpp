@@ -1,7 +1,7 @@
 // Vectors times coefficients: one, two or four products a lane.
 #include "multiply/taps.h"
 
-#include "frame/stamp.h"
+#include "multiply/stamp.h"
 
 // KERNEL(OP, kind_taps, result layout, number of operands, their layout, coefficients)
 #define KERNEL_TAPS(OP, KIND, R, N, L, C) \

@@ -66,7 +66,7 @@ struct Channels<R, L, C, std::index_sequence<V...>> {
 
 }  // namespace
 
-#include "frame/stamp.h"
+#include "multiply/stamp.h"
 
 // KERNEL(OP, kind_window, result layout, operand layout, coefficients)
 #define KERNEL_fresh_window(OP, R, L, C) KERNEL_OF_WORDS(OP, (Window<R, L, C>::fresh(units...)))

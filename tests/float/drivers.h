@@ -12,6 +12,7 @@
 #include "float/cases.h"
 #include "float/host_state.h"
 #include "float/model.h"
+#include "kastarri/float.h"
 #include "support/drivers.h"
 
 namespace testing_support {

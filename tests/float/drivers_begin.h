@@ -23,6 +23,7 @@
 #define TEST_float_acc_ab_T(NAME, F, T, P, K) testing_support::drive_float_acc_ab_T(NAME, model_##K, F)
 #define TEST_float_const(NAME, F, T, K) testing_support::drive_float_const(NAME, F)
 
+#include "float/row_kinds.h"
 #include "frame/rows.h"
 
 namespace {

@@ -4,6 +4,8 @@
 #include <type_traits>
 
 #include "frame/entry.h"
+#include "kastarri/integer.h"
+#include "kastarri/multiply.h"
 
 namespace {
 

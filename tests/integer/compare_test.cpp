@@ -1,4 +1,4 @@
-#include "support/drivers.h"
+#include "integer/drivers.h"
 
 namespace model {
 

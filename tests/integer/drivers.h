@@ -3,6 +3,7 @@
 #ifndef KASTARRI_TESTS_INTEGER_DRIVERS_H
 #define KASTARRI_TESTS_INTEGER_DRIVERS_H
 
+#include "kastarri/integer.h"
 #include "support/drivers.h"
 
 #define KERNEL_unary(OP, RULE, L) constexpr auto model_##OP = testing_support::model_of<L, L>(model::RULE<L::bits>);

@@ -1,4 +1,5 @@
 // Loads and stores, by their rows.
+#include "kastarri/tables.h"
 #include "memory/drivers.h"
 
 namespace model {

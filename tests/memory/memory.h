@@ -7,6 +7,9 @@
 #include <random>
 #include <vector>
 
+#include "kastarri/gather.h"
+#include "kastarri/memory.h"
+#include "memory/row_kinds.h"
 #include "support/drivers.h"
 
 namespace testing_support {

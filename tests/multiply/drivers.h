@@ -3,6 +3,7 @@
 #ifndef KASTARRI_TESTS_MULTIPLY_DRIVERS_H
 #define KASTARRI_TESTS_MULTIPLY_DRIVERS_H
 
+#include "kastarri/multiply.h"
 #include "support/drivers.h"
 
 namespace testing_support {

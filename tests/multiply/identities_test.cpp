@@ -1,6 +1,7 @@
 // What holds between intrinsics, whatever their models say.
 #include <gtest/gtest.h>
 
+#include "kastarri/multiply.h"
 #include "support/operands.h"
 
 #define ZRA(OP) KASTARRI_SYMBOL(rk_zra32_ZRA_##OP)

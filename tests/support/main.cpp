@@ -6,7 +6,7 @@
 #include <cstdlib>
 #include <cstring>
 
-#include "kastarri.h"
+#include "kastarri/library.h"
 
 int main(int argc, char** argv) {
   testing::InitGoogleTest(&argc, argv);

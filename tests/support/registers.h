@@ -8,6 +8,8 @@
 #include <string>
 
 #include "frame/entry.h"
+#include "kastarri/library.h"
+#include "kastarri/state.h"
 
 namespace testing_support {
 

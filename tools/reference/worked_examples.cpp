@@ -5,7 +5,8 @@
 #include <utility>
 #include <vector>
 
-#include "frame/shapes.h"
+#include "families.h"
+#include "kastarri.h"
 #include "operands.h"
 
 namespace worked {

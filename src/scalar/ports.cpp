@@ -3,7 +3,7 @@
 // reordered nor merged. A handler may register others: every call looks the handler up anew.
 #include "frame/entry.h"
 #include "frame/failure.h"
-#include "frame/state.h"
+#include "scalar/state.h"
 
 namespace {
 
@@ -121,8 +121,8 @@ void cstub_Km_ZNB_Orbis_R5_64k_register_IMPWIRE(void* user_object, cstub_ImportW
   core.IMPWIRE.handler = handler;
 }
 
-#include "frame/scalar_stamp.h"
+#include "scalar/stamp.h"
 
-#include "frame/ports.def"
+#include "scalar/ports.def"
 
 #include "frame/rows_end.h"

@@ -1,7 +1,8 @@
 // Stamps tables of the scalar core, up to rows_end.h, into functions: the exported symbols themselves, which
 // no target dispatches.
 #include "frame/entry.h"
-#include "frame/shapes.h"
+#include "kastarri/scalar.h"
+#include "scalar/shapes.h"
 
 #define ENTRY(SYMBOL, SHAPE, ...) \
   SIG_##SHAPE(KASTARRI_SYMBOL(SYMBOL), __VA_ARGS__) { BODY_##SHAPE(__VA_ARGS__) }

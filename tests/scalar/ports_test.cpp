@@ -1,5 +1,6 @@
 // The ports: which handlers an intrinsic calls, in which order, with what; and how the program ends when
 // one of them is missing.
+#include "kastarri/scalar.h"
 #include "support/drivers.h"
 
 namespace {

@@ -1,6 +1,7 @@
 // SAR and the shifts: every amount from 0 to 63 and every argument from -70 to 140, over the corners of the
 // values, against shifts made bit by bit.
 
+#include "kastarri/scalar.h"
 #include "support/drivers.h"
 
 #define CORE(OP) cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_##OP

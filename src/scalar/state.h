@@ -1,6 +1,6 @@
 // The state block, as the library's own sources reach it.
-#ifndef KASTARRI_FRAME_STATE_H
-#define KASTARRI_FRAME_STATE_H
+#ifndef KASTARRI_SCALAR_STATE_H
+#define KASTARRI_SCALAR_STATE_H
 
 #include "kastarri/state.h"
 

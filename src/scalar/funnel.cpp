@@ -1,6 +1,6 @@
 // The shift-amount state SAR and the shifts of the scalar core.
 #include "frame/entry.h"
-#include "frame/state.h"
+#include "scalar/state.h"
 
 namespace {
 
@@ -28,8 +28,8 @@ word funnel(word hi, word lo, word amount) {
 
 }  // namespace
 
-#include "frame/scalar_stamp.h"
+#include "scalar/stamp.h"
 
-#include "frame/funnel.def"
+#include "scalar/funnel.def"
 
 #include "frame/rows_end.h"

@@ -2,6 +2,8 @@
 // integers, over the crossed corners of its operands.
 #include <csignal>
 
+#include "kastarri/scalar.h"
+#include "scalar/shapes.h"
 #include "support/drivers.h"
 
 namespace model {
@@ -221,7 +223,7 @@ void drive_stateless(const char* name, F f, Model model) {
 
 #include "frame/rows.h"
 
-#include "frame/scalar.def"
+#include "scalar/scalar.def"
 
 #include "frame/rows_end.h"
 

@@ -31,8 +31,8 @@ void store(Value from, const T* base, int offset) {
 
 }  // namespace
 
-#include "frame/scalar_stamp.h"
+#include "scalar/stamp.h"
 
-#include "frame/access.def"
+#include "scalar/access.def"
 
 #include "frame/rows_end.h"

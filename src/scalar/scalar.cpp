@@ -2,7 +2,7 @@
 #include <emmintrin.h>
 
 #include "frame/entry.h"
-#include "frame/state.h"
+#include "scalar/state.h"
 
 namespace {
 
@@ -55,8 +55,8 @@ Division<int> divided(int a, int b) {
 
 }  // namespace
 
-#include "frame/scalar_stamp.h"
+#include "scalar/stamp.h"
 
-#include "frame/scalar.def"
+#include "scalar/scalar.def"
 
 #include "frame/rows_end.h"

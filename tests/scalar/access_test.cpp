@@ -2,6 +2,7 @@
 // not aligned, before the memory is touched.
 #include <sys/mman.h>
 
+#include "kastarri/scalar.h"
 #include "support/drivers.h"
 
 namespace {

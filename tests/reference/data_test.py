@@ -15,6 +15,7 @@ sys.path[:0] = [os.path.join(ROOT, "tools"), os.path.join(ROOT, "tools", "refere
 import choices  # noqa: E402
 import entries  # noqa: E402
 import generate_headers  # noqa: E402
+import not_built  # noqa: E402
 
 with open(sys.argv.pop(1), encoding="utf-8") as file:
     EXAMPLES = json.load(file)["examples"]
@@ -190,6 +191,22 @@ class Facts(unittest.TestCase):
                                "ANDNX16": [], "ADDNXF16": ["rounds", "flags"], "SUBF16T": ["rounds", "flags"],
                                "int16_mtor_qv_vecNx16": [], "MULNX16PACKQ": ["wraps", "rounds"]}.items():
             self.assertEqual(facts[name], expected, name)
+
+    def test_what_is_written_instead_is_there(self):
+        there = {e.id for e in ENTRIES} | {e.short for e in ENTRIES}
+        for topic in not_built.TOPICS:
+            names = [name for code in re.findall("`([^`]+)`", topic.instead) for name in re.findall(r"\b[A-Za-z]+\w*(?=\(|$)", code)]
+            self.assertTrue(names, topic.key)
+            self.assertLessEqual(set(names), there)
+
+    def test_what_is_not_built_is_not_there(self):
+        self.assertEqual([e.id for e in ENTRIES if not_built.topic_of(e.id)], [])
+        for name, key in {"SELNX16I": "select", "SHFL2NX8": "select", "UNPKS2NX8": "select", "LANX16_IP": "aligning", "DIVNX16": "division",
+                          "RSQRTN_2XF32": "division", "ADDWUNX16": "widening", "UNSQZ2N": "compress", "RBMAXNX16": "reductions",
+                          "RADDANX16": "reductions", "LSCF_I": "unknown-elements"}.items():
+            self.assertEqual(not_built.topic_of(name).key, key, name)
+        for name in ("ADDNX17", "SLLNX8", "FOONX16", "MULX", "LATER", "SATNX16", "LSNX17_I"):
+            self.assertIsNone(not_built.topic_of(name), name)
 
     def test_short_names_lead_to_one_entry(self):
         self.assertEqual(len({e.id for e in ENTRIES}), len(ENTRIES))

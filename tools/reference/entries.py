@@ -38,9 +38,15 @@ class Operand:
             const, self.type, mark, self.name = None, text, None, name or ""
         self.register = types.get(self.type)
         self.in_memory = bool(mark) and "*" in mark
+        self.pointer = mark == "**"
         self.role = ("result" if name == "result" else "in memory" if self.in_memory
                      else "written" if mark == "&" and not const else "read")
+        self.keeps = False  # whether what it held before the call matters
         self.bytes = self.register.units * self.register.unit_bits // 8 if self.register else HOST_TYPES[self.type][0] // 8
+
+    @property
+    def access(self):
+        return "read and written" if self.keeps else "read, moved" if self.pointer else self.role
 
     @property
     def shape(self):
@@ -55,6 +61,8 @@ class Operand:
 def operands_of(row, types):
     result, parameters = re.fullmatch(r"(.*?)\s*\bcstub\w+\((.*)\)", row.prototype).groups()
     operands = [Operand(text, types) for text in parameters.split(",") if text.strip()]
+    for operand in operands:
+        operand.keeps = operand.role == "written" and operand.name in ("r", "acc") and not row.shape.startswith("load")
     return operands if result == "void" else operands + [Operand(result, types, "result")]
 
 

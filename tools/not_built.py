@@ -15,7 +15,7 @@ TOPICS = [
           "how they buffer and rotate is not known well enough to give the core's bits",
           "Whole vectors are loaded and stored at any address: `LVNX16_IP` and `SVNX16_IP` take the place of an aligning access, "
           "and what primes or flushes an alignment register is left out.",
-          [], ["LoadAligning", "StoreAligning"], "unaligned stream priming flush alignment register load store"),
+          [], ["LoadAligning", "StoreAligning"], "unaligned stream streaming priming flush alignment aligning align register valign"),
     Topic("select", "Select, shuffle, dual-select, unpack",
           "their patterns are tables of the core that we do not have",
           "Select by a predicate: `r = b; ZRA_MINNX16T(r, a, a, p);` takes a where the bit is 1, for the smaller of a and a is a. "
@@ -23,12 +23,12 @@ TOPICS = [
           "every lane: `REPNX16`. Every other lane of an accumulator: `PACKVRNX48_0` and `PACKVRNX48_1`. Bytes to 16 bits: "
           "`LVNX8S_I`, `LVNX8U_I`.",
           [], ["SELect", "DualSELect", "SHuFfLe", "UNPacK"],
-          "shuffle select permute permutation rearrange interleave deinterleave zip unzip transpose blend merge vsel swizzle reverse "
+          "shuffle select dual permute permutation rearrange interleave deinterleave zip unzip transpose blend merge vsel swizzle reverse "
           "unpack lanes pattern"),
     Topic("engine", "The general wide partial-product engine", "its operand encoding is not known",
           "Sums of products have intrinsics of their own: `MULPANX16` of two, `MULQAN16XR16` of four with coefficients, `MUL4TAN16XR8` "
           "over a sliding window.",
-          [], [], "partial product engine general wide matrix"),
+          [], [], "partial product engine general wide matrix systolic"),
     Topic("division", "Division, reciprocal and square-root steps", "their seed tables are not known",
           "Divide lane by lane in C on an array, or multiply by a reciprocal that the host computes. Integers of the scalar core have "
           "`RK_QUOS`, `RK_QUOU`, `RK_REMS` and `RK_REMU`; the exponent steps of floats are there: `scalarfp_MKDADJ_S`, "
@@ -44,8 +44,8 @@ TOPICS = [
           "Store the vector and the predicate and copy the enabled lanes in a loop; `GATHERANX16` brings them back in the new order.",
           [r"(UN)?SQZ\w*"], [], "compress compaction compact squeeze expand left pack filter predicate"),
     Topic("reductions", "Accumulating and bitwise reductions, `RMAX`, `RMIN`, `RBMAX`, `RBMIN`", "only their names are known",
-          "The sum of all lanes is there: `RADDNX16`, `RADDSNX16`. A maximum over lanes: store, and compare in a loop, or halve five "
-          "times by `GATHERANX16` and `MAXNX16`. Whether any bit of a predicate is 1: `RORBN`, all: `RANDBN`.",
+          "The sum of all lanes is there: `RADDNX16`, `RADDSNX16`. A maximum over lanes: store the vector twice in a row, take "
+          "`MAXNX16` of it and of what `LVNX16_I` loads 2 h bytes on, and again for h = 16, 8, 4, 2, 1. Whether any bit of a predicate is 1: `RORBN`, all: `RANDBN`.",
           [r"RB?(MAX|MIN)\w*", r"R(ADD|OR|AND|XOR)AU?[N2]\w*", r"R(OR|AND|XOR)[N2]\w*"], [],
           "reduce reduction horizontal across lanes maximum minimum max min argmax argmin bitwise and or xor accumulate"),
     Topic("unknown-elements", "`LSFAST9_I`, `SSFAST9_I`, `LSCF_I`, `SSCF_I`", "nothing tells their operands",

@@ -188,7 +188,7 @@ class DebianPackages(Directory):
         headers = {"usr/include/" + os.path.relpath(path, os.path.join(ROOT, "include"))
                    for path in glob.glob(os.path.join(ROOT, "include", "**", "*.h"), recursive=True)}
         links = {f"usr/{MULTIARCH}/libkastarri.so", f"usr/{MULTIARCH}/libkastarri_static.a",
-                 "usr/lib/pkgconfig/kastarri.pc", "usr/lib/cmake/kastarri/kastarri-config.cmake"}
+                 "usr/bin/kastarri-port", f"usr/{MULTIARCH}/kastarri/port.json", "usr/lib/pkgconfig/kastarri.pc", "usr/lib/cmake/kastarri/kastarri-config.cmake"}
         self.assertEqual((headers | links | documents["libkastarri-dev"]) - set(devel), set(), "missing")
         self.assertEqual(set(runtime) & set(devel), set(), "in both packages")
         for name, (mode, owner) in {**runtime, **devel}.items():

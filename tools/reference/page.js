@@ -38,7 +38,7 @@ const byName = new Map(entries.flatMap((entry) => entry.names.map((name) => [nam
 // What is not built is found like an entry.
 const topics = data.topics.map((topic) => ({
   ...topic, id: `not-built:${topic.key}`, names: [], patterns: topic.names.map((pattern) => new RegExp(`^(?:${pattern})$`)),
-  words: {operation: `${topic.title} ${topic.words}`}, plainness: 1,
+  words: {operation: topic.words}, plainness: 0.93,
 }));
 const index = indexOf([...topics, ...entries]);
 

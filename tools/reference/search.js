@@ -77,8 +77,8 @@ function matchesOf(index, word) {
   matchWords((each) => each === wanted, 1);
   if (wanted.length > 2) matchWords((each) => each !== wanted && each.startsWith(wanted), BEGINS);
   index.entries.forEach(({names}, number) => {
-    const worth = nameWorth(names, word);
-    if (worth) matches.set(number, worth + (matches.get(number) || 0));
+    const worth = nameWorth(names, word), other = matches.get(number) || 0;
+    if (worth) matches.set(number, worth > NAME_CONTAINS ? worth + other : Math.max(worth, other));
   });
   if (matches.size || word.length < 4) return matches;
   matchWords((each) => each.length > 2 && (oneLetterApart(each, wanted) || oneLetterApart(each, word)), MISSPELT);

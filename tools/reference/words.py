@@ -286,7 +286,8 @@ def words_of(entry):
     """What the operation is called, and what else tells the entry from others: two texts of words."""
     name = entry.id
     if entry.family == "scalar":
-        words = [f"{first(SCALAR, name.removeprefix('RK_'))} scalar core", ""]
+        text = f"{first(SCALAR, name.removeprefix('RK_'))} scalar core"
+        words = [re.sub(r"\d+bit", "", text), " ".join(re.findall(r"\d+bit", text))]
     elif name.startswith("scalarfp_"):
         words = of_scalar_float(name)
     elif re.search(r"_(load|store)[ix]p?$|_move$|_(rtor|mtor|rtom)_", name):

@@ -35,9 +35,9 @@ inline void fourier(std::vector<std::complex<double>>& x) {
   }
 }
 
-// The mean power spectrum of a sound in dB, 0 dB a sine of full scale: size / 2 + 1 values from 0 Hz to
-// half the sample rate, by Hann windows of `size` samples: overlapping ones, or at most MOST_WINDOWS spread
-// over a long sound.
+// The mean power spectrum of a sound in dB, where 0 dB is a sine of full scale: size / 2 + 1 values from 0 Hz to
+// half the sample rate. It is taken through Hann windows of `size` samples, each half over the one before; of a
+// long sound at most MOST_WINDOWS are taken, at even distances.
 constexpr std::size_t MOST_WINDOWS = 1000;
 
 inline std::vector<double> power_spectrum(const std::vector<std::int16_t>& sound, std::size_t size) {

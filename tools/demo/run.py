@@ -37,12 +37,12 @@ EXAMPLES = [
 
 
 def run(example, build, out, wrapper):
-    """What an example printed, and its exit status."""
+    """What an example printed, complaints included, and its exit status."""
     name, kind, draws, *_ = example
     command = [*wrapper, os.path.join(build, "examples", name), "--output", os.path.join(out, name + kind)]
     if draws:
         command += ["--picture", os.path.join(out, name + "-plot.svg")]
-    result = subprocess.run(command, stdout=subprocess.PIPE, text=True, check=False)
+    result = subprocess.run(command, stdout=subprocess.PIPE, stderr=subprocess.STDOUT, text=True, check=False)
     print(result.stdout)
     return result.stdout, result.returncode
 

@@ -34,6 +34,9 @@ FAMILIES = {
 }
 CONVERSION_TABLES = ["frame/conversions.def", "float/conversions.def"]
 
+# What a text that reads tables begins with.
+READER = '#include "families.h"\n'
+
 UNITS = {"word": ("unsigned int", 32), "half": ("unsigned short", 16), "byte": ("unsigned char", 8)}
 
 
@@ -207,7 +210,7 @@ def read_rows(tables, types):
     rows = []
     for table in tables:
         doc = ""
-        for kind, fields in records('#include "families.h"\n#define DOC(...) @doc{__VA_ARGS__}@\n'
+        for kind, fields in records(READER + '#define DOC(...) @doc{__VA_ARGS__}@\n'
                                     '#define ENTRY(SYMBOL, SHAPE, ...) @row{SYMBOL@,SHAPE@,SIG_##SHAPE(SYMBOL, __VA_ARGS__)}@\n'
                                     '#define HELPER ENTRY\n'
                                     f'#include "frame/rows.h"\n#include "{table}"\n'):
@@ -255,8 +258,11 @@ def short_name(name):
 
 def listed_tables():
     """The tables that the library is made of, in their order."""
-    lists = [open(os.path.join(ROOT, "src", name), encoding="utf-8").read() for name in ("scalar_rows.def", "rows.def")]
-    return re.findall(r'^#include "(.*)"', "".join(lists), re.M)
+    listed = []
+    for name in ("scalar_rows.def", "rows.def"):
+        with open(os.path.join(ROOT, "src", name), encoding="utf-8") as file:
+            listed += re.findall(r'^#include "(.*)"', file.read(), re.M)
+    return listed
 
 
 def tables_by_family():

@@ -170,8 +170,10 @@ class Page(unittest.TestCase):
                      "The address of the destination r is tested", "Post-increment element loads test the address",
                      "src/memory/elements.def", "a choice of this library"):
             self.assertIn(text, self.entry())
+        self.open("#LVNX16_IP")
+        self.assertIn("loads the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.", self.entry())
         self.open("#ADDSNX16T")
-        self.assertIn("r keeps the lane that it held", self.entry())
+        self.assertIn("Where predicate bit i is 0, r keeps lane i", self.entry())
         rows = self.run_script("return [...document.querySelectorAll('.lanes tr')].map((row) => row.innerText.split(/\\s+/))")
         self.assertEqual(rows[1][:4], ["r", "10", "-20", "30"])
         self.assertEqual(rows[5][:5], ["r", "after", "3", "-20", "293"])

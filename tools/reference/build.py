@@ -62,7 +62,7 @@ def coefficients(entry, operand, value):
 def example_data(example, initial, entry, text):
     """What goes in and what comes out, without what only stays as it is."""
     given, got = example["in"], example["out"]
-    rule = " ".join([entry.row.doc] + entry.context)
+    rule = " ".join([entry.rule] + entry.context)
     words_of_coefficients = {o.name: o for o in entry.operands if o.type == "qv_int32pr" and entry.family == "multiply"}
     given = [[name, coefficients(entry, words_of_coefficients[name], values) if name in words_of_coefficients else values]
              for name, values in given]
@@ -82,8 +82,8 @@ def entry_data(entry, examples, text):
                 for number in (text(o.name), text(o.type), text(o.access), text(o.shape))]
     stem, axes = twins.axes_of(entry)
     return [entry.short, entry.symbol.replace(generate_headers.PREFIX, "$"), list(generate_headers.FAMILIES).index(entry.family),
-            text(row.table), text(row.doc), [text(t) for t in entry.context], prototype, operands, entry.lane_bits,
-            entry.register_bits, int(entry.predicated), int(entry.keeps_lanes), entry.facts, text(entry.alignment),
+            text(row.table), text(entry.rule), [text(t) for t in entry.context], prototype, operands, entry.lane_bits,
+            entry.register_bits, int(entry.predicated), entry.facts, text(entry.alignment),
             entry.choices, example_data(examples["examples"][row.name], examples["initial"], entry, text),
             [text(w) for w in words.words_of(entry)], round(100 * words.plainness(entry)), [text(t) for t in [stem, *axes]]]
 

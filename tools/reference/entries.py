@@ -4,6 +4,7 @@ import os
 import re
 
 import generate_headers
+import rules
 from generate_headers import PREFIX, ROOT
 
 # Host types: bits, and how they are shown.
@@ -89,8 +90,8 @@ def operation(name):
     return re.sub(r"^ZRA_", "", generate_headers.short_name(name))
 
 
-class Rules:
-    """The rules of a table, and which others a rule's words refer to."""
+class Sentences:
+    """The sentences of a table, and which others their words refer to."""
 
     def __init__(self, rows):
         self.texts = list(dict.fromkeys(row.doc for row in rows))
@@ -121,22 +122,18 @@ def about_table(table):
 
 
 class Entry:
-    def __init__(self, family, row, types, rules, choices):
+    def __init__(self, family, row, types, sentences, choices):
         self.row, self.family = row, family
         self.id = operation(row.name)
         self.short = generate_headers.short_name(row.name)
         self.symbol = generate_headers.symbol(row.name)
         self.operands = operands_of(row, types)
-        self.context = rules.context(row.doc)
-        self.facts = facts([row.doc] + self.context)
+        self.rule = rules.own(row, types)
+        self.context = [rules.own(row, types, sentence) for sentence in sentences.context(row.doc)]
+        self.facts = facts([self.rule] + self.context)
         self.alignment = alignment(row, self.operands)
         self.choices = [i for i, choice in enumerate(choices) if choice.family == family and choice.names(self.id)]
         self.predicated = "_T" in row.shape
-
-    @property
-    def keeps_lanes(self):
-        """Whether a predicated form leaves the lanes of its destination that are not enabled."""
-        return self.predicated and any(o.role == "written" for o in self.operands) and self.alignment is None
 
     @property
     def lane_bits(self):
@@ -153,6 +150,6 @@ def read_entries(choices):
     types = generate_headers.read_types()
     entries = []
     for family, (_, tables, rows) in generate_headers.all_rows().items():
-        rules = {table: Rules([row for row in rows if row.table == table]) for table in tables}
-        entries += [Entry(family, row, types, rules[row.table], choices) for row in rows]
+        sentences = {table: Sentences([row for row in rows if row.table == table]) for table in tables}
+        entries += [Entry(family, row, types, sentences[row.table], choices) for row in rows]
     return entries

@@ -34,9 +34,7 @@ function sentence(text) {
 }
 
 function rule(entry) {
-  const keeper = entry.operands.find((o) => o.role === 'read and written');
   return section('What it does', element('p', {class: 'rule'}, sentence(entry.rule)),
-    entry.keeps ? element('p', null, `Where the bit of p is 0, ${keeper.name} keeps the lane that it held.`) : null,
     entry.context.map((text) => element('p', {class: 'aside'}, 'That is: ', sentence(text))));
 }
 

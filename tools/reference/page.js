@@ -8,7 +8,7 @@ function groups(list, size) {
 }
 
 function entryOf(row) {
-  const [short, symbol, family, table, rule, context, prototype, operands, lanes, register, predicated, keeps, facts,
+  const [short, symbol, family, table, rule, context, prototype, operands, lanes, register, predicated, facts,
     alignment, choices, example, [operation, attributes], plainness, [stem, ...axes]] = row;
   const id = short.replace(/^ZRA_/, '');
   const types = groups(operands, 4).map(([name, type, role, shape]) => ({
@@ -20,7 +20,7 @@ function entryOf(row) {
   return {
     id, short, symbol: fullName, names, family, table, rule: textOf(rule), context: context.map(textOf),
     prototype: prototype.replaceAll('$', data.prefix), shortPrototype: prototype.replace(symbol, short).replaceAll('$', ''),
-    operands: types, lanes, register, keeps, alignment: textOf(alignment), choices, facts, example,
+    operands: types, lanes, register, alignment: textOf(alignment), choices, facts, example,
     traits: new Set([...facts, ...(predicated ? ['predicated'] : []), ...(choices.length ? ['choice'] : []),
       ...(alignment === null ? [] : ['memory']), ...(/tested:/.test(textOf(alignment)) ? ['aligned'] : [])]),
     searched: [...names.slice(0, 3), ...typeNames, textOf(rule)].join('\n').toLowerCase(),

@@ -13,8 +13,7 @@
     lanes<L::count>(                                                             \
         result<L>(r), [chosen](int) { return chosen; }, Same(0));                \
   }
-// In registers of 64 bytes at most: longer ones the compiler fills with a string instruction, which takes
-// longer to start than all of this.
+// In pieces of 64 bytes at most. For longer ones compilers choose a string instruction, which is slow to start.
 #define KERNEL_filled(OP, BYTE)                                          \
   template <class Unit, std::size_t units>                               \
   static inline void KASTARRI_SEMANTIC(OP)(Unit(&r)[units]) {            \

@@ -3,7 +3,7 @@
 #
 #   make demo          build the library and the examples and run them on the data that is shipped
 #   make test          build everything and run the tests
-#   make bench         time every intrinsic and write docs/performance.md
+#   make bench         time every intrinsic and write docs/performance.md, a summary, and build/performance.md
 #   make bench-static  time kernels with the static library against the shared one
 #   make docs          write build/docs/reference.html, all intrinsics on one page
 #   make picture       take docs/pictures/reference.png of that page
@@ -38,7 +38,7 @@ bench:
 	tools/packages.sh build test
 	cmake --preset test
 	$(CMAKE_BUILD) test
-	tools/performance.py build/test docs/performance.md
+	tools/performance.py build/test --summary docs/performance.md --table build/performance.md
 
 bench-static:
 	tools/packages.sh build test

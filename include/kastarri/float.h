@@ -6,7 +6,8 @@
 #include "kastarri/library.h"
 #include "kastarri/types.h"
 
-/// control: bits 0-1 RoundMode, bits 2-6 StickyEnable; other bits read as 0 and are dropped when written.
+/// control: bits 0-1 RoundMode, bits 2-6 StickyEnable, which enables nothing; other bits read as 0 and are
+/// dropped when written.
 /// Rule: src/float/scalars.def
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_RUR_FCR();
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_WUR_FCR(unsigned value);

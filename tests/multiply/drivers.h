@@ -46,9 +46,15 @@ class MultiplyName {
   std::string rest_;
 };
 
-// The operands of one call, as bytes in memory.
+// The operands of one call, as bytes in memory. A reference to one may point beyond its first byte, into the same word.
 struct Factors {
   const unsigned char* operand[8];
+  std::size_t beyond[8];
+
+  template <class A>
+  [[gnu::no_sanitize("undefined")]] const A& reference(std::size_t which) const {
+    return *reinterpret_cast<const A*>(operand[which] + beyond[which]);
+  }
 
   Bits at(int which, int lane, int bits, bool is_unsigned) const {
     Bits value = 0;
@@ -200,6 +206,7 @@ void drive_multiply(const std::string& op, Call call) {
       const unsigned char* from = factors[which].bytes;
       const std::size_t slot = random() % 16;
       if (is_word && n % 2) from = reinterpret_cast<unsigned char*>(acc._);
+      if (is_word && n % 3 == 0) f.beyond[which] = random() % 4;
       f.operand[which++] = is_word ? from + 4 * slot : from;
     };
     (place(is_coefficient<A>), ...);
@@ -223,13 +230,12 @@ void drive_multiply(const std::string& op, Call call) {
 
 template <class R, class... A, std::size_t... I>
 void drive_multiply(const std::string& op, R (*function)(const A&...), std::index_sequence<I...>) {
-  drive_multiply<R, A...>(
-      op, [function](R&, const Factors& f) { return function(*reinterpret_cast<const A*>(f.operand[I])...); });
+  drive_multiply<R, A...>(op, [function](R&, const Factors& f) { return function(f.template reference<A>(I)...); });
 }
 template <class W, class... A, std::size_t... I>
 void drive_multiply(const std::string& op, void (*function)(W&, const A&...), std::index_sequence<I...>) {
   drive_multiply<W, A...>(op, [function](W& acc, const Factors& f) {
-    function(acc, *reinterpret_cast<const A*>(f.operand[I])...);
+    function(acc, f.template reference<A>(I)...);
     return acc;
   });
 }

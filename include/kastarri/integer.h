@@ -382,6 +382,16 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSNX16(const cstub_Km_ZNB_Orbis_R5_
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
 
+/// lane i = |a[i]|, modulo 2^w: the most negative value stays as it is; bit i of p = 1 when a[i] is negative,
+/// else 0.
+/// Lanes: qv_vecNx16 32 x 16 bits, signed; vboolN 32 x 1 bit.
+/// Rule: src/integer/arithmetic.def
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_BABSNX16(
+    cstub_Km_ZNB_Orbis_R5_64k_vboolN& p,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
+
 /// lane i = |a[i]|, clamped to the signed range of the lane: the most negative value gives the largest one.
 /// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_int16 1 x 16 bits, signed.
 /// Rule: src/integer/arithmetic.def
@@ -1385,6 +1395,14 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REPN_2X32UT(
     immediate i,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
+/// lane number (immediate modulo the number of lanes) of a.
+/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_int8 1 x 8 bits, signed.
+/// Rule: src/integer/replicate.def
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SELS2NX8(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    immediate i);
+
 /// every bit is 0.
 /// Rule: src/integer/replicate.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ZERO2NX8();
@@ -2010,5 +2028,352 @@ KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADDSNX16T(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// the largest signed lane.
+/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits,
+/// signed; qv_int8 1 x 8 bits, signed; qv_int16 1 x 16 bits, signed; qv_int32v 1 x 32 bits, signed.
+/// Rule: src/integer/reductions.def
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAX2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
+
+/// the largest signed lane of those whose predicate bit is 1; without any, the lowest number of a lane.
+/// Rule: src/integer/reductions.def
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAX2NX8T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXNX16T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXN_2X32T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// the smallest signed lane.
+/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits,
+/// signed; qv_int8 1 x 8 bits, signed; qv_int16 1 x 16 bits, signed; qv_int32v 1 x 32 bits, signed.
+/// Rule: src/integer/reductions.def
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMIN2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
+
+/// the smallest signed lane of those whose predicate bit is 1; without any, the highest number of a lane.
+/// Rule: src/integer/reductions.def
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMIN2NX8T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINNX16T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINN_2X32T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// the largest unsigned lane.
+/// Lanes: qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecN_2x32Uv 16 x 32 bits,
+/// unsigned; qv_int8U 1 x 8 bits, unsigned; qv_int16U 1 x 16 bits, unsigned; qv_int32Uv 1 x 32 bits,
+/// unsigned.
+/// Rule: src/integer/reductions.def
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXU2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXUNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXUN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
+
+/// the largest unsigned lane of those whose predicate bit is 1; without any, 0.
+/// Rule: src/integer/reductions.def
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXU2NX8T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXUNX16T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXUN_2X32T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// the smallest unsigned lane.
+/// Lanes: qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecN_2x32Uv 16 x 32 bits,
+/// unsigned; qv_int8U 1 x 8 bits, unsigned; qv_int16U 1 x 16 bits, unsigned; qv_int32Uv 1 x 32 bits,
+/// unsigned.
+/// Rule: src/integer/reductions.def
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINU2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINUNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINUN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
+
+/// the smallest unsigned lane of those whose predicate bit is 1; without any, the highest number of a lane.
+/// Rule: src/integer/reductions.def
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINU2NX8T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINUNX16T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINUN_2X32T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// the exclusive or of all lanes.
+/// Rule: src/integer/reductions.def
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXOR2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXOR2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
+
+/// the exclusive or of the lanes whose predicate bit is 1; without any, 0.
+/// Rule: src/integer/reductions.def
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXOR2NX8T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXOR2NX8UT(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORNX16T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORNX16UT(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORN_2X32T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORN_2X32UT(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// the bits that are 1 in any lane.
+/// Rule: src/integer/reductions.def
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROR2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROR2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
+
+/// the bits that are 1 in any lane whose predicate bit is 1; without any such lane, 0.
+/// Rule: src/integer/reductions.def
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROR2NX8T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROR2NX8UT(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORNX16T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORNX16UT(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORN_2X32T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORN_2X32UT(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// the bits that are 1 in every lane.
+/// Rule: src/integer/reductions.def
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RAND2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RAND2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
+
+/// the bits that are 1 in every lane whose predicate bit is 1; without any such lane, all ones.
+/// Rule: src/integer/reductions.def
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RAND2NX8T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RAND2NX8UT(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDNX16T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDNX16UT(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDN_2X32T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDN_2X32UT(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// acc = the larger of acc and the largest lane of a, all signed.
+/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits,
+/// signed; qv_int8 1 x 8 bits, signed; qv_int16 1 x 16 bits, signed; qv_int32v 1 x 32 bits, signed.
+/// Rule: src/integer/reductions.def
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXA2NX8(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXANX16(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXAN_2X32(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
+
+/// acc = the smaller of acc and the smallest lane of a, all signed.
+/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits,
+/// signed; qv_int8 1 x 8 bits, signed; qv_int16 1 x 16 bits, signed; qv_int32v 1 x 32 bits, signed.
+/// Rule: src/integer/reductions.def
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINA2NX8(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINANX16(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINAN_2X32(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
+
+/// acc = the exclusive or of acc and all lanes of a.
+/// Rule: src/integer/reductions.def
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORA2NX8(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORA2NX8U(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORANX16(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORANX16U(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORAN_2X32(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORAN_2X32U(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
+
+/// acc = the bits that are 1 in acc or any lane of a.
+/// Rule: src/integer/reductions.def
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORA2NX8(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORA2NX8U(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORANX16(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORANX16U(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORAN_2X32(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORAN_2X32U(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
+
+/// acc = the bits that are 1 in acc and every lane of a.
+/// Rule: src/integer/reductions.def
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDA2NX8(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDA2NX8U(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDANX16(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDANX16U(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDAN_2X32(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDAN_2X32U(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
 
 #endif

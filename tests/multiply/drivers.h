@@ -14,10 +14,11 @@ class MultiplyName {
  public:
   explicit MultiplyName(std::string name) : rest_(std::move(name)) {
     square = take("SQR");
+    widened = take("ADDW") ? '+' : take("SUBW") ? '-' : ' ';
     if (!square) take("MUL");
     transfer = take("SGN");
     saturating = transfer && take("S");
-    first_unsigned = second_unsigned = take("UU") || (square && take("U"));
+    first_unsigned = second_unsigned = take("UU") || ((square || widened != ' ') && take("U"));
     if (!first_unsigned && !(first_unsigned = take("US"))) second_unsigned = take("SU");
     window = take("4T");
     difference = take("PD");
@@ -34,7 +35,7 @@ class MultiplyName {
 
   bool square, transfer, saturating, first_unsigned, second_unsigned, window, difference, high, predicated;
   int products;
-  char kind, pack = ' ';
+  char kind, pack = ' ', widened;  // widened lanes are added or subtracted, not multiplied
   std::string shape;
 
  private:
@@ -106,6 +107,10 @@ class MultiplyModel {
       const Bits x = f.at(n_.square ? p : 2 * p, i, bits_, n_.first_unsigned);
       return x * (n_.square ? x : f.at(2 * p + 1, i, bits_, n_.second_unsigned));
     };
+    if (n_.widened != ' ') {
+      const Bits a = f.at(0, i, bits_, n_.first_unsigned), b = f.at(1, i, bits_, n_.first_unsigned);
+      return n_.widened == '+' ? a + b : a - b;
+    }
     if (n_.transfer) return signed_by(f.at(0, i, bits_, false), f.at(1, i, bits_, false));
     if (n_.products == 1) return product(0);
     return n_.difference ? product(0) - product(1) : product(0) + product(1);

@@ -6,8 +6,10 @@
 #include "kastarri/library.h"
 #include "kastarri/types.h"
 
+/* Single products. Factors are signed; in UU forms unsigned; in US forms the first is unsigned.
+   Table: src/multiply/products.def */
+
 /// lane i = a[i] * b[i], exact; UU forms read both factors as unsigned, US forms the first.
-/// Rule: src/multiply/products.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL2NX8(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
@@ -83,7 +85,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUS32U(
 
 /// lane i of acc = acc[i] + a[i] * b[i], modulo 2^24, 2^48 or 2^64; UU forms read both factors as unsigned,
 /// US forms the first.
-/// Rule: src/multiply/products.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULA2NX8(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
@@ -177,7 +178,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSA32U(
 
 /// lane i of acc = acc[i] - a[i] * b[i], modulo 2^24, 2^48 or 2^64; UU forms read both factors as unsigned,
 /// US forms the first.
-/// Rule: src/multiply/products.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULS2NX8(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
@@ -279,11 +279,11 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSS32U(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
 
+/* Paired products: the sum of two, or in PD forms the first less the second.
+   Table: src/multiply/pairs.def */
+
 /// lane i = a[i] * b[i] + c[i] * d[i], exact; UU forms read both factors of a product as unsigned, US forms
 /// the first.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vecNx16 32 x 16 bits, signed;
-/// qv_vecNx16U 32 x 16 bits, unsigned; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed.
-/// Rule: src/multiply/pairs.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULP2NX8(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
@@ -323,9 +323,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPNX16(
 
 /// lane i of acc = acc[i] + (a[i] * b[i] + c[i] * d[i]), modulo 2^24 or 2^48; UU forms read both factors of a
 /// product as unsigned, US forms the first.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vecNx16 32 x 16 bits, signed;
-/// qv_vecNx16U 32 x 16 bits, unsigned; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed.
-/// Rule: src/multiply/pairs.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPA2NX8(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
@@ -371,9 +368,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPANX16(
 
 /// lane i of acc = acc[i] - (a[i] * b[i] + c[i] * d[i]), modulo 2^24 or 2^48; UU forms read both factors of a
 /// product as unsigned, US forms the first.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vecNx16 32 x 16 bits, signed;
-/// qv_vecNx16U 32 x 16 bits, unsigned; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed.
-/// Rule: src/multiply/pairs.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPS2NX8(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
@@ -419,9 +413,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPSNX16(
 
 /// lane i = a[i] * b[i] - c[i] * d[i], exact; UU forms read both factors of a product as unsigned, US forms
 /// the first.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vecNx16 32 x 16 bits, signed;
-/// qv_vecNx16U 32 x 16 bits, unsigned; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed.
-/// Rule: src/multiply/pairs.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPD2NX8(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
@@ -461,9 +452,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPDNX16(
 
 /// lane i of acc = acc[i] + (a[i] * b[i] - c[i] * d[i]), modulo 2^24 or 2^48; UU forms read both factors of a
 /// product as unsigned, US forms the first.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vecNx16 32 x 16 bits, signed;
-/// qv_vecNx16U 32 x 16 bits, unsigned; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed.
-/// Rule: src/multiply/pairs.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPDA2NX8(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
@@ -507,8 +495,10 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPDANX16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& c,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& d);
 
+/* Sums of two squares, in PD forms the first less the second.
+   Table: src/multiply/squares.def */
+
 /// lane i = a[i]^2 + b[i]^2, exact; SQRU forms read the lanes as unsigned.
-/// Rule: src/multiply/squares.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRP2NX8(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
@@ -547,7 +537,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUP16U(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
 
 /// lane i of acc = acc[i] + (a[i]^2 + b[i]^2), modulo 2^24 or 2^48; SQRU forms read the lanes as unsigned.
-/// Rule: src/multiply/squares.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRPA2NX8(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
@@ -595,7 +584,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPA16U(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
 
 /// lane i of acc = acc[i] - (a[i]^2 + b[i]^2), modulo 2^24 or 2^48; SQRU forms read the lanes as unsigned.
-/// Rule: src/multiply/squares.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRPS2NX8(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
@@ -643,7 +631,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPS16U(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
 
 /// lane i = a[i]^2 - b[i]^2, exact; SQRU forms read the lanes as unsigned.
-/// Rule: src/multiply/squares.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRPD2NX8(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
@@ -682,7 +669,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPD16U(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
 
 /// lane i of acc = acc[i] + (a[i]^2 - b[i]^2), modulo 2^24 or 2^48; SQRU forms read the lanes as unsigned.
-/// Rule: src/multiply/squares.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRPDA2NX8(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
@@ -729,11 +715,12 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPDA16U(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
 
+/* Vectors times coefficients from words of the scalar core. A word is the one in whose bytes the reference
+   points: the low two bits of the address are ignored.
+   Table: src/multiply/taps.def */
+
 /// lane i = a[i] * s0, s0 the low half of s, exact; vectors and coefficients are signed, US forms the vectors
 /// as unsigned.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vec2Nx24 64 x 24 bits,
-/// signed; qv_int32pr 1 x 32 bits, unsigned.
-/// Rule: src/multiply/taps.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL2N8XR16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
@@ -745,9 +732,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUS2N8XR16(
 
 /// added to acc, modulo 2^24: lane i = a[i] * s0, s0 the low half of s; vectors and coefficients are signed,
 /// US forms the vectors as unsigned.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vec2Nx24 64 x 24 bits,
-/// signed; qv_int32pr 1 x 32 bits, unsigned.
-/// Rule: src/multiply/taps.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULA2N8XR16(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
@@ -761,9 +745,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSA2N8XR16(
 
 /// lane i = a[i] * s1 + b[i] * s0, s1 the high and s0 the low half of s, modulo 2^24; vectors and
 /// coefficients are signed, US forms the vectors as unsigned.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vec2Nx24 64 x 24 bits,
-/// signed; qv_int32pr 1 x 32 bits, unsigned.
-/// Rule: src/multiply/taps.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULP2N8XR16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
@@ -777,9 +758,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSP2N8XR16(
 
 /// added to acc, modulo 2^24: lane i = a[i] * s1 + b[i] * s0, s1 the high and s0 the low half of s; vectors
 /// and coefficients are signed, US forms the vectors as unsigned.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vec2Nx24 64 x 24 bits,
-/// signed; qv_int32pr 1 x 32 bits, unsigned.
-/// Rule: src/multiply/taps.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPA2N8XR16(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
@@ -795,9 +773,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPA2N8XR16(
 
 /// lane i = a[i] * s1 + b[i] * s0, s1 the high and s0 the low half of s, exact; vectors and coefficients are
 /// signed, UU forms read both as unsigned, US forms the vectors, SU forms the coefficients.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecNx48 32 x 48 bits,
-/// signed; qv_int32pr 1 x 32 bits, unsigned.
-/// Rule: src/multiply/taps.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPN16XR16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
@@ -822,9 +797,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUPN16XR16(
 /// added to acc, modulo 2^48: lane i = a[i] * s1 + b[i] * s0, s1 the high and s0 the low half of s; vectors
 /// and coefficients are signed, UU forms read both as unsigned, US forms the vectors, SU forms the
 /// coefficients.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecNx48 32 x 48 bits,
-/// signed; qv_int32pr 1 x 32 bits, unsigned.
-/// Rule: src/multiply/taps.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPAN16XR16(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
@@ -853,9 +825,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUPAN16XR16(
 /// lane i = a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the bytes of s from the highest, exact;
 /// vectors and coefficients are signed, UU forms read both as unsigned, US forms the vectors, SU forms the
 /// coefficients.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vec2Nx24 64 x 24 bits,
-/// signed; qv_int32pr 1 x 32 bits, unsigned.
-/// Rule: src/multiply/taps.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQ2N8XR8(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &a,
@@ -888,9 +857,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUQ2N8XR8(
 /// added to acc, modulo 2^24: lane i = a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the bytes of s
 /// from the highest; vectors and coefficients are signed, UU forms read both as unsigned, US forms the
 /// vectors, SU forms the coefficients.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vec2Nx24 64 x 24 bits,
-/// signed; qv_int32pr 1 x 32 bits, unsigned.
-/// Rule: src/multiply/taps.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQA2N8XR8(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
@@ -927,9 +893,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUQA2N8XR8(
 /// even lanes i = a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the bytes of s from the highest,
 /// odd lanes the same with t, exact; vectors and coefficients are signed, UU forms read both as unsigned, US
 /// forms the vectors, SU forms the coefficients.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vec2Nx24 64 x 24 bits,
-/// signed; qv_int32pr 1 x 32 bits, unsigned.
-/// Rule: src/multiply/taps.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQ2N8DXR8(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &a,
@@ -966,9 +929,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUQ2N8DXR8(
 /// added to acc, modulo 2^24: even lanes i = a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the
 /// bytes of s from the highest, odd lanes the same with t; vectors and coefficients are signed, UU forms read
 /// both as unsigned, US forms the vectors, SU forms the coefficients.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vec2Nx24 64 x 24 bits,
-/// signed; qv_int32pr 1 x 32 bits, unsigned.
-/// Rule: src/multiply/taps.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQA2N8DXR8(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
@@ -1009,9 +969,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUQA2N8DXR8(
 /// lanes i with i mod 4 = 0: a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the bytes of s from the
 /// highest; with i mod 4 = 1, 2, 3 the same with t, u, v, exact; vectors and coefficients are signed, UU
 /// forms read both as unsigned, US forms the vectors, SU forms the coefficients.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vec2Nx24 64 x 24 bits,
-/// signed; qv_int32pr 1 x 32 bits, unsigned.
-/// Rule: src/multiply/taps.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQ2N8QXR8(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &a,
@@ -1056,9 +1013,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUQ2N8QXR8(
 /// added to acc, modulo 2^24: lanes i with i mod 4 = 0: a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to
 /// s0 the bytes of s from the highest; with i mod 4 = 1, 2, 3 the same with t, u, v; vectors and coefficients
 /// are signed, UU forms read both as unsigned, US forms the vectors, SU forms the coefficients.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vec2Nx24 64 x 24 bits,
-/// signed; qv_int32pr 1 x 32 bits, unsigned.
-/// Rule: src/multiply/taps.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQA2N8QXR8(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
@@ -1107,9 +1061,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUQA2N8QXR8(
 /// lane i = a[i] * s1 + b[i] * s0 + c[i] * s1 + d[i] * s0, s1 the high and s0 the low half of s, exact;
 /// vectors and coefficients are signed, UU forms read both as unsigned, US forms the vectors, SU forms the
 /// coefficients.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecNx48 32 x 48 bits,
-/// signed; qv_int32pr 1 x 32 bits, unsigned.
-/// Rule: src/multiply/taps.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQN16XR16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &a,
@@ -1142,9 +1093,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUQN16XR16(
 /// added to acc, modulo 2^48: lane i = a[i] * s1 + b[i] * s0 + c[i] * s1 + d[i] * s0, s1 the high and s0 the
 /// low half of s; vectors and coefficients are signed, UU forms read both as unsigned, US forms the vectors,
 /// SU forms the coefficients.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecNx48 32 x 48 bits,
-/// signed; qv_int32pr 1 x 32 bits, unsigned.
-/// Rule: src/multiply/taps.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQAN16XR16(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
@@ -1181,9 +1129,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUQAN16XR16(
 /// even lanes i = a[i] * s1 + b[i] * s0 + c[i] * s1 + d[i] * s0, s1 the high and s0 the low half of s, odd
 /// lanes the same with t, exact; vectors and coefficients are signed, UU forms read both as unsigned, US
 /// forms the vectors, SU forms the coefficients.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecNx48 32 x 48 bits,
-/// signed; qv_int32pr 1 x 32 bits, unsigned.
-/// Rule: src/multiply/taps.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQN16DXR16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &a,
@@ -1220,9 +1165,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUQN16DXR16(
 /// added to acc, modulo 2^48: even lanes i = a[i] * s1 + b[i] * s0 + c[i] * s1 + d[i] * s0, s1 the high and
 /// s0 the low half of s, odd lanes the same with t; vectors and coefficients are signed, UU forms read both
 /// as unsigned, US forms the vectors, SU forms the coefficients.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecNx48 32 x 48 bits,
-/// signed; qv_int32pr 1 x 32 bits, unsigned.
-/// Rule: src/multiply/taps.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQAN16DXR16(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
@@ -1262,8 +1204,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUQAN16DXR16(
 
 /// lane i = a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the bytes of s from the highest, exact;
 /// vectors and coefficients are signed.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx48 32 x 48 bits, signed; qv_int32pr 1 x 32 bits, unsigned.
-/// Rule: src/multiply/taps.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQN16XR8(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &a,
@@ -1274,8 +1214,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQN16XR8(
 
 /// added to acc, modulo 2^48: lane i = a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the bytes of s
 /// from the highest; vectors and coefficients are signed.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx48 32 x 48 bits, signed; qv_int32pr 1 x 32 bits, unsigned.
-/// Rule: src/multiply/taps.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQAN16XR8(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
@@ -1285,12 +1223,12 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQAN16XR8(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &d,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
 
+/* Four neighbouring lanes times coefficients, and two channels that alternate.
+   Table: src/multiply/windows.def */
+
 /// lane i = x[i] * s3 + x[i + 1] * s2 + x[i + 2] * s1 + x[i + 3] * s0, x the lanes of a followed by those of
 /// b, s3 to s0 the bytes of s from the highest, exact; vectors and coefficients are signed, US forms the
 /// vectors as unsigned.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vec2Nx24 64 x 24 bits,
-/// signed; qv_int32pr 1 x 32 bits, unsigned.
-/// Rule: src/multiply/windows.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL4T2N8XR8(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
@@ -1305,9 +1243,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUS4T2N8XR8(
 /// added to acc, modulo 2^24: lane i = x[i] * s3 + x[i + 1] * s2 + x[i + 2] * s1 + x[i + 3] * s0, x the lanes
 /// of a followed by those of b, s3 to s0 the bytes of s from the highest; vectors and coefficients are
 /// signed, US forms the vectors as unsigned.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vec2Nx24 64 x 24 bits,
-/// signed; qv_int32pr 1 x 32 bits, unsigned.
-/// Rule: src/multiply/windows.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL4TA2N8XR8(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
@@ -1323,8 +1258,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUS4TA2N8XR8(
 
 /// lane i = x[i] * s3 + x[i + 1] * s2 + x[i + 2] * s1 + x[i + 3] * s0, x the lanes of a followed by those of
 /// b, s3 to s0 the bytes of s from the highest, exact; vectors and coefficients are signed.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx48 32 x 48 bits, signed; qv_int32pr 1 x 32 bits, unsigned.
-/// Rule: src/multiply/windows.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL4TN16XR8(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
@@ -1334,8 +1267,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL4TN16XR8(
 /// added to acc, modulo 2^48: lane i = x[i] * s3 + x[i + 1] * s2 + x[i + 2] * s1 + x[i + 3] * s0, x the lanes
 /// of a followed by those of b, s3 to s0 the bytes of s from the highest; vectors and coefficients are
 /// signed.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx48 32 x 48 bits, signed; qv_int32pr 1 x 32 bits, unsigned.
-/// Rule: src/multiply/windows.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL4TAN16XR8(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
@@ -1346,9 +1277,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL4TAN16XR8(
 /// lane i = x[i] * s1 + x[i + 1] * s0 + x[i + 2] * s1 + x[i + 3] * s0, x the lanes of a followed by those of
 /// b, s1 the high and s0 the low half of s, exact; vectors and coefficients are signed, US forms the vectors
 /// as unsigned.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecNx48 32 x 48 bits,
-/// signed; qv_int32pr 1 x 32 bits, unsigned.
-/// Rule: src/multiply/windows.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL4TN16XR16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
@@ -1363,9 +1291,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUS4TN16XR16(
 /// added to acc, modulo 2^48: lane i = x[i] * s1 + x[i + 1] * s0 + x[i + 2] * s1 + x[i + 3] * s0, x the lanes
 /// of a followed by those of b, s1 the high and s0 the low half of s; vectors and coefficients are signed, US
 /// forms the vectors as unsigned.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecNx48 32 x 48 bits,
-/// signed; qv_int32pr 1 x 32 bits, unsigned.
-/// Rule: src/multiply/windows.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL4TAN16XR16(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
@@ -1381,9 +1306,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUS4TAN16XR16(
 
 /// lane 2k = a[k] * s0, lane 2k + 1 = b[k] * s0, s0 the lowest byte of s, exact; vectors and coefficients are
 /// signed, US forms the vectors as unsigned.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vec2Nx24 64 x 24 bits,
-/// signed; qv_int32pr 1 x 32 bits, unsigned.
-/// Rule: src/multiply/windows.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULI2NR8X16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
@@ -1397,9 +1319,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSI2NR8X16(
 
 /// added to acc, modulo 2^24: lane 2k = a[k] * s0, lane 2k + 1 = b[k] * s0, s0 the lowest byte of s; vectors
 /// and coefficients are signed, US forms the vectors as unsigned.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vec2Nx24 64 x 24 bits,
-/// signed; qv_int32pr 1 x 32 bits, unsigned.
-/// Rule: src/multiply/windows.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAI2NR8X16(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
@@ -1415,9 +1334,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSAI2NR8X16(
 
 /// lane 2k = a[k] * s0, lane 2k + 1 = b[k] * s0, s0 the lowest byte of s, exact; vectors are signed,
 /// coefficients unsigned.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vec2Nx24 64 x 24 bits, signed; qv_int32pr 1 x 32 bits,
-/// unsigned.
-/// Rule: src/multiply/windows.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULI2NR8UX16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
@@ -1426,9 +1342,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULI2NR8UX16(
 
 /// added to acc, modulo 2^24: lane 2k = a[k] * s0, lane 2k + 1 = b[k] * s0, s0 the lowest byte of s; vectors
 /// are signed, coefficients unsigned.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vec2Nx24 64 x 24 bits, signed; qv_int32pr 1 x 32 bits,
-/// unsigned.
-/// Rule: src/multiply/windows.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAI2NR8UX16(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
@@ -1438,9 +1351,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAI2NR8UX16(
 
 /// lane 2k = a[k] * s1 + c[k] * s0, lane 2k + 1 = b[k] * s1 + d[k] * s0, s1 and s0 the lower bytes of s,
 /// modulo 2^24; vectors and coefficients are signed, US forms the vectors as unsigned.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vec2Nx24 64 x 24 bits,
-/// signed; qv_int32pr 1 x 32 bits, unsigned.
-/// Rule: src/multiply/windows.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPI2NR8X16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &a,
@@ -1458,9 +1368,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPI2NR8X16(
 
 /// added to acc, modulo 2^24: lane 2k = a[k] * s1 + c[k] * s0, lane 2k + 1 = b[k] * s1 + d[k] * s0, s1 and s0
 /// the lower bytes of s; vectors and coefficients are signed, US forms the vectors as unsigned.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vec2Nx24 64 x 24 bits,
-/// signed; qv_int32pr 1 x 32 bits, unsigned.
-/// Rule: src/multiply/windows.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPAI2NR8X16(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
@@ -1478,11 +1385,11 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPAI2NR8X16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &d,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
 
+/* Products of a 16-bit lane and a 32-bit lane.
+   Table: src/multiply/mixed16x32.def */
+
 /// lane k = a[2k] * b[k], exact; UU forms read both factors as unsigned, US forms the 16-bit one, SU forms
 /// the 32-bit one.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecN_2x32v 16 x 32 bits,
-/// signed; qv_vecN_2x32Uv 16 x 32 bits, unsigned; qv_vecN_2x64w 16 x 64 bits, signed.
-/// Rule: src/multiply/mixed16x32.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULN_2X16X32_0(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
@@ -1502,9 +1409,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUN_2X16X32_0(
 
 /// lane k of acc = acc[k] + a[2k] * b[k], modulo 2^64; UU forms read both factors as unsigned, US forms the
 /// 16-bit one, SU forms the 32-bit one.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecN_2x32v 16 x 32 bits,
-/// signed; qv_vecN_2x32Uv 16 x 32 bits, unsigned; qv_vecN_2x64w 16 x 64 bits, signed.
-/// Rule: src/multiply/mixed16x32.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAN_2X16X32_0(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
@@ -1528,9 +1432,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUAN_2X16X32_0(
 
 /// lane k of acc = acc[k] - a[2k] * b[k], modulo 2^64; UU forms read both factors as unsigned, US forms the
 /// 16-bit one, SU forms the 32-bit one.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecN_2x32v 16 x 32 bits,
-/// signed; qv_vecN_2x32Uv 16 x 32 bits, unsigned; qv_vecN_2x64w 16 x 64 bits, signed.
-/// Rule: src/multiply/mixed16x32.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSN_2X16X32_0(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
@@ -1554,9 +1455,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUSN_2X16X32_0(
 
 /// lane k = a[2k + 1] * b[k], exact; UU forms read both factors as unsigned, US forms the 16-bit one, SU
 /// forms the 32-bit one.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecN_2x32v 16 x 32 bits,
-/// signed; qv_vecN_2x32Uv 16 x 32 bits, unsigned; qv_vecN_2x64w 16 x 64 bits, signed.
-/// Rule: src/multiply/mixed16x32.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULN_2X16X32_1(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
@@ -1576,9 +1474,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUN_2X16X32_1(
 
 /// lane k of acc = acc[k] + a[2k + 1] * b[k], modulo 2^64; UU forms read both factors as unsigned, US forms
 /// the 16-bit one, SU forms the 32-bit one.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecN_2x32v 16 x 32 bits,
-/// signed; qv_vecN_2x32Uv 16 x 32 bits, unsigned; qv_vecN_2x64w 16 x 64 bits, signed.
-/// Rule: src/multiply/mixed16x32.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAN_2X16X32_1(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
@@ -1602,9 +1497,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUAN_2X16X32_1(
 
 /// lane k of acc = acc[k] - a[2k + 1] * b[k], modulo 2^64; UU forms read both factors as unsigned, US forms
 /// the 16-bit one, SU forms the 32-bit one.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecN_2x32v 16 x 32 bits,
-/// signed; qv_vecN_2x32Uv 16 x 32 bits, unsigned; qv_vecN_2x64w 16 x 64 bits, signed.
-/// Rule: src/multiply/mixed16x32.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSN_2X16X32_1(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
@@ -1628,9 +1520,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUSN_2X16X32_1(
 
 /// lane k = a[2k + 1] * b[k] * 2^16, modulo 2^64; UU forms read both factors as unsigned, US forms the 16-bit
 /// one, SU forms the 32-bit one.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecN_2x32v 16 x 32 bits,
-/// signed; qv_vecN_2x32Uv 16 x 32 bits, unsigned; qv_vecN_2x64w 16 x 64 bits, signed.
-/// Rule: src/multiply/mixed16x32.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULHN_2X16X32_1(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
@@ -1650,9 +1539,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUHN_2X16X32_1(
 
 /// lane k of acc = acc[k] + a[2k + 1] * b[k] * 2^16, modulo 2^64; UU forms read both factors as unsigned, US
 /// forms the 16-bit one, SU forms the 32-bit one.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecN_2x32v 16 x 32 bits,
-/// signed; qv_vecN_2x32Uv 16 x 32 bits, unsigned; qv_vecN_2x64w 16 x 64 bits, signed.
-/// Rule: src/multiply/mixed16x32.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAHN_2X16X32_1(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
@@ -1676,9 +1562,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUAHN_2X16X32_1(
 
 /// lane k of acc = acc[k] - a[2k + 1] * b[k] * 2^16, modulo 2^64; UU forms read both factors as unsigned, US
 /// forms the 16-bit one, SU forms the 32-bit one.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecN_2x32v 16 x 32 bits,
-/// signed; qv_vecN_2x32Uv 16 x 32 bits, unsigned; qv_vecN_2x64w 16 x 64 bits, signed.
-/// Rule: src/multiply/mixed16x32.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSHN_2X16X32_1(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
@@ -1700,10 +1583,10 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUSHN_2X16X32_1(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
 
+/* Products of 8-bit lanes and 16-bit lanes, interleaved.
+   Table: src/multiply/mixed8x16.def */
+
 /// lane 2k = a[2k] * b[k], lane 2k + 1 = a[2k + 1] * c[k], exact; US forms read a as unsigned.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vecNx16 32 x 16 bits, signed;
-/// qv_vec2Nx24 64 x 24 bits, signed.
-/// Rule: src/multiply/mixed8x16.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULI2NX8X16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
@@ -1717,9 +1600,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSI2NX8X16(
 
 /// lane 2k of acc = acc[2k] + a[2k] * b[k], lane 2k + 1 of acc = acc[2k + 1] + a[2k + 1] * c[k], modulo 2^24;
 /// US forms read a as unsigned.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vecNx16 32 x 16 bits, signed;
-/// qv_vec2Nx24 64 x 24 bits, signed.
-/// Rule: src/multiply/mixed8x16.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAI2NX8X16(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
@@ -1733,11 +1613,11 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSAI2NX8X16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& c);
 
+/* Complex products: number k has its real part in lane 2k, its imaginary part in lane 2k + 1.
+   Table: src/multiply/complex.def */
+
 /// lanes 2k, 2k + 1 = the complex product, real part a[2k] * b[2k] - a[2k + 1] * b[2k + 1], imaginary part
 /// a[2k + 1] * b[2k] + a[2k] * b[2k + 1]; modulo 2^48 or 2^64.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits, signed; qv_vecNx48 32 x 48 bits,
-/// signed; qv_vecN_2x64w 16 x 64 bits, signed.
-/// Rule: src/multiply/complex.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULNX16C(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
@@ -1749,9 +1629,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULN_2X32C(
 
 /// lanes 2k, 2k + 1 of acc plus the complex product, real part a[2k] * b[2k] - a[2k + 1] * b[2k + 1],
 /// imaginary part a[2k + 1] * b[2k] + a[2k] * b[2k + 1]; modulo 2^48 or 2^64.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits, signed; qv_vecNx48 32 x 48 bits,
-/// signed; qv_vecN_2x64w 16 x 64 bits, signed.
-/// Rule: src/multiply/complex.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANX16C(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
@@ -1765,9 +1642,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAN_2X32C(
 
 /// lanes 2k, 2k + 1 of acc less the complex product, real part a[2k] * b[2k] - a[2k + 1] * b[2k + 1],
 /// imaginary part a[2k + 1] * b[2k] + a[2k] * b[2k + 1]; modulo 2^48 or 2^64.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits, signed; qv_vecNx48 32 x 48 bits,
-/// signed; qv_vecN_2x64w 16 x 64 bits, signed.
-/// Rule: src/multiply/complex.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSNX16C(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
@@ -1781,9 +1655,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSN_2X32C(
 
 /// lanes 2k, 2k + 1 = the complex product, with the second factor conjugated: real part a[2k] * b[2k] + a[2k
 /// + 1] * b[2k + 1], imaginary part a[2k + 1] * b[2k] - a[2k] * b[2k + 1]; modulo 2^48 or 2^64.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits, signed; qv_vecNx48 32 x 48 bits,
-/// signed; qv_vecN_2x64w 16 x 64 bits, signed.
-/// Rule: src/multiply/complex.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULNX16J(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
@@ -1795,9 +1666,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULN_2X32J(
 
 /// lanes 2k, 2k + 1 of acc plus the complex product, with the second factor conjugated: real part a[2k] *
 /// b[2k] + a[2k + 1] * b[2k + 1], imaginary part a[2k + 1] * b[2k] - a[2k] * b[2k + 1]; modulo 2^48 or 2^64.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits, signed; qv_vecNx48 32 x 48 bits,
-/// signed; qv_vecN_2x64w 16 x 64 bits, signed.
-/// Rule: src/multiply/complex.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANX16J(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
@@ -1811,9 +1679,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAN_2X32J(
 
 /// lanes 2k, 2k + 1 of acc less the complex product, with the second factor conjugated: real part a[2k] *
 /// b[2k] + a[2k + 1] * b[2k + 1], imaginary part a[2k + 1] * b[2k] - a[2k] * b[2k + 1]; modulo 2^48 or 2^64.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits, signed; qv_vecNx48 32 x 48 bits,
-/// signed; qv_vecN_2x64w 16 x 64 bits, signed.
-/// Rule: src/multiply/complex.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSNX16J(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
@@ -1827,8 +1692,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSN_2X32J(
 
 /// lanes 2k, 2k + 1 = the terms with the real part of b: real part a[2k] * b[2k], imaginary part a[2k + 1] *
 /// b[2k]; modulo 2^48 or 2^64.
-/// Lanes: qv_vecN_2x32v 16 x 32 bits, signed; qv_vecN_2x64w 16 x 64 bits, signed.
-/// Rule: src/multiply/complex.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULN_2X32C_0(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
@@ -1836,8 +1699,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULN_2X32C_0(
 
 /// lanes 2k, 2k + 1 of acc plus the terms with the real part of b: real part a[2k] * b[2k], imaginary part
 /// a[2k + 1] * b[2k]; modulo 2^48 or 2^64.
-/// Lanes: qv_vecN_2x32v 16 x 32 bits, signed; qv_vecN_2x64w 16 x 64 bits, signed.
-/// Rule: src/multiply/complex.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAN_2X32C_0(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
@@ -1846,8 +1707,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAN_2X32C_0(
 
 /// lanes 2k, 2k + 1 of acc less the terms with the real part of b: real part a[2k] * b[2k], imaginary part
 /// a[2k + 1] * b[2k]; modulo 2^48 or 2^64.
-/// Lanes: qv_vecN_2x32v 16 x 32 bits, signed; qv_vecN_2x64w 16 x 64 bits, signed.
-/// Rule: src/multiply/complex.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSN_2X32C_0(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
@@ -1856,8 +1715,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSN_2X32C_0(
 
 /// lanes 2k, 2k + 1 of acc plus the terms with the imaginary part of b: real part -a[2k + 1] * b[2k + 1],
 /// imaginary part a[2k] * b[2k + 1]; modulo 2^48 or 2^64.
-/// Lanes: qv_vecN_2x32v 16 x 32 bits, signed; qv_vecN_2x64w 16 x 64 bits, signed.
-/// Rule: src/multiply/complex.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAN_2X32C_1(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
@@ -1866,18 +1723,16 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAN_2X32C_1(
 
 /// lanes 2k, 2k + 1 of acc less the terms with the imaginary part of b: real part -a[2k + 1] * b[2k + 1],
 /// imaginary part a[2k] * b[2k + 1]; modulo 2^48 or 2^64.
-/// Lanes: qv_vecN_2x32v 16 x 32 bits, signed; qv_vecN_2x64w 16 x 64 bits, signed.
-/// Rule: src/multiply/complex.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSN_2X32C_1(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
 
+/* 16 bits of the products of 16-bit lanes, and transfers of sign.
+   Table: src/multiply/narrow.def */
+
 /// lane i = bits 0 to 15 of a[i] * b[i].
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_int16 1 x 16 bits, signed;
-/// qv_int16U 1 x 16 bits, unsigned.
-/// Rule: src/multiply/narrow.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULNX16PACKL(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
@@ -1895,10 +1750,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL16UPACKL(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
 
-/// lane i of acc = acc[i] plus, modulo 2^16, bits 0 to 15 of a[i] * b[i].
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; vboolN 32 x 1 bit; vbool1 1 x
-/// 1 bit; qv_int16 1 x 16 bits, signed; qv_int16U 1 x 16 bits, unsigned.
-/// Rule: src/multiply/narrow.def
+/// lane i of acc = acc[i] plus, modulo 2^16, bits 0 to 15 of a[i] * b[i]. T forms keep the destination's
+/// lanes whose predicate bit is 0.
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANX16PACKL(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& acc,
@@ -1945,9 +1798,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULA16UPACKLT(
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i of acc = acc[i] less, modulo 2^16, bits 0 to 15 of a[i] * b[i].
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_int16 1 x 16 bits, signed;
-/// qv_int16U 1 x 16 bits, unsigned.
-/// Rule: src/multiply/narrow.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSNX16PACKL(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& acc,
@@ -1971,8 +1821,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULS16UPACKL(
 
 /// lane i = bits 16 to 31 of (2 * a[i] * b[i] + 0x8000), modulo 2^32: a Q15 product rounded half up, not
 /// saturated.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_int16 1 x 16 bits, signed.
-/// Rule: src/multiply/narrow.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULNX16PACKQ(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
@@ -1983,9 +1831,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL16PACKQ(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
 
 /// lane i of acc = acc[i] plus, modulo 2^16, bits 16 to 31 of (2 * a[i] * b[i] + 0x8000), modulo 2^32: a Q15
-/// product rounded half up, not saturated.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; vboolN 32 x 1 bit; vbool1 1 x 1 bit; qv_int16 1 x 16 bits, signed.
-/// Rule: src/multiply/narrow.def
+/// product rounded half up, not saturated. T forms keep the destination's lanes whose predicate bit is 0.
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANX16PACKQ(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& acc,
@@ -2011,8 +1857,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULA16PACKQT(
 
 /// lane i of acc = acc[i] less, modulo 2^16, bits 16 to 31 of (2 * a[i] * b[i] + 0x8000), modulo 2^32: a Q15
 /// product rounded half up, not saturated.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_int16 1 x 16 bits, signed.
-/// Rule: src/multiply/narrow.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSNX16PACKQ(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& acc,
@@ -2026,8 +1870,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULS16PACKQ(
 
 /// lane i = bits 10 to 25 of (a[i] * b[i] + 0x200): a product less 10 fractional bits, rounded half up, not
 /// saturated.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_int16 1 x 16 bits, signed.
-/// Rule: src/multiply/narrow.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULNX16PACKP(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
@@ -2038,9 +1880,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL16PACKP(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
 
 /// lane i of acc = acc[i] plus, modulo 2^16, bits 10 to 25 of (a[i] * b[i] + 0x200): a product less 10
-/// fractional bits, rounded half up, not saturated.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; vboolN 32 x 1 bit; vbool1 1 x 1 bit; qv_int16 1 x 16 bits, signed.
-/// Rule: src/multiply/narrow.def
+/// fractional bits, rounded half up, not saturated. T forms keep the destination's lanes whose predicate bit
+/// is 0.
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANX16PACKP(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& acc,
@@ -2066,8 +1907,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULA16PACKPT(
 
 /// lane i of acc = acc[i] less, modulo 2^16, bits 10 to 25 of (a[i] * b[i] + 0x200): a product less 10
 /// fractional bits, rounded half up, not saturated.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_int16 1 x 16 bits, signed.
-/// Rule: src/multiply/narrow.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSNX16PACKP(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& acc,
@@ -2080,9 +1919,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULS16PACKP(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
 
 /// lane i = b[i] when a[i] is positive, 0 when it is 0, -b[i] modulo 2^w when it is negative.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits, signed; qv_int16 1 x 16 bits, signed;
-/// qv_int32v 1 x 32 bits, signed.
-/// Rule: src/multiply/narrow.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSGNNX16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
@@ -2100,10 +1936,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSGN32(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
 
-/// lane i = b[i] when a[i] is positive, 0 when it is 0, -b[i] clamped to the range of the lane when it is
-/// negative.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_int16 1 x 16 bits, signed.
-/// Rule: src/multiply/narrow.def
+/// lane i = b[i] when a[i] is positive, 0 when it is 0, -b[i] clamped to the signed range of the lane when it
+/// is negative.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSGNSNX16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
@@ -2113,10 +1947,10 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSGNS16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
 
+/* Sums and differences of narrow lanes in accumulators. Lanes are signed, in U forms unsigned.
+   Table: src/multiply/sums.def */
+
 /// lane i = a[i] + b[i], exact; U forms read both as unsigned.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vecNx16 32 x 16 bits, signed;
-/// qv_vecNx16U 32 x 16 bits, unsigned; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed.
-/// Rule: src/multiply/sums.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDW2NX8(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
@@ -2135,9 +1969,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDWUNX16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
 
 /// lane i = a[i] - b[i], exact, also below 0; U forms read both as unsigned.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vecNx16 32 x 16 bits, signed;
-/// qv_vecNx16U 32 x 16 bits, unsigned; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed.
-/// Rule: src/multiply/sums.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBW2NX8(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
@@ -2156,9 +1987,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBWUNX16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
 
 /// lane i of acc = acc[i] + (a[i] + b[i]), modulo 2^24 or 2^48; U forms read a and b as unsigned.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vecNx16 32 x 16 bits, signed;
-/// qv_vecNx16U 32 x 16 bits, unsigned; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed.
-/// Rule: src/multiply/sums.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDWA2NX8(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
@@ -2181,9 +2009,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDWUANX16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
 
 /// lane i of acc = acc[i] + (a[i] - b[i]), modulo 2^24 or 2^48; U forms read a and b as unsigned.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vecNx16 32 x 16 bits, signed;
-/// qv_vecNx16U 32 x 16 bits, unsigned; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed.
-/// Rule: src/multiply/sums.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBWA2NX8(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
@@ -2206,9 +2031,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBWUANX16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
 
 /// lane i of acc = acc[i] - (a[i] + b[i]), modulo 2^24 or 2^48; U forms read a and b as unsigned.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vecNx16 32 x 16 bits, signed;
-/// qv_vecNx16U 32 x 16 bits, unsigned; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed.
-/// Rule: src/multiply/sums.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDWS2NX8(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
@@ -2231,9 +2053,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDWUSNX16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
 
 /// lane i of acc = acc[i] - (a[i] - b[i]), modulo 2^24 or 2^48; U forms read a and b as unsigned.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vecNx16 32 x 16 bits, signed;
-/// qv_vecNx16U 32 x 16 bits, unsigned; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed.
-/// Rule: src/multiply/sums.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBWS2NX8(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
@@ -2255,11 +2074,10 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBWUSNX16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
 
+/* Packs of wide accumulators to narrow lanes. Counts are read as unsigned.
+   Table: src/multiply/pack.def */
+
 /// lane i = the low bits of acc[i], as many as the result has.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits,
-/// signed; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed; qv_vecN_2x64w 16 x 64 bits,
-/// signed.
-/// Rule: src/multiply/pack.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKLNX48(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
@@ -2270,49 +2088,34 @@ KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKLN_2X96(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc);
 
 /// lane k = bits 0 to 7 of acc[2k], extended by zeros.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vec2Nx24 64 x 24 bits, signed.
-/// Rule: src/multiply/pack.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKL2NX24_0(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc);
 
 /// lane k = bits 0 to 7 of acc[2k + 1], extended by zeros.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vec2Nx24 64 x 24 bits, signed.
-/// Rule: src/multiply/pack.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKL2NX24_1(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc);
 
 /// lane i = bits 16 to 31 of acc[i].
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx48 32 x 48 bits, signed.
-/// Rule: src/multiply/pack.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKMNX48(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc);
 
 /// lane k = bits 32 to 63 of acc[k].
-/// Lanes: qv_vecN_2x32v 16 x 32 bits, signed; qv_vecN_2x64w 16 x 64 bits, signed.
-/// Rule: src/multiply/pack.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKHN_2X64W(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc);
 
 /// lane i = bits 16 to 31 of (2 * bits 0 to 31 of acc[i] + 0x8000), modulo 2^32: a Q15 product rounded half
 /// up.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx48 32 x 48 bits, signed.
-/// Rule: src/multiply/pack.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKQNX48(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc);
 
 /// lane i = bits 10 to 25 of (bits 0 to 31 of acc[i] + 0x200): a product less 10 fractional bits, rounded
 /// half up.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx48 32 x 48 bits, signed.
-/// Rule: src/multiply/pack.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKPNX48(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc);
 
-/// lane i = acc[i] shifted right by shift (at most 23 for 24-bit lanes, 32 for others, which also stand for
-/// larger and negative counts), rounded half up, clamped to the range of the lane.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vecNx16 32 x 16 bits, signed;
-/// qv_vecN_2x32v 16 x 32 bits, signed; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed;
-/// qv_vecN_2x64w 16 x 64 bits, signed.
-/// Rule: src/multiply/pack.def
+/// lane i = acc[i] shifted right by shift, rounded half up, clamped to the signed range of the result's lane,
+/// in U forms to the unsigned one; a shift above 23 (24-bit lanes) or 32 (others), or below 0, acts as that
+/// bound.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVR2NX24(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
@@ -2330,11 +2133,9 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRN_2X64W(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
     unsigned int shift);
 
-/// lane k = acc[2k] shifted right by shift (at most 23 for 24-bit lanes, 32 for others, which also stand for
-/// larger and negative counts), rounded half up, clamped to the range of the lane.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecN_2x32v 16 x 32 bits,
-/// signed; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed.
-/// Rule: src/multiply/pack.def
+/// lane k = acc[2k] shifted right by shift, rounded half up, clamped to the signed range of the result's
+/// lane, in U forms to the unsigned one; a shift above 23 (24-bit lanes) or 32 (others), or below 0, acts as
+/// that bound.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVR2NX24_0(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
@@ -2348,11 +2149,9 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNX48_0(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
     unsigned int shift);
 
-/// lane k = acc[2k + 1] shifted right by shift (at most 23 for 24-bit lanes, 32 for others, which also stand
-/// for larger and negative counts), rounded half up, clamped to the range of the lane.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecN_2x32v 16 x 32 bits,
-/// signed; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed.
-/// Rule: src/multiply/pack.def
+/// lane k = acc[2k + 1] shifted right by shift, rounded half up, clamped to the signed range of the result's
+/// lane, in U forms to the unsigned one; a shift above 23 (24-bit lanes) or 32 (others), or below 0, acts as
+/// that bound.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVR2NX24_1(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
@@ -2366,12 +2165,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNX48_1(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
     unsigned int shift);
 
-/// lane i = acc[i] shifted right by shift (at most 23 for 24-bit lanes, 32 for others, which also stand for
-/// larger and negative counts), truncated, clamped to the range of the lane.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits,
-/// signed; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed; qv_vecN_2x64w 16 x 64 bits,
-/// signed.
-/// Rule: src/multiply/pack.def
+/// lane i = acc[i] shifted right by shift, truncated, clamped to the signed range of the result's lane; a
+/// shift above 23 (24-bit lanes) or 32 (others), or below 0, acts as that bound.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNR2NX24(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
@@ -2385,11 +2180,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNRN_2X64W(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
     unsigned int shift);
 
-/// lane k = acc[2k] shifted right by shift (at most 23 for 24-bit lanes, 32 for others, which also stand for
-/// larger and negative counts), truncated, clamped to the range of the lane.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits, signed; qv_vec2Nx24 64 x 24 bits,
-/// signed; qv_vecNx48 32 x 48 bits, signed.
-/// Rule: src/multiply/pack.def
+/// lane k = acc[2k] shifted right by shift, truncated, clamped to the signed range of the result's lane; a
+/// shift above 23 (24-bit lanes) or 32 (others), or below 0, acts as that bound.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNR2NX24_0(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
@@ -2399,11 +2191,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNRNX48_0(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
     unsigned int shift);
 
-/// lane k = acc[2k + 1] shifted right by shift (at most 23 for 24-bit lanes, 32 for others, which also stand
-/// for larger and negative counts), truncated, clamped to the range of the lane.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits, signed; qv_vec2Nx24 64 x 24 bits,
-/// signed; qv_vecNx48 32 x 48 bits, signed.
-/// Rule: src/multiply/pack.def
+/// lane k = acc[2k + 1] shifted right by shift, truncated, clamped to the signed range of the result's lane;
+/// a shift above 23 (24-bit lanes) or 32 (others), or below 0, acts as that bound.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNR2NX24_1(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
@@ -2413,12 +2202,9 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNRNX48_1(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
     unsigned int shift);
 
-/// lane i = acc[i] shifted right by shift[i] (at most 23 for 24-bit lanes, 32 for others, which also stand
-/// for larger and negative counts), rounded half up, clamped to the range of the lane.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vecNx16 32 x 16 bits, signed;
-/// qv_vecN_2x32v 16 x 32 bits, signed; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed;
-/// qv_vecN_2x64w 16 x 64 bits, signed.
-/// Rule: src/multiply/pack.def
+/// lane i = acc[i] shifted right by shift[i], rounded half up, clamped to the signed range of the result's
+/// lane, in U forms to the unsigned one; a shift[i] above 23 (24-bit lanes) or 32 (others), or below 0, acts
+/// as that bound.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKV2NX24(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
@@ -2436,11 +2222,9 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVN_2X64W(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& shift);
 
-/// lane k = acc[2k] shifted right by shift[k] (at most 23 for 24-bit lanes, 32 for others, which also stand
-/// for larger and negative counts), rounded half up, clamped to the range of the lane.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecN_2x32v 16 x 32 bits,
-/// signed; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed.
-/// Rule: src/multiply/pack.def
+/// lane k = acc[2k] shifted right by shift[k], rounded half up, clamped to the signed range of the result's
+/// lane, in U forms to the unsigned one; a shift[k] above 23 (24-bit lanes) or 32 (others), or below 0, acts
+/// as that bound.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKV2NX24_0(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
@@ -2454,11 +2238,9 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNX48_0(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& shift);
 
-/// lane k = acc[2k + 1] shifted right by shift[k] (at most 23 for 24-bit lanes, 32 for others, which also
-/// stand for larger and negative counts), rounded half up, clamped to the range of the lane.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecN_2x32v 16 x 32 bits,
-/// signed; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed.
-/// Rule: src/multiply/pack.def
+/// lane k = acc[2k + 1] shifted right by shift[k], rounded half up, clamped to the signed range of the
+/// result's lane, in U forms to the unsigned one; a shift[k] above 23 (24-bit lanes) or 32 (others), or below
+/// 0, acts as that bound.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKV2NX24_1(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
@@ -2472,12 +2254,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNX48_1(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& shift);
 
-/// lane i = acc[i] shifted right by shift[i] (at most 23 for 24-bit lanes, 32 for others, which also stand
-/// for larger and negative counts), truncated, clamped to the range of the lane.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits,
-/// signed; qv_vec2Nx24 64 x 24 bits, signed; qv_vecNx48 32 x 48 bits, signed; qv_vecN_2x64w 16 x 64 bits,
-/// signed.
-/// Rule: src/multiply/pack.def
+/// lane i = acc[i] shifted right by shift[i], truncated, clamped to the signed range of the result's lane; a
+/// shift[i] above 23 (24-bit lanes) or 32 (others), or below 0, acts as that bound.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNR2NX24(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
@@ -2491,11 +2269,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNRN_2X64W(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& shift);
 
-/// lane k = acc[2k] shifted right by shift[k] (at most 23 for 24-bit lanes, 32 for others, which also stand
-/// for larger and negative counts), truncated, clamped to the range of the lane.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits, signed; qv_vec2Nx24 64 x 24 bits,
-/// signed; qv_vecNx48 32 x 48 bits, signed.
-/// Rule: src/multiply/pack.def
+/// lane k = acc[2k] shifted right by shift[k], truncated, clamped to the signed range of the result's lane; a
+/// shift[k] above 23 (24-bit lanes) or 32 (others), or below 0, acts as that bound.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNR2NX24_0(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
@@ -2505,11 +2280,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNRNX48_0(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& shift);
 
-/// lane k = acc[2k + 1] shifted right by shift[k] (at most 23 for 24-bit lanes, 32 for others, which also
-/// stand for larger and negative counts), truncated, clamped to the range of the lane.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits, signed; qv_vec2Nx24 64 x 24 bits,
-/// signed; qv_vecNx48 32 x 48 bits, signed.
-/// Rule: src/multiply/pack.def
+/// lane k = acc[2k + 1] shifted right by shift[k], truncated, clamped to the signed range of the result's
+/// lane; a shift[k] above 23 (24-bit lanes) or 32 (others), or below 0, acts as that bound.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNR2NX24_1(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,

@@ -1,7 +1,7 @@
 # The front door: a thin face over CMake. Every target builds below build/ and installs the Debian packages
 # that it needs and does not find (tools/packages.sh).
 #
-#   make demo          build the library and the examples and run them on the data that is shipped
+#   make demo          build the library and the examples, run them and write build/demo/index.html, before and after
 #   make test          build everything and run the tests
 #   make bench         time every intrinsic and write docs/performance.md, a summary, and build/performance.md
 #   make bench-static  time kernels with the static library against the shared one
@@ -9,7 +9,7 @@
 #   make picture       take docs/pictures/reference.png of that page
 #   make install       install libraries and headers (PREFIX=/usr/local, DESTDIR=, LIBDIR=lib)
 #   make package       make Debian packages in build/packages
-#   make headers       write the public headers, gdb's table of types and docs/coverage.md anew from the tables of rows
+#   make headers       write the public headers, gdb's table of types, docs/coverage.md and docs/shapes.md from the tables
 #   make format        format the sources
 #   make clean         remove build/
 
@@ -23,10 +23,10 @@ help:
 	@sed -n 's/^#   //p' Makefile
 
 demo:
-	tools/packages.sh build
+	tools/packages.sh build demo
 	cmake --preset demo
 	$(CMAKE_BUILD) demo
-	tools/demo.sh build/demo
+	tools/demo/run.py build/demo
 
 test:
 	tools/packages.sh build test

@@ -4,8 +4,8 @@
 
 namespace {
 
-// A sum needs at most twice the width of its lanes, which is what it is formed in, and no more than 32
-// bits are ever returned.
+// What a sum is formed in: twice the width of its lanes holds it (64 lanes of 8 bits, 32 of 16). Of 32-bit lanes only
+// the low 32 bits are returned.
 template <class L>
 using sum_of = std::conditional_t<L::bits == 8, std::uint16_t, std::uint32_t>;
 

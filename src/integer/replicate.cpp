@@ -18,8 +18,7 @@
   static inline void KASTARRI_SEMANTIC(OP)(const Units* a, word number, Unit* r) { \
     Write<L>(r).put(0, Read<L>(a)[static_cast<int>(number % L::count)]);           \
   }
-// In registers of 64 bytes at most: longer ones the compiler fills with a string instruction, which takes
-// longer to start than all of this.
+// In pieces of 64 bytes at most. For longer ones compilers choose a string instruction, which is slow to start.
 #define KERNEL_filled(OP, BYTE)                                          \
   template <class Unit, std::size_t units>                               \
   static inline void KASTARRI_SEMANTIC(OP)(Unit(&r)[units]) {            \

@@ -27,7 +27,9 @@ def coverage():
         total += len(rows)
     lines += [f"| **All** | **{total}** |", "",
               "## What is not built", "",
-              "A missing intrinsic is an error when a kernel is compiled; a guessed one would be a silent wrong answer.", "",
+              "A missing intrinsic is an error when a kernel is compiled; a guessed one would be a silent wrong answer. A "
+              "kernel can do with what is there, and who knows how an intrinsic works adds it "
+              "([adding-an-intrinsic.md](adding-an-intrinsic.md)).", "",
               "| what | why | what to write instead |", "|---|---|---|"] + not_built.table()
     return "\n".join(lines) + "\n"
 

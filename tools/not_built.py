@@ -11,13 +11,13 @@ import re
 Topic = collections.namedtuple("Topic", "key title why instead names abbreviated words")
 
 TOPICS = [
-    Topic("aligning", "Aligning loads and stores through alignment registers",
-          "how they buffer and rotate is not known well enough to give the core's bits",
+    Topic("aligning", "Aligning loads and stores through alignment registers, also of double width",
+          "how the registers buffer and rotate is not known well enough to give the core's bits",
           "Whole vectors are loaded and stored at any address: `LVNX16_IP` and `SVNX16_IP` take the place of an aligning access, "
           "and what primes or flushes an alignment register is left out.",
           [], ["LoadAligning", "StoreAligning"], "unaligned stream streaming priming flush alignment aligning align register valign"),
-    Topic("select", "Select, shuffle, dual-select, unpack",
-          "their patterns are tables of the core that we do not have",
+    Topic("select", "Select, shuffle, dual-select and unpack by pattern, but for `SELS2NX8`",
+          "the patterns are tables of the core that we do not have",
           "Select by a predicate: `r = b; ZRA_MINNX16T(r, a, a, p);` takes a where the bit is 1, for the smaller of a and a is a. "
           "Any other order: store the lanes, load them with `GATHERANX16` and `GATHERDNX16`, whose offsets are bytes. One lane in "
           "every lane: `REPNX16`. Every other lane of an accumulator: `PACKVRNX48_0` and `PACKVRNX48_1`. Bytes to 16 bits: "
@@ -29,25 +29,28 @@ TOPICS = [
           "Sums of products have intrinsics of their own: `MULPANX16` of two, `MULQAN16XR16` of four with coefficients, `MUL4TAN16XR8` "
           "over a sliding window.",
           [], [], "partial product engine general wide matrix systolic"),
-    Topic("division", "Division, reciprocal and square-root steps", "their seed tables are not known",
-          "Divide lane by lane in C on an array, or multiply by a reciprocal that the host computes. Integers of the scalar core have "
+    Topic("division", "Division, reciprocal and square-root steps and their tables", "the seeds are not known",
+          "Divide lane by lane in C on an array, or multiply by a reciprocal that the host computes: results to nearest, not the "
+          "core's approximations. Integers of the scalar core have "
           "`RK_QUOS`, `RK_QUOU`, `RK_REMS` and `RK_REMU`; the exponent steps of floats are there: `scalarfp_MKDADJ_S`, "
           "`scalarfp_MKSADJ_S`, `scalarfp_ADDEXPM_S`.",
           [], ["DIVide", "DIVision", "RECiprocal", "RECIProcal", "SQuareRooT", "ReciprocalSQuareRooT", "QUOtient"],
           "divide division reciprocal inverse square root sqrt rsqrt quotient newton step seed iteration div"),
-    Topic("widening", "Widening adds and subtracts (`ADDW..`, `SUBW..`), `ADDMOD16U`, `MINORMAX2NX8`", "only their names are known",
-          "`ZRA_MULANX16(acc, v, 1)` adds a vector to its accumulator and `ZRA_MULSNX16(acc, v, 1)` subtracts it; `MULPNX16` with "
-          "factors of 1 adds two. An address in a ring is C on the PC.",
-          [r"ADDW\w*", r"SUBW\w*", r"ADDMOD16U", r"MINORMAX2NX8"], [],
-          "widening wide add subtract accumulator circular modulo address ring buffer"),
-    Topic("compress", "Compress and expand under a predicate (`SQZ..`, `UNSQZ..`)", "only their names are known",
+    Topic("ring", "`ADDMOD16U`, `MINORMAX2NX8`", "where the modulus comes from and which of the two is chosen is not known",
+          "An address in a ring is C on the PC; in lanes, `ADDNX16U`, a comparison (`GEUNX16U`) and `SUBNX16UT`. For the other, "
+          "`MIN2NX8` and `MAX2NX8`, the one stored over the other by `SV2NX8T_I`.",
+          [r"ADDMOD16U", r"MINORMAX2NX8"], [], "circular modulo address ring buffer"),
+    Topic("compress", "Compress and expand under a predicate (`SQZ..`, `UNSQZ..`)",
+          "their operands and the lanes that are left over are not known",
           "Store the vector and the predicate and copy the enabled lanes in a loop; `GATHERANX16` brings them back in the new order.",
           [r"(UN)?SQZ\w*"], [], "compress compaction compact squeeze expand left pack filter predicate"),
-    Topic("reductions", "Accumulating and bitwise reductions, `RMAX`, `RMIN`, `RBMAX`, `RBMIN`", "only their names are known",
-          "The sum of all lanes is there: `RADDNX16`, `RADDSNX16`. A maximum over lanes: store the vector twice in a row, take "
-          "`MAXNX16` of it and of what `LVNX16_I` loads 2 h bytes on, and again for h = 16, 8, 4, 2, 1. Whether any bit of a predicate is 1: `RORBN`, all: `RANDBN`.",
-          [r"RB?(MAX|MIN)\w*", r"R(ADD|OR|AND|XOR)AU?[N2]\w*", r"R(OR|AND|XOR)[N2]\w*"], [],
-          "reduce reduction horizontal across lanes maximum minimum max min argmax argmin bitwise and or xor accumulate"),
+    Topic("sums", "Accumulating sums of lanes (`RADDA`, `RADDAU`), reductions that start anew (`.._rinit`)",
+          "how wide the accumulator is and what it starts from is not known",
+          "`RADDNX16` and an addition: `ADD32`. Extremes and bits that accumulate are there: `RMAXANX16`, `RXORANX16`.",
+          [r"RADDAU?(2N|N)\w*", r"R[A-Z]+A?\w*_rinit"], [], "accumulate accumulating reduction sum initialize"),
+    Topic("places", "Extremes with their place (`RBMAX`, `RBMIN`)", "which of several equal lanes is told is not known",
+          "`RMAXNX16` or `RMINNX16`, and `EQNX16` with the result in every lane: the predicate of all such lanes.",
+          [r"RB(MAX|MIN)\w*"], [], "argmax argmin index place position maximum minimum horizontal across lanes"),
     Topic("unknown-elements", "`LSFAST9_I`, `SSFAST9_I`, `LSCF_I`, `SSCF_I`", "nothing tells their operands",
           "One element is loaded by `LSNX16_I` and its like and stored by `SSNX16_I`.",
           [r"[LS]SFAST9_I", r"[LS]SCF_I"], [], ""),

@@ -27,6 +27,7 @@ OWN_PARTS = [(re.compile(part), forms) for part, forms in [
     (r"UU forms read both factors as unsigned, US forms the 16-bit one, SU forms the 32-bit one", MIXED_SIGNS),
     (r"vectors and coefficients are signed, (?:UU forms read both as unsigned, )?US forms the vectors(?: as unsigned|, SU forms the "
      r"coefficients)", COEFFICIENT_SIGNS),
+    (r"U forms read (?:both|a and b) as unsigned", [(r"^(ADD|SUB)WU", "a and b are unsigned"), ("", "a and b are signed")]),
     (r"SQRU forms read the lanes as unsigned", [(r"^SQRU", "the lanes are unsigned"), ("", "the lanes are signed")]),
     (r"US forms read a as unsigned", [(r"^MULUS", "a is unsigned"), ("", "a is signed")]),
     (r"23 (?:for 24-bit lanes, 32 for others|\(24-bit lanes\) or 32 \(others\))", [(r"2NX24", "23"), ("", "32")]),
@@ -208,10 +209,11 @@ def address(row):
 
 def disabled(row, text):
     """What becomes of the lanes whose predicate bit is 0, where the sentence does not say it."""
-    written = re.search(r"[\w:]+ ?& ?(r|acc)\b", row.prototype) if row.shape.endswith("_T") else None
-    if not written or row.shape.startswith("load") or "predicate bit" in text:
+    if not generate_headers.keeps_lanes(row) or "predicate bit" in text:
         return None
-    return f"Where predicate bit i is 0, {written[1]} keeps lane i"
+    written = re.search(r"& ?(\w+)", row.prototype)[1]
+    flags = " and raises no flag" if row.table.startswith("float/") else ""
+    return f"Where predicate bit i is 0, {written} keeps lane i{flags}"
 
 
 def own(row, types, sentence=None):

@@ -57,6 +57,15 @@ constexpr auto ABSSSUB = [](auto x, auto y) { return ABSS(SUBS(x, y)); };
 
 #include "integer/stamp.h"
 
+// The rule on every lane, and which lanes are negative.
+#define KERNEL_unary_and_signs(OP, RULE, L)                                     \
+  template <class Units, class Bits>                                            \
+  static inline void KASTARRI_SEMANTIC(OP)(const Units* a, Bits* p, Units* r) { \
+    lane_bits<L::bits, L::count>(                                               \
+        p, [](auto x) { return x < 0; }, Read<L>(a));                           \
+    lanes<L::count>(result<L>(r), RULE, Read<L>(a));                            \
+  }
+
 #include "integer/arithmetic.def"
 
 #include "frame/stamp_end.h"

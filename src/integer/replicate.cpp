@@ -1,4 +1,4 @@
-// One value in every lane.
+// One value in every lane, and a lane alone.
 #include <cstring>
 
 #include "frame/lanes.h"
@@ -12,6 +12,11 @@
     const auto chosen = Read<L>(a)[static_cast<int>(number % L::count)];         \
     lanes<L::count>(                                                             \
         result<L>(r), [chosen](int) { return chosen; }, Same(0));                \
+  }
+#define KERNEL_selected(OP, L)                                                     \
+  template <class Units, class Unit>                                               \
+  static inline void KASTARRI_SEMANTIC(OP)(const Units* a, word number, Unit* r) { \
+    Write<L>(r).put(0, Read<L>(a)[static_cast<int>(number % L::count)]);           \
   }
 // In pieces of 64 bytes at most. For longer ones compilers choose a string instruction, which is slow to start.
 #define KERNEL_filled(OP, BYTE)                                          \

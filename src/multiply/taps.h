@@ -29,6 +29,14 @@ using u16 = Coefficients<std::uint16_t>;
 using s16_in_2 = Coefficients<std::int16_t, 2>;
 using u16_in_2 = Coefficients<std::uint16_t, 2>;
 
+// The word in whose bytes a reference to coefficients points: the low two bits of the address are ignored. Compilers
+// take references to be aligned, and would not clear those bits if they saw where the address comes from.
+inline const word* word_around(const void* reference) {
+  auto address = reinterpret_cast<std::uintptr_t>(reference);
+  asm("" : "+r"(address));
+  return reinterpret_cast<const word*>(address & ~std::uintptr_t{3});
+}
+
 // --- Sums of products by pairs -------------------------------------------------------------------------
 // Targets multiply neighbouring 16-bit numbers and add the two products in one instruction (sums_of_products). So
 // operands are interleaved two by two: a0 b0 a1 b1 ... times x y x y ... makes a0 x + b0 y, a1 x + b1 y ...

@@ -1,11 +1,10 @@
 """What the reference says of each intrinsic, from its row: nothing here knows an intrinsic by name."""
 
-import os
 import re
 
 import generate_headers
 import rules
-from generate_headers import PREFIX, ROOT
+from generate_headers import PREFIX
 
 # Host types: bits, and how they are shown.
 HOST_TYPES = {
@@ -111,14 +110,6 @@ class Sentences:
 def facts(texts):
     joined = ". ".join(texts)
     return [name for name, pattern in FACTS.items() if re.search(pattern, joined)]
-
-
-def about_table(table):
-    """The comment at the head of a table, without the kinds of row that it lists."""
-    with open(os.path.join(ROOT, "src", table), encoding="utf-8") as file:
-        head = re.match(r"(//.*\n)*", file.read())[0]
-    lines = [line[3:] for line in head.splitlines() if not line.startswith("//  ")]
-    return " ".join(lines)
 
 
 class Entry:

@@ -18,6 +18,9 @@ def of_operation(operation):
     if letters:
         root, signs, window, products, kind, high, interleaved = letters.groups()
         return f"{root}{window}{products}{high}{interleaved}", signs, kind, ""
+    several = re.fullmatch(r"(ADDW|SUBW|RMAX|RMIN|RXOR|ROR|RAND)(U?)([AS]?)", operation)
+    if several:
+        return *several.groups(), ""
     unsigned = re.fullmatch(rf"({SIGNED})U", operation) or re.fullmatch(r"U(FLOAT|TRUNC)", operation)
     if unsigned:
         return unsigned[1], "U", "", ""

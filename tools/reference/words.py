@@ -101,6 +101,15 @@ OPERATIONS = [(re.compile(pattern), words) for pattern, words in [
     (r"LTRS", "first n lanes predicate mask tail remainder rest leading count make create clamp saturating"),
     (r"RADDU?", "reduce reduction horizontal sum add across all lanes total"),
     (r"RADDS", f"reduce reduction horizontal sum add across all lanes total {SATURATING}"),
+    (r"RMAXU?A?", "reduce reduction horizontal maximum largest max across all lanes"),
+    (r"RMINU?A?", "reduce reduction horizontal minimum smallest min across all lanes"),
+    (r"RXORA?", "reduce reduction horizontal bitwise exclusive or xor parity across all lanes"),
+    (r"RORA?", "reduce reduction horizontal bitwise or across all lanes"),
+    (r"RANDA?", "reduce reduction horizontal bitwise and across all lanes"),
+    (r"SELS", "select lane extract get element immediate constant"),
+    (r"BABS", "absolute value magnitude abs sign signs predicate negative"),
+    (r"ADDWU?[AS]?", "widening wide add sum plus extend accumulator accumulate"),
+    (r"SUBWU?[AS]?", "widening wide subtract minus difference extend accumulator accumulate"),
     # Packs
     (r"PACKL", "pack narrow low bits part accumulator to vector convert truncate extract modulo"),
     (r"PACKM", "pack narrow middle high half upper bits accumulator to vector convert extract"),
@@ -266,7 +275,7 @@ def of_vectors(name):
         signed = {"S": "sign", "U": "zero", "": "float"}[match["sign"]]
         words += f" widen extend {signed} extending promote upconvert" if operation[0] == "L" else \
             " narrow downconvert demote" + (f" {SATURATING}" if match["sign"] == "S" else " truncate low bits" if match["sign"] else "")
-    if match["sign"] == "U" or re.match(r"U|\w+U$|MULUU|SQRU", operation) and not is_float:
+    if match["sign"] == "U" or re.match(r"U|\w+U[AS]?$|MULUU|SQRU", operation) and not is_float:
         attributes.append("unsigned")
     if match["pack"]:
         words += " " + PACKED[match["pack"]]

@@ -101,7 +101,8 @@ def page_data(examples, version):
     return {"version": version, "prefix": generate_headers.PREFIX, "families": list(generate_headers.FAMILIES.items()),
             "choices": [choice.text for choice in all_choices], "topics": [topic_data(topic) for topic in not_built.TOPICS],
             "tables": tables,
-            "types": {name: [t.shape, t.units * t.unit_bits // 8, t.meaning] for name, t in generate_headers.read_types().items()},
+            "types": {name: [type.shape, type.units * type.unit_bits // 8, type.meaning]
+                      for name, type in generate_headers.read_types().items()},
             "texts": text.all(), "entries": rows}
 
 

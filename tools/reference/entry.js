@@ -86,8 +86,10 @@ const linkTo = (id) => element('a', {href: addressOf({...state, open: id})}, id)
 
 function twins(entry) {
   const rows = AXES.map((title, axis) => [title, twinsOf(entry, axis)]).filter(([, found]) => found.length);
-  return rows.length ? section('Twins', element('table', {class: 'twins'}, element('tbody', null, rows.map(([title, found]) =>
-    element('tr', null, element('th', {scope: 'row'}, title), element('td', null, found.map((twin) => [linkTo(twin.id), ' ']).flat())))))) : [];
+  if (!rows.length) return [];
+  const lines = rows.map(([title, found]) => element('tr', null, element('th', {scope: 'row'}, title),
+    element('td', null, found.flatMap((twin) => [linkTo(twin.id), ' ']))));
+  return section('Twins', element('table', {class: 'twins'}, element('tbody', null, lines)));
 }
 
 function laneRow(kind, [name, values], columns, before) {
@@ -128,7 +130,8 @@ function example(entry) {
 // Lines break between parameters only.
 function prototype(text) {
   const parts = (text + ';').split(/(?<=[(,]) ?/);
-  return element('pre', {'aria-label': 'Prototype with short names'}, parts.flatMap((part) => [element('span', null, part), /,$/.test(part) ? ' ' : '']));
+  return element('pre', {'aria-label': 'Prototype with short names'},
+    parts.flatMap((part) => [element('span', null, part), part.endsWith(',') ? ' ' : '']));
 }
 
 function show(entry) {
@@ -169,7 +172,8 @@ function showTopic(topic, name) {
     element('a', {class: 'back', href: addressOf({...state, open: ''})}, '← Back to the list'),
     element('h2', null, 'Not built: ', ...prose(topic.title)),
     name === topic.id ? '' : element('p', {role: 'alert'}, 'There is no intrinsic named ', element('code', null, name), '.'),
-    ...section('Why', element('p', null, sentence(topic.why[0].toUpperCase() + topic.why.slice(1)), ' A guess would be a silent wrong answer.')),
+    ...section('Why', element('p', null, sentence(topic.why[0].toUpperCase() + topic.why.slice(1)),
+      ' A guess would be a silent wrong answer.')),
     ...section('What to write instead', element('p', {class: 'rule'}, linked(topic.instead))));
 }
 

@@ -139,7 +139,8 @@ function showList() {
     found = search();
     const there = found.filter((answer) => answer.rule).length;
     const some = there === entries.length ? 'All ' : '';
-    const count = `${some}${there.toLocaleString('en')} ${there === 1 ? 'intrinsic' : 'intrinsics'}${state.q && there > 1 && !state.re ? ', best first' : ''}`;
+    const order = state.q && there > 1 && !state.re ? ', best first' : '';
+    const count = `${some}${there.toLocaleString('en')} ${there === 1 ? 'intrinsic' : 'intrinsics'}${order}`;
     showMessage(found.length ? count : 'No intrinsic matches. Fewer words or filters may.', false);
   } catch (error) {
     found = [];

@@ -4,8 +4,8 @@
 
 const N_BITS = /\b(\d+)[ -]?bits?\b/g;
 const WIDTH = /^(8|16|24|32|48|64|128|256)$/;
-const STOP_WORDS = new Set(('a an the of to in into with for from by on is are be do does how i can my me what which that this two ' +
-  'using use vs intrinsic intrinsics function instruction').split(' '));
+const STOP_WORDS = new Set(('a an the of to in into with for from by on is are be do does how i can my me what which that ' +
+  'this two using use vs intrinsic intrinsics function instruction').split(' '));
 // Endings that tell no difference here: saturate, saturating, saturation.
 const WHOLE = new Set(['masked', 'predicated', 'signed']);  // not those with a mask, a predicate, a sign
 const ENDINGS = /(?:ations?|ating|ated|ates?|ings?|ions?|ed|es|ers?|s|e)$/;
@@ -37,8 +37,8 @@ const WEIGHTS = {operation: 6, attributes: 3, rule: 1};
 const EXACT_NAME = 10, NAME_BEGINS = 5, NAME_CONTAINS = 2, NAME_MISSPELT = 8;
 const BEGINS = 0.5, MISSPELT = 0.4, CUT = 0.35;
 
-// An index of entries {id, names, words: {operation, attributes, rule}, plainness}; names are in lower case. Plainness, from 0 to 1, is
-// what the score of an entry is multiplied by: what is used more goes before its variants.
+// An index of entries {id, names, words: {operation, attributes, rule}, plainness}; names are in lower case. Plainness,
+// from 0 to 1, is what the score of an entry is multiplied by: what is used more goes before its variants.
 function indexOf(entries) {
   const byWord = new Map();  // stem -> Map of number of the entry -> weight
   const known = new Map();  // many entries share a text

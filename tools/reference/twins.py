@@ -9,7 +9,8 @@ AXES = ["predicated", "mode", "sign", "lanes", "kind", "saturated"]
 
 # Operations of which a U at the end makes one on unsigned numbers.
 SIGNED = r"LT|LE|GT|GE|MIN|MAX|AVGR?|ABSSUB|RADD|PACKVR?"
-SATURATED = {"ADDS": "ADD", "SUBS": "SUB", "NEGS": "NEG", "ABSS": "ABS", "ABSSSUB": "ABSSUB", "RADDS": "RADD", "MULSGNS": "MULSGN"}
+SATURATED = {"ADDS": "ADD", "SUBS": "SUB", "NEGS": "NEG", "ABSS": "ABS", "ABSSSUB": "ABSSUB",
+             "RADDS": "RADD", "MULSGNS": "MULSGN"}
 
 
 def of_operation(operation):

@@ -12,17 +12,19 @@ LAYOUTS = {
     "N_4X64": "64bit int64 doubleword", "N_8X128": "128bit", "N_16X256": "256bit",
     "NXF16": "half float 16bit floating point precision fp16 f16",
     "N_2XF32": "float single 32bit floating point precision fp32 f32 float32",
-    "NX8": "8bit byte int8 16bit", "N_2X16": "16bit short 32bit", "N_2XF16": "half float 16bit single 32bit floating point precision",
+    "NX8": "8bit byte int8 16bit", "N_2X16": "16bit short 32bit",
+    "N_2XF16": "half float 16bit single 32bit floating point precision",
     "2NX24": "24bit accumulator wide 8bit", "NX48": "48bit accumulator wide 16bit", "N_2X64W": "64bit accumulator wide 32bit",
     "N_2X96": "64bit accumulator wide", "2N8": "8bit byte", "N16": "16bit short", "N_2X16X32": "16bit 32bit mixed",
     "2NX8X16": "8bit 16bit mixed", "2NR8X16": "8bit 16bit mixed coefficient word channel",
     "2NR8UX16": "8bit 16bit mixed coefficient word channel unsigned",
     "8": "8bit byte int8 scalar", "16": "16bit short int16 scalar", "32": "32bit word int32 scalar", "64": "64bit int64 scalar",
-    "F16": "half float 16bit floating point precision fp16 scalar", "F32": "float single 32bit floating point precision fp32 scalar",
+    "F16": "half float 16bit floating point precision fp16 scalar",
+    "F32": "float single 32bit floating point precision fp32 scalar",
 }
 LAYOUT = "|".join(layout + r"(?=[DQ]?XR)" * (layout in ("2N8", "N16")) for layout in sorted(LAYOUTS, key=len, reverse=True))
-NAME = re.compile(rf"(?P<operation>CVTF(?:16|32)|[A-Z]+?(?:4T[AS]?|I(?=2N))?)(?P<layout>{LAYOUT})(?P<sign>[US]?)(?P<pack>PACK[LQP])?"
-                  r"(?P<coefficients>[DQ]?XR(?:8|16)|[CJ](?![A-Z]))?(?P<predicated>T?)(?P<immediate>I?)"
+NAME = re.compile(rf"(?P<operation>CVTF(?:16|32)|[A-Z]+?(?:4T[AS]?|I(?=2N))?)(?P<layout>{LAYOUT})(?P<sign>[US]?)"
+                  r"(?P<pack>PACK[LQP])?(?P<coefficients>[DQ]?XR(?:8|16)|[CJ](?![A-Z]))?(?P<predicated>T?)(?P<immediate>I?)"
                   r"(?:_(?P<mode>[IX]P?|V|[LH01]))?")
 
 # How an address is formed, and which half, for loads and stores, gathers and packs.
@@ -154,7 +156,8 @@ MULTIPLY_WORDS = [
     {"UU": "unsigned", "U": "unsigned", "US": "unsigned times signed mixed sign", "SU": "signed times unsigned mixed sign"},
     {"4T": "four tap taps sliding window fir filter convolution convolve correlation coefficient dot"},
     {"P": "pair two sum dot products dual", "PD": "pair two difference dual", "Q": "four quad sum dot products"},
-    {"A": "accumulate accumulating multiply-accumulate mac mla add", "S": "subtract multiply-subtract mls msub negative accumulate minus"},
+    {"A": "accumulate accumulating multiply-accumulate mac mla add",
+     "S": "subtract multiply-subtract mls msub negative accumulate minus"},
     {"H": "high half upper"},
     {"I": "interleave interleaved two channel stereo"},
 ]
@@ -184,7 +187,8 @@ SCALAR = [(re.compile(pattern), words) for pattern, words in [
     (r"ADD(M?I)?(_[NA])?", "add sum plus"), (r"ADDX\d(_A)?", "add scaled shift lea address index times"),
     (r"SUB(_A)?", "subtract minus"), (r"SUBX\d", "subtract scaled shift times"),
     (r"NEG", "negate minus"), (r"ABS", "absolute value magnitude"),
-    (r"MULL", "multiply low product"), (r"MUL[US]H", "multiply high upper product mulh"), (r"MUL16[US]", "multiply 16bit halves product"),
+    (r"MULL", "multiply low product"), (r"MUL[US]H", "multiply high upper product mulh"),
+    (r"MUL16[US]", "multiply 16bit halves product"),
     (r"AND", "bitwise and"), (r"OR", "bitwise or"), (r"XOR", "bitwise exclusive or xor"),
     (r"SALTU?", "compare less than set slt"), (r"MINU?", "minimum smaller min"), (r"MAXU?", "maximum larger max"),
     (r"CLAMPS", f"clamp to n bits range limit signed {SATURATING}"), (r"SEXT", "sign extend extension bit"),
@@ -200,7 +204,8 @@ SCALAR = [(re.compile(pattern), words) for pattern, words in [
     (r"QUO[US]", "divide division quotient integer div"), (r"REM[US]", "remainder modulo mod divide division integer"),
     (r"RSR_SAR", "shift amount register sar read"), (r"WSR_SAR", "shift amount register sar write set"),
     (r"XSR_SAR", "shift amount register sar exchange swap"),
-    (r"SS(R|L|AI)", "shift amount register sar set"), (r"SSA8[LB]", "shift amount register sar set byte unaligned endian endianness alignment"),
+    (r"SS(R|L|AI)", "shift amount register sar set"),
+    (r"SSA8[LB]", "shift amount register sar set byte unaligned endian endianness alignment"),
     (r"SRC|SS(R|AI)_SRC", "funnel shift double concatenate extract unaligned rotate"),
     (r"SLL|SSL_SLL", "shift left logical"), (r"SRA|SSR_SRA", "shift right arithmetic"), (r"SRL|SSR_SRL", "shift right logical"),
     (r"SLLI", "shift left logical immediate constant"), (r"SRAI", "shift right arithmetic immediate constant"),
@@ -274,7 +279,7 @@ def of_vectors(name):
     if memory and layout in ("NX8", "N_2X16", "N_2XF16"):
         signed = {"S": "sign", "U": "zero", "": "float"}[match["sign"]]
         words += f" widen extend {signed} extending promote upconvert" if operation[0] == "L" else \
-            " narrow downconvert demote" + (f" {SATURATING}" if match["sign"] == "S" else " truncate low bits" if match["sign"] else "")
+            " narrow downconvert demote " + {"S": SATURATING, "U": "truncate low bits", "": ""}[match["sign"]]
     if match["sign"] == "U" or re.match(r"U|\w+U[AS]?$|MULUU|SQRU", operation) and not is_float:
         attributes.append("unsigned")
     if match["pack"]:

@@ -1,9 +1,9 @@
 # The front door: a thin face over CMake. Every target builds below build/ and installs the Debian packages
 # that it needs and does not find (tools/packages.sh).
 #
-#   make demo          build the library and the examples and run them on the data that is shipped
+#   make demo          build the library and the examples, run them and write build/demo/index.html, before and after
 #   make test          build everything and run the tests
-#   make bench         time every intrinsic and write docs/performance.md
+#   make bench         time every intrinsic and write docs/performance.md, a summary, and build/performance.md
 #   make bench-static  time kernels with the static library against the shared one
 #   make docs          write build/docs/reference.html, all intrinsics on one page
 #   make picture       take docs/pictures/reference.png of that page
@@ -23,10 +23,10 @@ help:
 	@sed -n 's/^#   //p' Makefile
 
 demo:
-	tools/packages.sh build
+	tools/packages.sh build demo
 	cmake --preset demo
 	$(CMAKE_BUILD) demo
-	tools/demo.sh build/demo
+	tools/demo/run.py build/demo
 
 test:
 	tools/packages.sh build test
@@ -38,7 +38,7 @@ bench:
 	tools/packages.sh build test
 	cmake --preset test
 	$(CMAKE_BUILD) test
-	tools/performance.py build/test docs/performance.md
+	tools/performance.py build/test --summary docs/performance.md --table build/performance.md
 
 bench-static:
 	tools/packages.sh build test

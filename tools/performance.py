@@ -1,7 +1,7 @@
 #!/usr/bin/env python3
-"""Time every intrinsic on every target that this processor runs, and write the table.
+"""Time every intrinsic on every target that this processor runs; write a summary and the table of them all.
 
-    tools/performance.py BUILD [OUTPUT] [--filter REGEX] [--repetitions N] [--seconds S]
+    tools/performance.py BUILD [--summary FILE] [--table FILE] [--filter REGEX] [--repetitions N] [--seconds S]
 
 BUILD is a build directory with the benchmarks in it. Every figure is a ratio, within one run, to an exported
 call that copies one register (qv_vecNx16_move): medians of the repetitions. bench/limits.txt says how much an
@@ -68,8 +68,10 @@ def limit_of(name, target, limits):
 
 
 def processor():
+    """Its name, with family and model, as many have the same name."""
     with open("/proc/cpuinfo", encoding="utf-8") as file:
-        return re.search(r"model name\s*: (.*)", file.read())[1]
+        told = dict(re.findall(r"^(.+?)\s*: (.*)$", file.read(), re.M))
+    return f"{told['model name']} (family {told['cpu family']}, model {told['model']})"
 
 
 def cell(name, target, ratios, limits):
@@ -80,83 +82,117 @@ def cell(name, target, ratios, limits):
 
 
 def table_lines(names, ratios, limits):
-    targets = [t for t in TARGETS if t in ratios]
-    yield "| intrinsic | " + " | ".join(targets) + " |"
-    yield "|---|" + "---|" * len(targets)
+    yield from headed(ratios, "intrinsic")
     for name in names:
-        yield f"| `{name}` | " + " | ".join(cell(name, target, ratios, limits) for target in targets) + " |"
+        yield f"| `{name}` | " + " | ".join(cell(name, target, ratios, limits) for target in ratios) + " |"
 
 
 def variant_lines(ratios, limits):
     """The slowest of the directed rounding modes, and operands with special values, of what is timed so."""
-    targets = [t for t in TARGETS if t in ratios]
     measured = next(iter(ratios.values()))
-    yield "| intrinsic | " + " | ".join(f"{t} directed | {t} special" for t in targets) + " |"
-    yield "|---|" + "---|---|" * len(targets)
+    yield from headed([f"{t} {kind}" for t in ratios for kind in ("directed", "special")], "intrinsic")
     for name in dict.fromkeys(n.partition("/")[0] for n in measured if "/" in n):
         cells = []
-        for target in targets:
+        for target in ratios:
             modes = [f"{name}/{mode}" for mode in DIRECTED if f"{name}/{mode}" in ratios[target]]
             slowest = max(modes, key=ratios[target].get, default=name + "/none")
             cells += [cell(slowest, target, ratios, limits), cell(name + "/special", target, ratios, limits)]
         yield f"| `{name}` | " + " | ".join(cells) + " |"
 
 
+def headed(ratios, *columns):
+    """The head of a table of targets."""
+    columns = [*columns, *ratios]
+    return ["| " + " | ".join(columns) + " |", "|---|" + "---|" * (len(columns) - 1)]
+
+
 def family_lines(families, ratios):
     """The middle intrinsic of each family."""
-    targets = [t for t in TARGETS if t in ratios]
-    yield "| family | intrinsics | " + " | ".join(targets) + " |"
-    yield "|---|---|" + "---|" * len(targets)
+    yield from headed(ratios, "family", "intrinsics")
     for title, names in families.items():
-        medians = [f"{statistics.median(ratios[t][n] for n in names):.1f}" for t in targets]
+        medians = [f"{statistics.median(found[n] for n in names):.1f}" for found in ratios.values()]
         yield f"| {title} | {len(names)} | " + " | ".join(medians) + " |"
 
 
-def document(times, limits):
-    def known_as(name):
-        symbol, slash, variant = name.partition("/")
-        return (generate_headers.short_name(symbol) if symbol.startswith("rk_") else symbol) + slash + variant
+def slowest_lines(families, ratios, limits):
+    """The slowest intrinsic of each family, and how many of the family are above their limits."""
+    yield from headed(ratios, "family")
+    for title, names in families.items():
+        cells = []
+        for target, found in ratios.items():
+            slowest = max(names, key=found.get)
+            above = sum(found[n] > (limit_of(n, target, limits) or found[n]) for n in names)
+            cells.append(f"`{slowest}` {found[slowest]:.1f}; {above} above")
+        yield f"| {title} | " + " | ".join(cells) + " |"
 
-    ratios = {t: {known_as(n): v / times[t][BASELINE] for n, v in found.items()} for t, found in times.items()}
-    measured = next(iter(ratios.values()))
-    lines = ["# Performance", "",
-             "A call of each intrinsic, operands in memory, as a multiple of an exported call that copies one",
-             "register (`qv_vecNx16_move`, 64 bytes) in the same run. Medians. Measured on " + processor() + " by", "",
-             "    make bench", "",
-             "On that machine the copy took " +
-             ", ".join(f"{times[t][BASELINE]:.1f} ns ({t})" for t in TARGETS if t in times) + ".",
-             "Figures in bold are above the limit set in `bench/limits.txt`; the notes at the end say why.", ""]
-    if any("fir_scalar" in n for n in measured):
+
+class Measured:
+    """Ratios by target and name, and what the documents say of where they come from."""
+
+    def __init__(self, times, processor_name):
+        def known_as(name):
+            symbol, slash, variant = name.partition("/")
+            return (generate_headers.short_name(symbol) if symbol.startswith("rk_") else symbol) + slash + variant
+
+        self.processor = processor_name
+        self.copies = {t: found[BASELINE] for t, found in times.items()}
+        self.ratios = {t: {known_as(n): v / found[BASELINE] for n, v in found.items()} for t, found in times.items()}
+        self.names = next(iter(self.ratios.values()))
+        families = {}
+        for title, _, rows in generate_headers.all_rows().values():
+            names = dict.fromkeys(generate_headers.short_name(row[0]) for row in rows)
+            families[title] = [n for n in names if n in self.names]
+        self.families = {title: names for title, names in families.items() if names}
+
+    def introduction(self, what):
+        copies = ", ".join(f"{time:.1f} ns ({target})" for target, time in self.copies.items())
+        return ["# Performance", "",
+                f"{what}, operands in memory, as a multiple of an exported call that copies one",
+                "register (`qv_vecNx16_move`, 64 bytes) in the same run. Medians.", "",
+                f"Measured on: {self.processor}, where the copy took {copies}.", ""]
+
+
+def summary(measured, limits):
+    """What stands in the repository: a kernel, the families, their slowest, and why."""
+    ratios = measured.ratios
+    lines = measured.introduction("What a call costs")
+    lines += ["`make bench` measures it on your machine, writes this page anew and every intrinsic to `build/performance.md`.", ""]
+    if "fir_scalar" in measured.names:
         lines += ["## A whole kernel", "",
                   "FIR filter of 16 taps (`examples/fir`), samples a second, against the scalar C loop built with",
                   "`-O2 -fno-tree-vectorize`:", "", "| target | speed-up |", "|---|---|"]
-        lines += [f"| {t} | {ratios[t]['fir_scalar'] / ratios[t]['fir_kernel']:.2f} |" for t in TARGETS if t in ratios]
-        lines += [""]
-    families = {}
-    for title, _, rows in generate_headers.all_rows().values():
-        names = dict.fromkeys(generate_headers.short_name(row[0]) for row in rows)
-        families[title] = [n for n in names if n in measured]
-    families = {title: names for title, names in families.items() if names}
-    lines += ["## Families", "", "The median of each family's intrinsics.", ""] + list(family_lines(families, ratios)) + [""]
-    for title, names in families.items():
-        lines += [f"## {title}", ""] + list(table_lines(names, ratios, limits)) + [""]
-    if any("/" in n for n in measured):
+        lines += [f"| {t} | {found['fir_scalar'] / found['fir_kernel']:.2f} |" for t, found in ratios.items()] + [""]
+    lines += ["## Families", "", "The median of each family's intrinsics.", "", *family_lines(measured.families, ratios), "",
+              "The slowest of each family, and how many are above the limits that `bench/limits.txt` sets.", "",
+              *slowest_lines(measured.families, ratios, limits), ""]
+    with open(os.path.join(ROOT, "bench", "notes.md"), encoding="utf-8") as notes:
+        return "\n".join(lines) + "\n" + notes.read()
+
+
+def full_table(measured, limits):
+    lines = measured.introduction("A call of each intrinsic")
+    lines += ["Figures in bold are above the limit set in `bench/limits.txt`.", ""]
+    for title, names in measured.families.items():
+        lines += [f"## {title}", "", *table_lines(names, measured.ratios, limits), ""]
+    if any("/" in n for n in measured.names):
         lines += ["## Rounding modes and special values", "",
                   "Directed: the slowest of rounding toward zero, up and down; the limit is that of rounding to nearest.",
                   "Special: a NaN, an infinity, a subnormal number and a zero among the lanes of each operand; the limit",
-                  f"is {SPECIAL} times as high.", ""] + list(variant_lines(ratios, limits)) + [""]
-    notes = os.path.join(ROOT, "bench", "notes.md")
-    if os.path.exists(notes):
-        lines += [open(notes, encoding="utf-8").read().rstrip(), ""]
-    above = [(n, t, r, limit_of(n, t, limits)) for t, found in ratios.items() for n, r in found.items()
-             if (limit_of(n, t, limits) or r) < r]
-    return "\n".join(lines), above
+                  f"is {SPECIAL} times as high.", "", *variant_lines(measured.ratios, limits), ""]
+    return "\n".join(lines)
+
+
+def write(path, text):
+    os.makedirs(os.path.dirname(os.path.abspath(path)), exist_ok=True)
+    with open(path, "w", encoding="utf-8") as file:
+        file.write(text)
 
 
 def main():
     parser = argparse.ArgumentParser(description=__doc__, formatter_class=argparse.RawDescriptionHelpFormatter)
     parser.add_argument("build")
-    parser.add_argument("output", nargs="?")
+    parser.add_argument("--summary", help="where the summary goes")
+    parser.add_argument("--table", help="where the table of every intrinsic goes; without it, to the standard output")
     parser.add_argument("--filter", default=".")
     parser.add_argument("--repetitions", type=int, default=5)
     parser.add_argument("--seconds", type=float, default=0.005, help="the least time of one repetition")
@@ -166,14 +202,18 @@ def main():
         found = run(arguments.build, target, arguments.filter, arguments.repetitions, arguments.seconds)
         if found:
             times[target] = found
-    text, above = document(times, read_limits())
-    if arguments.output:
-        with open(arguments.output, "w", encoding="utf-8") as file:
-            file.write(text)
+    measured, limits = Measured(times, processor()), read_limits()
+    if arguments.summary:
+        write(arguments.summary, summary(measured, limits))
+    if arguments.table:
+        write(arguments.table, full_table(measured, limits))
     else:
-        print(text)
-    for name, target, ratio, limit in above:
-        print(f"above its limit: {name} {target} {ratio:.2f} > {limit:g}")
+        print(full_table(measured, limits))
+    for target, found in measured.ratios.items():
+        for name, ratio in found.items():
+            limit = limit_of(name, target, limits)
+            if limit and ratio > limit:
+                print(f"above its limit: {name} {target} {ratio:.2f} > {limit:g}")
 
 
 if __name__ == "__main__":

@@ -6,7 +6,8 @@
 
 namespace {
 
-// Samples in, samples out: Q15 integers by way of the conversions' scale.
+// The operations of the cascade in single precision. Conversions divide and multiply by 2^15, so that samples stand
+// for -1 to 1.
 struct Single {
   using Vector = qv_vecN_2xf32;
   static constexpr int lanes = SINGLE_LANES;
@@ -16,7 +17,7 @@ struct Single {
     return ZRA_FLOATN_2X32(qv_vecN_2x32v(qv_vecN_2x16_loadi(from, 0)), 15);
   }
   static void store(const Vector& v, short* y) {
-    // 2^16 is far from the bounds of 32 bits: saturate above, not in the sample.
+    // The conversion saturates to 32 bits, not to the 16 of a sample: what is too loud is cut off before.
     const Vector bounded = ZRA_MAXN_2XF32(ZRA_MINN_2XF32(v, Vector(32767.0f / 32768)), Vector(-1.0f));
     const auto* to = reinterpret_cast<const qv_vecN_2x16*>(y);
     qv_vecN_2x16_storei(qv_vecN_2x16(ZRA_TRUNCN_2XF32(bounded, 15)), to, 0);
@@ -26,6 +27,7 @@ struct Single {
   static void take_product(Vector& sum, const Vector& a, const Vector& b) { ZRA_MULSN_2XF32(sum, a, b); }
 };
 
+// The same in half precision.
 struct Half {
   using Vector = qv_vecNxf16;
   static constexpr int lanes = HALF_LANES;

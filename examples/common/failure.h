@@ -1,12 +1,8 @@
-// How an example fails: one clear line on stderr, exit status 2, and no half-written file.
+// The two ways in which an example fails.
 #ifndef KASTARRI_EXAMPLES_FAILURE_H
 #define KASTARRI_EXAMPLES_FAILURE_H
 
-#include <cstdio>
-#include <cstdlib>
-#include <exception>
 #include <stdexcept>
-#include <string>
 
 namespace examples {
 
@@ -15,18 +11,10 @@ class Failure : public std::runtime_error {
   using std::runtime_error::runtime_error;
 };
 
-// Runs the example; whatever goes wrong ends as one line on stderr and the exit status.
-template <class Main>
-int run(const char* program, Main&& main) {
-  try {
-    return main();
-  } catch (const std::bad_alloc&) {
-    std::fprintf(stderr, "%s: not enough memory\n", program);
-  } catch (const std::exception& failure) {
-    std::fprintf(stderr, "%s: %s\n", program, failure.what());
-  }
-  return 2;
-}
+// A kernel made something else than plain C.
+class Difference : public std::runtime_error {
+  using std::runtime_error::runtime_error;
+};
 
 }  // namespace examples
 

@@ -44,9 +44,6 @@ class Options {
     }
   }
 
-  std::string text(const char* name, const std::string& fallback, const char* meaning) {
-    return value(name, fallback, "TEXT", meaning);
-  }
   std::string path(const char* name, const std::string& fallback, const char* meaning) {
     const std::string path = value(name, fallback, "FILE", meaning);
     if (path.empty() && !help_) throw Failure(std::string("--") + name + " needs a file name");

@@ -69,6 +69,11 @@ inline Picture parse_pgm(const Bytes& bytes, const std::string& name) {
 
 inline Picture read_pgm(const std::string& path) { return parse_pgm(read_file(path), path); }
 
+// As in "512 x 512 pixels".
+inline std::string describe(const Picture& picture) {
+  return std::to_string(picture.width) + " x " + std::to_string(picture.height) + " pixels";
+}
+
 inline void write_pgm(const std::string& path, const Picture& picture) {
   const std::string header = "P5\n" + std::to_string(picture.width) + " " + std::to_string(picture.height) + "\n255\n";
   Bytes bytes(header.begin(), header.end());

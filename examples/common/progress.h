@@ -1,5 +1,4 @@
-// A progress bar on the terminal, for work that lasts: nothing is drawn in the first third of a second,
-// nor ever when stderr is not a terminal.
+// A progress bar for work that lasts longer than a third of a second, on standard error if that is a terminal.
 #ifndef KASTARRI_EXAMPLES_PROGRESS_H
 #define KASTARRI_EXAMPLES_PROGRESS_H
 

@@ -16,12 +16,14 @@ constexpr double PI = 3.14159265358979323846;
 // The discrete Fourier transform in place; the size is a power of two.
 inline void fourier(std::vector<std::complex<double>>& x) {
   const std::size_t n = x.size();
+  // Each value goes to the place with the bits of its own reversed: of eight, value 3 (011) to place 6 (110).
   for (std::size_t i = 1, j = 0; i < n; ++i) {
     std::size_t bit = n >> 1;
     for (; j & bit; bit >>= 1) j ^= bit;
     j ^= bit;
     if (i < j) std::swap(x[i], x[j]);
   }
+  // Transforms of two neighbours, then of four, and so on, each out of two of half its size.
   for (std::size_t span = 2; span <= n; span *= 2) {
     const std::complex<double> step = std::polar(1.0, -2 * PI / static_cast<double>(span));
     for (std::size_t start = 0; start < n; start += span) {
@@ -35,9 +37,9 @@ inline void fourier(std::vector<std::complex<double>>& x) {
   }
 }
 
-// The mean power spectrum of a sound in dB, 0 dB a sine of full scale: size / 2 + 1 values from 0 Hz to
-// half the sample rate, by Hann windows of `size` samples: overlapping ones, or at most MOST_WINDOWS spread
-// over a long sound.
+// The mean power spectrum of a sound in dB, where 0 dB is a sine of full scale: size / 2 + 1 values from 0 Hz to
+// half the sample rate. It is taken through Hann windows of `size` samples, each half over the one before; of a
+// long sound at most MOST_WINDOWS are taken, at even distances.
 constexpr std::size_t MOST_WINDOWS = 1000;
 
 inline std::vector<double> power_spectrum(const std::vector<std::int16_t>& sound, std::size_t size) {

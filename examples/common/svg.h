@@ -4,7 +4,7 @@
 //   plot.x = {"frequency (kHz)", 0, 22};
 //   plot.y = {"power (dB)", -120, 0};
 //   plot.curve("before", xs, ys);
-//   write_file("spectrum.svg", plot.svg());
+//   write_svg("spectrum.svg", {plot});  // several stand one below another
 #ifndef KASTARRI_EXAMPLES_SVG_H
 #define KASTARRI_EXAMPLES_SVG_H
 
@@ -24,7 +24,7 @@ struct Axis {
   std::string label;
   double low = 0;
   double high = 1;
-  std::vector<std::pair<double, std::string>> names = {};  // ticks with names of their own; none: round numbers
+  bool logarithmic = false;
 };
 
 class Plot {
@@ -33,42 +33,46 @@ class Plot {
       : title_(std::move(title)), subtitle_(std::move(subtitle)) {}
 
   Axis x, y;
+  double height = 540;
 
-  // A thin grey line through the points, behind the curves.
-  void background(const std::string& name, const std::vector<double>& xs, const std::vector<double>& ys) {
-    series_.push_back({name, xs, ys, Kind::background});
+  // A grey line through the points, behind the curves.
+  void background(const std::string& name, const std::vector<double>& xs, const std::vector<double>& ys,
+                  double width = 1.6) {
+    series_.push_back({name, xs, ys, Kind::background, width});
   }
   // A line through the points.
   void curve(const std::string& name, const std::vector<double>& xs, const std::vector<double>& ys) {
-    series_.push_back({name, xs, ys, Kind::line});
+    series_.push_back({name, xs, ys, Kind::line, 1.6});
   }
-  // A bar at each x from the bottom of the plot (or zero, where it is inside) to y.
+  // A bar at each x from the bottom of the plot to y.
   void bars(const std::string& name, const std::vector<double>& xs, const std::vector<double>& ys) {
-    series_.push_back({name, xs, ys, Kind::bar});
+    series_.push_back({name, xs, ys, Kind::bar, 0});
   }
   // A dashed upright line with a word at its top.
   void mark(double at, const std::string& word) { marks_.emplace_back(at, word); }
 
-  std::string svg() const {
-    std::string out;
-    add(out, "<svg xmlns='http://www.w3.org/2000/svg' viewBox='0 0 %g %g' width='%g' height='%g' font-family='%s'>\n",
-        WIDTH, HEIGHT, WIDTH, HEIGHT, "system-ui, \"DejaVu Sans\", Helvetica, Arial, sans-serif");
-    add(out, "<rect width='%g' height='%g' fill='#ffffff'/>\n", WIDTH, HEIGHT);
-    add(out, "<clipPath id='inside'><rect x='%g' y='%g' width='%g' height='%g'/></clipPath>\n", LEFT, TOP, RIGHT - LEFT,
-        BOTTOM - TOP);
-    text(out, LEFT, 34, "start", "font-size='20' font-weight='600' fill='#1f2933'", title_);
-    text(out, LEFT, 56, "start", "font-size='13' fill='#616e7c'", subtitle_);
-    draw_axes(out);
-    add(out, "<g clip-path='url(#inside)'>\n");
-    for (const Kind kind : {Kind::background, Kind::bar, Kind::line}) {
-      for (std::size_t i = 0; i < series_.size(); ++i) {
-        if (series_[i].kind == kind) kind == Kind::bar ? draw_bars(out, i) : draw_curve(out, i);
-      }
+  // The picture as a document. Its title and description are for those who do not see it.
+  static std::string svg(const std::vector<Plot>& plots) {
+    std::string title, description, drawings;
+    double used = 0;  // of the height
+    for (std::size_t i = 0; i < plots.size(); ++i) {
+      const Plot& plot = plots[i];
+      title += (i ? "; " : "") + plot.title_;
+      description += (i ? " " : "") + plot.description();
+      add(drawings, "<g transform='translate(0 %g)'>\n", used);
+      plot.draw(drawings, i);
+      drawings += "</g>\n";
+      used += plot.height;
     }
-    add(out, "</g>\n");
-    draw_marks(out);
-    draw_legend(out);
-    return out + "</svg>\n";
+    std::string out;
+    add(out, "<svg xmlns='http://www.w3.org/2000/svg' viewBox='0 0 %g %g' width='%g' height='%g' role='img' ", WIDTH,
+        used, WIDTH, used);
+    out +=
+        "aria-labelledby='title description' font-family='system-ui, \"DejaVu Sans\", Helvetica, Arial, sans-serif'>\n";
+    out += "<title id='title'>" + escaped(title) + "</title>\n";
+    out += "<desc id='description'>" + escaped(description) + "</desc>\n";
+    add(out, "<rect width='%g' height='%g' fill='#ffffff'/>\n", WIDTH, used);
+    return out + drawings + "</svg>\n";
   }
 
  private:
@@ -77,31 +81,56 @@ class Plot {
     std::string name;
     std::vector<double> xs, ys;
     Kind kind;
+    double width;  // of its line
   };
 
-  static constexpr double WIDTH = 960, HEIGHT = 540;
-  static constexpr double LEFT = 78, RIGHT = 930, TOP = 104, BOTTOM = 478;
+  static constexpr double WIDTH = 960;
+  static constexpr double LEFT = 78, RIGHT = 930;
+  double top() const { return series_.size() > 1 ? 104 : 76; }  // a single series needs no legend
+  double bottom() const { return height - 62; }
+
+  std::string description() const {
+    std::string names;
+    for (const Series& s : series_) names += (names.empty() ? "" : ", ") + s.name;
+    return subtitle_ + ". Up: " + y.label + "; across: " + x.label + ". Drawn are: " + names + ".";
+  }
+
+  // `number` tells the plots of a document apart.
+  void draw(std::string& out, std::size_t number) const {
+    add(out, "<clipPath id='inside%zu'><rect x='%g' y='%g' width='%g' height='%g'/></clipPath>\n", number, LEFT, top(),
+        RIGHT - LEFT, bottom() - top());
+    text(out, LEFT, 34, "start", "font-size='20' font-weight='600' fill='#1f2933'", title_);
+    text(out, LEFT, 56, "start", "font-size='13' fill='#616e7c'", subtitle_);
+    draw_axes(out);
+    add(out, "<g clip-path='url(#inside%zu)'>\n", number);
+    for (const Kind kind : {Kind::background, Kind::bar, Kind::line}) {
+      for (std::size_t i = 0; i < series_.size(); ++i) {
+        if (series_[i].kind == kind) kind == Kind::bar ? draw_bars(out, i) : draw_curve(out, i);
+      }
+    }
+    add(out, "</g>\n");
+    draw_marks(out);
+    draw_legend(out);
+  }
 
   // Colours that people with any colour vision tell apart (Okabe and Ito).
   const char* colour(std::size_t which) const {
     static const char* const colours[] = {"#0072b2", "#d55e00", "#009e73", "#cc79a7", "#e69f00", "#56b4e9"};
     if (series_[which].kind == Kind::background) return "#b8c0ca";
-    return colours[count(which, [](Kind kind) { return kind != Kind::background; }) % 6];
-  }
-  // How many of the first series are of a kind.
-  template <class Is>
-  std::size_t count(std::size_t first, Is is) const {
-    std::size_t found = 0;
-    for (std::size_t i = 0; i < first; ++i) found += is(series_[i].kind) ? 1 : 0;
-    return found;
+    std::size_t before = 0;
+    for (std::size_t i = 0; i < which; ++i) before += series_[i].kind != Kind::background ? 1 : 0;
+    return colours[before % 6];
   }
   static std::size_t bounded(std::size_t have, std::size_t want) { return std::min(have, want); }
 
-  double across(double value) const { return LEFT + (value - x.low) / (x.high - x.low) * (RIGHT - LEFT); }
+  double across(double value) const {
+    const auto scaled = [&](double v) { return x.logarithmic ? std::log(std::max(v, x.low / 2)) : v; };
+    return LEFT + (scaled(value) - scaled(x.low)) / (scaled(x.high) - scaled(x.low)) * (RIGHT - LEFT);
+  }
   double up(double value) const {
     const double far = y.high - y.low;  // a spike beyond the frame is cut there, whatever its size
     const double v = std::isfinite(value) ? std::min(std::max(value, y.low - far), y.high + far) : y.low - far;
-    return BOTTOM - (v - y.low) / far * (BOTTOM - TOP);
+    return bottom() - (v - y.low) / far * (bottom() - top());
   }
 
   [[gnu::format(printf, 2, 3)]] static void add(std::string& out, const char* format, ...) {
@@ -132,70 +161,78 @@ class Plot {
     out += escaped(words) + "</text>\n";
   }
 
-  // Round numbers, about `wanted` of them, within the axis.
-  static std::vector<std::pair<double, std::string>> ticks(const Axis& axis, int wanted) {
-    if (!axis.names.empty()) return axis.names;
+  // Round numbers within the axis: about `wanted` of them, or 1, 2 and 5 times the powers of ten.
+  static std::vector<double> ticks(const Axis& axis, int wanted) {
+    std::vector<double> result;
+    if (axis.logarithmic) {
+      for (double power = std::pow(10.0, std::floor(std::log10(axis.low))); power <= axis.high; power *= 10) {
+        for (const double factor : {1.0, 2.0, 5.0}) {
+          if (factor * power >= axis.low && factor * power <= axis.high) result.push_back(factor * power);
+        }
+      }
+      return result;
+    }
     const double raw = (axis.high - axis.low) / wanted;
     const double power = std::pow(10.0, std::floor(std::log10(raw)));
     double step = 10 * power;
     for (const double candidate : {5.0, 2.0, 1.0}) {
       if (candidate * power >= raw * 0.75) step = candidate * power;
     }
-    std::vector<std::pair<double, std::string>> result;
-    for (double k = std::ceil(axis.low / step - 1e-9); k * step <= axis.high + step * 1e-9; ++k) {
-      char label[32];
-      std::snprintf(label, sizeof label, "%g", std::fabs(k) < 0.5 ? 0.0 : k * step);
-      result.emplace_back(k * step, label[0] == '-' ? "\u2212" + std::string(label + 1) : label);
-    }
+    for (double k = std::ceil(axis.low / step - 1e-9); k * step <= axis.high + step * 1e-9; ++k)
+      result.push_back(std::fabs(k) < 0.5 ? 0.0 : k * step);
     return result;
+  }
+  static std::string tick_label(double value) {
+    char label[32];
+    std::snprintf(label, sizeof label, "%g", value);
+    return label[0] == '-' ? "\u2212" + std::string(label + 1) : label;
   }
 
   void draw_axes(std::string& out) const {
     const char* const grid = "stroke='#e4e7eb' stroke-width='1'";
     const char* const small = "font-size='12' fill='#52606d'";
     const char* const label = "font-size='13' fill='#323f4b'";
-    for (const auto& tick : ticks(x, 11)) {
-      const double at = across(tick.first);
-      if (x.names.empty()) add(out, "<line x1='%.1f' y1='%g' x2='%.1f' y2='%g' %s/>\n", at, TOP, at, BOTTOM, grid);
-      text(out, at, BOTTOM + 20, "middle", small, tick.second);
+    for (const double tick : ticks(x, 11)) {
+      const double at = across(tick);
+      add(out, "<line x1='%.1f' y1='%g' x2='%.1f' y2='%g' %s/>\n", at, top(), at, bottom(), grid);
+      text(out, at, bottom() + 20, "middle", small, tick_label(tick));
     }
-    for (const auto& tick : ticks(y, 7)) {
-      const double at = up(tick.first);
+    for (const double tick : ticks(y, height < 400 ? 4 : 7)) {
+      const double at = up(tick);
       add(out, "<line x1='%g' y1='%.1f' x2='%g' y2='%.1f' %s/>\n", LEFT, at, RIGHT, at, grid);
-      text(out, LEFT - 10, at + 4, "end", small, tick.second);
+      text(out, LEFT - 10, at + 4, "end", small, tick_label(tick));
     }
-    add(out, "<path d='M%g %gV%gH%g' fill='none' stroke='#7b8794' stroke-width='1.2'/>\n", LEFT, TOP, BOTTOM, RIGHT);
-    text(out, (LEFT + RIGHT) / 2, BOTTOM + 46, "middle", label, x.label);
-    add(out, "<g transform='translate(24 %g) rotate(-90)'>", (TOP + BOTTOM) / 2);
+    add(out, "<path d='M%g %gV%gH%g' fill='none' stroke='#7b8794' stroke-width='1.2'/>\n", LEFT, top(), bottom(),
+        RIGHT);
+    text(out, (LEFT + RIGHT) / 2, bottom() + 46, "middle", label, x.label);
+    add(out, "<g transform='translate(24 %g) rotate(-90)'>", (top() + bottom()) / 2);
     text(out, 0, 0, "middle", label, y.label);
     add(out, "</g>\n");
   }
 
   void draw_curve(std::string& out, std::size_t which) const {
     const Series& s = series_[which];
-    add(out, "<path fill='none' stroke='%s' stroke-width='1.6' stroke-linejoin='round' stroke-opacity='0.9' d='",
-        colour(which));
+    add(out, "<path fill='none' stroke='%s' stroke-width='%g' stroke-linejoin='round' stroke-opacity='0.9' d='",
+        colour(which), s.width);
+    double last = -WIDTH;
     for (std::size_t i = 0; i < bounded(s.xs.size(), s.ys.size()); ++i) {
-      add(out, "%c%.1f %.1f", i == 0 ? 'M' : 'L', across(s.xs[i]), up(s.ys[i]));
+      const double at = across(s.xs[i]);
+      if (at - last < 0.5) continue;  // a logarithmic axis crowds its high end: no one sees half a pixel
+      add(out, "%c%.1f %.1f", i == 0 ? 'M' : 'L', at, up(s.ys[i]));
+      last = at;
     }
     out += "'/>\n";
   }
 
-  // Bars of several series stand side by side.
   void draw_bars(std::string& out, std::size_t which) const {
     const Series& s = series_[which];
-    const auto is_bar = [](Kind kind) { return kind == Kind::bar; };
-    const auto groups = static_cast<double>(count(series_.size(), is_bar));
-    const auto place = static_cast<double>(count(which, is_bar));
     const double step = s.xs.size() > 1 ? std::fabs(across(s.xs[1]) - across(s.xs[0])) : (RIGHT - LEFT) / 4;
-    const double width = step * 0.8 / groups;
-    const double base = up(std::min(std::max(0.0, y.low), y.high));
+    add(out, "<path fill='%s' d='", colour(which));
     for (std::size_t i = 0; i < bounded(s.xs.size(), s.ys.size()); ++i) {
-      const double end = up(s.ys[i]);
-      add(out, "<rect x='%.1f' y='%.1f' width='%.1f' height='%.1f' fill='%s' fill-opacity='0.85'/>\n",
-          across(s.xs[i]) - step * 0.4 + place * width, std::min(base, end), width, std::fabs(end - base),
-          colour(which));
+      const double left = across(s.xs[i]) - step * 0.45;
+      add(out, "M%.2f %.1fV%.1fh%.2fV%.1fz", left, bottom(), up(s.ys[i]), step * 0.9, bottom());
     }
+    out += "'/>\n";
   }
 
   // Words of neighbours stand on two lines, so that close marks can be read.
@@ -204,14 +241,15 @@ class Plot {
       const double at = across(marks_[i].first);
       add(out,
           "<line x1='%.1f' y1='%g' x2='%.1f' y2='%g' stroke='#323f4b' stroke-width='1.2' stroke-dasharray='5 4'/>\n",
-          at, TOP, at, BOTTOM);
+          at, top(), at, bottom());
       const bool right = at > (LEFT + RIGHT) / 2;
-      text(out, right ? at - 6 : at + 6, TOP + (i % 2 == 0 ? 14 : 32), right ? "end" : "start",
+      text(out, right ? at - 6 : at + 6, top() + (i % 2 == 0 ? 14 : 32), right ? "end" : "start",
            "font-size='12' fill='#323f4b'", marks_[i].second);
     }
   }
 
   void draw_legend(std::string& out) const {
+    if (series_.size() < 2) return;
     double at = LEFT;
     for (std::size_t i = 0; i < series_.size(); ++i) {
       const Series& s = series_[i];
@@ -227,7 +265,7 @@ class Plot {
   std::vector<std::pair<double, std::string>> marks_;
 };
 
-inline void write_svg(const std::string& path, const Plot& plot) { write_file(path, plot.svg()); }
+inline void write_svg(const std::string& path, const std::vector<Plot>& plots) { write_file(path, Plot::svg(plots)); }
 
 }  // namespace examples
 

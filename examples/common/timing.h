@@ -1,4 +1,4 @@
-// How long two ways to the same result take. They run by turns, so that whatever else the machine does
+// How long a kernel and plain C take for the same. They run by turns, so that whatever else the machine does
 // hits both, and the medians are compared.
 #ifndef KASTARRI_EXAMPLES_TIMING_H
 #define KASTARRI_EXAMPLES_TIMING_H
@@ -25,23 +25,18 @@ inline double median(std::vector<double> values) {
 
 struct Timing {
   double kernel;  // seconds, the median
-  double scalar;
-  double ratio() const { return scalar / kernel; }
+  double plain;
+  double ratio() const { return plain / kernel; }
 };
 
-template <class Kernel, class Scalar, class AfterEach>
-Timing compare(int repetitions, Kernel&& kernel, Scalar&& scalar, AfterEach&& after_each) {
-  std::vector<double> kernel_times, scalar_times;
+template <class Kernel, class Plain>
+Timing compare(int repetitions, Kernel&& kernel, Plain&& plain) {
+  std::vector<double> kernel_times, plain_times;
   for (int i = 0; i < repetitions; ++i) {
     kernel_times.push_back(seconds(kernel));
-    scalar_times.push_back(seconds(scalar));
-    after_each(i + 1, repetitions);
+    plain_times.push_back(seconds(plain));
   }
-  return {median(kernel_times), median(scalar_times)};
-}
-template <class Kernel, class Scalar>
-Timing compare(int repetitions, Kernel&& kernel, Scalar&& scalar) {
-  return compare(repetitions, kernel, scalar, [](int, int) {});
+  return {median(kernel_times), median(plain_times)};
 }
 
 }  // namespace examples

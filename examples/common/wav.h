@@ -119,6 +119,13 @@ inline Bytes wav_bytes(const Wav& wav) {
   return bytes;
 }
 
+// As in "3.33 s, 44100 Hz, stereo".
+inline std::string describe(const Wav& wav) {
+  char length[32];
+  std::snprintf(length, sizeof length, "%.2f s, ", static_cast<double>(wav.frames()) / wav.rate);
+  return length + std::to_string(wav.rate) + " Hz, " + (wav.channels == 1 ? "mono" : "stereo");
+}
+
 inline void write_wav(const std::string& path, const Wav& wav) { write_file(path, wav_bytes(wav)); }
 
 }  // namespace examples

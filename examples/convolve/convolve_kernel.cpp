@@ -6,13 +6,14 @@
 
 namespace {
 
-// Up to four neighbours and their weights, as the quad forms take them: the first in the top byte.
+// Up to four neighbours and their weights in one word, as the quad multiplications take them, the first in the top
+// byte: weights 1, 2, -1 are 0x0102FF00. A quad of fewer than four has weights of 0 in their place.
 struct Quad {
   int offset[4] = {};
   qv_int32pr weights{0};
 };
 
-// The neighbours of weight other than 0; what a quad has too many has weight 0 and looks at the pixel itself.
+// The neighbours whose weight is not 0.
 std::vector<Quad> quads_of(const Mask& mask, int stride) {
   std::vector<Quad> quads;
   int used = 4;
@@ -34,7 +35,7 @@ qv_vec2Nx8U at(const std::uint8_t* pixel, int offset) {
 }
 
 qv_vec2Nx8U response(const std::uint8_t* pixel, const std::vector<Quad>& quads, int shift) {
-  // On the PC registers lie in memory, and are quickest where they do not cross cache lines.
+  // On the PC registers lie in memory. Aligned to 64 bytes, each is in one cache line, which is quickest.
   alignas(64) qv_vec2Nx24 sum(0);
   for (const Quad& q : quads) {
     alignas(64) const qv_vec2Nx8U a = at(pixel, q.offset[0]), b = at(pixel, q.offset[1]);

@@ -1,4 +1,4 @@
-// The same as plain scalar code: what the kernel is checked against, bit for bit, and timed against.
+// The same in plain C++: what the kernel is checked against, bit for bit, and timed against.
 #include "convolve/convolve.h"
 
 static int response(const std::uint8_t* pixel, int stride, const Mask& mask, int radius, int shift) {

@@ -2,7 +2,7 @@
 //
 // y[n] = the sum of taps[k] * x[n + k] over k, as Q15 rounded half up, saturated to 16 bits, for the n
 // below count. Both use x[0] to x[count + taps - 2]. The kernel loads and stores whole registers: behind its
-// samples x and y have FIR_MARGIN more, which make no difference and stay as they are.
+// samples x and y have FIR_MARGIN more. What x has there makes no difference, what y has there stays.
 #ifndef KASTARRI_EXAMPLES_FIR_H
 #define KASTARRI_EXAMPLES_FIR_H
 

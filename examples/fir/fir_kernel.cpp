@@ -5,7 +5,7 @@
 #include "fir/fir.h"
 
 void fir(const short* x, const short* taps, int tap_count, short* y, int count) {
-  // Taps in pairs, the earlier one in the upper half of a word: an odd number of them gets a last one of 0.
+  // Taps in pairs, the earlier one in the upper half of a word: taps 3, 5, 7 become 0x00030005, 0x00070000.
   qv_int32pr pair[(FIR_MAX_TAPS + 1) / 2];
   const int pairs = (tap_count + 1) / 2;
   for (int k = 0; k < pairs; ++k) {
@@ -15,9 +15,9 @@ void fir(const short* x, const short* taps, int tap_count, short* y, int count) 
 
   auto* out = reinterpret_cast<qv_vecNx16*>(y);
   for (int n = 0; n < count; n += 32) {
-    // Loads take any address: the window moves by one sample from tap to tap.
+    // Tap k meets the samples from x[n + k] on: the next load begins one sample later, at whatever address that is.
     const auto* in = reinterpret_cast<const qv_vecNx16*>(x + n);
-    // On the PC registers lie in memory, and are quickest where they do not cross cache lines.
+    // On the PC registers lie in memory. Aligned to 64 bytes, each is in one cache line, which is quickest.
     alignas(64) qv_vecNx16 earlier, later;
     ZRA_LVNX16_IP(earlier, &in, sizeof(short));
     ZRA_LVNX16_IP(later, &in, sizeof(short));
@@ -32,7 +32,7 @@ void fir(const short* x, const short* taps, int tap_count, short* y, int count) 
     if (count - n >= 32) {
       ZRA_SVNX16_IP(filtered, &out, sizeof(qv_vecNx16));
     } else {
-      // The last samples only: the store reads the whole register's room and leaves the rest of it as it is.
+      // Fewer samples than lanes are left: lanes whose bit is 0 are not written.
       vboolN rest;
       rest._[0] = (1u << (count - n)) - 1;
       ZRA_SVNX16T_I(filtered, out, 0, rest);

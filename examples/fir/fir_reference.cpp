@@ -1,4 +1,4 @@
-// The same filter as plain scalar code: what the kernel is checked against, bit for bit, and timed against.
+// The same filter in plain C++: what the kernel is checked against, bit for bit, and timed against.
 #include "fir/fir.h"
 
 void fir_reference(const short* x, const short* taps, int tap_count, short* y, int count) {

@@ -1,7 +1,7 @@
 // How often each grey occurs in a picture, and greys looked up in a table, twice: for the core and in plain C++.
 //
-// The kernels load and store whole registers: behind its pixels a picture has PIXEL_MARGIN more, and the
-// table one entry more, which make no difference and stay as they are.
+// The kernels load whole registers: behind its pixels a picture has PIXEL_MARGIN bytes more, and behind its last
+// entry the table has one more, of any value. They write no more than the results.
 #ifndef KASTARRI_EXAMPLES_HISTOGRAM_H
 #define KASTARRI_EXAMPLES_HISTOGRAM_H
 

@@ -9,7 +9,8 @@
 namespace {
 
 constexpr int LANES = 32;
-constexpr int FULL = 65535 / LANES * LANES;  // as many pixels as no 16-bit counter can fail to hold
+// So many pixels a 16-bit counter can count even when all are of one grey, in whole registers.
+constexpr int FULL = 65535 / LANES * LANES;
 
 vboolN first_lanes(int n) {
   vboolN p;
@@ -42,11 +43,11 @@ void count_greys(const unsigned char* pixels, int count, unsigned* counts) {
       if (end - i >= LANES) {
         ZRA_LVNX8U_IP(greys, &in, sizeof(qv_vecNx8U));
       } else {
-        // The lanes without a pixel load 0, and are taken from its count again.
+        // Lanes without a pixel load 0, and the scatter will count them as black: they are taken off beforehand.
         ZRA_LVNX8UT_IP(greys, &in, sizeof(qv_vecNx8U), first_lanes(end - i));
         part[0] = static_cast<unsigned short>(part[0] - (LANES - (end - i)));
       }
-      // An offset is in bytes: twice the grey. Pixels of one grey add up in their counter.
+      // Offsets are in bytes, and a counter has two: twice the grey. Lanes of the same grey count one after the other.
       ZRA_SCATTERINCNX16U(part, ZRA_ADDNX16U(greys, greys));
     }
     add_counts(part, counts);

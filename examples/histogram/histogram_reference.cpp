@@ -1,4 +1,4 @@
-// The same as plain scalar code: what the kernels are checked against and timed against.
+// The same in plain C++: what the kernels are checked against and timed against.
 #include "histogram/histogram.h"
 
 void count_greys_reference(const unsigned char* pixels, int count, unsigned* counts) {

@@ -15,7 +15,8 @@ inline short to_q15(double value) {
   return static_cast<short>(std::lround(std::min(std::max(value, -32768.0), 32767.0)));
 }
 
-// Numbers follow each other, real part first; zeros fill them up to a multiple of `block`.
+// Complex numbers as the kernel takes them: real part, imaginary part, real part, and so on, with zeros behind them up
+// to a multiple of `block` numbers.
 inline std::vector<short> interleaved(const std::vector<std::complex<double>>& numbers, std::size_t count,
                                       std::size_t block) {
   std::vector<short> parts(2 * ((count + block - 1) / block * block), 0);
@@ -26,8 +27,9 @@ inline std::vector<short> interleaved(const std::vector<std::complex<double>>& n
   return parts;
 }
 
-// The sound as the real part of numbers whose spectrum has its positive half only: multiplied by a
-// carrier they move as a whole, where the sound itself would move up and down at once.
+// The sound as the real part of complex numbers that have no negative frequencies. A tone of 300 Hz is half a turn
+// of 300 Hz and half a turn of -300 Hz: moved up by 500 Hz, that is 800 Hz and 200 Hz. Without the negative half it
+// is 800 Hz alone.
 inline std::vector<short> analytic(const std::vector<short>& sound, std::size_t block) {
   std::size_t size = 2;
   while (size < sound.size()) size *= 2;
@@ -36,14 +38,14 @@ inline std::vector<short> analytic(const std::vector<short>& sound, std::size_t 
   fourier(x);
   for (std::size_t k = 1; k < size / 2; ++k) x[k] *= 2;
   for (std::size_t k = size / 2 + 1; k < size; ++k) x[k] = 0;
-  // The transform of the conjugate is the conjugate of the inverse.
+  // The inverse transform by way of the forward one: conjugate, transform, conjugate, divide by the size.
   for (auto& value : x) value = std::conj(value);
   fourier(x);
   for (auto& value : x) value = std::conj(value) / static_cast<double>(size);
   return interleaved(x, sound.size(), block);
 }
 
-// A full turn every 1 / frequency numbers; a frequency is a fraction of the sample rate.
+// Complex numbers of length 1 that turn `frequency` times a sample: 0.25 makes 1, i, -1, -i, 1, ...
 inline std::vector<short> carrier(double frequency, std::size_t count, std::size_t block) {
   std::vector<std::complex<double>> w(count);
   for (std::size_t n = 0; n < count; ++n) {

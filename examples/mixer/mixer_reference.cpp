@@ -1,4 +1,4 @@
-// The same as plain scalar code: what the kernel is checked against, bit for bit, and timed against.
+// The same in plain C++: what the kernel is checked against, bit for bit, and timed against.
 #include "mixer/mixer.h"
 
 static short q15(long long product) {

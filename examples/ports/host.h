@@ -12,8 +12,8 @@
 
 namespace examples {
 
-// Readiness of a queue whose other end is not always there: after every burst of entries it is away for as
-// many questions. An entry handler may answer differently each time it is asked.
+// A queue whose other end is not always there. With a length of 5, it takes or gives five entries, then says no to
+// five questions whether it is ready, then takes or gives five again. So a kernel that polls meets both answers.
 class Bursts {
  public:
   explicit Bursts(unsigned length) : length_(length) {}

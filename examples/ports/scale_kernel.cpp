@@ -15,7 +15,7 @@ struct Blocking {
   void put(unsigned entry) { RK_WRITE_OPQ(entry); }
 };
 
-// Queues that the core asks again and again. A real kernel would do other work in between.
+// Queues that are asked again and again until they are ready. A real kernel would do other work in between.
 struct Polling {
   unsigned waits = 0;
   unsigned take() {

@@ -1,4 +1,4 @@
-// The same as plain scalar code: what the kernel is checked against, bit for bit.
+// The same in plain C++: what the kernel is checked against, bit for bit.
 #include "ports/scale.h"
 
 void scale_reference(const short* x, int gain, short* y, int count) {

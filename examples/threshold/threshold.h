@@ -1,5 +1,4 @@
-// A photograph parted into dark and light at the level that lies midway between the means of both parts.
-// Each function has a scalar twin with the same results.
+// A photograph parted into dark and light at a level, twice: for the core and in plain C++.
 #ifndef KASTARRI_EXAMPLES_THRESHOLD_H
 #define KASTARRI_EXAMPLES_THRESHOLD_H
 
@@ -13,7 +12,7 @@ struct Part {
   std::uint64_t sum = 0;  // of their values
 };
 
-// The pixels above the level. A level of -1 takes them all.
+// How many pixels are above the level, and what they add up to. A level of -1 takes them all.
 Part lighter(const std::uint8_t* pixels, int count, int level);
 Part lighter_reference(const std::uint8_t* pixels, int count, int level);
 

@@ -9,7 +9,7 @@ Part lighter(const std::uint8_t* pixels, int count, int level) {
   const qv_vec2Nx8U one = 1;
   const qv_vec2Nx8U lowest = level + 1;
   Part part;
-  if (level >= 255) return part;  // nothing is above white, and 256 is no lane
+  if (level >= 255) return part;  // nothing is lighter than white, and a lane cannot hold 256
   for (int n = 0; n < count; n += 64) {
     qv_vec2Nx8U lane;
     qv_vec2Nx8U_loadip(lane, &in, sizeof lane);
@@ -28,7 +28,7 @@ void part(const std::uint8_t* pixels, std::uint8_t* parted, int count, int level
     qv_vec2Nx8U lane;
     qv_vec2Nx8U_loadip(lane, &in, sizeof lane);
     const vbool2N light = ZRA_GTU2NX8U(lane, highest);
-    // All bits turned make the distance to white; the distance to black is the pixel itself.
+    // The distance to white, 255 - pixel, is the pixel with all bits turned; the distance to black is the pixel.
     qv_vec2Nx8U moved = ZRA_SUB2NX8U(lane, ZRA_SRLI2NX8U(lane, shift));
     ZRA_ADD2NX8UT(moved, lane, ZRA_SRLI2NX8U(ZRA_NOT2NX8U(lane), shift), light);
     qv_vec2Nx8U_storeip(moved, &out, sizeof moved);

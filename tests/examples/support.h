@@ -2,6 +2,8 @@
 #ifndef KASTARRI_TESTS_EXAMPLES_SUPPORT_H
 #define KASTARRI_TESTS_EXAMPLES_SUPPORT_H
 
+#include <gtest/gtest.h>
+
 #include <cstdio>
 #include <cstdlib>
 #include <filesystem>
@@ -21,7 +23,6 @@ class Directory {
     if (!::mkdtemp(path_.data())) throw std::runtime_error("cannot make " + path_);
   }
   Directory(const Directory&) = delete;
-  Directory& operator=(const Directory&) = delete;
   ~Directory() { std::filesystem::remove_all(path_); }
   std::string file(const std::string& name) const { return path_ + "/" + name; }
   std::set<std::string> names() const {
@@ -35,34 +36,29 @@ class Directory {
   std::string path_;
 };
 
-struct Outcome {
-  int status;
-  std::string errors;
-};
-
-// Runs an example in the directory. Arguments are words for the shell.
-inline Outcome run_example(const Directory& directory, const std::string& name, const std::string& arguments) {
+// Runs an example in the directory: its exit status and what it complains about, as in "0: ". Arguments are words
+// for the shell.
+inline std::string run_example(const Directory& directory, const std::string& name, const std::string& arguments) {
   const std::string command =
       "cd " + directory.path() + " && " EXAMPLE_PROGRAMS "/" + name + " " + arguments + " 2>&1 >/dev/null";
-  Outcome run{-1, ""};
   std::FILE* const pipe = ::popen(command.c_str(), "r");
-  if (!pipe) return run;
+  if (!pipe) return "not run";
+  std::string errors;
   char block[4096];
-  while (const std::size_t got = std::fread(block, 1, sizeof block, pipe)) run.errors.append(block, got);
+  while (const std::size_t got = std::fread(block, 1, sizeof block, pipe)) errors.append(block, got);
   const int status = ::pclose(pipe);
-  run.status = WIFEXITED(status) ? WEXITSTATUS(status) : -1;
-  return run;
+  return std::to_string(WIFEXITED(status) ? WEXITSTATUS(status) : -1) + ": " + errors;
 }
 
-// What the function complains about, "" if it does not.
+// Expects that the function throws a Failure that says `what`.
 template <class F>
-std::string complaint(F&& f) {
+void expect_complaint(F&& f, const std::string& what) {
   try {
     f();
+    ADD_FAILURE() << "nothing said: " << what;
   } catch (const examples::Failure& failure) {
-    return failure.what();
+    EXPECT_NE(std::string(failure.what()).find(what), std::string::npos) << what << ": " << failure.what();
   }
-  return "";
 }
 
 #endif

@@ -193,6 +193,13 @@ class Documents(unittest.TestCase):
         printed = re.search(r"It prints `(.*?)`", readme)[1]
         self.assertEqual(self.run_program(program), (printed + "\n", 0))
 
+    def test_every_line_that_compiles_a_kernel_has_the_flags_of_a_fast_one(self):
+        pages = [os.path.join(ROOT, "README.md"), *glob.glob(os.path.join(ROOT, "docs", "*.md"))]
+        lines = [line for page in pages for line in read(page).splitlines()
+                 if re.match(r"    (g|clang)\+\+ .*\.cpp", line) and "$(pkg-config" not in line]
+        self.assertGreaterEqual(len(lines), 2)
+        self.assertEqual([line for line in lines if not re.search(r" -msse2 -mfpmath=sse | -march=native ", line)], [])
+
     def test_the_programs_of_the_porting_page_print_what_it_says(self):
         page = read("docs", "porting.md")
         programs = re.findall(r"```cpp\n(.*?)```\n\n(?:```text\n(.*?)```)?", page, re.S)

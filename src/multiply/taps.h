@@ -8,11 +8,11 @@
 
 namespace {
 
-// Coefficients stored as Stored in each of Words words, which lanes use in turn.
-template <class Stored, int Words = 1>
+// Coefficients stored as Stored in each of Count words, which lanes use in turn.
+template <class Stored, int Count = 1>
 struct Coefficients {
   using stored = Stored;
-  static constexpr int words = Words;
+  static constexpr int words = Count;
   static constexpr int bits = 8 * sizeof(Stored);
   static constexpr int in_a_word = 4 / sizeof(Stored);
 };
@@ -34,13 +34,13 @@ using u16_in_2 = Coefficients<std::uint16_t, 2>;
 
 // The coefficients of pairs as 16-bit numbers: those of 8 bits from the odd bytes and from the even ones.
 template <class Stored>
-inline Vector<std::int16_t> odd_bytes(Vector<word> words) {
-  using Half = std::conditional_t<std::is_signed_v<Stored>, std::int16_t, std::uint16_t>;
-  return reinterpret_cast<Vector<std::int16_t>>(reinterpret_cast<Vector<Half>>(words) >> 8);
+inline Shorts odd_bytes(Words words) {
+  using Lanes = std::conditional_t<std::is_signed_v<Stored>, Shorts, Halves>;
+  return in_bits<Shorts>(in_bits<Lanes>(words) >> 8);
 }
 template <class Stored>
-inline Vector<std::int16_t> even_bytes(Vector<word> words) {
-  return odd_bytes<Stored>(reinterpret_cast<Vector<word>>(reinterpret_cast<Vector<std::uint16_t>>(words) << 8));
+inline Shorts even_bytes(Words words) {
+  return odd_bytes<Stored>(in_bits<Words>(in_bits<Halves>(words) << 8));
 }
 
 // Which operands are a pair, the one that meets the lower half of a word and the one that meets the upper:
@@ -73,8 +73,8 @@ struct Pairs {
     const Bytes all[] = {dealt(operand)...};
     for (int p = 0; p < count; ++p) {
       const Bytes lower = Count == 1 ? all[0] : all[lower_of<C>(p)], upper = Count == 1 ? Bytes{} : all[upper_of<C>(p)];
-      half[0][p] = made_now(bits_of(interleaved<0, typename L::container>(lower, upper)));
-      half[1][p] = made_now(bits_of(interleaved<1, typename L::container>(lower, upper)));
+      half[0][p] = made_now(interleaved<0, typename L::container>(lower, upper));
+      half[1][p] = made_now(interleaved<1, typename L::container>(lower, upper));
     }
   }
 };
@@ -86,7 +86,7 @@ struct Sums {
   static constexpr bool is_signed = std::is_signed_v<typename L::container>;
   static constexpr int scale = is_signed ? 8 : 0;
   static constexpr int pairs = (Count + 1) / 2;
-  Vector<std::int16_t> coefficients[2];
+  Shorts coefficients[2];
 
   explicit Sums(const word* words) {
     const auto all = repeated<C::words>(words);
@@ -94,30 +94,27 @@ struct Sums {
       coefficients[0] = odd_bytes<typename C::stored>(all);
       coefficients[1] = even_bytes<typename C::stored>(all);
     } else {
-      coefficients[0] = coefficients[1] = reinterpret_cast<Vector<std::int16_t>>(all);
+      coefficients[0] = coefficients[1] = in_bits<Shorts>(all);
     }
   }
 
   template <int Half>
-  static Vector<std::int16_t> extended(Bytes v) {
-    return reinterpret_cast<Vector<std::int16_t>>(is_signed ? interleaved<Half, std::uint8_t>(Bytes{}, v)
-                                                            : interleaved<Half, std::uint8_t>(v, Bytes{}));
+  static Shorts extended(Bytes v) {
+    return in_bits<Shorts>(interleaved<Half, std::uint8_t>(is_signed ? Bytes{} : v, is_signed ? v : Bytes{}));
   }
   template <int Quarter>
-  Vector<word> sum(const Pairs<L, C, Count>& operands) const {
-    Vector<word> sum{};
+  Words sum(const Pairs<L, C, Count>& operands) const {
+    Words sum{};
     for (int p = 0; p < pairs; ++p)
-      sum += reinterpret_cast<Vector<word>>(
-          sums_of_products(extended<Quarter % 2>(operands.half[Quarter / 2][p]), coefficients[p]));
+      sum += in_bits<Words>(sums_of_products(extended<Quarter % 2>(operands.half[Quarter / 2][p]), coefficients[p]));
     return sum;
   }
 };
 
 // A 16-bit lane as a signed one: of an unsigned lane the top bit is flipped, which takes 2^15 from it.
 template <class L>
-inline Vector<std::int16_t> made_signed(Bytes v) {
-  return reinterpret_cast<Vector<std::int16_t>>(
-      std::is_signed_v<typename L::container> ? as<std::uint16_t>(v) : as<std::uint16_t>(v) ^ 0x8000);
+inline Shorts made_signed(Bytes v) {
+  return in_bits<Shorts>(std::is_signed_v<typename L::container> ? in_bits<Halves>(v) : in_bits<Halves>(v) ^ 0x8000);
 }
 
 // Sums of 16-bit lanes, four registers of pairs of words from one of lanes. A coefficient of 16 bits is split into
@@ -128,8 +125,8 @@ struct Sums<L, C, Count, false> {
   static constexpr int scale = 0;
   static constexpr int pairs = (Count + 1) / 2;
   static constexpr bool split = C::in_a_word == 2;
-  Vector<std::int16_t> odd, even;
-  Vector<word> odd_bias, even_bias;  // what unsigned lanes, made signed by flipping their top bit, are short of
+  Shorts odd, even;
+  Words odd_bias, even_bias;  // what unsigned lanes, made signed by flipping their top bit, are short of
 
   explicit Sums(const word* words) {
     using stored = typename C::stored;
@@ -139,27 +136,27 @@ struct Sums<L, C, Count, false> {
     odd_bias = bias(odd);
     even_bias = bias(even);
   }
-  static Vector<word> bias(Vector<std::int16_t> coefficient) {
-    if (is_signed) return Vector<word>{};
-    const auto half = sums_of_products(coefficient, Vector<std::int16_t>{} + 0x4000);
-    return reinterpret_cast<Vector<word>>(half) << (split && pairs == 2 ? 2 : 1);
+  static Words bias(Shorts coefficient) {
+    if (is_signed) return Words{};
+    const auto half = sums_of_products(coefficient, Shorts{} + 0x4000);
+    return in_bits<Words>(half) << (split && pairs == 2 ? 2 : 1);
   }
 
   template <int Quarter>
-  Vector<std::uint64_t> sum(const Pairs<L, C, Count>& operands) const {
-    Vector<word> by_odd = odd_bias, by_even = even_bias;
+  LongWords sum(const Pairs<L, C, Count>& operands) const {
+    Words by_odd = odd_bias, by_even = even_bias;
     for (int p = 0; p < pairs; ++p) {
       const auto both = made_signed<L>(operands.half[Quarter / 2][p]);
-      if (split || p == 0) by_odd += reinterpret_cast<Vector<word>>(sums_of_products(both, odd));
-      if (split || p == 1) by_even += reinterpret_cast<Vector<word>>(sums_of_products(both, even));
+      if (split || p == 0) by_odd += in_bits<Words>(sums_of_products(both, odd));
+      if (split || p == 1) by_even += in_bits<Words>(sums_of_products(both, even));
     }
     if constexpr (split) {
-      const auto high = reinterpret_cast<Vector<std::int32_t>>(by_odd);
-      const auto low = reinterpret_cast<Vector<std::int32_t>>(by_even);
+      const auto high = in_bits<Integers>(by_odd);
+      const auto low = in_bits<Integers>(by_even);
       return pairs_of_words<Quarter % 2>((by_odd << 8) + by_even, (high + (low >> 8)) >> 24);
     } else {
       const auto sum = by_odd + by_even;
-      return pairs_of_words<Quarter % 2>(sum, reinterpret_cast<Vector<std::int32_t>>(sum) >> 31);
+      return pairs_of_words<Quarter % 2>(sum, in_bits<Integers>(sum) >> 31);
     }
   }
 };
@@ -171,8 +168,8 @@ struct UnsplitSums {
   static constexpr int scale = 0;
   static constexpr bool is_signed = std::is_signed_v<typename L::container>;
   static constexpr int pairs = (Count + 1) / 2;
-  Vector<std::int16_t> coefficients;
-  Vector<std::uint64_t> bias;  // as above
+  Shorts coefficients;
+  LongWords bias;  // as above
 
   static bool serves(const word* words) {
     bool fit = true;
@@ -180,29 +177,27 @@ struct UnsplitSums {
     return fit;
   }
 
-  explicit UnsplitSums(const word* words)
-      : coefficients(reinterpret_cast<Vector<std::int16_t>>(repeated<C::words>(words))), bias{} {
+  explicit UnsplitSums(const word* words) : coefficients(in_bits<Shorts>(repeated<C::words>(words))), bias{} {
     if (is_signed) return;
-    const auto half = sums_of_products(coefficients, Vector<std::int16_t>{} + 0x4000);
-    bias = pairs_of_words<0>(reinterpret_cast<Vector<word>>(half) << pairs, half >> (32 - pairs));
+    const auto half = sums_of_products(coefficients, Shorts{} + 0x4000);
+    bias = pairs_of_words<0>(in_bits<Words>(half) << pairs, half >> (32 - pairs));
   }
 
   template <int Quarter>
-  Vector<std::uint64_t> sum(const Pairs<L, C, Count>& operands) const {
-    Vector<std::int32_t> low = sum_of_pair(operands.half[Quarter / 2][0]), sign = low;
+  LongWords sum(const Pairs<L, C, Count>& operands) const {
+    Integers low = sum_of_pair(operands.half[Quarter / 2][0]), sign = low;
     if constexpr (pairs == 2) {
       const auto other = sum_of_pair(operands.half[Quarter / 2][1]);
-      const auto all = reinterpret_cast<Vector<std::int32_t>>(reinterpret_cast<Vector<word>>(low) +
-                                                              reinterpret_cast<Vector<word>>(other));
+      const auto all = in_bits<Integers>(in_bits<Words>(low) + in_bits<Words>(other));
       sign = majority(low, other, all);  // of both if they agree, else of their sum, which then fits
       low = all;
     }
-    const auto sum = pairs_of_words<Quarter % 2>(reinterpret_cast<Vector<word>>(low), sign >> 31);
+    const auto sum = pairs_of_words<Quarter % 2>(in_bits<Words>(low), sign >> 31);
     return is_signed ? sum : sum + bias;
   }
 
  private:
-  Vector<std::int32_t> sum_of_pair(Bytes both) const { return sums_of_products(made_signed<L>(both), coefficients); }
+  Integers sum_of_pair(Bytes both) const { return sums_of_products(made_signed<L>(both), coefficients); }
 };
 
 // Register number k of an operand.
@@ -211,55 +206,44 @@ struct Whole {
   Bytes part(int k) const { return load_register<std::uint8_t>(image, k); }
 };
 
-template <class R, class How, class L, class C, class Sums, class... Operands>
+template <class R, class Kind, class L, class C, class Sums, class... Operands>
 [[gnu::always_inline]] inline void put_taps(const Sums& sums, const void* acc, void* r, const Operands&... operands) {
   for (int k = 0; k < 64 / register_bytes; ++k) {
     const Pairs<L, C, sizeof...(Operands)> pairs(operands.part(k)...);
     const auto sum = [&](auto quarter) { return sums.template sum<quarter>(pairs); };
-    put_sums<R, How, Sums::scale>(sum, 4 * k, acc, r);
+    put_sums<R, Kind, Sums::scale>(sum, 4 * k, acc, r);
   }
 }
 
-template <class R, class How, class L, class C, class... Operands>
+template <class R, class Kind, class L, class C, class... Operands>
 [[gnu::always_inline]] inline void sum_of_taps(const void* acc, const word* words, void* r,
                                                const Operands&... operands) {
   if constexpr (L::bits == 16 && C::in_a_word == 2 && std::is_signed_v<typename C::stored>) {
     using Unsplit = UnsplitSums<L, C, sizeof...(Operands)>;
     if (__builtin_expect(Unsplit::serves(words), true))
-      return put_taps<R, How, L, C>(Unsplit(words), acc, r, operands...);
+      return put_taps<R, Kind, L, C>(Unsplit(words), acc, r, operands...);
     asm("" : : : "memory");  // lest compilers load what both ways need before the branch, and spill it
   }
-  put_taps<R, How, L, C>(Sums<L, C, sizeof...(Operands)>(words), acc, r, operands...);
+  put_taps<R, Kind, L, C>(Sums<L, C, sizeof...(Operands)>(words), acc, r, operands...);
 }
 
-// The semantic functions: Operands vectors of layout L, then the words of coefficients, the accumulator
-// before them, the result last.
-template <class R, class L, class C, class Operands, class Words = std::make_index_sequence<C::words>>
+// Operands vectors of layout L, then the words of coefficients.
+template <class R, class Kind, class L, class C, class Operands,
+          class Coefficients = std::make_index_sequence<C::words>>
 struct Taps;
 
 template <std::size_t>
 using word_image = const word*;
 
-template <class R, class L, class C, std::size_t... V, std::size_t... W>
-struct Taps<R, L, C, std::index_sequence<V...>, std::index_sequence<W...>> {
-  [[gnu::always_inline]] static inline void fresh(word_image<V>... vectors, word_image<W>... words, word* r) {
-    const word all[] = {*words...};
-    sum_of_taps<R, Over, L, C>(nullptr, all, r, Whole{vectors}...);
-  }
-  [[gnu::always_inline]] static inline void add(const word* acc, word_image<V>... vectors, word_image<W>... words,
+template <class R, class Kind, class L, class C, std::size_t... V, std::size_t... W>
+struct Taps<R, Kind, L, C, std::index_sequence<V...>, std::index_sequence<W...>> {
+  [[gnu::always_inline]] static inline void run(const word* acc, word_image<V>... vectors, word_image<W>... words,
                                                 word* r) {
     const word all[] = {*words...};
-    sum_of_taps<R, Onto, L, C>(acc, all, r, Whole{vectors}...);
+    sum_of_taps<R, Kind, L, C>(acc, all, r, Whole{vectors}...);
   }
 };
 
 }  // namespace
-
-// A semantic function whose operands, all arrays of words, go to CALL as `units`.
-#define KERNEL_OF_WORDS(OP, CALL)                                                      \
-  template <class... Units>                                                            \
-  [[gnu::always_inline]] static inline void KASTARRI_SEMANTIC(OP)(Units * ... units) { \
-    CALL;                                                                              \
-  }
 
 #endif

@@ -4,6 +4,7 @@ Run as: library_test.py LIBRARY OBJECT... (the library's object files).
 """
 
 import glob
+import itertools
 import os
 import re
 import subprocess
@@ -161,6 +162,24 @@ class Headers(unittest.TestCase):
         for compiler in COMPILERS:
             with self.subTest(compiler=compiler):
                 self.compile(compiler, "-x", "c++", "-", text=program)
+
+
+class Constants(unittest.TestCase):
+    def test_registers_made_of_host_scalars_are_those_of_the_exported_conversions(self):
+        with open("/proc/cpuinfo", encoding="utf-8") as file:
+            features = re.search(r"^flags\s*:(.*)$", file.read(), re.M)[1].split()
+        sets = [(), ("sse2",), ("avx2",), ("avx512f", "avx512bw")]
+        with tempfile.TemporaryDirectory() as directory:
+            binary = os.path.join(directory, "constants")
+            for compiler, flags, level in itertools.product(COMPILERS, sets, ("-O0", "-O3")):
+                if not set(flags) <= set(features):
+                    continue
+                with self.subTest(compiler=compiler, flags=flags, level=level):
+                    fpmath = ["-mfpmath=sse"] if flags else []
+                    subprocess.run([compiler, *USER_FLAGS, level, *(f"-m{flag}" for flag in flags), *fpmath, "-Wno-conversion",
+                                    "-I", os.path.join(ROOT, "src"), os.path.join(ROOT, "tests", "contract", "constants.cpp"),
+                                    LIBRARY, "-o", binary, "-Wl,-rpath," + os.path.dirname(LIBRARY)], check=True)
+                    self.assertEqual(subprocess.run([binary], capture_output=True, text=True, check=False).stdout, "")
 
 
 class Documents(unittest.TestCase):

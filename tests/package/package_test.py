@@ -4,6 +4,7 @@ Run as: package_test.py BUILD (a build directory whose libraries are built).
 """
 
 import glob
+import itertools
 import os
 import re
 import shutil
@@ -73,6 +74,9 @@ class Installation(Directory):
         shutil.move(os.path.join(staging, "opt", "elsewhere"), cls.prefix)
         cls.libraries = os.path.join(cls.prefix, MULTIARCH)
 
+    def environment(self):
+        return dict(os.environ, PKG_CONFIG_PATH=os.path.join(self.prefix, "lib", "pkgconfig"))
+
     def configure(self, *arguments):
         return run("cmake", "-S", os.path.join(HERE, "consumer"), "-B", self.path("build"),
                    "-DCMAKE_BUILD_TYPE=Release", f"-DCMAKE_PREFIX_PATH={self.prefix}", *arguments)
@@ -120,16 +124,27 @@ class Installation(Directory):
         self.assertIn("kastarri is a 32-bit x86 library", configured.stdout)
 
     def test_pkg_config_has_all_that_a_compiler_needs(self):
-        environment = dict(os.environ, PKG_CONFIG_PATH=os.path.join(self.prefix, "lib", "pkgconfig"))
         modules = {"kastarri": True, "kastarri-static": processor_runs_static()}
-        for module, runs in modules.items():
-            with self.subTest(module=module):
-                self.assertEqual(output("pkg-config", "--modversion", module, env=environment).strip(), VERSION)
+        for (module, runs), compiler in itertools.product(modules.items(), ("g++", "clang++")):
+            with self.subTest(module=module, compiler=compiler):
+                self.assertEqual(output("pkg-config", "--modversion", module, env=self.environment()).strip(), VERSION)
                 # The shell takes apart what pkg-config prints, spaces in the prefix being quoted.
-                output("sh", "-c", f'eval "g++ -O2 {HERE}/consumer/main.cpp -o {self.path(module)} '
-                       f'$(pkg-config --cflags --libs {module})"', env=environment)
+                output("sh", "-c", f'eval "{compiler} -O2 {HERE}/consumer/main.cpp -o {self.path(module)} '
+                       f'$(pkg-config --cflags --libs {module})"', env=self.environment())
                 if runs:
                     self.check_answer(self.path(module), LD_LIBRARY_PATH=self.libraries)
+
+    def test_both_ways_compile_for_sse2_and_nothing_that_one_compiler_lacks(self):
+        self.configure("-DLINKAGE=shared", "-DCMAKE_EXPORT_COMPILE_COMMANDS=ON")
+        with open(self.path("build", "compile_commands.json"), encoding="utf-8") as commands:
+            flags = {"cmake": commands.read().split()}
+        for module in "kastarri", "kastarri-static":
+            flags[module] = output("pkg-config", "--cflags", module, env=self.environment()).split()
+        for name, given in flags.items():
+            with self.subTest(name=name):
+                self.assertIn("-mfpmath=sse", given)
+                self.assertTrue({"-msse2", "-mavx2", "-mavx512f"} & set(given))
+                self.assertEqual([flag for flag in given if "-max=" in flag], [])
 
     def test_headers_say_that_the_library_is_32_bit(self):
         compiled = run("g++", "-m64", "-fsyntax-only", "-I", os.path.join(self.prefix, "include"), "-x", "c++", "-",

@@ -1,6 +1,6 @@
 #!/usr/bin/env python3
-"""Write docs/coverage.md, what is exported, by family, and what of the core is not, and docs/shapes.md, the shapes of
-all rows with an example each.
+"""Write docs/coverage.md, what is exported, by family, and what of the core is not, docs/shapes.md, the shapes of
+all rows with an example each, and the counts of the README.
 
     tools/coverage.py [--check]
 """
@@ -34,6 +34,18 @@ def coverage():
     return "\n".join(lines) + "\n"
 
 
+def readme():
+    """The README with the counts of families, and of all, in the section of what is covered."""
+    with open(os.path.join(ROOT, "README.md"), encoding="utf-8") as file:
+        before, section, after = re.split(r"(^## What is covered$.*?)(?=^## )", file.read(), maxsplit=1, flags=re.M | re.S)
+    counts = [len(rows) for _, _, rows in generate_headers.all_rows().values()]
+    counts.append(sum(counts))
+    new = re.sub(r"\| \d+ \|$", lambda match: f"| {counts.pop(0)} |", section, count=len(counts), flags=re.M)
+    if counts:
+        sys.exit("README.md: What is covered has not a row a family and one of all")
+    return before + new + after
+
+
 def shapes():
     rows = [row for _, _, family in generate_headers.all_rows().values() for row in family]
     by_shape = {shape: list(group) for shape, group in itertools.groupby(sorted(rows, key=lambda row: row.shape), lambda row: row.shape)}
@@ -52,8 +64,8 @@ def shapes():
 
 def main():
     stale = False
-    for name, text in (("coverage.md", coverage()), ("shapes.md", shapes())):
-        path = os.path.join(ROOT, "docs", name)
+    for name, text in (("docs/coverage.md", coverage()), ("docs/shapes.md", shapes()), ("README.md", readme())):
+        path = os.path.join(ROOT, name)
         if "--check" in sys.argv[1:]:
             stale = stale or not os.path.exists(path) or open(path, encoding="utf-8").read() != text
         else:

@@ -41,11 +41,11 @@ function(kastarri_compile_library target)
   target_include_directories(${target} PUBLIC $<BUILD_INTERFACE:${PROJECT_SOURCE_DIR}/include>)
   target_compile_options(${target} PRIVATE
     -O3 -mfpmath=sse -ffp-contract=off -fno-exceptions -fno-rtti -fno-threadsafe-statics
-    -fvisibility=hidden -mno-mmx -mstackrealign -Wconversion -Wmissing-declarations -Wno-psabi
+    -fvisibility=hidden -mno-mmx ${KASTARRI_STACK} -Wconversion -Wmissing-declarations -Wno-psabi
     $<$<CXX_COMPILER_ID:Clang>:-Wmissing-prototypes>)
-  # A program that forgets that everything is 32-bit gets it right nevertheless.
-  target_compile_options(${target} INTERFACE -m32)
-  target_link_options(${target} INTERFACE -m32)
+  # A program that forgets to say its width gets it right nevertheless.
+  target_compile_options(${target} INTERFACE ${KASTARRI_WIDTH})
+  target_link_options(${target} INTERFACE ${KASTARRI_WIDTH})
   set_target_properties(${target} PROPERTIES POSITION_INDEPENDENT_CODE ON)
 endfunction()
 

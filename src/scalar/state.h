@@ -6,6 +6,8 @@
 
 namespace {
 
+#ifdef __i386__
+
 // Exported data is found through the global offset table, and the table from the program counter. GCC calls a
 // function for the latter. The processor does not count a call of the next instruction as one and runs it
 // without a branch: a whole call of RSR_SAR takes 1.7 ns instead of 2.5.
@@ -21,6 +23,12 @@ inline cstub_Km_ZNB_Orbis_R5_64k_processor_t& processor() {
       : "cc");
   return *found;
 }
+
+#else
+
+inline cstub_Km_ZNB_Orbis_R5_64k_processor_t& processor() { return cstub_Km_ZNB_Orbis_R5_64k_proc; }
+
+#endif
 
 }  // namespace
 

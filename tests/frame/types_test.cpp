@@ -33,6 +33,8 @@ static_assert(plain<qv_int64pr, 8, 4> && plain<qv_int64w, 8, 4> && plain<qv_int1
 static_assert(std::is_same_v<qv_vecNx16, qv_vecNx16_space::qv_vecNx16_>);
 static_assert(std::is_same_v<immediate, int>);
 
+#ifdef __i386__
+
 // Calls f(a, b, c, d) with a stack pointer that is `offset` bytes below a multiple of 64. The callee may
 // or may not pop its hidden result argument.
 __attribute__((noinline)) void call_with_stack(void* f, const void* a, const void* b, const void* c, const void* d,
@@ -74,5 +76,7 @@ TEST(frame, caller_stack_is_aligned_to_4_bytes_only) {
     }
   }
 }
+
+#endif
 
 }  // namespace

@@ -9,7 +9,7 @@
 #   make picture       take docs/pictures/reference.png of that page
 #   make install       install libraries and headers (PREFIX=/usr/local, DESTDIR=, LIBDIR=lib or lib/x86_64-linux-gnu)
 #   make package       make Debian packages in build/packages
-#   make headers       write the public headers, gdb's table of types and docs/coverage.md anew from the tables of rows
+#   make headers       write the public headers, gdb's table of types, docs/coverage.md and docs/shapes.md from the tables
 #   make format        format the sources
 #   make clean         remove build/
 #   ... BITS=64        make, test, install ... the same for 64-bit programs, in build/demo-64, build/test-64 and so on

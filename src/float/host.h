@@ -22,7 +22,7 @@
 #include "float/destination.h"
 #include "float/exact.h"
 #include "float/host_fpu.h"
-#include "frame/packs.h"
+#include "frame/registers.h"
 
 namespace {
 
@@ -85,7 +85,7 @@ struct Settled {
   static constexpr bool paired = Paired;
   Words bits, magnitudes, dropped;
 };
-inline Words in_lane_order(Words v) { return in_bits<Words>(in_order<std::uint64_t>(bits_of(v))); }
+inline Words in_lane_order(Words v) { return in_order<std::uint64_t>(v); }
 
 template <class F, Left Which>
 using Kept = Range<F::bits == 16 && Which == Left::great_and_tiny ? single_bits_of_power(Half::least_exponent) : 0,
@@ -111,8 +111,8 @@ struct Leading {
 
   Leading(const Doubles& exact_lower, const Doubles& exact_upper) {
     const Doubles lower = pinned(exact_lower), upper = pinned(exact_upper);
-    const Words high = every_other_word<1>(bits_of(lower), bits_of(upper));
-    const Words low = every_other_word<0>(bits_of(lower), bits_of(upper));
+    const Words high = every_other_word<1>(in_bits<Words>(lower), in_bits<Words>(upper));
+    const Words low = every_other_word<0>(in_bits<Words>(lower), in_bits<Words>(upper));
     magnitude = high & single_magnitude;
     sign = high ^ magnitude;
     const auto rebiased = in_bits<Integers>(magnitude - rebias);
@@ -231,8 +231,7 @@ template <class R, class StepFrom>
     return narrowed(first, step_from(from + step));
   } else {
     const auto second = in_bits<Register>(step_from(from + step));
-    return in_bits<Vector<Lane>>(
-        in_order<std::uint64_t>(bits_of(pack_words(in_bits<Register>(first), second, Lane{}))));
+    return in_bits<Vector<Lane>>(in_order<std::uint64_t>(pack_words(in_bits<Register>(first), second, Lane{})));
   }
 }
 template <class R, class Results, class StepFrom, std::size_t... K>

@@ -12,18 +12,10 @@
 
 namespace {
 
-using Words = Vector<word>;
-using Integers = Vector<std::int32_t>;
-using Singles = Vector<float>;
-using Doubles = Vector<double>;
-using DoubleBits = Vector<std::uint64_t>;
+using DoubleBits = LongWords;
 
 constexpr int step = lanes_in_register<word>;  // lanes that are computed at a time
 
-template <class To, class From>
-inline To in_bits(From v) {
-  return reinterpret_cast<To>(v);
-}
 inline Words words_of(Singles x) { return in_bits<Words>(x); }
 
 // Lanes of ones where the sign is set.

@@ -15,8 +15,9 @@ KASTARRI_FAILURE void fail(const char* format, ...) __attribute__((format(printf
 // What the exported cstub_vaddr_not_aligned does.
 KASTARRI_FAILURE void not_aligned(std::uintptr_t address);
 
-// The same for a caller to end in, whose way without failure is then that of a leaf: the address comes in a register,
-// and the compiler is not told that nothing returns, for it never ends a function in a call that does not.
+// The same, made for `return end_not_aligned(a);` at the end of an entry: that compiles to a jump, so that the entry
+// sets up no stack frame for it. Hence the address in a register, and no noreturn: compilers make no such jump to a
+// function that never returns.
 #ifdef __i386__
 #define KASTARRI_IN_REGISTER __attribute__((regparm(1)))
 #else

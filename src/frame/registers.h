@@ -11,14 +11,16 @@
 
 namespace {
 
+// Register is what the processors' intrinsics for integers take. Most shuffles work within blocks of 128 bits.
 #if defined __AVX512BW__
-constexpr int register_bytes = 64;
+using Register = __m512i;
 #elif defined __AVX2__
-constexpr int register_bytes = 32;
+using Register = __m256i;
 #else
-constexpr int register_bytes = 16;
+using Register = __m128i;
 #endif
-constexpr int blocks_in_register = register_bytes / 16;  // most shuffles work within blocks of 128 bits
+constexpr int register_bytes = sizeof(Register);
+constexpr int blocks_in_register = register_bytes / 16;
 
 template <class Lane>
 struct vector_of {
@@ -29,13 +31,19 @@ using Vector = typename vector_of<Lane>::type;
 template <class Lane>
 constexpr int lanes_in_register = register_bytes / static_cast<int>(sizeof(Lane));
 
-template <class Lane>
-inline Vector<Lane> as(Vector<std::uint8_t> v) {
-  return reinterpret_cast<Vector<Lane>>(v);
-}
-template <class V>
-inline Vector<std::uint8_t> bits_of(V v) {
-  return reinterpret_cast<Vector<std::uint8_t>>(v);
+using Bytes = Vector<std::uint8_t>;
+using Shorts = Vector<std::int16_t>;
+using Halves = Vector<std::uint16_t>;
+using Integers = Vector<std::int32_t>;
+using Words = Vector<std::uint32_t>;
+using LongWords = Vector<std::uint64_t>;
+using Singles = Vector<float>;
+using Doubles = Vector<double>;
+
+// The same bits as another type of register.
+template <class To, class From>
+inline To in_bits(From v) {
+  return reinterpret_cast<To>(v);
 }
 
 // Register number k of those at an address.
@@ -54,25 +62,23 @@ inline void store_register(void* to, int k, V v) {
 template <class Lane>
 inline bool any_sign(Vector<Lane> v) {
   constexpr Lane sign = static_cast<Lane>(Lane{1} << (8 * sizeof(Lane) - 1));
-  const auto signs = v & sign;
+  const auto signs = in_bits<Register>(v & sign);
 #if defined __AVX512BW__
-  return _mm512_test_epi32_mask(reinterpret_cast<__m512i>(signs), reinterpret_cast<__m512i>(signs)) != 0;
+  return _mm512_test_epi32_mask(signs, signs) != 0;
 #elif defined __AVX2__
-  return _mm256_testz_si256(reinterpret_cast<__m256i>(signs), reinterpret_cast<__m256i>(signs)) == 0;
+  return _mm256_testz_si256(signs, signs) == 0;
 #else
-  return _mm_movemask_epi8(reinterpret_cast<__m128i>(signs)) != 0;
+  return _mm_movemask_epi8(signs) != 0;
 #endif
 }
 
-// Magnitudes with the signs of v, where it is not 0.
+// Lane i = magnitude i with the sign of v[i]; where v[i] is 0, magnitude i or 0.
 #if defined __AVX2__ && !defined __AVX512BW__
-inline Vector<std::int16_t> signed_as(Vector<std::int16_t> magnitudes, Vector<std::int16_t> v) {
-  return reinterpret_cast<Vector<std::int16_t>>(
-      _mm256_sign_epi16(reinterpret_cast<__m256i>(magnitudes), reinterpret_cast<__m256i>(v)));
+inline Shorts signed_as(Shorts magnitudes, Shorts v) {
+  return in_bits<Shorts>(_mm256_sign_epi16(in_bits<Register>(magnitudes), in_bits<Register>(v)));
 }
-inline Vector<std::int32_t> signed_as(Vector<std::int32_t> magnitudes, Vector<std::int32_t> v) {
-  return reinterpret_cast<Vector<std::int32_t>>(
-      _mm256_sign_epi32(reinterpret_cast<__m256i>(magnitudes), reinterpret_cast<__m256i>(v)));
+inline Integers signed_as(Integers magnitudes, Integers v) {
+  return in_bits<Integers>(_mm256_sign_epi32(in_bits<Register>(magnitudes), in_bits<Register>(v)));
 }
 #else
 template <class V>
@@ -82,111 +88,127 @@ inline V signed_as(V magnitudes, V v) {
 }
 #endif
 
-// Words that fill a block, one after the other and again, and that block over and over.
-template <int Words, std::size_t... I>
+// --- Shuffles ------------------------------------------------------------------------------------------------
+// Each is told the lane that it moves, and leaves the type of the register as it is. Examples are of words in
+// registers of 256 bits: two blocks of four words.
+
+template <class Lane>
+using lane_numbers = std::make_index_sequence<lanes_in_register<Lane>>;
+
+// `Count` words over and over: 1 2 1 2 1 2 1 2 of 1 2.
+template <int Count, std::size_t... I>
 inline __m128i block_of(const std::uint32_t* words, std::index_sequence<I...>) {
   typedef std::uint32_t Block __attribute__((vector_size(16)));
-  return reinterpret_cast<__m128i>(Block{words[I % Words]...});
+  return reinterpret_cast<__m128i>(Block{words[I % Count]...});
 }
-template <int Words>
-inline Vector<std::uint32_t> repeated(const std::uint32_t* words) {
-  if constexpr (Words == 1) return Vector<std::uint32_t>{} + *words;
-  const __m128i block = block_of<Words>(words, std::make_index_sequence<4>());
+template <int Count>
+inline Words repeated(const std::uint32_t* words) {
+  if constexpr (Count == 1) return Words{} + *words;
+  const __m128i block = block_of<Count>(words, std::make_index_sequence<4>());
 #if defined __AVX512BW__
-  return reinterpret_cast<Vector<std::uint32_t>>(_mm512_maskz_broadcast_i32x4(0xFFFF, block));
+  return in_bits<Words>(_mm512_maskz_broadcast_i32x4(0xFFFF, block));
 #elif defined __AVX2__
-  return reinterpret_cast<Vector<std::uint32_t>>(_mm256_broadcastsi128_si256(block));
+  return in_bits<Words>(_mm256_broadcastsi128_si256(block));
 #else
-  return reinterpret_cast<Vector<std::uint32_t>>(block);
+  return in_bits<Words>(block);
 #endif
 }
 
-// The lower (Half = 0) or upper (1) lanes of every block of a and b, taken in turn.
+// The lower (Half = 0) or upper (1) lanes of every block of a and b, taken in turn: the lower ones of
+// a0 .. a7 and b0 .. b7 are a0 b0 a1 b1, a4 b4 a5 b5.
 template <int Half, class Lane, std::size_t... I>
 inline Vector<Lane> interleaved(Vector<Lane> a, Vector<Lane> b, std::index_sequence<I...>) {
   constexpr int in_block = 16 / sizeof(Lane), all = lanes_in_register<Lane>;
   return __builtin_shufflevector(a, b,
                                  (I / in_block * in_block + Half * in_block / 2 + I % in_block / 2 + I % 2 * all)...);
 }
-template <int Half, class Lane>
-inline Vector<Lane> interleaved(Vector<std::uint8_t> a, Vector<std::uint8_t> b) {
-  return interleaved<Half, Lane>(as<Lane>(a), as<Lane>(b), std::make_index_sequence<lanes_in_register<Lane>>());
+template <int Half, class Lane, class V>
+inline V interleaved(V a, V b) {
+  return in_bits<V>(interleaved<Half, Lane>(in_bits<Vector<Lane>>(a), in_bits<Vector<Lane>>(b), lane_numbers<Lane>()));
 }
 
-// The even (First = 0) or odd (1) words of a and b, block by block: a's, then b's. As numbers they are shuffled in one
-// step.
+// Every other word, the even ones (First = 0) or the odd ones (1), block by block, a's before b's: the even ones are
+// a0 a2 b0 b2, a4 a6 b4 b6. Shuffled as floats, which takes one step.
 template <int First, std::size_t... I>
-inline Vector<float> every_other_word(Vector<float> a, Vector<float> b, std::index_sequence<I...>) {
+inline Singles every_other_word(Singles a, Singles b, std::index_sequence<I...>) {
   return __builtin_shufflevector(a, b, (I / 4 * 4 + I % 2 * 2 + First + I % 4 / 2 * sizeof...(I))...);
 }
-template <int First>
-inline Vector<std::uint32_t> every_other_word(Vector<std::uint8_t> a, Vector<std::uint8_t> b) {
-  return reinterpret_cast<Vector<std::uint32_t>>(
-      every_other_word<First>(as<float>(a), as<float>(b), std::make_index_sequence<lanes_in_register<float>>()));
+template <int First, class V>
+inline V every_other_word(V a, V b) {
+  return in_bits<V>(every_other_word<First>(in_bits<Singles>(a), in_bits<Singles>(b), lane_numbers<float>()));
 }
 
-// The lanes of a register, of which every block holds one of each of its parts, with the parts in order.
+// The first lanes of all blocks, then their second ones, and so on: v0 v4 v1 v5, v2 v6 v3 v7. That puts in order what
+// was made block by block: with lanes of 64 bits a0 a2 b0 b2, a4 a6 b4 b6 becomes a0 a2 a4 a6, b0 b2 b4 b6.
 template <class Lane, std::size_t... I>
 inline Vector<Lane> in_order(Vector<Lane> v, std::index_sequence<I...>) {
   return __builtin_shufflevector(v, v, (I % blocks_in_register * (16 / sizeof(Lane)) + I / blocks_in_register)...);
 }
-template <class Lane>
-inline Vector<Lane> in_order(Vector<std::uint8_t> v) {
-  return in_order<Lane>(as<Lane>(v), std::make_index_sequence<lanes_in_register<Lane>>());
+template <class Lane, class V>
+inline V in_order(V v) {
+  return in_bits<V>(in_order<Lane>(in_bits<Vector<Lane>>(v), lane_numbers<Lane>()));
 }
 
-// The words of a register dealt to its blocks in turn: interleaving such registers twice puts lanes in order.
+// Words dealt to the blocks in turn: v0 v2 v4 v6, v1 v3 v5 v7. The four registers that interleaving makes of it, the
+// halves of its halves, are then in order: v0 v1, v2 v3, v4 v5, v6 v7, each word over a whole block.
 template <std::size_t... I>
-inline Vector<std::uint32_t> dealt(Vector<std::uint32_t> v, std::index_sequence<I...>) {
+inline Words dealt(Words v, std::index_sequence<I...>) {
   return __builtin_shufflevector(v, v, (I % 4 * blocks_in_register + I / 4)...);
 }
-inline Vector<std::uint8_t> dealt(Vector<std::uint8_t> v) {
-  return bits_of(dealt(as<std::uint32_t>(v), std::make_index_sequence<lanes_in_register<std::uint32_t>>()));
+template <class V>
+inline V dealt(V v) {
+  return in_bits<V>(dealt(in_bits<Words>(v), lane_numbers<std::uint32_t>()));
 }
 
-// The blocks of a but its first, then the first of b.
+// A register of the bytes of a followed by those of b, from byte number First of a block on.
 template <std::size_t... I>
-inline Vector<std::uint64_t> next_block(Vector<std::uint64_t> a, Vector<std::uint64_t> b, std::index_sequence<I...>) {
+inline LongWords next_block(LongWords a, LongWords b, std::index_sequence<I...>) {
   return __builtin_shufflevector(a, b, (I + 2)...);
 }
-
+template <int First>
+inline Bytes from_byte(Bytes a, Bytes b) {
+  const auto all = in_bits<Register>(a);
+  const auto next =
+      in_bits<Register>(next_block(in_bits<LongWords>(a), in_bits<LongWords>(b), lane_numbers<std::uint64_t>()));
 #if defined __AVX512BW__
-using Register = __m512i;
-inline Register paired_products(Register a, Register b) { return _mm512_madd_epi16(a, b); }
-inline Register upper_products(Register a, Register b, std::int16_t) { return _mm512_mulhi_epi16(a, b); }
-inline Register upper_products(Register a, Register b, std::uint16_t) { return _mm512_mulhi_epu16(a, b); }
+  return in_bits<Bytes>(_mm512_alignr_epi8(next, all, First));
 #elif defined __AVX2__
-using Register = __m256i;
-inline Register paired_products(Register a, Register b) { return _mm256_madd_epi16(a, b); }
-inline Register upper_products(Register a, Register b, std::int16_t) { return _mm256_mulhi_epi16(a, b); }
-inline Register upper_products(Register a, Register b, std::uint16_t) { return _mm256_mulhi_epu16(a, b); }
+  return in_bits<Bytes>(_mm256_alignr_epi8(next, all, First));
 #else
-using Register = __m128i;
-inline Register paired_products(Register a, Register b) { return _mm_madd_epi16(a, b); }
-inline Register upper_products(Register a, Register b, std::int16_t) { return _mm_mulhi_epi16(a, b); }
-inline Register upper_products(Register a, Register b, std::uint16_t) { return _mm_mulhi_epu16(a, b); }
+  return in_bits<Bytes>(_mm_srli_si128(all, First)) | in_bits<Bytes>(_mm_slli_si128(next, 16 - First));
 #endif
-
-// The sum of two neighbouring products a lane. It passes 2^31 - 1 only if all four factors are -2^15,
-// and then wraps.
-inline Vector<std::int32_t> sums_of_products(Vector<std::int16_t> a, Vector<std::int16_t> b) {
-  return reinterpret_cast<Vector<std::int32_t>>(
-      paired_products(reinterpret_cast<Register>(a), reinterpret_cast<Register>(b)));
 }
 
-// The bits that at least two of three hold.
-inline Vector<std::int32_t> majority(Vector<std::int32_t> a, Vector<std::int32_t> b, Vector<std::int32_t> c) {
+// --- Lanes clamped to half their width -----------------------------------------------------------------------
+
+// Words clamped to halves, halves to bytes, signed or not as the last operand; block by block, a's before b's.
 #if defined __AVX512BW__
-  return reinterpret_cast<Vector<std::int32_t>>(_mm512_ternarylogic_epi32(
-      reinterpret_cast<__m512i>(a), reinterpret_cast<__m512i>(b), reinterpret_cast<__m512i>(c), 0xE8));
-#else
-  return (a & b) | ((a | b) & c);
+inline __m512i pack_words(__m512i a, __m512i b, std::int16_t) { return _mm512_packs_epi32(a, b); }
+inline __m512i pack_words(__m512i a, __m512i b, std::uint16_t) { return _mm512_packus_epi32(a, b); }
+inline __m512i pack_halves(__m512i a, __m512i b, std::int8_t) { return _mm512_packs_epi16(a, b); }
+inline __m512i pack_halves(__m512i a, __m512i b, std::uint8_t) { return _mm512_packus_epi16(a, b); }
 #endif
+#if defined __AVX2__
+inline __m256i pack_words(__m256i a, __m256i b, std::int16_t) { return _mm256_packs_epi32(a, b); }
+inline __m256i pack_words(__m256i a, __m256i b, std::uint16_t) { return _mm256_packus_epi32(a, b); }
+inline __m256i pack_halves(__m256i a, __m256i b, std::int8_t) { return _mm256_packs_epi16(a, b); }
+inline __m256i pack_halves(__m256i a, __m256i b, std::uint8_t) { return _mm256_packus_epi16(a, b); }
+#else
+inline __m128i pack_words(__m128i a, __m128i b, std::int16_t) { return _mm_packs_epi32(a, b); }
+// Clamped as signed, 2^15 lower. Words that are 2^15 or less from the lowest one would wrap; none are.
+inline __m128i pack_words(__m128i a, __m128i b, std::uint16_t) {
+  const __m128i half = _mm_set1_epi32(0x8000);
+  const __m128i packed = _mm_packs_epi32(_mm_sub_epi32(a, half), _mm_sub_epi32(b, half));
+  return _mm_xor_si128(packed, _mm_set1_epi16(-0x8000));
 }
+inline __m128i pack_halves(__m128i a, __m128i b, std::int8_t) { return _mm_packs_epi16(a, b); }
+inline __m128i pack_halves(__m128i a, __m128i b, std::uint8_t) { return _mm_packus_epi16(a, b); }
+#endif
 
-// Counts to shift words by: the lanes' own, or where the target has no such shift one for all. Any count serves that is
-// below 32 or stands for nothing being left. (Compilers take a count that all share through memory in two halves, which
-// a load of both waits for.)
+// --- Shifts of words by counts -------------------------------------------------------------------------------
+
+// The counts are the lanes' own, or where the target has no such shift one for all. A count from 0 to 31 shifts by as
+// much, one beyond leaves nothing but signs. (A shift operator would take a shared count through memory.)
 using Counts = Register;
 #if defined __AVX512BW__
 inline Counts counts_of(std::uint32_t n) { return _mm512_set1_epi32(static_cast<int>(n)); }
@@ -205,61 +227,15 @@ inline Register right_by(Register v, Counts n, std::uint32_t) { return _mm_srl_e
 inline Register right_by(Register v, Counts n, std::int32_t) { return _mm_sra_epi32(v, n); }
 #endif
 #if defined __AVX2__
-inline Counts counts_of(Vector<std::uint32_t> n) { return reinterpret_cast<Counts>(n); }
+inline Counts counts_of(Words n) { return in_bits<Counts>(n); }
 #endif
 template <class Lane>
 inline Vector<Lane> shifted_left(Vector<Lane> v, Counts n) {
-  return reinterpret_cast<Vector<Lane>>(left_by(reinterpret_cast<Counts>(v), n));
+  return in_bits<Vector<Lane>>(left_by(in_bits<Register>(v), n));
 }
 template <class Lane>
 inline Vector<Lane> shifted_right(Vector<Lane> v, Counts n) {
-  return reinterpret_cast<Vector<Lane>>(right_by(reinterpret_cast<Counts>(v), n, Lane{}));
-}
-
-// The upper halves of 32-bit products.
-template <class Lane>
-inline Vector<Lane> upper_halves(Vector<Lane> a, Vector<Lane> b) {
-  return reinterpret_cast<Vector<Lane>>(
-      upper_products(reinterpret_cast<Register>(a), reinterpret_cast<Register>(b), Lane{}));
-}
-
-// The low 24 bits of a word, the low 48 of a pair of words, sign-extended. Where a target can multiply some lanes and
-// leave the rest, the sign is that of a product with 1.
-inline Vector<std::uint32_t> extended_from_24(Vector<std::uint32_t> v) {
-#if defined __AVX512BW__
-  const auto all = reinterpret_cast<__m512i>(v);
-  return reinterpret_cast<Vector<std::uint32_t>>(_mm512_mask_maddubs_epi16(all, 0xAAAAAAAA, _mm512_set1_epi16(1), all));
-#else
-  return reinterpret_cast<Vector<std::uint32_t>>(reinterpret_cast<Vector<std::int32_t>>(v << 8) >> 8);
-#endif
-}
-inline Vector<std::uint64_t> extended_from_48(Vector<std::uint64_t> v) {
-#if defined __AVX512BW__
-  const auto all = reinterpret_cast<__m512i>(v);
-  return reinterpret_cast<Vector<std::uint64_t>>(_mm512_mask_madd_epi16(all, 0xAAAA, all, _mm512_set1_epi32(1)));
-#elif defined __AVX2__
-  const auto all = reinterpret_cast<__m256i>(v);
-  return reinterpret_cast<Vector<std::uint64_t>>(
-      _mm256_blend_epi32(all, _mm256_madd_epi16(all, _mm256_set1_epi32(1)), 0xAA));
-#else
-  constexpr std::uint64_t sign = std::uint64_t{1} << 47;
-  return ((v & (2 * sign - 1)) ^ sign) - sign;
-#endif
-}
-
-// The bytes from Bytes on of a followed by b.
-template <int Bytes>
-inline Vector<std::uint8_t> from_byte(Vector<std::uint8_t> a, Vector<std::uint8_t> b) {
-  const auto next = bits_of(next_block(as<std::uint64_t>(a), as<std::uint64_t>(b),
-                                       std::make_index_sequence<lanes_in_register<std::uint64_t>>()));
-#if defined __AVX512BW__
-  return bits_of(_mm512_alignr_epi8(reinterpret_cast<__m512i>(next), reinterpret_cast<__m512i>(a), Bytes));
-#elif defined __AVX2__
-  return bits_of(_mm256_alignr_epi8(reinterpret_cast<__m256i>(next), reinterpret_cast<__m256i>(a), Bytes));
-#else
-  return bits_of(_mm_srli_si128(reinterpret_cast<__m128i>(a), Bytes)) |
-         bits_of(_mm_slli_si128(reinterpret_cast<__m128i>(next), 16 - Bytes));
-#endif
+  return in_bits<Vector<Lane>>(right_by(in_bits<Register>(v), n, Lane{}));
 }
 
 }  // namespace

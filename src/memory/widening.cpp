@@ -1,5 +1,5 @@
 // Loads that widen lanes and stores that narrow them.
-#include "frame/packs.h"
+#include "frame/registers.h"
 #include "memory/kernels.h"
 
 namespace {

@@ -13,11 +13,11 @@ namespace {
 template <class L>
 using All = Read<L>;
 
-// Every other 24-bit lane: two of them are the halves of a 64-bit container.
+// Every other 24-bit lane, the even ones (First = 0) or the odd ones (1): two are the halves of 64 bits.
 template <int First>
-class Every2nd {
+class EveryOther {
  public:
-  explicit Every2nd(const void* acc) : pairs_(acc) {}
+  explicit EveryOther(const void* acc) : pairs_(acc) {}
   word operator[](int k) const { return static_cast<word>(pairs_[k] >> (32 * First)); }
 
  private:
@@ -45,7 +45,7 @@ struct OwnCounts {
     const Read<C> given(counts);
     for (int i = 0; i < C::count; ++i) count[i] = given[i] > Bound ? Bound : given[i];
   }
-  Word operator[](int k) const { return load_register<word>(count, k); }
+  Words operator[](int k) const { return load_register<word>(count, k); }
 };
 class SharedCount {
  public:
@@ -60,23 +60,23 @@ class SharedCount {
 template <class Rounding, class Lanes>
 struct Words24 {
   template <class N>
-  static Int part(const word* acc, int k, N n) {
+  static Integers part(const word* acc, int k, N n) {
     return shifted24<Rounding>(Lanes::part(acc, k), n);
   }
 };
 template <class Rounding, class Lanes>
 struct WordsOfPairs {
   template <class N>
-  static Int part(const word* acc, int k, N n) {
+  static Integers part(const word* acc, int k, N n) {
     return packed_pairs<Rounding, Lanes>(Lanes::lanes(acc, k), n);
   }
 };
 
-template <class R, class Words, class N>
+template <class R, class Parts, class N>
 inline void pack(const word* acc, const N& counts, word* r) {
   Saturated<typename R::container, R::count> results;
   for (int k = 0; k < 4 * R::count / register_bytes; ++k)
-    store_register(results.lane, k, Words::part(acc, k, counts[k]));
+    store_register(results.lane, k, Parts::part(acc, k, counts[k]));
   results.collect(r);
 }
 
@@ -95,9 +95,9 @@ inline void pack(const word* acc, const N& counts, word* r) {
   static inline void KASTARRI_SEMANTIC(OP)(const word* acc, word count, word* r) { \
     pack<R, WORDS<ROUNDING, LANES>>(acc, SharedCount(count, BOUND), r);            \
   }
-#define KERNEL_shift_alternate24(OP, R, ROUNDING, FIRST)                               \
-  static inline void KASTARRI_SEMANTIC(OP)(const word* acc, word count, word* r) {     \
-    pack_alternate24<R::container, ROUNDING, FIRST>(acc, clamped(count, word{23}), r); \
+#define KERNEL_shift_every_other24(OP, R, ROUNDING, FIRST)                               \
+  static inline void KASTARRI_SEMANTIC(OP)(const word* acc, word count, word* r) {       \
+    pack_every_other24<R::container, ROUNDING, FIRST>(acc, clamped(count, word{23}), r); \
   }
 #define KERNEL_shift48(OP, ROUNDING)                                               \
   static inline void KASTARRI_SEMANTIC(OP)(const word* acc, word count, word* r) { \

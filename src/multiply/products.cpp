@@ -4,91 +4,82 @@
 
 namespace {
 
-// Products of vectors whose accumulators have lanes four times as wide. They are made twice as wide first, those of
-// either half of a block, and then extended by their sign.
+// Products of vectors whose accumulators have lanes four times as wide: 8 bits to 24 in a word, 16 to 48 in two. They
+// are made twice as wide first, those of either half of a block, and then extended by their sign.
 template <class A, class B>
 struct Products {
   static constexpr bool a_signed = std::is_signed_v<typename A::container>;
   static constexpr bool b_signed = std::is_signed_v<typename B::container>;
   using Lane = std::conditional_t<A::bits == 8, std::int16_t, std::int32_t>;
-  using Unsigned = std::make_unsigned_t<Lane>;
   Vector<Lane> half[2];
 
   Products(Bytes a, Bytes b) : half{of_half<0>(a, b), of_half<1>(a, b)} {}
 
   template <int Quarter>
   auto quarter() const {
+    using Sum = std::conditional_t<A::bits == 8, Words, LongWords>;
     const auto product = half[Quarter / 2];
     const auto above = a_signed || b_signed ? product >> (8 * sizeof(Lane) - 1) : Vector<Lane>{};
-    return as_sum(interleaved<Quarter % 2, Unsigned>(bits_of(product), bits_of(above)));
+    return in_bits<Sum>(interleaved<Quarter % 2, Lane>(product, above));
   }
 
  private:
-  static Vector<word> as_sum(Vector<std::uint16_t> v) { return reinterpret_cast<Vector<word>>(v); }
-  static Vector<std::uint64_t> as_sum(Vector<word> v) { return reinterpret_cast<Vector<std::uint64_t>>(v); }
-
   template <int Half>
   static Vector<Lane> of_half(Bytes a, Bytes b) {
     if constexpr (A::bits == 8)
       return of_bytes<Half>(a, b);
     else
-      return reinterpret_cast<Vector<Lane>>(
-          interleaved<Half, std::uint16_t>(bits_of(as<std::uint16_t>(a) * as<std::uint16_t>(b)), upper(a, b)));
+      return in_bits<Integers>(interleaved<Half, std::uint16_t>(in_bits<Halves>(a) * in_bits<Halves>(b),
+                                                                upper(in_bits<Halves>(a), in_bits<Halves>(b))));
   }
 
   template <int Half>
-  static Vector<std::int16_t> of_bytes(Bytes a, Bytes b) {
-    if constexpr (a_signed && b_signed) return upper_halves<std::int16_t>(at_top<Half>(a), at_top<Half>(b));
-    return reinterpret_cast<Vector<std::int16_t>>(widened<Half, a_signed>(a) * widened<Half, b_signed>(b));
+  static Shorts of_bytes(Bytes a, Bytes b) {
+    if constexpr (a_signed && b_signed)
+      return upper_halves<std::int16_t>(at_top<Half>(a), at_top<Half>(b));
+    else
+      return in_bits<Shorts>(widened<Half, a_signed>(a) * widened<Half, b_signed>(b));
   }
-  // Bytes as 2^8 times themselves, and as themselves.
+  // Bytes x as 16-bit lanes: as 2^8 x, and as x.
   template <int Half>
-  static Vector<std::int16_t> at_top(Bytes v) {
-    return reinterpret_cast<Vector<std::int16_t>>(interleaved<Half, std::uint8_t>(Bytes{}, v));
+  static Shorts at_top(Bytes v) {
+    return in_bits<Shorts>(interleaved<Half, std::uint8_t>(Bytes{}, v));
   }
   template <int Half, bool IsSigned>
-  static Vector<std::uint16_t> widened(Bytes v) {
-    return reinterpret_cast<Vector<std::uint16_t>>(IsSigned ? bits_of(at_top<Half>(v) >> 8)
-                                                            : bits_of(interleaved<Half, std::uint8_t>(v, Bytes{})));
+  static Halves widened(Bytes v) {
+    return IsSigned ? in_bits<Halves>(at_top<Half>(v) >> 8)
+                    : in_bits<Halves>(interleaved<Half, std::uint8_t>(v, Bytes{}));
   }
 
-  // The upper halves of products of 16-bit lanes. An unsigned factor taken as signed is short of 2^16 if its top bit
-  // is set.
-  static Bytes upper(Bytes a, Bytes b) {
-    const auto x = as<std::int16_t>(a), y = as<std::int16_t>(b);
+  // The upper halves of products of 16-bit lanes. For an unsigned x and a signed y, x read as signed is x - 2^16 where
+  // its top bit is set; the upper half is then y too small.
+  static Halves upper(Halves a, Halves b) {
+    const auto x = in_bits<Shorts>(a), y = in_bits<Shorts>(b);
     if constexpr (a_signed && b_signed)
-      return bits_of(upper_halves<std::int16_t>(x, y));
+      return in_bits<Halves>(upper_halves<std::int16_t>(x, y));
     else if constexpr (b_signed)
-      return bits_of(as<std::uint16_t>(bits_of(upper_halves<std::int16_t>(x, y))) +
-                     as<std::uint16_t>(bits_of(y & x >> 15)));
+      return in_bits<Halves>(upper_halves<std::int16_t>(x, y)) + in_bits<Halves>(y & x >> 15);
     else
-      return bits_of(upper_halves<std::uint16_t>(as<std::uint16_t>(a), as<std::uint16_t>(b)));
+      return upper_halves<std::uint16_t>(a, b);
   }
 };
 
-template <class R, class How, class A, class B>
-inline void put_products(const word* acc, const word* a, const word* b, word* r) {
-  for (int k = 0; k < 64 / register_bytes; ++k) {
-    const Products<A, B> products(dealt(load_register<std::uint8_t>(a, k)), dealt(load_register<std::uint8_t>(b, k)));
-    put_sums<R, How, 0>([&](auto quarter) { return products.template quarter<quarter>(); }, 4 * k, acc, r);
+template <class R, class Kind, class A, class B>
+struct ByRegister {
+  static inline void run(const word* acc, const word* a, const word* b, word* r) {
+    for (int k = 0; k < 64 / register_bytes; ++k) {
+      const Products<A, B> products(dealt(load_register<std::uint8_t>(a, k)), dealt(load_register<std::uint8_t>(b, k)));
+      put_sums<R, Kind, 0>([&](auto quarter) { return products.template quarter<quarter>(); }, 4 * k, acc, r);
+    }
   }
-}
+};
 
 }  // namespace
 
 #include "multiply/stamp.h"
 
-// KERNEL(OP, kind_vectors, result layout, factors' layouts)
-#define KERNEL_fresh_vectors(OP, R, A, B)                                           \
-  static inline void KASTARRI_SEMANTIC(OP)(const word* a, const word* b, word* r) { \
-    put_products<R, Over, A, B>(nullptr, a, b, r);                                  \
-  }
-#define KERNEL_onto(OP, HOW, R, A, B)                                                                \
-  static inline void KASTARRI_SEMANTIC(OP)(const word* acc, const word* a, const word* b, word* r) { \
-    put_products<R, HOW, A, B>(acc, a, b, r);                                                        \
-  }
-#define KERNEL_add_vectors(OP, ...) KERNEL_onto(OP, Onto, __VA_ARGS__)
-#define KERNEL_subtract_vectors(OP, ...) KERNEL_onto(OP, From, __VA_ARGS__)
+// KERNEL(OP, by_register, kind, result layout, layouts of the factors)
+#define KERNEL_by_register(OP, KIND, R, A, B) KERNEL_OF_KIND(OP, KIND, ByRegister<R, KIND, A, B>::run)
 
 #include "multiply/products.def"
 

@@ -1,7 +1,7 @@
 // What all multiplies share. A multiply is three choices that do not touch each other:
 //   the factors' layouts, which carry their signedness;
 //   the arrangement, a rule that makes a lane's sum of products from the factors;
-//   the kind, which puts that sum into the result: fresh, added to the accumulator, subtracted from it.
+//   the kind, which puts that sum into the result: Fresh, Added to the accumulator, Subtracted from it.
 #ifndef KASTARRI_MULTIPLY_PRODUCTS_H
 #define KASTARRI_MULTIPLY_PRODUCTS_H
 
@@ -92,55 +92,57 @@ template <class Sum>
 Both(Sum, Sum) -> Both<Sum>;
 
 // --- Kinds ------------------------------------------------------------------------------------------------
+// What becomes of a sum of products: it is the result, or is added to what the accumulator holds, or subtracted from
+// it. with(acc, sum) is the result, of a lane or of a register of lanes.
+
+struct Fresh {};
+
+struct Added {
+  template <class V>
+  static V with(V acc, V sum) {
+    return static_cast<V>(acc + sum);
+  }
+};
+
+struct Subtracted {
+  template <class V>
+  static V with(V acc, V sum) {
+    return static_cast<V>(acc - sum);
+  }
+};
 
 // The whole containers of an accumulator: what they hold above the lane's own bits is cut from the sum.
 template <class R>
 using whole = Layout<std::make_unsigned_t<typename R::container>, 8 * sizeof(typename R::container), R::count>;
 
-struct Fresh {
-  template <class Sum>
-  Sum operator()(int, Sum sum) const {
+// Lane i of the result. A fresh result has no accumulator to read.
+template <class R, class Kind, class Sum>
+inline Sum accumulated(const void* acc, int i, Sum sum) {
+  if constexpr (std::is_same_v<Kind, Fresh>)
     return sum;
-  }
-};
-
-template <class R>
-struct Added {
-  Read<whole<R>> acc;
-  template <class Sum>
-  Sum operator()(int i, Sum sum) const {
-    return static_cast<Sum>(acc[i] + sum);
-  }
-};
-
-template <class R>
-struct Subtracted {
-  Read<whole<R>> acc;
-  template <class Sum>
-  Sum operator()(int i, Sum sum) const {
-    return static_cast<Sum>(acc[i] - sum);
-  }
-};
+  else
+    return Kind::with(static_cast<Sum>(Read<whole<R>>(acc)[i]), sum);
+}
 
 // --- The loop ---------------------------------------------------------------------------------------------
 
-template <class Out, class Kind, class Sum>
-inline void put(const Out& out, const Kind& kind, int i, Sum sum) {
-  out.put(i, kind(i, sum));
+template <class R, class Kind, class Out, class Sum>
+inline void put(const Out& out, const void* acc, int i, Sum sum) {
+  out.put(i, accumulated<R, Kind>(acc, i, sum));
 }
-template <class Out, class Kind, class Sum>
-inline void put(const Out& out, const Kind& kind, int k, Both<Sum> sums) {
-  const auto even = kind(2 * k, sums.even);
-  const auto odd = kind(2 * k + 1, sums.odd);
+template <class R, class Kind, class Out, class Sum>
+inline void put(const Out& out, const void* acc, int k, Both<Sum> sums) {
+  const auto even = accumulated<R, Kind>(acc, 2 * k, sums.even);
+  const auto odd = accumulated<R, Kind>(acc, 2 * k + 1, sums.odd);
   out.put(2 * k, even);
   out.put(2 * k + 1, odd);
 }
 
 // Lane i (lanes 2i and 2i + 1) of the result from lanes i of the operands, for i = 0 .. Steps - 1.
-template <int Steps, class Out, class Kind, class Rule, class... Operands>
-inline void multiply(const Out& out, const Kind& kind, Rule rule, const Operands&... operands) {
+template <class R, class Kind, int Steps, class Out, class Rule, class... Operands>
+inline void multiply(const void* acc, const Out& out, Rule rule, const Operands&... operands) {
   KASTARRI_LANES_INDEPENDENT
-  for (int i = 0; i < Steps; ++i) put(out, kind, i, rule(operands[i]...));
+  for (int i = 0; i < Steps; ++i) put<R, Kind>(out, acc, i, rule(operands[i]...));
 }
 
 template <class>
@@ -149,34 +151,30 @@ using image = const void*;
 template <class L, class... Ls>
 constexpr int lanes_of = L::count;
 
-// The semantic functions: operands of layouts Ls, the accumulator before them, the result last.
-template <class R, class... Ls>
-struct Multiply {
-  template <class Rule, class Out>
-  static inline void fresh(Rule rule, image<Ls>... operands, Out r) {
-    multiply<lanes_of<Ls...>>(result<R>(r), Fresh{}, rule, Read<Ls>(operands)...);
-  }
-  template <class Rule, class Out>
-  static inline void add(Rule rule, const void* acc, image<Ls>... operands, Out r) {
-    multiply<lanes_of<Ls...>>(result<R>(r), Added<R>{Read<whole<R>>(acc)}, rule, Read<Ls>(operands)...);
-  }
-  template <class Rule, class Out>
-  static inline void subtract(Rule rule, const void* acc, image<Ls>... operands, Out r) {
-    multiply<lanes_of<Ls...>>(result<R>(r), Subtracted<R>{Read<whole<R>>(acc)}, rule, Read<Ls>(operands)...);
+// Operands of layouts Ls.
+template <const auto& rule, class R, class Kind, class... Ls>
+struct ByLane {
+  template <class Out>
+  static inline void run(const void* acc, image<Ls>... operands, Out r) {
+    multiply<R, Kind, lanes_of<Ls...>>(acc, result<R>(r), rule, Read<Ls>(operands)...);
   }
 };
 
 }  // namespace
 
-// KERNEL(OP, kind, result layout, rule, operand layouts ...). A fresh sum that cannot pass the lane's top bit
-// is written as a whole container, which it fills in canonical form by itself.
-#define KERNEL_OF_PRODUCTS(OP, KIND, R, RULE, ...)           \
-  template <class... Units>                                  \
-  static inline void KASTARRI_SEMANTIC(OP)(Units... units) { \
-    Multiply<R, __VA_ARGS__>::KIND(RULE, units...);          \
+// The semantic function of a kind: operands first, before them the accumulator if the kind has one, the result last.
+// The last arguments are the function that it hands them to, which always takes an accumulator.
+#define KERNEL_OF_KIND(OP, KIND, ...)                                               \
+  template <class... Units>                                                         \
+  [[gnu::always_inline]] static inline void KASTARRI_SEMANTIC(OP)(Units... units) { \
+    if constexpr (std::is_same_v<KIND, Fresh>)                                      \
+      __VA_ARGS__(nullptr, units...);                                               \
+    else                                                                            \
+      __VA_ARGS__(units...);                                                        \
   }
-#define KERNEL_fresh(OP, ...) KERNEL_OF_PRODUCTS(OP, fresh, __VA_ARGS__)
-#define KERNEL_add(OP, ...) KERNEL_OF_PRODUCTS(OP, add, __VA_ARGS__)
-#define KERNEL_subtract(OP, ...) KERNEL_OF_PRODUCTS(OP, subtract, __VA_ARGS__)
+
+// KERNEL(OP, by_lane, kind, result layout, rule, operand layouts ...). A fresh sum that cannot pass the lane's top bit
+// is written as a whole container, which it fills in canonical form by itself.
+#define KERNEL_by_lane(OP, KIND, R, RULE, ...) KERNEL_OF_KIND(OP, KIND, ByLane<RULE, R, KIND, __VA_ARGS__>::run)
 
 #endif

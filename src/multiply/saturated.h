@@ -7,7 +7,7 @@
 
 #include "frame/arithmetic.h"
 #include "frame/lanes.h"
-#include "frame/packs.h"
+#include "frame/registers.h"
 
 namespace {
 
@@ -26,18 +26,14 @@ struct Saturated {
   }
 
  private:
-  using Bytes = Vector<std::uint8_t>;
-
-  static Register words(const std::int32_t* from, int k) {
-    return reinterpret_cast<Register>(load_register<word>(from, k));
-  }
   template <class Packed>
-  static Bytes collected(const std::int32_t* from, Packed lane_type) {
+  static Register collected(const std::int32_t* from, Packed lane_type) {
+    const auto words = [from](int k) { return in_bits<Register>(load_register<word>(from, k)); };
     if constexpr (sizeof(Packed) == 2) {
-      return bits_of(in_order<std::uint64_t>(bits_of(pack_words(words(from, 0), words(from, 1), lane_type))));
+      return in_order<std::uint64_t>(pack_words(words(0), words(1), lane_type));
     } else {
-      const auto halves = [from](int k) { return pack_words(words(from, k), words(from, k + 1), std::int16_t{}); };
-      return bits_of(in_order<word>(bits_of(pack_halves(halves(0), halves(2), lane_type))));
+      const auto halves = [words](int k) { return pack_words(words(k), words(k + 1), std::int16_t{}); };
+      return in_order<word>(pack_halves(halves(0), halves(2), lane_type));
     }
   }
 };

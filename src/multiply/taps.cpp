@@ -3,11 +3,9 @@
 
 #include "multiply/stamp.h"
 
-// KERNEL(OP, kind_taps, result layout, number of operands, their layout, coefficients)
-#define KERNEL_TAPS(OP, KIND, R, N, L, C) \
-  KERNEL_OF_WORDS(OP, (Taps<R, L, C, std::make_index_sequence<N>>::KIND(units...)))
-#define KERNEL_fresh_taps(OP, ...) KERNEL_TAPS(OP, fresh, __VA_ARGS__)
-#define KERNEL_add_taps(OP, ...) KERNEL_TAPS(OP, add, __VA_ARGS__)
+// KERNEL(OP, taps, kind, result layout, number of operands, their layout, coefficients)
+#define KERNEL_taps(OP, KIND, R, N, L, C) \
+  KERNEL_OF_KIND(OP, KIND, Taps<R, KIND, L, C, std::make_index_sequence<N>>::run)
 
 #include "multiply/taps.def"
 

@@ -6,67 +6,47 @@
 
 #include "frame/registers.h"
 #include "multiply/products.h"
+#include "multiply/register_products.h"
 
 namespace {
 
-using Bytes = Vector<std::uint8_t>;
-
-// The words of half Half of every block of low, and those of high, as pairs.
+// Half Half of every block of low, and that of high, as pairs: low0 high0 low1 high1.
 template <int Half>
-inline Vector<std::uint64_t> pairs_of_words(Vector<word> low, Vector<std::int32_t> high) {
-  return reinterpret_cast<Vector<std::uint64_t>>(interleaved<Half, word>(bits_of(low), bits_of(high)));
+inline LongWords pairs_of_words(Words low, Integers high) {
+  return in_bits<LongWords>(interleaved<Half, word>(low, in_bits<Words>(high)));
 }
 
-// A sum 2^Scale times as large in the canonical form of a lane of R.
+// Some sums come 2^Scale times as large, for that is how they are made soonest: an 8-bit lane in the upper byte of 16
+// bits is 2^8 times itself, and so are its products. This brings a sum down and extends it to a lane of R. A 24-bit sum
+// at scale 8 lies at the top of its word already, and one shift does both.
 template <class R, int Scale>
-inline Vector<word> in_lane(Vector<word> sum) {
+inline Words in_lane(Words sum) {
   constexpr int above = 32 - R::bits;
   if constexpr (above == 0 || above == Scale)
-    return reinterpret_cast<Vector<word>>(reinterpret_cast<Vector<std::int32_t>>(sum) >> Scale);
+    return in_bits<Words>(in_bits<Integers>(sum) >> Scale);
   else
     return extended_from_24(sum);
 }
 template <class R, int>
-inline Vector<std::uint64_t> in_lane(Vector<std::uint64_t> sum) {
+inline LongWords in_lane(LongWords sum) {
   if constexpr (R::bits == 64) return sum;
   return extended_from_48(sum);
 }
 
-// What a sum is before it is cut to its lane: the sum alone, added to the accumulator's lane, subtracted from it.
-template <int Scale, class V>
-inline V scaled_lanes(const void* acc, int k) {
-  return reinterpret_cast<V>(load_register<std::uint8_t>(acc, k)) << Scale;
-}
-struct Over {
-  template <int, class V>
-  static V with(V sum, const void*, int) {
-    return sum;
-  }
-};
-struct Onto {
-  template <int Scale, class V>
-  static V with(V sum, const void* acc, int k) {
-    return scaled_lanes<Scale, V>(acc, k) + sum;
-  }
-};
-struct From {
-  template <int Scale, class V>
-  static V with(V sum, const void* acc, int k) {
-    return scaled_lanes<Scale, V>(acc, k) - sum;
-  }
-};
-
 // Registers first .. first + 3 of the result from sum(quarter), quarter = 0 .. 3.
-template <class R, class How, int Scale, class Sum, std::size_t... Quarter>
+template <class R, class Kind, int Scale, class Sum, std::size_t... Quarter>
 inline void put_quarters(const Sum& sum, int first, const void* acc, void* r, std::index_sequence<Quarter...>) {
   const auto put = [&](int k, auto v) {
-    store_register(r, k, in_lane<R, Scale>(How::template with<Scale>(v, acc, k)));
+    using V = decltype(v);
+    if constexpr (!std::is_same_v<Kind, Fresh>)
+      v = Kind::with(in_bits<V>(load_register<std::uint8_t>(acc, k)) << Scale, v);
+    store_register(r, k, in_lane<R, Scale>(v));
   };
   (put(first + static_cast<int>(Quarter), sum(std::integral_constant<int, Quarter>())), ...);
 }
-template <class R, class How, int Scale, class Sum>
+template <class R, class Kind, int Scale, class Sum>
 inline void put_sums(const Sum& sum, int first, const void* acc, void* r) {
-  put_quarters<R, How, Scale>(sum, first, acc, r, std::make_index_sequence<4>());
+  put_quarters<R, Kind, Scale>(sum, first, acc, r, std::make_index_sequence<4>());
 }
 
 }  // namespace

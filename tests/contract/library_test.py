@@ -109,6 +109,12 @@ class Headers(unittest.TestCase):
         stale = [path for path, text in generate_headers.outputs().items() if read(path) != text]
         self.assertEqual(stale, [], "run `make headers`")
 
+    def test_rules_tell_what_becomes_of_lanes_under_a_predicate(self):
+        predicated = [row for _, _, rows in generate_headers.all_rows().values() for row in rows if "_T" in row.shape]
+        self.assertGreater(len(predicated), 250)
+        silent = [row.name for row in predicated if "predicate bit" not in generate_headers.rule_text([row])]
+        self.assertEqual(silent, [])
+
     def test_each_header_compiles_alone(self):
         headers = sorted(glob.glob(os.path.join(ROOT, "include", "kastarri", "*.h")))
         for compiler in COMPILERS:

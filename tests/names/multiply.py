@@ -1,4 +1,4 @@
-"""Multiplies and packs: what their names say.
+"""Multiplies, widened sums and packs: what their names say.
 
 A multiply's name is read letter by letter:
 
@@ -31,7 +31,7 @@ NAME = re.compile(
     r"|(?P<complex>NX16|N_2X32)(?P<conjugate>[CJ])(?P<part>_[01]|)"
     r")")
 
-FRESH, KINDS = "fresh", {"": "fresh", "A": "add", "S": "subtract"}
+FRESH, KINDS = "Fresh", {"": "Fresh", "A": "Added", "S": "Subtracted"}
 COEFFICIENTS = "const qv_int32pr&"
 
 
@@ -64,8 +64,8 @@ class Multiply:
         fits = self.kind == FRESH and largest < 2 ** (wide - 1)
         return [own, container] if fits else [own]
 
-    def kernels(self, results, *columns, form=""):
-        return [(self.kind + form, result, *columns) for result in results]
+    def kernels(self, results, *columns, form="by_lane"):
+        return [(form, self.kind, result, *columns) for result in results]
 
 
 def limits(sign, bits):
@@ -116,7 +116,7 @@ def products(m, twins):
     results = m.results(wide, layout.lanes, layout.bits, layout.bits)
     # Single products of 8-bit and 16-bit lanes have instructions of their own.
     vectors = rule == "SINGLE" and m.lanes in ("2NX8", "NX16")
-    kernels = m.kernels(results, *([] if vectors else [rule]), *columns, form="_vectors" if vectors else "")
+    kernels = m.kernels(results, *([] if vectors else [rule]), *columns, form="by_register" if vectors else "by_lane")
     return Expected(*m.result(wide_type(wide, layout.lanes), operands, shape), kernels)
 
 
@@ -124,7 +124,7 @@ def sign_transfer(m):
     """SGN: b where a is positive, -b where a is negative, 0 where it is 0, as narrow as they are. SGNS saturates -b."""
     layout = LAYOUTS[m.lanes]
     code, operand = layout.code("i"), const(layout.types[""])
-    return Expected(prototype(layout.types[""], operand, operand), "ab_r", [(FRESH, code, m.transfer, code, code)])
+    return Expected(prototype(layout.types[""], operand, operand), "ab_r", [("ab", code, m.transfer, code, code)])
 
 
 def narrow(m):
@@ -133,7 +133,7 @@ def narrow(m):
     layout = LAYOUTS[m.packed]
     register_type, code = layout.types[m.packed_types], layout.code("i")
     operands = [const(register_type)] * 2
-    kernels = [(m.kind, code, f"PACK{m.pack}", code, code)]
+    kernels = [("by_lane", m.kind, code, f"PACK{m.pack}", code, code)]
     if m.kind == FRESH:
         return Expected(prototype(register_type, *operands), "ab_r", kernels)
     if m.predicated:
@@ -148,7 +148,7 @@ def halves_times_words(m):
     half = "std::uint16_t" if m.first == "u" else "std::int16_t"
     types = [const(halves.types["U" if m.first == "u" else ""]), const(words.types["U" if m.second == "u" else ""])]
     return Expected(*m.result("qv_vecN_2x64w", types, "ab"),
-                    [(m.kind, "i64x16", f"{place}<{half}>", "u32x16", words.code(m.second))])
+                    [("by_lane", m.kind, "i64x16", f"{place}<{half}>", "u32x16", words.code(m.second))])
 
 
 def bytes_times_halves(m):
@@ -170,7 +170,7 @@ def channels(m):
     types = [const(LAYOUTS["NX16"].types["U" if m.first == "u" else ""])] * vectors
     rule = "CHANNEL" if m.count == 1 else "CHANNEL_PAIR"
     kernels = m.kernels(m.results(24, 64, 16, 8), rule, str(vectors), LAYOUTS["NX16"].code(m.first),
-                        f"{'u' if m.second == 'u' else 's'}8", form="_channels")
+                        f"{'u' if m.second == 'u' else 's'}8", form="channels")
     return Expected(*m.result("qv_vec2Nx24", [*types, COEFFICIENTS], {2: "abs", 4: "abcds"}[vectors]), kernels)
 
 
@@ -185,9 +185,9 @@ def coefficients(m):
     wide = ACCUMULATORS[layout.bits]
     results = m.results(wide, layout.lanes, layout.bits, int(m.coefficient))
     if m.window:
-        kernels = m.kernels(results, layout.code(m.first), coefficient, form="_window")
+        kernels = m.kernels(results, layout.code(m.first), coefficient, form="window")
     else:
-        kernels = m.kernels(results, str(m.count), layout.code(m.first), coefficient, form="_taps")
+        kernels = m.kernels(results, str(m.count), layout.code(m.first), coefficient, form="taps")
     types = [const(layout.types["U" if m.signs else ""])] * vectors + [COEFFICIENTS] * words
     return Expected(*m.result(wide_type(wide, layout.lanes), types, "abcd"[:vectors] + "stuv"[:words]), kernels)
 
@@ -202,6 +202,24 @@ def complex_product(m):
     number = f"u{2 * layout.bits}x{layout.lanes // 2}"
     kernels = m.kernels(m.results(wide, layout.lanes, layout.bits, layout.bits), rule, number, number)
     return Expected(*m.result(wide_type(wide, layout.lanes), [const(layout.types[""])] * 2, "ab"), kernels)
+
+
+def widened(name, twins):
+    """ADDW, SUBW: lanes added or subtracted, both unsigned with U, in the accumulator's lanes. A and S as of products."""
+    del twins
+    match = re.fullmatch(r"(ADD|SUB)W(U?)([AS]?)(2NX8|NX16)", name)
+    if not match:
+        raise Unknown(name)
+    operation, unsigned, kind, lanes = match.groups()
+    layout, kind = LAYOUTS[lanes], KINDS[kind]
+    wide, code = ACCUMULATORS[layout.bits], layout.code("u" if unsigned else "i")
+    # A fresh sum is in range and fills the whole container of a lane.
+    result = f"i{(32 if wide == 24 else 64) if kind == FRESH else wide}x{layout.lanes}"
+    register_type, operands = wide_type(wide, layout.lanes), [const(layout.types[unsigned])] * 2
+    kernels = [("by_lane", kind, result, {"ADD": "SUM", "SUB": "DIFFERENCE"}[operation], code, code)]
+    if kind == FRESH:
+        return Expected(prototype(register_type, *operands), "ab_w", kernels)
+    return Expected(prototype("void", f"{register_type}&", *operands), "acc_ab", kernels)
 
 
 PACK = re.compile(r"PACK(?P<how>L|M|H|Q|P|VRNR|VR|VNR|V)(?P<unsigned>U?)(?P<wide>2NX24|NX48|N_2X64W|N_2X96)(?P<parity>_[01]|)")
@@ -225,7 +243,7 @@ def pack(name, twins):
     result = layout.types[unsigned]
     if how in FIXED:
         if parity:
-            kernel = ("fixed", layout.code("i"), f"{FIXED[how]}8", f"Every2nd<{parity[1]}>")
+            kernel = ("fixed", layout.code("i"), f"{FIXED[how]}8", f"EveryOther<{parity[1]}>")
         else:
             kernel = ("fixed", layout.code("i"), FIXED[how], f"All<{containers}>")
         return Expected(prototype(result, const(source)), "w_r", [kernel])
@@ -245,11 +263,11 @@ def shifted(form, code, wide, rounding, parity, *counts):
     if wide == "NX48" and not parity:
         return f"{form}48", rounding
     if wide == "2NX24" and parity and form == "shift":
-        return "shift_alternate24", code, rounding, parity[1]
+        return "shift_every_other24", code, rounding, parity[1]
     if wide == "2NX24":
-        return form, code, "Words24", rounding, f"Alternate24<{parity[1]}>" if parity else "All24", "23", *counts
-    lanes = f"Alternate48<{parity[1]}>" if parity else "AllLanes<64>"
+        return form, code, "Words24", rounding, f"EveryOther24<{parity[1]}>" if parity else "All24", "23", *counts
+    lanes = f"EveryOther48<{parity[1]}>" if parity else "AllLanes<64>"
     return form, code, "WordsOfPairs", rounding, lanes, "32", *counts
 
 
-RULES = [multiply, pack]
+RULES = [multiply, widened, pack]

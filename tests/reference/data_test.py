@@ -73,6 +73,8 @@ BY_LANE = {
     "MULANX16": lambda acc, a, b: signed(acc + a * b, 48),
     "MULS2NX8": lambda acc, a, b: signed(acc - a * b, 24),
     "MULP2NX8": lambda a, b, c, d: signed(a * b + c * d, 24),
+    "ADDWNX16": lambda a, b: a + b,
+    "SUBWUANX16": lambda acc, a, b: signed(acc + a - b, 48),
     "SQRPDNX16": lambda a, b: a * a - b * b,
     "ADDSNX16T": lambda r, a, b, p: clamped(a + b, 16) if p else r,
     "SUBNX16UT": lambda r, a, b, p: low(a - b, 16) if p else r,
@@ -90,6 +92,9 @@ BY_OPERANDS = {
     "PACKLNX48": lambda acc: [signed(x, 16) for x in acc],
     "RADDNX16": lambda a: [4 * sum(a)],
     "RADDSNX16": lambda a: [clamped(4 * sum(a), 16)],
+    "RMAXNX16": lambda a: [max(a)],
+    "RMINUNX16T": lambda a, p: [min([x for x, bit in zip(a, p) if bit], default=65535)],
+    "RXORANX16": lambda acc, a: acc,  # every lane is there four times
     "LTRN": lambda n: [int(i < n[0]) for i in range(8)],
     "MULQ2N8XR8": lambda a, b, c, d, s: [
         signed(sum(signed(s[0] >> 8 * (3 - k), 8) * x for k, x in enumerate(lanes)), 24) for lanes in zip(a, b, c, d)],

@@ -74,7 +74,7 @@ def page_data(examples, version):
     all_choices = choices.read_choices()
     found = entries.read_entries(all_choices)
     rows = [entry_data(entry, examples, text) for entry in found]
-    tables = {text(table): entries.about_table(table) for table in dict.fromkeys(entry.row.table for entry in found)}
+    tables = {text(table): generate_headers.about_table(table) for table in dict.fromkeys(entry.row.table for entry in found)}
     return {"version": version, "prefix": generate_headers.PREFIX, "families": list(generate_headers.FAMILIES.items()),
             "choices": [choice.text for choice in all_choices], "tables": tables, "texts": text.all(), "entries": rows}
 

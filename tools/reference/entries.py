@@ -1,10 +1,9 @@
 """What the reference says of each intrinsic, from its row: nothing here knows an intrinsic by name."""
 
-import os
 import re
 
 import generate_headers
-from generate_headers import PREFIX, ROOT
+from generate_headers import PREFIX
 
 # Host types: bits, and how they are shown.
 HOST_TYPES = {
@@ -104,14 +103,6 @@ def facts(texts):
     return [name for name, pattern in FACTS.items() if re.search(pattern, joined)]
 
 
-def about_table(table):
-    """The comment at the head of a table, without the kinds of row that it lists."""
-    with open(os.path.join(ROOT, "src", table), encoding="utf-8") as file:
-        head = re.match(r"(//.*\n)*", file.read())[0]
-    lines = [line[3:] for line in head.splitlines() if not line.startswith("//  ")]
-    return " ".join(lines)
-
-
 class Entry:
     def __init__(self, family, row, types, rules, choices):
         self.row, self.family = row, family
@@ -128,7 +119,7 @@ class Entry:
     @property
     def keeps_lanes(self):
         """Whether a predicated form leaves the lanes of its destination that are not enabled."""
-        return self.predicated and any(o.role == "written" for o in self.operands) and self.alignment is None
+        return generate_headers.keeps_lanes(self.row)
 
     @property
     def lane_bits(self):

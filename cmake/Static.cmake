@@ -31,12 +31,12 @@ endforeach()
 
 # A kernel is compiled for the same machine: without, nothing may be inlined into it.
 set(KASTARRI_STATIC_FLAGS ${KASTARRI_FLAGS_${KASTARRI_STATIC_TARGET}} -mfpmath=sse)
-foreach(flag IN LISTS KASTARRI_STATIC_FLAGS)
-  if(flag MATCHES "^-m(move|store)-max=")
-    set(flag $<$<CXX_COMPILER_ID:GNU>:${flag}>)
-  endif()
-  target_compile_options(kastarri_static INTERFACE ${flag})
-endforeach()
+# Those that every compiler has; only g++ knows how wide copies may be.
+set(KASTARRI_STATIC_COMMON_FLAGS ${KASTARRI_STATIC_FLAGS})
+list(FILTER KASTARRI_STATIC_COMMON_FLAGS EXCLUDE REGEX "^-m(move|store)-max=")
+set(gnu_flags ${KASTARRI_STATIC_FLAGS})
+list(REMOVE_ITEM gnu_flags ${KASTARRI_STATIC_COMMON_FLAGS})
+target_compile_options(kastarri_static INTERFACE ${KASTARRI_STATIC_COMMON_FLAGS} "$<$<CXX_COMPILER_ID:GNU>:${gnu_flags}>")
 
 if(CMAKE_CXX_COMPILER_ID STREQUAL GNU)
   # Realigning the stack is of the options that a function and what is inlined into it have to share.

@@ -33,6 +33,7 @@ FAMILIES = {
     "float": "Floating point",
 }
 CONVERSION_TABLES = ["frame/conversions.def", "float/conversions.def"]
+MOVES_OF_BITS = "frame/conversions.def"  # the other one has numbers rounded, with flags
 
 # What a text that reads tables begins with.
 READER = '#include "families.h"\n'
@@ -61,17 +62,27 @@ def unquote(text):
     return "".join(re.findall(r'"((?:[^"\\]|\\.)*)"', text)).replace('\\"', '"')
 
 
+# What a register is made from: its C++ type, the name of the conversion, and whether bits are all that it moves.
+Source = collections.namedtuple("Source", "type conversion from_bits")
+
+
 class RegisterType:
     def __init__(self, name, unit, units, layout, meaning):
         self.name, self.units, self.layout = name, int(units), layout
         self.unit, self.unit_bits = UNITS[unit]
         self.meaning = unquote(meaning)
-        self.sources = []  # (C++ type of the source, name of the conversion), in the order of the rows
+        self.sources = []  # Source, in the order of the rows
         self.targets = []
 
     @property
     def cls(self):
         return f"{self.name}_space::{self.name}_"
+
+    @property
+    def replicated(self):
+        """The arguments of kastarri::replicate: bits of a lane, of its share of the register, and whether it is signed."""
+        kind, bits, lanes = re.match(r"([iufb])(\d+)x(\d+)$", self.layout).groups()
+        return f"{bits}, {self.units * self.unit_bits // int(lanes)}, {'true' if kind == 'i' else 'false'}"
 
     @property
     def shape(self):
@@ -97,22 +108,26 @@ def read_types():
     found = records('#define TYPE(T, UNIT, UNITS, LAYOUT, ...) @type{T@,UNIT@,UNITS@,LAYOUT@,__VA_ARGS__}@\n'
                     '#include "frame/types.def"\n')
     types = {fields[0]: RegisterType(*fields) for _, fields in found}
-    kinds = records('#define DOC(TEXT)\n'
+    kinds = records('#define DOC(TEXT)\n#define BITS(...) @bits{__VA_ARGS__}@\n'
                     '#define REGISTER(FROM, TO) @register{FROM@,TO}@\n'
                     '#define HOST(NAME, TYPE, TO) @host{NAME@,TYPE@,TO}@\n'
                     '#define HOST_BOTH(NAME, TYPE, TO) @both{NAME@,TYPE@,TO}@\n'
                     '#define HOST_INTS(TO) ' + " ".join(
                         f"HOST({n}, {t}, TO)" for n, t in (
                             ("int8", "signed char"), ("uint8", "unsigned char"), ("int16", "short"),
-                            ("uint16", "unsigned short"), ("int32", "int"), ("uint32", "unsigned int"))) + "\n"                    + "".join(f'#include "{table}"\n' for table in CONVERSION_TABLES))
+                            ("uint16", "unsigned short"), ("int32", "int"), ("uint32", "unsigned int"))) + "\n"
+                    + "".join(f'BITS({int(table == MOVES_OF_BITS)})\n#include "{table}"\n' for table in CONVERSION_TABLES))
+    from_bits = False
     for kind, fields in kinds:
-        if kind == "register":
+        if kind == "bits":
+            from_bits = fields[0] == "1"
+        elif kind == "register":
             source, target = types[fields[0]], types[fields[1]]
-            target.sources.append((f"const {source.cls}&", f"{source.name}_rtor_{target.name}"))
+            target.sources.append(Source(f"const {source.cls}&", f"{source.name}_rtor_{target.name}", False))
             source.targets.append((target.cls, f"{source.name}_rtor_{target.name}"))
         else:
             name, host, target = fields[0], fields[1], types[fields[2]]
-            target.sources.append((host, f"{name}_rtor_{target.name}"))
+            target.sources.append(Source(host, f"{name}_rtor_{target.name}", from_bits))
             if kind == "both":
                 target.targets.append((host, f"{target.name}_rtor_{name}"))
     return types
@@ -152,8 +167,8 @@ def types_header(types):
         size = t.units * t.unit_bits // 8
         body += [f"/// {t.meaning}: {t.shape} ({size} {'byte' if size == 1 else 'bytes'}).", f"namespace {t.name}_space {{",
                  f"class {t.name}_ {{", " public:", f"  {t.name}_() = default;"]
-        body += [f"  {'explicit ' * source.endswith('&')}inline {t.name}_({source} from);" for source, _ in t.sources]
-        body += [f"  inline {t.name}_& operator=({source} from);" for source, _ in t.sources]
+        body += [f"  {'explicit ' * source.endswith('&')}inline {t.name}_({source} from);" for source, *_ in t.sources]
+        body += [f"  inline {t.name}_& operator=({source} from);" for source, *_ in t.sources]
         body += [f"  inline operator {target}() const;" for target, _ in t.targets]
         body += ["", f"  {t.unit} _[{t.units}];", "};", "}", ""]
     return body
@@ -179,13 +194,19 @@ def debugger_table(types):
 
 
 def conversion_bodies(types):
-    """The inline members of the types: each calls the exported conversion."""
+    """The inline members of the types. Each calls the exported conversion, but for those that give every lane the
+    bits of a host scalar: a compiler can fold and hoist them."""
     body = ["/* Constructors, assignments and conversion operators of the register types. */", ""]
     for t in types.values():
-        for source, name in t.sources:
-            call = f"*this = {symbol('rk_zra32_' + name)}(from);"
-            body += [f"inline {t.cls}::{t.name}_({source} from) {{ {call} }}",
-                     f"inline {t.cls}& {t.cls}::operator=({source} from) {{ return {call} }}"]
+        for source in t.sources:
+            if source.from_bits:
+                fill = f"kastarri::replicate<{t.replicated}>(_, from);"
+                body += [f"KASTARRI_ALWAYS_INLINE {t.cls}::{t.name}_({source.type} from) {{ {fill} }}",
+                         f"KASTARRI_ALWAYS_INLINE {t.cls}& {t.cls}::operator=({source.type} from) {{ {fill} return *this; }}"]
+                continue
+            call = f"*this = {symbol('rk_zra32_' + source.conversion)}(from);"
+            body += [f"inline {t.cls}::{t.name}_({source.type} from) {{ {call} }}",
+                     f"inline {t.cls}& {t.cls}::operator=({source.type} from) {{ return {call} }}"]
         for target, name in t.targets:
             body.append(f"inline {t.cls}::operator {target}() const {{ return {symbol('rk_zra32_' + name)}(*this); }}")
     return body
@@ -312,9 +333,11 @@ def outputs():
                                    "src/frame/types.def", lanes_header(types))
     for name, (title, tables, rows) in families.items():
         body = family_body(rows)
+        includes = ["library", "types"]
         if name == "conversions":
             body += [""] + conversion_bodies(types)
-        headers[name] = header_text(name, title, ", ".join("src/" + t for t in tables), body, ["library", "types"])
+            includes += ["replicate"]
+        headers[name] = header_text(name, title, ", ".join("src/" + t for t in tables), body, includes)
     short = [(t, PREFIX + t) for t in types]
     short += [(short_name(r[0]), symbol(r[0])) for _, _, rows in families.values() for r in rows]
     headers["names"] = header_text(

@@ -4,6 +4,7 @@ Run as: library_test.py LIBRARY OBJECT... (the library's object files).
 """
 
 import glob
+import itertools
 import os
 import re
 import subprocess
@@ -170,6 +171,24 @@ class Headers(unittest.TestCase):
                 self.compile(compiler, "-x", "c++", "-", text=program)
 
 
+class Constants(unittest.TestCase):
+    def test_registers_made_of_host_scalars_are_those_of_the_exported_conversions(self):
+        with open("/proc/cpuinfo", encoding="utf-8") as file:
+            features = re.search(r"^flags\s*:(.*)$", file.read(), re.M)[1].split()
+        sets = [(), ("sse2",), ("avx2",), ("avx512f", "avx512bw")]
+        with tempfile.TemporaryDirectory() as directory:
+            binary = os.path.join(directory, "constants")
+            for compiler, flags, level in itertools.product(COMPILERS, sets, ("-O0", "-O3")):
+                if not set(flags) <= set(features):
+                    continue
+                with self.subTest(compiler=compiler, flags=flags, level=level):
+                    fpmath = ["-mfpmath=sse"] if flags else []
+                    subprocess.run([compiler, *USER_FLAGS, level, *(f"-m{flag}" for flag in flags), *fpmath, "-Wno-conversion",
+                                    "-I", os.path.join(ROOT, "src"), os.path.join(ROOT, "tests", "contract", "constants.cpp"),
+                                    LIBRARY, "-o", binary, "-Wl,-rpath," + os.path.dirname(LIBRARY)], check=True)
+                    self.assertEqual(subprocess.run([binary], capture_output=True, text=True, check=False).stdout, "")
+
+
 class Documents(unittest.TestCase):
     def test_coverage_is_that_of_the_rows(self):
         check = subprocess.run([sys.executable, os.path.join(ROOT, "tools", "coverage.py"), "--check"], check=False)
@@ -199,6 +218,13 @@ class Documents(unittest.TestCase):
         program = re.search(r"```cpp\n(.*?)```", readme, re.S)[1]
         printed = re.search(r"It prints `(.*?)`", readme)[1]
         self.assertEqual(self.run_program(program), (printed + "\n", 0))
+
+    def test_every_line_that_compiles_a_kernel_has_the_flags_of_a_fast_one(self):
+        pages = [os.path.join(ROOT, "README.md"), *glob.glob(os.path.join(ROOT, "docs", "*.md"))]
+        lines = [line for page in pages for line in read(page).splitlines()
+                 if re.match(r"    (g|clang)\+\+ .*\.cpp", line) and "$(pkg-config" not in line]
+        self.assertGreaterEqual(len(lines), 2)
+        self.assertEqual([line for line in lines if not re.search(r" -msse2 -mfpmath=sse | -march=native ", line)], [])
 
     def test_the_programs_of_the_porting_page_print_what_it_says(self):
         page = read("docs", "porting.md")

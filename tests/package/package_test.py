@@ -80,6 +80,9 @@ class Installation(Directory):
         shutil.move(os.path.join(staging, "opt", "elsewhere"), cls.prefix)
         cls.libraries = os.path.join(cls.prefix, MULTIARCH)
 
+    def environment(self, directory=PKGCONFIG_DIRECTORIES[0]):
+        return dict(os.environ, PKG_CONFIG_PATH=os.path.join(self.prefix, directory))
+
     def configure(self, *arguments):
         return run("cmake", "-S", os.path.join(HERE, "consumer"), "-B", self.path("build"),
                    "-DCMAKE_BUILD_TYPE=Release", f"-DCMAKE_PREFIX_PATH={self.prefix}", *arguments)
@@ -140,15 +143,27 @@ class Installation(Directory):
 
     def test_pkg_config_has_all_that_a_compiler_needs(self):
         modules = {"kastarri": True, "kastarri-static": processor_runs_static()}
-        for module, directory in itertools.product(modules, PKGCONFIG_DIRECTORIES):
-            environment = dict(os.environ, PKG_CONFIG_PATH=os.path.join(self.prefix, directory))
-            with self.subTest(module=module, directory=directory):
+        for module, directory, compiler in itertools.product(modules, PKGCONFIG_DIRECTORIES, ("g++", "clang++")):
+            with self.subTest(module=module, directory=directory, compiler=compiler):
+                environment = self.environment(directory)
                 self.assertEqual(output("pkg-config", "--modversion", module, env=environment).strip(), VERSION)
                 # The shell takes apart what pkg-config prints, spaces in the prefix being quoted.
-                output("sh", "-c", f'eval "g++ -O2 {HERE}/consumer/main.cpp -o {self.path(module)} '
+                output("sh", "-c", f'eval "{compiler} -O2 {HERE}/consumer/main.cpp -o {self.path(module)} '
                        f'$(pkg-config --cflags --libs {module})"', env=environment)
                 if modules[module]:
                     self.check_answer(self.path(module), LD_LIBRARY_PATH=self.libraries)
+
+    def test_both_ways_compile_for_sse2_and_nothing_that_one_compiler_lacks(self):
+        self.configure("-DLINKAGE=shared", "-DCMAKE_EXPORT_COMPILE_COMMANDS=ON")
+        with open(self.path("build", "compile_commands.json"), encoding="utf-8") as commands:
+            flags = {"cmake": commands.read().split()}
+        for module in "kastarri", "kastarri-static":
+            flags[module] = output("pkg-config", "--cflags", module, env=self.environment()).split()
+        for name, given in flags.items():
+            with self.subTest(name=name):
+                self.assertIn("-mfpmath=sse", given)
+                self.assertTrue({"-msse2", "-mavx2", "-mavx512f"} & set(given))
+                self.assertEqual([flag for flag in given if "-max=" in flag], [])
 
     def test_headers_say_which_programs_they_are_for(self):
         compiled = run("g++", "-mx32", "-fsyntax-only", "-I", os.path.join(self.prefix, "include"), "-x", "c++", "-",

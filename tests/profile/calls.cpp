@@ -17,7 +17,8 @@
 
 namespace {
 
-const qv_vecNx16 ones = RK_CLAMPS(1, 7);  // called before main: CLAMPS and int32_rtor_qv_vecNx16, once each
+const qv_vecNx16 ones =
+    int32_rtor_qv_vecNx16(RK_CLAMPS(1, 7));  // called before main: CLAMPS and int32_rtor_qv_vecNx16, once each
 
 void add(int times) {
   alignas(64) qv_vecNx16 sum = ones;
@@ -33,7 +34,7 @@ void results() {
   ZRA_LVNX16_IP(loaded, &pointer, 64);
   qv_vecNx48 product = ZRA_MULNX16(loaded, ones);
   ZRA_MULANX16(product, loaded, loaded);
-  const qv_vecN_2xf32 floats = 1.5f;
+  const qv_vecN_2xf32 floats = float_rtor_qv_vecN_2xf32(1.5f);
   std::printf("%d %d %u %x %d\n", static_cast<int>(pointer - &ones), RK_CLAMPS(1000, 7), product._[62], floats._[15],
               errno);
 }

@@ -1,8 +1,8 @@
-# kastarri-port: the program, and what it knows beside the profiler's files, which it finds by their place relative to
-# its own.
+# kastarri-port: the program, and what it knows, which it finds by its place relative to its own. Neither depends on
+# the width, so packages of both widths may bring the same files.
 find_package(Python3 REQUIRED COMPONENTS Interpreter)
 
-file(RELATIVE_PATH KASTARRI_PORT_FILES ${CMAKE_INSTALL_FULL_BINDIR} ${CMAKE_INSTALL_FULL_LIBDIR}/kastarri)
+file(RELATIVE_PATH KASTARRI_PORT_FILES ${CMAKE_INSTALL_FULL_BINDIR} ${CMAKE_INSTALL_FULL_DATADIR}/kastarri)
 set(programs ${PROJECT_BINARY_DIR}/bin)
 cmake_path(ABSOLUTE_PATH KASTARRI_PORT_FILES BASE_DIRECTORY ${programs} NORMALIZE OUTPUT_VARIABLE files)
 file(MAKE_DIRECTORY ${files})
@@ -19,4 +19,4 @@ add_custom_command(OUTPUT ${files}/port.json
 add_custom_target(kastarri-port ALL DEPENDS ${files}/port.json)
 
 install(PROGRAMS ${programs}/kastarri-port DESTINATION ${CMAKE_INSTALL_BINDIR})
-install(FILES ${files}/port.json DESTINATION ${CMAKE_INSTALL_LIBDIR}/kastarri)
+install(FILES ${files}/port.json DESTINATION ${CMAKE_INSTALL_DATADIR}/kastarri)

@@ -4,7 +4,7 @@ find_package(Python3 REQUIRED COMPONENTS Interpreter)
 set(KASTARRI_REFERENCE_TOOLS ${PROJECT_SOURCE_DIR}/tools/reference)
 
 add_executable(kastarri_examples
-  ${KASTARRI_REFERENCE_TOOLS}/worked_examples.cpp ${KASTARRI_REFERENCE_TOOLS}/operands.cpp
+  ${KASTARRI_REFERENCE_TOOLS}/worked_examples.cpp ${KASTARRI_REFERENCE_TOOLS}/calls.cpp ${KASTARRI_REFERENCE_TOOLS}/operands.cpp
   ${PROJECT_SOURCE_DIR}/tests/support/registers.cpp)
 target_include_directories(kastarri_examples PRIVATE
   ${KASTARRI_REFERENCE_TOOLS} ${PROJECT_SOURCE_DIR}/tests ${PROJECT_SOURCE_DIR}/src)

@@ -1,4 +1,5 @@
-// Gather and scatter: elements at a base address plus a byte offset each, unsigned 32-bit, wrapping.
+// Gather and scatter: elements at a base address plus a byte offset each, wrapping. Offsets of 32 bits are signed,
+// those of 16 bits are not.
 #ifndef KASTARRI_MEMORY_GATHER_H
 #define KASTARRI_MEMORY_GATHER_H
 
@@ -10,14 +11,23 @@
 
 namespace {
 
+// What is added to the base for an offset, which may have no more bits than a word: -4 as a word is 2^32 - 4, which
+// compilers would make a distance of 64 bits without a sign and without a warning. Hence a type of its own.
+enum class Distance : std::uintptr_t {};
+
+inline Distance distance(word offset) {
+  return Distance(static_cast<std::uintptr_t>(static_cast<std::int32_t>(offset)));
+}
+
 template <class Unit>
-inline in_memory<Unit>& element(const void* base, word offset) {
-  return *reinterpret_cast<in_memory<Unit>*>(reinterpret_cast<std::uintptr_t>(base) + offset);
+inline in_memory<Unit>& element(const void* base, Distance from_base) {
+  return *reinterpret_cast<in_memory<Unit>*>(reinterpret_cast<std::uintptr_t>(base) +
+                                             static_cast<std::uintptr_t>(from_base));
 }
 
 // Which elements there are: all, or those that a predicate enables.
 struct EveryElement {
-  word at(word offset, int) const { return offset; }
+  Distance at(word offset, int) const { return distance(offset); }
 };
 
 // A disabled element is looked for in a word of the library's own: its offset is replaced by the distance from the base
@@ -26,19 +36,20 @@ struct EveryElement {
 class EnabledElements {
  public:
   EnabledElements(const void* base, word& nowhere, word predicate)
-      : away_(reinterpret_cast<std::uintptr_t>(&nowhere) - reinterpret_cast<std::uintptr_t>(base)),
+      : away_(Distance(reinterpret_cast<std::uintptr_t>(&nowhere) - reinterpret_cast<std::uintptr_t>(base))),
         predicate_(predicate) {
     asm("" : "+m"(nowhere));  // has to lie in memory: compilers do not see that it is read through another pointer
   }
 
-  // The offset of element i where its own is given.
-  word at(word offset, int i) const {
-    asm("" : "+r"(offset));  // in a register already, so that compilers choose by a conditional move, not a branch
-    return (predicate_ >> i & 1) != 0 ? offset : away_;
+  // The distance of element i where its offset is given.
+  Distance at(word offset, int i) const {
+    Distance own = distance(offset);
+    asm("" : "+r"(own));  // in a register already, so that compilers choose by a conditional move, not a branch
+    return (predicate_ >> i & 1) != 0 ? own : away_;
   }
 
  private:
-  word away_;
+  Distance away_;
   word predicate_;
 };
 
@@ -174,7 +185,7 @@ inline void scatter(void* base, const void* offsets, Which which, const void* da
 template <class O, std::size_t... I>
 inline void increment(void* base, const void* offsets, std::index_sequence<I...>) {
   InTurn<O> to(offsets);
-  (++element<typename O::container>(base, to.template lane<I>()), ...);
+  (++element<typename O::container>(base, distance(to.template lane<I>())), ...);
 }
 template <class O>
 inline void increment(void* base, const void* offsets) {

@@ -18,7 +18,9 @@ sys.path.insert(0, os.path.join(ROOT, "tools"))
 import generate_headers  # noqa: E402
 
 COMPILERS = ["g++", "clang++"]
-USER_FLAGS = ["-m32", "-std=c++11", "-Wall", "-Wextra", "-Wpedantic", "-Wconversion", "-Wshadow", "-Werror",
+with open(LIBRARY, "rb") as library_file:
+    BITS = 32 * library_file.read(5)[4]  # by the class of the ELF file
+USER_FLAGS = [f"-m{BITS}", "-std=c++11", "-Wall", "-Wextra", "-Wpedantic", "-Wconversion", "-Wshadow", "-Werror",
               "-I", os.path.join(ROOT, "include")]
 
 SYSTEM_HEADERS = """
@@ -76,8 +78,7 @@ class Library(unittest.TestCase):
         self.assertEqual(set(names) - declared(), set(), "exported but in no public header")
         self.assertEqual(declared() - set(names), set(), "in a public header but not exported")
 
-    def test_file_is_a_plain_32_bit_library(self):
-        self.assertIn("ELF32", output("readelf", "-h", LIBRARY))
+    def test_file_is_a_plain_library(self):
         dynamic = output("readelf", "-d", LIBRARY)
         major = re.search(r"KASTARRI_VERSION_MAJOR (\d+)", read("include", "kastarri", "library.h"))[1]
         self.assertEqual(re.findall(r"SONAME.*\[(.*)\]", dynamic), [f"libkastarri.so.{major}"])

@@ -42,6 +42,8 @@ constexpr bool filled = std::is_same_v<typename L::number, predicate_bit>
 static_assert(std::is_same_v<qv_vecNx16, qv_vecNx16_space::qv_vecNx16_>);
 static_assert(std::is_same_v<immediate, int>);
 
+#ifdef __i386__
+
 // Calls f(a, b, c, d) with a stack pointer that is `offset` bytes below a multiple of 64. The callee may
 // or may not pop its hidden result argument.
 __attribute__((noinline)) void call_with_stack(void* f, const void* a, const void* b, const void* c, const void* d,
@@ -83,5 +85,7 @@ TEST(frame, caller_stack_is_aligned_to_4_bytes_only) {
     }
   }
 }
+
+#endif
 
 }  // namespace

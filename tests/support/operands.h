@@ -12,6 +12,9 @@ namespace testing_support {
 
 inline constexpr unsigned seed = 20231;
 
+// A random number below n. The generator's own numbers have 64 bits on some hosts.
+inline unsigned below(std::mt19937& random, unsigned n) { return static_cast<unsigned>(random()) % n; }
+
 // The values of a lane at which rules change: small counts of either sign, bounds, powers of two and
 // their neighbours; every value of a lane of 8 bits or fewer.
 std::vector<Int> corners(const Format& format);

@@ -23,14 +23,17 @@ import generate_headers  # noqa: E402
 
 TARGETS = ["avx512", "avx2", "sse2"]
 BASELINE = "rk_zra32_qv_vecNx16_move"
+CYCLES = "3000 cycles"
 DIRECTED = ["zero", "up", "down"]
+MAGNITUDES = ["spread", "fresh"]
 SPECIAL = 10
 
 
 def run(build, target, pattern, repetitions, seconds):
     """Benchmark -> median time in nanoseconds, or None where the processor does not run the target."""
     environment = dict(os.environ, LD_LIBRARY_PATH=os.path.join(build, "tests", "only", target))
-    command = [os.path.join(build, "bench", "kastarri_bench"), f"--benchmark_filter=^{BASELINE}(/repeats:[0-9]+)?$|{pattern}",
+    command = [os.path.join(build, "bench", "kastarri_bench"), 
+               f"--benchmark_filter=^({BASELINE}|{CYCLES})(/repeats:[0-9]+)?$|{pattern}",
                f"--benchmark_repetitions={repetitions}", f"--benchmark_min_time={seconds}", "--benchmark_format=csv",
                "--benchmark_enable_random_interleaving=true"]
     result = subprocess.run(command, env=environment, capture_output=True, text=True, check=False)
@@ -69,7 +72,9 @@ def limit_of(name, target, limits):
 
 def processor():
     with open("/proc/cpuinfo", encoding="utf-8") as file:
-        return re.search(r"model name\s*: (.*)", file.read())[1]
+        text = file.read()
+    family, model, name = (re.search(rf"^{key}\s*: (.*)", text, re.M)[1] for key in ("cpu family", "model", "model name"))
+    return f"{name} (family {family}, model {model})"
 
 
 def cell(name, target, ratios, limits):
@@ -88,17 +93,17 @@ def table_lines(names, ratios, limits):
 
 
 def variant_lines(ratios, limits):
-    """The slowest of the directed rounding modes, and operands with special values, of what is timed so."""
+    """The slowest of the directed rounding modes, of operands of many magnitudes, and those with special values."""
     targets = [t for t in TARGETS if t in ratios]
     measured = next(iter(ratios.values()))
-    yield "| intrinsic | " + " | ".join(f"{t} directed | {t} special" for t in targets) + " |"
-    yield "|---|" + "---|---|" * len(targets)
+    yield "| intrinsic | " + " | ".join(f"{t} directed | {t} many magnitudes | {t} special" for t in targets) + " |"
+    yield "|---|" + "---|---|---|" * len(targets)
     for name in dict.fromkeys(n.partition("/")[0] for n in measured if "/" in n):
         cells = []
         for target in targets:
-            modes = [f"{name}/{mode}" for mode in DIRECTED if f"{name}/{mode}" in ratios[target]]
-            slowest = max(modes, key=ratios[target].get, default=name + "/none")
-            cells += [cell(slowest, target, ratios, limits), cell(name + "/special", target, ratios, limits)]
+            for variants in DIRECTED, MAGNITUDES, ["special"]:
+                found = [f"{name}/{variant}" for variant in variants if f"{name}/{variant}" in ratios[target]]
+                cells.append(cell(max(found, key=ratios[target].get, default=name + "/none"), target, ratios, limits))
         yield f"| `{name}` | " + " | ".join(cells) + " |"
 
 
@@ -117,6 +122,7 @@ def document(times, limits):
         symbol, slash, variant = name.partition("/")
         return (generate_headers.short_name(symbol) if symbol.startswith("rk_") else symbol) + slash + variant
 
+    cycle = {t: found.pop(CYCLES) / 3000 for t, found in times.items()}
     ratios = {t: {known_as(n): v / times[t][BASELINE] for n, v in found.items()} for t, found in times.items()}
     measured = next(iter(ratios.values()))
     lines = ["# Performance", "",
@@ -124,7 +130,9 @@ def document(times, limits):
              "register (`qv_vecNx16_move`, 64 bytes) in the same run. Medians. Measured on " + processor() + " by", "",
              "    make bench", "",
              "On that machine the copy took " +
-             ", ".join(f"{times[t][BASELINE]:.1f} ns ({t})" for t in TARGETS if t in times) + ".",
+             ", ".join(f"{times[t][BASELINE]:.1f} ns or {times[t][BASELINE] / cycle[t]:.1f} cycles ({t})"
+                       for t in TARGETS if t in times) + ";",
+             "a cycle is a third of what an integer multiplication takes in a chain of them, timed in the same run.",
              "Figures in bold are above the limit set in `bench/limits.txt`; the notes at the end say why.", ""]
     if any("fir_scalar" in n for n in measured):
         lines += ["## A whole kernel", "",
@@ -143,6 +151,8 @@ def document(times, limits):
     if any("/" in n for n in measured):
         lines += ["## Rounding modes and special values", "",
                   "Directed: the slowest of rounding toward zero, up and down; the limit is that of rounding to nearest.",
+                  "Many magnitudes: exponents from -12 to 11 (of halves from -6 to 5), with a zero in every register, or with",
+                  "an accumulator of 0, the slower of both; an accumulator is put back before every call, by a copy.",
                   "Special: a NaN, an infinity, a subnormal number and a zero among the lanes of each operand; the limit",
                   f"is {SPECIAL} times as high.", ""] + list(variant_lines(ratios, limits)) + [""]
     notes = os.path.join(ROOT, "bench", "notes.md")

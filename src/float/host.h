@@ -8,7 +8,7 @@
 //   halves    are computed as singles, 24 bits, in which every half is a number and the product of two exact;
 //   singles   as doubles, 53 bits, in which the product of two is exact;
 //   sums      have room there when the exponents of their terms are near, which is measured before; when a lane's are
-//             not, the vector is computed in the long way, in which a term far below the other is lifted (apart).
+//             not, the vector is computed in the long way, in which the lesser term is made to fit (sum_with_room).
 //
 // Lanes for which this does not hold are left to the reference: operands or results that are infinite or
 // NaNs, results that overflow or come near, tiny ones that need not be exact. They, and subnormal operands, raise
@@ -186,6 +186,15 @@ template <class F, class... Ls, class Rule, class... Units>
     far |= rule(Lanes<Ls, Reach::measured>(operands, from)...).far;
   return any_sign<Lane>(far);
 }
+// The same of lanes without a 0.
+template <class F, class... Ls, class Rule, class... Units>
+[[gnu::noinline, gnu::flatten]] bool any_far_without_zero(Rule rule, const Units*... operands) {
+  using Lane = typename F::lane;
+  Vector<Lane> far = {};
+  for (int from = 0; from < std::min({Ls::count...}); from += lanes_in_register<Lane>)
+    far |= rule(Lanes<Ls, Reach::measured>(operands, from)...).far_without_zero;
+  return any_sign<Lane>(far);
+}
 
 // A vector of results in registers, and a bit for each lane that is left.
 template <class L>
@@ -329,7 +338,9 @@ template <class R, class... Ls, class Mode, class Results, class Rule, class... 
 [[gnu::always_inline, gnu::flatten]] inline HostResult on_host_in(const Mode& mode, Results& results, Rule rule,
                                                                   const Units*... operands) {
   if constexpr (measures<Rule, Lanes<Ls, Reach::measured>...>) {
-    if (__builtin_expect(any_far<format_of<R>, Ls...>(rule, operands...), 0)) {
+    using F = format_of<R>;
+    if (__builtin_expect(any_far<F, Ls...>(rule, operands...), 0) &&
+        any_far_without_zero<F, Ls...>(rule, operands...)) {
       const FarResults<R> far = far_on_host<R, Ls...>(mode, rule, operands...);
       for (int k = 0; k < registers_of<R>; ++k) results.number[k] = far.results.number[k];
       results.left = far.results.left;

@@ -406,7 +406,8 @@ template <class R, class... Ls, class Results, class Rule, class... Units>
   return on_host_in<R, Ls...>(ToNearestAway(), results, rule, operands...);
 }
 
-// Sums that are 0, rounded downward: -0 but for terms that are both +0.
+// Rounded downward, x + y = 0 is -0, but (+0) + (+0) is +0. The host, which rounds to nearest here, makes +0 of 1 + -1:
+// the sign is set where either term has one.
 template <class R, class... Ls, class Results, class Rule, std::size_t... K, class... Units>
 [[gnu::always_inline]] inline void turn_zeros(Results& results, Rule rule, std::index_sequence<K...>,
                                               const Units*... operands) {

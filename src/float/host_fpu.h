@@ -11,7 +11,8 @@ template <class Pointer>
 inline void pin_operand(Pointer& pointer) {
   asm volatile("" : "+r"(pointer) : : "memory");
 }
-// The register is computed before, and what is computed of it is not computed of its operands again.
+// The value as the compiler knows nothing of it: all that it depends on is computed before, once, and nothing that uses
+// it can move before this place.
 template <class V>
 inline V pinned(V result) {
   asm volatile("" : "+x"(result));

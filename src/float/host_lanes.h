@@ -103,10 +103,17 @@ inline Parted parted(Words x, Words right) {
 constexpr int rest_bits = 29;  // of what a single drops of a double
 constexpr word all_of_rest = (word{1} << rest_bits) - 1, half_of_rest = word{1} << (rest_bits - 1);
 
-// The ways to round, each in two forms: what is added to the bits of a number before its lowest Count are dropped, for
-// bits of a number, a carry from its fraction included, count as an integer does; and the greatest of the numbers of
-// rest_bits bits that are dropped without rounding up. To nearest, ties away, integers alone are rounded, in the
-// second.
+// The ways to round the bits of a number, as an integer: a carry out of the fraction is right in the exponent. Each has
+// two forms, for bits that are dropped from a word and for bits that are beside it:
+//
+//   increment<Count>(bits)       is added before the lowest Count bits are dropped. To nearest, of 2 bits beside an
+//   even
+//                                number, 1: binary 10.10, a tie, becomes 10.11 and is cut to 10; 10.11 becomes 11.00.
+//   greatest_down(kept, signs)   the greatest rest, of rest_bits bits, that is dropped without adding 1 to what is
+//   kept:
+//                                to nearest a half, or the number below it beside an odd number.
+//
+// (To nearest with ties away rounds to integers alone, which take the second form.)
 struct ToNearest {
   template <int Count>
   Words increment(Words bits) const {

@@ -83,7 +83,8 @@ struct Extreme {
     constexpr auto choose = Less ? minimum<F> : maximum<F>;
     return NumberWins ? number_of<F>(env, a, b, choose) : choose(env, a, b);
   }
-  // Numbers are in the order of their bits as integers, unless both are negative: then of the others, those turned.
+  // By signed integers. Bits of numbers are in their order, unless both numbers are negative: the bits of -2 are a
+  // greater integer than those of -1. Then all bits are turned, compared, and turned back.
   template <class V>
   static V of_numbers(V a, V b) {
     const auto turned = ordered(a & b) >> (8 * sizeof(a[0]) - 1);

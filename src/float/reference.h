@@ -210,7 +210,10 @@ template <class S>
     apart = 1;
   }
   const word lost = x.lost | y.lost | word{(y.significand & ((S{1} << apart) - 1)) != 0};
-  // ~((y - 1) >> n) is -y >> n, both rounded down; if y has lost something, so is ~(y >> n).
+  // A difference is x - y - (what y has lost), rounded down, where x is shifted and y is not. In two's complement -y is
+  // ~(y - 1) and ~y is -y - 1, and a shift rounds both down: ~((y - 1) >> n) is -y >> n. So 8 - 3, with 3 shifted by 1,
+  // is 8 + ~(2 >> 1) = 6, which with its sticky bit stands for 6.5. If y has lost something itself, which is less than
+  // 1, then -y less that is rounded down to ~y, and ~(y >> n) serves.
   const auto differ = static_cast<S>(static_cast<Signed>(static_cast<std::int32_t>(x.negative ^ y.negative)));
   const S less = y.lost != 0 ? y.significand : y.significand + differ;
   const S total = x.significand + (static_cast<S>(static_cast<Signed>(less) >> apart) ^ differ);

@@ -28,19 +28,25 @@
 
 #define FLOAT_a(OP)          \
   FLOAT_KERNELS(OP, float_a) \
-  FLOAT_ROWS(OP, float_a_r)
+  FLOAT_ROWS(OP, a_r)
 #define FLOAT_bits(OP)          \
   FLOAT_KERNELS(OP, float_bits) \
-  FLOAT_ROWS(OP, float_a_r)     \
-  FLOAT_ROWS_T(OP, float_a_r_T)
+  FLOAT_ROWS(OP, a_r)           \
+  FLOAT_ROWS_T(OP, a_r_T)
 #define FLOAT_ab(OP)          \
   FLOAT_KERNELS(OP, float_ab) \
   FLOAT_ROWS(OP, ab_r)        \
   FLOAT_ROWS_T(OP, ab_r_T)
-#define FLOAT_acc_ab(OP)       \
-  FLOAT_KERNELS(OP, float_abc) \
-  FLOAT_ROWS(OP, float_acc_ab) \
-  FLOAT_ROWS_T(OP, float_acc_ab_T)
+#define FLOAT_acc_ab(OP)                                                             \
+  FLOAT_KERNELS(OP, float_abc)                                                       \
+  ROW(OP##NXF16, acc_ab, qv_vecNxf16, qv_vecNxf16, qv_vecNxf16, OP##NXF16)           \
+  ROW(OP##N_2XF32, acc_ab, qv_vecN_2xf32, qv_vecN_2xf32, qv_vecN_2xf32, OP##N_2XF32) \
+  ROW(OP##F16, acc_ab, qv_f16, qv_f16, qv_f16, OP##F16)                              \
+  ROW(OP##F32, acc_ab, rkfloat, rkfloat, rkfloat, OP##F32)                           \
+  ROW(OP##NXF16T, acc_ab_T, qv_vecNxf16, qv_vecNxf16, vboolN, OP##NXF16)             \
+  ROW(OP##N_2XF32T, acc_ab_T, qv_vecN_2xf32, qv_vecN_2xf32, vboolN_2, OP##N_2XF32)   \
+  ROW(OP##F16T, acc_ab_T, qv_f16, qv_f16, vbool1, OP##F16)                           \
+  ROW(OP##F32T, acc_ab_T, rkfloat, rkfloat, vbool1, OP##F32)
 #define FLOAT_ab_p(OP)                                         \
   FLOAT_KERNELS(OP, float_ab_bits)                             \
   ROW(OP##NXF16, ab_p, vboolN, qv_vecNxf16, OP##NXF16)         \

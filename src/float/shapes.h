@@ -4,21 +4,6 @@
 
 // --- Vectors and single lanes ---------------------------------------------------------------------------
 
-#define SIG_float_a_r(SYMBOL, T, K) T SYMBOL(const T& a)
-#define BODY_float_a_r(T, K)      \
-  T r;                            \
-  KASTARRI_SEMANTIC(K)(a._, r._); \
-  return r;
-
-#define SIG_float_a_r_T(SYMBOL, T, P, K) void SYMBOL(T& r, const T& a, const P& p)
-#define BODY_float_a_r_T(T, P, K) KASTARRI_SEMANTIC(K)(a._, where(r._, p._));
-
-#define SIG_float_acc_ab(SYMBOL, T, K) void SYMBOL(T& acc, const T& a, const T& b)
-#define BODY_float_acc_ab(T, K) KASTARRI_SEMANTIC(K)(acc._, a._, b._, acc._);
-
-#define SIG_float_acc_ab_T(SYMBOL, T, P, K) void SYMBOL(T& acc, const T& a, const T& b, const P& p)
-#define BODY_float_acc_ab_T(T, P, K) KASTARRI_SEMANTIC(K)(acc._, a._, b._, where(acc._, p._));
-
 #define SIG_float_const(SYMBOL, T, K) T SYMBOL(immediate number)
 #define BODY_float_const(T, K)                          \
   T r;                                                  \

@@ -1,4 +1,4 @@
-// Operations on whole registers: the fast path, then the reference for the lanes that it left.
+// Operations on whole registers: by the unit, which has special lanes computed by the reference (unit.h).
 #ifndef KASTARRI_FLOAT_VECTORS_H
 #define KASTARRI_FLOAT_VECTORS_H
 
@@ -7,13 +7,14 @@
 
 namespace {
 
-// A lane alone in a whole word: compilers would compute in 16 bits, where constants hold processors' decoders up.
+// A single lane in a whole word. Compilers would compute a half in 16 bits, and instructions with 16-bit constants are
+// slow to decode (length-changing prefixes).
 inline word in_word(word lane) {
   asm("" : "+r"(lane));
   return lane;
 }
 
-// A lane of a vector, which is one of many places: there the reference is called, alone it is inlined.
+// A lane of a vector by the reference: a call, for it is one of many places. Alone the reference is inlined.
 template <class Op, class F, class... X>
 [[gnu::noinline]] word exact_lane(Rounding rounding, X... x) {
   Environment env(rounding);

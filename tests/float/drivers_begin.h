@@ -13,14 +13,14 @@
     TEST_##SHAPE(testing_support::operation(#SYMBOL), &KASTARRI_SYMBOL(SYMBOL), __VA_ARGS__);                          \
   });
 
-#define TEST_float_a_r(NAME, F, T, K) testing_support::drive_float_a_r(NAME, model_##K, F)
-#define TEST_float_a_r_T(NAME, F, T, P, K) testing_support::drive_float_a_r_T(NAME, model_##K, F)
+#define TEST_a_r(NAME, F, T, K) testing_support::drive_float_a_r(NAME, model_##K, F)
+#define TEST_a_r_T(NAME, F, T, P, K) testing_support::drive_float_a_r_T(NAME, model_##K, F)
 #define TEST_w_r(NAME, F, R, A, K) testing_support::drive_float_a_r(NAME, model_##K, F)
 #define TEST_ab_r(NAME, F, T, K) testing_support::drive_float_ab_r(NAME, model_##K, F)
 #define TEST_ab_r_T(NAME, F, T, P, K) testing_support::drive_float_ab_r_T(NAME, model_##K, F)
 #define TEST_ab_p(NAME, F, P, T, K) testing_support::drive_float_relation(NAME, model_##K, F)
-#define TEST_float_acc_ab(NAME, F, T, K) testing_support::drive_float_acc_ab(NAME, model_##K, F)
-#define TEST_float_acc_ab_T(NAME, F, T, P, K) testing_support::drive_float_acc_ab_T(NAME, model_##K, F)
+#define TEST_acc_ab(NAME, F, W, A, B, K) testing_support::drive_float_acc_ab(NAME, model_##K, F)
+#define TEST_acc_ab_T(NAME, F, W, A, P, K) testing_support::drive_float_acc_ab_T(NAME, model_##K, F)
 #define TEST_float_const(NAME, F, T, K) testing_support::drive_float_const(NAME, F)
 
 #include "float/row_kinds.h"

@@ -35,10 +35,10 @@ def lanes(name, twins):
     predicate = [const(layout.predicate)] if predicated else []
     suffix = "_T" if predicated else ""
     if operation in FUSED:
-        return Expected(prototype("void", f"{register_type}&", operand, operand, *predicate), "float_acc_ab" + suffix,
+        return Expected(prototype("void", f"{register_type}&", operand, operand, *predicate), "acc_ab" + suffix,
                         [("float_abc", operation, code)])
     operands = [operand] * (1 if operation in ON_BITS else 2)
-    shape = ("float_a_r" if operation in ON_BITS else "ab_r") + suffix
+    shape = ("a_r" if operation in ON_BITS else "ab_r") + suffix
     kernel = ("float_bits" if operation in ON_BITS else "float_ab", operation, code)
     if predicated:
         return Expected(prototype("void", f"{register_type}&", *operands, *predicate), shape, [kernel])
@@ -52,7 +52,7 @@ def integral(name, twins):
     if predicated:
         raise Unknown(name)
     register_type = layout.types[""]
-    return Expected(prototype(register_type, const(register_type)), "float_a_r", [("float_a", operation, layout.code("f"))])
+    return Expected(prototype(register_type, const(register_type)), "a_r", [("float_a", operation, layout.code("f"))])
 
 
 CLASSES = {"NXF16": "qv_vecNx16U", "N_2XF32": "qv_vecN_2x32Uv", "F16": "qv_int16U", "F32": "qv_int32Uv"}

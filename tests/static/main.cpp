@@ -45,7 +45,8 @@ int differences(unsigned free, unsigned one) {
 
 int main() {
   if (std::strcmp(cstub_Km_ZNB_Orbis_R5_64k_target(), "none") == 0) return 77;  // not for this processor
-  const int singles = differences<Singles>(0x807FFFFF, 0x3F800000), halves = differences<Halves>(0x83FF83FF, 0x3C003C00);
+  const int singles = differences<Singles>(0x807FFFFF, 0x3F800000),
+            halves = differences<Halves>(0x83FF83FF, 0x3C003C00);
   std::printf("different from calls: %d of singles, %d of halves\n", singles, halves);
   return singles + halves != 0;
 }

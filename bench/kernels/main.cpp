@@ -1,8 +1,8 @@
-// Times kernels three ways, for one target: linked with the shared library, inlined from the static library
-// when linked, and plain loops that the compiler vectorised. Prints how much faster than with the shared
-// library they are.
+// Times kernels as several modules have them: with the intrinsics of the shared library, inlined, as loops that
+// compilers vectorised, as plain loops. Prints kernel, module, nanoseconds an item, separated by commas.
 #include <dlfcn.h>
 
+#include <algorithm>
 #include <cstdio>
 #include <cstdlib>
 #include <random>
@@ -17,59 +17,84 @@ namespace {
 
 using namespace examples;
 
-constexpr int ROUNDS = 61;
+int rounds = 61;
 
 struct Way {
-  const char* name;
+  std::string name;
   const Kernels* kernels;
 };
 
-const Kernels* load(const char* path) {
-  void* const module = dlopen(path, RTLD_NOW | RTLD_LOCAL);
+Way load(const std::string& argument) {
+  const std::size_t equals = argument.find('=');
+  void* const module = dlopen(argument.substr(equals + 1).c_str(), RTLD_NOW | RTLD_LOCAL);
   const void* const kernels = module ? dlsym(module, "kernels") : nullptr;
-  if (kernels) return static_cast<const Kernels*>(kernels);
+  if (kernels) return {argument.substr(0, equals), static_cast<const Kernels*>(kernels)};
   std::fprintf(stderr, "%s\n", dlerror());
   std::exit(1);
 }
 
-// Runs the ways by turns, so that whatever else the machine does hits all, and compares the medians. All have to
-// make the same, which `made` returns.
-template <class Run, class Made>
-void compare_ways(const std::string& title, const std::vector<Way>& ways, int repetitions, double items, Run run,
-                  Made made) {
+// Runs the ways by turns, so that whatever else the machine does hits all, and takes the shortest time of each. All
+// have to make the same, which `made` returns.
+template <class Has, class Run, class Made>
+void compare_ways(const std::string& title, const std::vector<Way>& all, int repetitions, double items, Has has,
+                  Run run, Made made) {
+  std::vector<Way> ways;
+  std::copy_if(all.begin(), all.end(), std::back_inserter(ways), [&](const Way& way) { return has(*way.kernels); });
+  if (ways.empty()) return;
   run(*ways[0].kernels);
   const auto expected = made();
-  std::vector<std::vector<double>> times(ways.size());
-  for (int round = 0; round < ROUNDS; ++round) {
+  std::vector<double> least(ways.size(), 1e9);
+  for (int round = 0; round < rounds; ++round) {
     for (std::size_t w = 0; w < ways.size(); ++w) {
-      times[w].push_back(seconds([&] {
-        for (int i = 0; i < repetitions; ++i) run(*ways[w].kernels);
-      }));
+      least[w] = std::min(least[w], seconds([&] {
+                            for (int i = 0; i < repetitions; ++i) run(*ways[w].kernels);
+                          }));
       if (made() != expected) {
-        std::fprintf(stderr, "%s: %s differs from %s\n", title.c_str(), ways[w].name, ways[0].name);
+        std::fprintf(stderr, "%s: %s differs from %s\n", title.c_str(), ways[w].name.c_str(), ways[0].name.c_str());
         std::exit(1);
       }
     }
   }
-  const double base = median(times[0]);
-  std::printf("%s\n", title.c_str());
-  for (std::size_t w = 0; w < ways.size(); ++w) {
-    const double time = median(times[w]);
-    std::printf("  %-8s %7.3f ns   %5.2f\n", ways[w].name, 1e9 * time / repetitions / items, base / time);
-  }
+  for (std::size_t w = 0; w < ways.size(); ++w)
+    std::printf("%s,%s,%.4f\n", title.c_str(), ways[w].name.c_str(), 1e9 * least[w] / repetitions / items);
 }
 
-void compare_fir(const std::vector<Way>& ways, int taps) {
+template <class Has, class Run>
+void compare_filters(const std::string& title, const std::vector<Way>& ways, int taps, Has has, Run run) {
   constexpr int samples = 4096;
   std::minstd_rand random(1);
   std::vector<short> x(static_cast<std::size_t>(samples + taps - 1 + FIR_MARGIN)), y(samples + FIR_MARGIN);
   std::vector<short> h(static_cast<std::size_t>(taps));
   for (auto& sample : x) sample = static_cast<short>(random());
   for (auto& tap : h) tap = static_cast<short>(random() % 4096);
-  const std::string title = "FIR, " + std::to_string(taps) + " taps, a sample";
   compare_ways(
-      title, ways, 8, samples,
-      [&](const Kernels& kernels) { kernels.fir(x.data(), h.data(), taps, y.data(), samples); }, [&] { return y; });
+      title, ways, 4, samples, has,
+      [&](const Kernels& kernels) { run(kernels, x.data(), h.data(), y.data(), samples); }, [&] { return y; });
+}
+
+void compare_fir(const std::vector<Way>& ways, int taps) {
+  compare_filters(
+      "FIR of " + std::to_string(taps) + " taps", ways, taps, [](const Kernels& k) { return k.fir != nullptr; },
+      [&](const Kernels& k, const short* x, const short* h, short* y, int count) { k.fir(x, h, taps, y, count); });
+}
+
+void compare_chain(const std::vector<Way>& ways) {
+  compare_filters(
+      "chain of MULANX16", ways, CHAIN_TAPS, [](const Kernels& k) { return k.chain != nullptr; },
+      [](const Kernels& k, const short* x, const short* h, short* y, int count) {
+        k.chain(x, h, CHAIN_TAPS, y, count);
+      });
+}
+
+// The chain with its registers at an offset from a cache line.
+void compare_chain_at(const std::vector<Way>& ways, int offset) {
+  alignas(64) static unsigned char frame[CHAIN_FRAME];
+  compare_filters(
+      "chain at " + std::to_string(offset) + " mod 64", ways, CHAIN_TAPS,
+      [](const Kernels& k) { return k.chain_at != nullptr; },
+      [&](const Kernels& k, const short* x, const short* h, short* y, int count) {
+        k.chain_at(x, h, y, count, frame + offset);
+      });
 }
 
 void compare_convolution(const std::vector<Way>& ways, const char* name, const Filter& filter) {
@@ -78,21 +103,45 @@ void compare_convolution(const std::vector<Way>& ways, const char* name, const F
   for (auto& pixel : picture.pixels) pixel = static_cast<std::uint8_t>(random() >> 16);
   const Framed in(picture);
   Convolved out(picture.width, picture.height);
-  const std::string title = std::string("convolution, ") + name + ", a pixel";
   compare_ways(
-      title, ways, 2, 256 * 128, [&](const Kernels& kernels) { out.make(kernels.convolve, in, filter); },
-      [&] { return out.picture().pixels; });
+      name, ways, 1, 256 * 128, [](const Kernels& k) { return k.convolve != nullptr; },
+      [&](const Kernels& kernels) { out.make(kernels.convolve, in, filter); }, [&] { return out.picture().pixels; });
+}
+
+void compare_tables(const std::vector<Way>& ways) {
+  constexpr int pixels = 16384;
+  std::minstd_rand random(1);
+  std::vector<unsigned char> picture(pixels + PIXEL_MARGIN), table(GREYS + 1), found(pixels);
+  for (auto& pixel : picture) pixel = static_cast<unsigned char>(random() >> 16);
+  for (auto& entry : table) entry = static_cast<unsigned char>(random() >> 16);
+  std::vector<unsigned> counts(GREYS);
+  compare_ways(
+      "table look-up", ways, 2, pixels, [](const Kernels& k) { return k.look_up != nullptr; },
+      [&](const Kernels& k) { k.look_up(picture.data(), pixels, table.data(), found.data()); }, [&] { return found; });
+  compare_ways(
+      "histogram", ways, 2, pixels, [](const Kernels& k) { return k.count_greys != nullptr; },
+      [&](const Kernels& k) { k.count_greys(picture.data(), pixels, counts.data()); }, [&] { return counts; });
 }
 
 }  // namespace
 
 int main(int argc, char** argv) {
-  if (argc != 4) {
-    std::fprintf(stderr, "usage: static_bench SHARED STATIC PLAIN (the modules with the kernels)\n");
+  std::vector<Way> ways;
+  for (int i = 1; i < argc; ++i) {
+    const std::string argument = argv[i];
+    if (argument.rfind("--rounds=", 0) == 0)
+      rounds = std::atoi(argv[i] + 9);
+    else if (argument.find('=') != std::string::npos)
+      ways.push_back(load(argument));
+  }
+  if (ways.empty()) {
+    std::fprintf(stderr, "usage: kernel_bench [--rounds=N] NAME=MODULE...\n");
     return 2;
   }
-  const std::vector<Way> ways = {{"shared", load(argv[1])}, {"static", load(argv[2])}, {"plain", load(argv[3])}};
   for (const int taps : {16, 64}) compare_fir(ways, taps);
-  compare_convolution(ways, "5 x 5", gauss());
-  compare_convolution(ways, "four of 3 x 3", sobel());
+  compare_convolution(ways, "convolution 5 x 5", gauss());
+  compare_convolution(ways, "four masks of 3 x 3", sobel());
+  compare_chain(ways);
+  for (const int offset : {0, 16, 32}) compare_chain_at(ways, offset);
+  compare_tables(ways);
 }

@@ -3,69 +3,100 @@
 #
 #   make demo          build the library and the examples, run them and write build/demo/index.html, before and after
 #   make test          build everything and run the tests
+#   make try           build for one target; test and time one intrinsic (NAME=ADDSNX16)
+#   make mutants       plant faults in all rows and in some rules, and list those that no test finds (MUTANTS=40, SEED=1,
+#                      ONLY= a regular expression of tables and sources)
 #   make bench         time every intrinsic and write docs/performance.md, a summary, and build/performance.md
 #   make bench-static  time kernels with the static library against the shared one
 #   make docs          write build/docs/reference.html, all intrinsics on one page
 #   make picture       take docs/pictures/reference.png of that page
-#   make install       install libraries and headers (PREFIX=/usr/local, DESTDIR=, LIBDIR=lib)
+#   make install       install libraries and headers (PREFIX=/usr/local, DESTDIR=, LIBDIR=lib or lib/x86_64-linux-gnu)
 #   make package       make Debian packages in build/packages
-#   make headers       write the public headers, gdb's table of types and docs/coverage.md anew from the tables of rows
+#   make headers       write the public headers, gdb's table of types, docs/coverage.md, docs/shapes.md and the README's
+#                      counts from the tables
 #   make format        format the sources
 #   make clean         remove build/
+#   ... BITS=64        make, test, install ... the same for 64-bit programs, in build/demo-64, build/test-64 and so on
 
+BITS ?= 32
 PREFIX ?= /usr/local
-LIBDIR ?= lib
+MUTANTS ?= 40
+SEED ?= 1
 CMAKE_BUILD = cmake --build --parallel --preset
 
-.PHONY: help demo test bench bench-static docs picture install package headers format clean
+ifeq ($(BITS),32)
+WIDTH =
+MULTIARCH = i386-linux-gnu
+LIBDIR ?= lib
+SUMMARY = docs/performance.md
+else ifeq ($(BITS),64)
+WIDTH = -64
+MULTIARCH = x86_64-linux-gnu
+LIBDIR ?= lib/$(MULTIARCH)
+SUMMARY = build/summary-64.md
+else
+$(error BITS is $(BITS); known are 32 and 64)
+endif
+
+.PHONY: help demo test try mutants bench bench-static docs picture install package headers format clean
 
 help:
 	@sed -n 's/^#   //p' Makefile
 
 demo:
 	tools/packages.sh build demo
-	cmake --preset demo
-	$(CMAKE_BUILD) demo
-	tools/demo/run.py build/demo
+	cmake --preset demo$(WIDTH)
+	$(CMAKE_BUILD) demo$(WIDTH)
+	tools/demo/run.py build/demo$(WIDTH)
 
 test:
+	tools/packages.sh build test$(WIDTH)
+	cmake --preset test$(WIDTH)
+	$(CMAKE_BUILD) test$(WIDTH)
+	ctest --preset test$(WIDTH)
+
+try:
 	tools/packages.sh build test
-	cmake --preset test
-	$(CMAKE_BUILD) test
-	ctest --preset test
+	tools/try.py $(NAME)
+
+mutants:
+	tools/packages.sh build test
+	cmake --preset mutants
+	$(CMAKE_BUILD) mutants --target kastarri_tests
+	tools/mutants/mutants.py build/mutants --rules $(MUTANTS) --seed $(SEED) --only '$(ONLY)'
 
 bench:
-	tools/packages.sh build test
-	cmake --preset test
-	$(CMAKE_BUILD) test
-	tools/performance.py build/test --summary docs/performance.md --table build/performance.md
+	tools/packages.sh build test$(WIDTH)
+	cmake --preset test$(WIDTH)
+	$(CMAKE_BUILD) test$(WIDTH)
+	tools/performance.py build/test$(WIDTH) --summary $(SUMMARY) --table build/performance$(WIDTH).md
 
 bench-static:
-	tools/packages.sh build test
-	cmake --preset test
-	$(CMAKE_BUILD) test --target static_bench
-	cd build/test/bench/static && ./static_bench ./libstatic_bench_shared.so ./libstatic_bench_static.so ./libstatic_bench_plain.so
+	tools/packages.sh build test$(WIDTH)
+	cmake --preset test$(WIDTH)
+	$(CMAKE_BUILD) test$(WIDTH) --target static_bench
+	cd build/test$(WIDTH)/bench/static && ./static_bench ./libstatic_bench_shared.so ./libstatic_bench_static.so ./libstatic_bench_plain.so
 
 docs:
 	tools/packages.sh build
-	cmake --preset docs
-	$(CMAKE_BUILD) docs --target reference
+	cmake --preset docs$(WIDTH)
+	$(CMAKE_BUILD) docs$(WIDTH) --target reference
 
 picture: docs
 	tools/packages.sh picture
-	tools/reference/picture.py build/docs/reference.html docs/pictures/reference.png
+	tools/reference/picture.py build/docs$(WIDTH)/reference.html docs/pictures/reference.png
 
 install:
 	tools/packages.sh build
-	cmake --preset install -DCMAKE_INSTALL_LIBDIR=$(LIBDIR)
-	$(CMAKE_BUILD) install
-	DESTDIR=$(DESTDIR) cmake --install build/install --prefix $(PREFIX)
+	cmake --preset install$(WIDTH) -DCMAKE_INSTALL_LIBDIR=$(LIBDIR)
+	$(CMAKE_BUILD) install$(WIDTH)
+	DESTDIR=$(DESTDIR) cmake --install build/install$(WIDTH) --prefix $(PREFIX)
 
 package:
 	tools/packages.sh build
-	cmake --preset install -DCMAKE_INSTALL_LIBDIR=lib/i386-linux-gnu
-	$(CMAKE_BUILD) install
-	cpack --config build/install/CPackConfig.cmake -B build/packages
+	cmake --preset install$(WIDTH) -DCMAKE_INSTALL_LIBDIR=lib/$(MULTIARCH)
+	$(CMAKE_BUILD) install$(WIDTH)
+	cpack --config build/install$(WIDTH)/CPackConfig.cmake -B build/packages
 
 headers:
 	tools/packages.sh build

@@ -5,7 +5,7 @@
 set(CMAKE_INSTALL_DEFAULT_COMPONENT_NAME devel)
 
 # Debian's multiarch directory would be that of the compiler's default, 64 bits.
-set(CMAKE_INSTALL_LIBDIR lib CACHE STRING "Where libraries go, below the prefix")
+set(CMAKE_INSTALL_LIBDIR ${KASTARRI_DEFAULT_LIBDIR} CACHE STRING "Where libraries go, below the prefix")
 include(GNUInstallDirs)
 foreach(directory IN ITEMS CMAKE_INSTALL_LIBDIR CMAKE_INSTALL_INCLUDEDIR)
   if(IS_ABSOLUTE "${${directory}}")
@@ -13,10 +13,16 @@ foreach(directory IN ITEMS CMAKE_INSTALL_LIBDIR CMAKE_INSTALL_INCLUDEDIR)
   endif()
 endforeach()
 
-# Where CMake and pkg-config look whatever the architecture they look for: who forgets that the library is
-# 32-bit, or sets it later, finds it nevertheless.
-set(KASTARRI_CMAKE_DIR lib/cmake/kastarri)
-set(KASTARRI_PKGCONFIG_DIR lib/pkgconfig)
+# The files of CMake and pkg-config lie with the library of a width. Those of the 32-bit one lie where both look
+# whatever they build for: who says nothing of a width finds it, unless there is one for the compiler's own. The
+# pkg-config of another architecture looks among the libraries alone.
+set(KASTARRI_CMAKE_DIR ${CMAKE_INSTALL_LIBDIR}/cmake/kastarri)
+set(KASTARRI_PKGCONFIG_DIRS ${CMAKE_INSTALL_LIBDIR}/pkgconfig)
+if(KASTARRI_BITS EQUAL 32)
+  set(KASTARRI_CMAKE_DIR lib/cmake/kastarri)
+  list(APPEND KASTARRI_PKGCONFIG_DIRS lib/pkgconfig)
+  list(REMOVE_DUPLICATES KASTARRI_PKGCONFIG_DIRS)
+endif()
 
 install(DIRECTORY ${PROJECT_SOURCE_DIR}/include/ DESTINATION ${CMAKE_INSTALL_INCLUDEDIR})
 
@@ -28,8 +34,11 @@ function(kastarri_install target component module library)
     INCLUDES DESTINATION ${CMAKE_INSTALL_INCLUDEDIR})
   install(EXPORT kastarri-${component} NAMESPACE kastarri:: DESTINATION ${KASTARRI_CMAKE_DIR})
   list(JOIN ARGN " " flags)
-  configure_file(${PROJECT_SOURCE_DIR}/cmake/kastarri.pc.in ${module}.pc @ONLY)
-  install(FILES ${CMAKE_CURRENT_BINARY_DIR}/${module}.pc DESTINATION ${KASTARRI_PKGCONFIG_DIR})
+  foreach(directory IN LISTS KASTARRI_PKGCONFIG_DIRS)
+    file(RELATIVE_PATH to_prefix /prefix/${directory} /prefix)
+    configure_file(${PROJECT_SOURCE_DIR}/cmake/kastarri.pc.in ${directory}/${module}.pc @ONLY)
+    install(FILES ${CMAKE_CURRENT_BINARY_DIR}/${directory}/${module}.pc DESTINATION ${directory})
+  endforeach()
 endfunction()
 
 kastarri_install(kastarri shared kastarri kastarri ${KASTARRI_USER_FLAGS})
@@ -44,7 +53,10 @@ else()
   set(compatibility SameMajorVersion)
 endif()
 include(CMakePackageConfigHelpers)
-# Independent of the architecture: what the compiler has to be able to do is tested in kastarri-config.cmake.
-write_basic_package_version_file(kastarri-config-version.cmake COMPATIBILITY ${compatibility} ARCH_INDEPENDENT)
-install(FILES ${PROJECT_SOURCE_DIR}/cmake/kastarri-config.cmake
-  ${CMAKE_CURRENT_BINARY_DIR}/kastarri-config-version.cmake DESTINATION ${KASTARRI_CMAKE_DIR})
+# Independent of the architecture as far as CMake knows it: a width that the library is not for is its own matter.
+write_basic_package_version_file(kastarri-version.cmake COMPATIBILITY ${compatibility} ARCH_INDEPENDENT)
+install(FILES ${CMAKE_CURRENT_BINARY_DIR}/kastarri-version.cmake DESTINATION ${KASTARRI_CMAKE_DIR})
+foreach(file IN ITEMS kastarri-config.cmake kastarri-config-version.cmake)
+  configure_file(${PROJECT_SOURCE_DIR}/cmake/${file}.in ${file} @ONLY)
+  install(FILES ${CMAKE_CURRENT_BINARY_DIR}/${file} DESTINATION ${KASTARRI_CMAKE_DIR})
+endforeach()

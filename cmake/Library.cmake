@@ -11,8 +11,8 @@ if(CMAKE_CXX_COMPILER_ID STREQUAL GNU)
 endif()
 set(KASTARRI_KNOWN_TARGETS avx512 avx2 sse2)  # best first
 
-# What a program that uses the library is compiled with, beside -m32. Without SSE2, g++ copies a register in pieces
-# that no vector load is forwarded from, and scalar floats go through the x87.
+# What a program that uses the library is compiled with, beside its width. Without SSE2, which a 32-bit one may lack, g++
+# copies a register in pieces that no vector load is forwarded from, and scalar floats go through the x87.
 set(KASTARRI_USER_FLAGS -msse2 -mfpmath=sse)
 
 # A source of a vector family is compiled for every target, and so are the conversions, which move whole
@@ -45,10 +45,10 @@ function(kastarri_compile_library target)
   target_include_directories(${target} PUBLIC $<BUILD_INTERFACE:${PROJECT_SOURCE_DIR}/include>)
   target_compile_options(${target} PRIVATE
     -O3 -mfpmath=sse -ffp-contract=off -fno-exceptions -fno-rtti -fno-threadsafe-statics
-    -fvisibility=hidden -mno-mmx -mstackrealign -Wconversion -Wmissing-declarations -Wno-psabi
+    -fvisibility=hidden -mno-mmx ${KASTARRI_STACK} -Wconversion -Wmissing-declarations -Wno-psabi
     $<$<CXX_COMPILER_ID:Clang>:-Wmissing-prototypes>)
-  target_compile_options(${target} INTERFACE -m32 ${KASTARRI_USER_FLAGS})
-  target_link_options(${target} INTERFACE -m32)
+  target_compile_options(${target} INTERFACE ${KASTARRI_WIDTH} ${KASTARRI_USER_FLAGS})
+  target_link_options(${target} INTERFACE ${KASTARRI_WIDTH})
   set_target_properties(${target} PROPERTIES POSITION_INDEPENDENT_CODE ON)
 endfunction()
 

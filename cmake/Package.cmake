@@ -26,23 +26,27 @@ set(CPACK_STRIP_FILES ON)
 set(CPACK_INSTALL_DEFAULT_DIRECTORY_PERMISSIONS
   OWNER_READ OWNER_WRITE OWNER_EXECUTE GROUP_READ GROUP_EXECUTE WORLD_READ WORLD_EXECUTE)
 set(CPACK_DEBIAN_FILE_NAME DEB-DEFAULT)
-set(CPACK_DEBIAN_PACKAGE_ARCHITECTURE i386)
+set(CPACK_DEBIAN_PACKAGE_ARCHITECTURE ${KASTARRI_DEBIAN_ARCHITECTURE})
 set(CPACK_DEBIAN_PACKAGE_CONTROL_STRICT_PERMISSION TRUE)
+
+# Packages of both widths stand beside each other: what they have in common is the same file. CPack knows no
+# such field before CMake 3.31; it writes what follows the section as it is.
+set(beside_the_other "\nMulti-Arch: same")
 
 set(what "Every intrinsic of one DSP core, with its 512-bit vectors, accumulators,
 predicates and floats, bit for bit, for programs on the PC.")
 set(CPACK_DEBIAN_RUNTIME_PACKAGE_NAME ${runtime_package})
-set(CPACK_DEBIAN_RUNTIME_PACKAGE_SECTION libs)
-set(CPACK_DEBIAN_RUNTIME_PACKAGE_DEPENDS "libc6 (>= 2.12)")  # with indirect functions on 32-bit x86
+set(CPACK_DEBIAN_RUNTIME_PACKAGE_SECTION libs${beside_the_other})
+set(CPACK_DEBIAN_RUNTIME_PACKAGE_DEPENDS "libc6 (>= ${KASTARRI_LIBC})")
 set(CPACK_DEBIAN_RUNTIME_PACKAGE_CONTROL_EXTRA
   ${CMAKE_CURRENT_BINARY_DIR}/package/triggers ${CMAKE_CURRENT_BINARY_DIR}/package/shlibs)
 set(CPACK_DEBIAN_RUNTIME_DESCRIPTION "intrinsics of a DSP core as a library\n${what}\n.
 This package has the shared library, which programs need to run.")
 set(CPACK_DEBIAN_DEVEL_PACKAGE_NAME ${devel_package})
-set(CPACK_DEBIAN_DEVEL_PACKAGE_SECTION libdevel)
+set(CPACK_DEBIAN_DEVEL_PACKAGE_SECTION libdevel${beside_the_other})
 # For kastarri-profile: any Python will do, of whichever architecture; its counting library needs a newer libc.
 set(CPACK_DEBIAN_DEVEL_PACKAGE_DEPENDS "${runtime_package} (= ${PROJECT_VERSION}), libc6 (>= 2.34), python3:any")
 set(CPACK_DEBIAN_DEVEL_DESCRIPTION "intrinsics of a DSP core as a library (development)\n${what}\n.
 This package has what programs are made with: headers, libraries to link, files for
-CMake and pkg-config, printers for gdb, the profiler and the reference page.")
+CMake and pkg-config, printers for gdb, the profiler, the checker of kernels and the reference page.")
 include(CPack)

@@ -1,12 +1,15 @@
 # kastarri-profile: the counting library, the list of intrinsics beside it, and the program, which finds both by
-# their place relative to its own. The build tree is laid out as the installed one.
+# their place relative to its own. The build tree is laid out as the installed one, where the program is the same
+# for both widths and finds the files of each.
 find_package(Python3 REQUIRED COMPONENTS Interpreter)
 enable_language(ASM)
 
-file(RELATIVE_PATH KASTARRI_PROFILE_FILES
-  ${CMAKE_INSTALL_FULL_BINDIR} ${CMAKE_INSTALL_FULL_LIBDIR}/kastarri)
+set(KASTARRI_PROFILE_DIR lib/kastarri/profile)
+file(RELATIVE_PATH KASTARRI_PROFILE_FILES ${CMAKE_INSTALL_FULL_BINDIR} ${CMAKE_INSTALL_PREFIX}/${KASTARRI_PROFILE_DIR})
 set(programs ${PROJECT_BINARY_DIR}/bin)
 cmake_path(ABSOLUTE_PATH KASTARRI_PROFILE_FILES BASE_DIRECTORY ${programs} NORMALIZE OUTPUT_VARIABLE files)
+string(APPEND files /${KASTARRI_BITS})
+string(APPEND KASTARRI_PROFILE_DIR /${KASTARRI_BITS})
 file(MAKE_DIRECTORY ${files})
 configure_file(${PROJECT_SOURCE_DIR}/tools/kastarri-profile.in ${programs}/kastarri-profile @ONLY
   FILE_PERMISSIONS OWNER_READ OWNER_WRITE OWNER_EXECUTE GROUP_READ GROUP_EXECUTE WORLD_READ WORLD_EXECUTE)
@@ -26,10 +29,10 @@ target_include_directories(kastarri-profile PRIVATE ${files})
 target_compile_definitions(kastarri-profile PRIVATE
   _FILE_OFFSET_BITS=64 KASTARRI_SONAME="libkastarri.so.${PROJECT_VERSION_MAJOR}")
 target_compile_options(kastarri-profile PRIVATE $<$<COMPILE_LANGUAGE:CXX>:
-  -O2 -fno-exceptions -fno-rtti -fno-threadsafe-statics -fvisibility=hidden -mstackrealign>)
+  -O2 -fno-exceptions -fno-rtti -fno-threadsafe-statics -fvisibility=hidden ${KASTARRI_STACK}>)
 target_link_options(kastarri-profile PRIVATE -static-libgcc -Wl,-z,text -Wl,-z,noexecstack -Wl,--no-undefined)
 target_link_libraries(kastarri-profile PRIVATE pthread ${CMAKE_DL_LIBS})
 
 install(PROGRAMS ${programs}/kastarri-profile DESTINATION ${CMAKE_INSTALL_BINDIR})
-install(TARGETS kastarri-profile LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR}/kastarri)
-install(FILES ${files}/intrinsics.csv DESTINATION ${CMAKE_INSTALL_LIBDIR}/kastarri)
+install(TARGETS kastarri-profile LIBRARY DESTINATION ${KASTARRI_PROFILE_DIR})
+install(FILES ${files}/intrinsics.csv DESTINATION ${KASTARRI_PROFILE_DIR})

@@ -257,17 +257,38 @@ def declaration(prototype):
     return [result, name + "("] + ["    " + p + (", " if p[-1] != ";" else "").rstrip() for p in parameters.split(", ")]
 
 
-def family_body(rows, types):
+def about_table(table):
+    """The comment at the head of a table, without the kinds of row that it lists."""
+    with open(os.path.join(ROOT, "src", table), encoding="utf-8") as file:
+        head = re.match(r"(//.*\n)*", file.read())[0]
+    return " ".join(line[3:] for line in head.splitlines() if not line.startswith("//  "))
+
+
+def keeps_lanes(row):
+    """Whether a form leaves the lanes of its destination whose predicate bit is 0: what is predicated and does not load."""
+    first = re.search(r"\(([^,)]*)", row.prototype)[1]
+    return "_T" in row.shape and "&" in first and not first.startswith("const") and "*" not in row.prototype
+
+
+def rule_text(rows):
+    """What the header says of rows that share a rule."""
+    text = rows[0].doc + "."
+    if any(map(keeps_lanes, rows)):
+        flags = ", which raise no flag" if rows[0].table.startswith("float/") else ""
+        text += f" T forms keep the destination's lanes whose predicate bit is 0{flags}."
+    return text
+
+
+def family_body(rows):
     body = []
-    for (doc, table), group in itertools.groupby(rows, key=lambda row: (row.doc, row.table)):
-        group = list(group)
-        used = [t for t in types.values() if any(re.search(PREFIX + t.name + r"\b", prototype) for _, prototype, *_ in group)]
-        body += [""] + [f"/// {line}" for line in wrap(doc + ".")]
-        if 0 < len(used) <= 8:
-            body += [f"/// {line}" for line in wrap("Lanes: " + "; ".join(f"{t.name} {t.shape}" for t in used) + ".")]
-        body.append(f"/// Rule: src/{table}")
-        for _, prototype, *_ in group:
-            body += declaration(prototype)
+    for table, section in itertools.groupby(rows, key=lambda row: row.table):
+        lines = wrap(about_table(table)) + [f"Table: src/{table} */"]
+        body += ["", "/* " + lines[0]] + [f"   {line}" for line in lines[1:]]
+        for _, group in itertools.groupby(section, key=lambda row: row.doc):
+            group = list(group)
+            body += [""] + [f"/// {line}" for line in wrap(rule_text(group))]
+            for row in group:
+                body += declaration(row.prototype)
     return body[1:]
 
 
@@ -311,7 +332,7 @@ def outputs():
     headers["lanes"] = header_text("lanes", "The lanes of the register types, for programs that handle them all",
                                    "src/frame/types.def", lanes_header(types))
     for name, (title, tables, rows) in families.items():
-        body = family_body(rows, types)
+        body = family_body(rows)
         includes = ["library", "types"]
         if name == "conversions":
             body += [""] + conversion_bodies(types)

@@ -2,13 +2,14 @@
 # Installs the Debian packages that are missing for the named purposes, as root or through sudo; where
 # neither works, prints the commands that do it and fails. On a system that is not Debian it names them and goes on.
 #
-#   tools/packages.sh PURPOSE...     build, demo, test, picture, check
+#   tools/packages.sh PURPOSE...     build, demo, test, test-64, picture, check
 set -euo pipefail
 
 declare -A packages=(
   [build]="g++-multilib cmake ninja-build python3"
   [demo]="librsvg2-bin"
   [test]="clang gdb pkg-config chromium chromium-driver libgtest-dev:i386 libbenchmark-dev:i386 libmpfr-dev:i386"
+  [test-64]="clang gdb pkg-config chromium chromium-driver libgtest-dev:amd64 libbenchmark-dev:amd64 libmpfr-dev:amd64"
   [picture]="chromium chromium-driver"
   [check]="clang-format valgrind libc6-dbg:i386"
 )

@@ -7,10 +7,13 @@
 #include "kastarri/types.h"
 #include "kastarri/replicate.h"
 
+/* Whole-register copies between registers and memory: the member array as it is, at any byte address, with
+   no rounding of the address and no test of it. A post-increment copy uses the pointer as it stands.
+   Table: src/frame/moves.def */
+
 /// a copy of the whole register: _loadi and _loadx from base + offset bytes, _storei and _storex to it;
 /// _loadip, _loadxp, _storeip, _storexp at the pointer, which then moves by the increment in bytes; _move of
 /// a register.
-/// Rule: src/frame/moves.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_loadi(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8* base,
@@ -1350,9 +1353,12 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64w_storei(
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int64w
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64w_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_int64w& from);
 
+/* Which register type is built from what. Each row is an exported conversion, a constructor and an
+   assignment of the type built, and, between registers, a conversion operator of the source.
+   Table: src/frame/conversions.def */
+
 /// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
 /// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
-/// Rule: src/frame/conversions.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_qv_vec2Nx8(signed char value);
 KASTARRI_API signed char
@@ -2139,9 +2145,12 @@ KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int256
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_rtor_qv_int256(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& from);
 
+/* Conversions between registers and memory of another type. A host scalar lies at the address with the bits
+   below its size ignored; a register type at the address as it is.
+   Table: src/frame/memory_conversions.def */
+
 /// the register from what is in memory at base + offset bytes, converted as between registers; the address of
 /// a host scalar is rounded down to its size.
-/// Rule: src/frame/memory_conversions.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_mtor_qv_vec2Nx8(const signed char* base, int offset);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
@@ -2372,7 +2381,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_mtor_qv_int256(
 /// the register's value to memory at base + offset bytes: lane 0 where memory holds one element, else all
 /// lanes; a narrower signed type in memory saturates, a narrower unsigned one keeps the low bits, and so do
 /// the images of the accumulators; the address of a host scalar is rounded down to its size.
-/// Rule: src/frame/memory_conversions.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtom_int8(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& value,
@@ -2694,9 +2702,12 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_rtom_int64(
     const long long* base,
     int offset);
 
+/* Conversions between integer and floating-point registers, and between half and single precision: value to
+   value, where the other conversions move bits (the row kinds are those of src/frame/conversions.def).
+   Table: src/float/conversions.def */
+
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags; to an integer
 /// truncated toward zero and saturated.
-/// Rule: src/float/conversions.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_vecNx16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);

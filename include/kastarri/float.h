@@ -6,21 +6,21 @@
 #include "kastarri/library.h"
 #include "kastarri/types.h"
 
-/// control: bits 0-1 RoundMode, bits 2-6 StickyEnable; other bits read as 0 and are dropped when written.
-/// Rule: src/float/scalars.def
+/* Scalars in half (_H) and single (_S) precision, and the control and status registers.
+   Table: src/float/scalars.def */
+
+/// control: bits 0-1 RoundMode, bits 2-6 StickyEnable, which enables nothing; other bits read as 0 and are
+/// dropped when written.
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_RUR_FCR();
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_WUR_FCR(unsigned value);
 
 /// status: bits 7-11 StickyFlags (inexact, underflow, overflow, division by zero, invalid); other bits read
 /// as 0 and are dropped when written. Flags are cleared in no other way.
-/// Rule: src/float/scalars.def
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_RUR_FSR();
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_WUR_FSR(unsigned value);
 
 /// a + b, a - b, a * b, rounded by RoundMode, with flags. A NaN among the operands is the result, the first
 /// one, made quiet.
-/// Lanes: qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits, floating point.
-/// Rule: src/float/scalars.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ADD_H(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
@@ -48,8 +48,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MUL_S(
 
 /// acc + a * b (MADD), acc - a * b (MSUB), rounded once; MADDN and MSUBN to nearest whatever RoundMode says.
 /// Of several NaNs, a goes before b, b before acc.
-/// Lanes: qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits, floating point.
-/// Rule: src/float/scalars.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MADD_H(
     cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc,
@@ -92,8 +90,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MSUBN_S(
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// the sign cleared, the sign turned: bits only, NaNs too.
-/// Lanes: qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits, floating point.
-/// Rule: src/float/scalars.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ABS_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
@@ -104,8 +100,6 @@ KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_NEG_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a);
 
 /// the smaller, the larger of a and b; -0 is below +0, a NaN is the result.
-/// Lanes: qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits, floating point.
-/// Rule: src/float/scalars.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MIN_H(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
@@ -124,8 +118,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MAX_S(
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// as MIN and MAX, but a number wins over a NaN.
-/// Lanes: qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits, floating point.
-/// Rule: src/float/scalars.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MINNUM_H(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
@@ -145,8 +137,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MAXNUM_S(
 
 /// one bit for the class: bits 0-4 -infinity, -normal, -subnormal, -0, +0; bits 5-7 +subnormal, +normal,
 /// +infinity; bit 8 signalling NaN, bit 9 quiet NaN.
-/// Lanes: qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits, floating point.
-/// Rule: src/float/scalars.def
 KASTARRI_API unsigned
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_CLSFY_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a);
 KASTARRI_API unsigned
@@ -154,18 +144,13 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_CLSFY_S(const cstub_Km_ZNB_Orbis
 
 /// constant number mod 16: 0, 1, 2, 0.5, 3, 4, 0.25, 10, 0.1, pi, pi/2, 1/pi, e, ln 2, log2 e, sqrt 2,
 /// rounded to nearest.
-/// Lanes: qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits, floating point.
-/// Rule: src/float/scalars.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_CONST_H(immediate number);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_CONST_S(immediate number);
 
-/// the relation of a and b. O.. is false and U.. true when either is a NaN. Invalid: a signalling NaN, and in
-/// OLT OLE OGT OGE ULT ULE a quiet one.
-/// Lanes: vbool1 1 x 1 bit; rkbool 1 x 1 bit, unsigned; qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32
-/// bits, floating point.
-/// Rule: src/float/scalars.def
+/// the relation of a and b. O.. is false and U.. true when either is a NaN; -0 equals +0. Invalid: a
+/// signalling NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OEQ_H(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
@@ -288,8 +273,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UNEQA_H(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// x / 2^(scale mod 32), rounded by RoundMode, with flags.
-/// Lanes: qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits, floating point.
-/// Rule: src/float/scalars.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_FLOAT_H(int value, immediate scale);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
@@ -300,8 +283,6 @@ KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UFLOAT_S(unsigned int value, immediate scale);
 
 /// x / 2^(scale mod 16), rounded by RoundMode, with flags.
-/// Lanes: qv_int16 1 x 16 bits, signed; qv_int16U 1 x 16 bits, unsigned; qv_f16 1 x 16 bits, floating point.
-/// Rule: src/float/scalars.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_FLOAT16_H(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
@@ -313,8 +294,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UFLOAT16_H(
 
 /// a * 2^(scale mod 32) truncated; the bound of the integer where that is out of range, the upper one for a
 /// NaN. Inexact when a fraction is dropped, invalid when out of range.
-/// Lanes: qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits, floating point.
-/// Rule: src/float/scalars.def
 KASTARRI_API int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_TRUNC_H(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
@@ -333,8 +312,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UTRUNC_S(
     immediate scale);
 
 /// a * 2^(scale mod 16) truncated to 16 bits, otherwise as TRUNC and UTRUNC.
-/// Lanes: qv_int16 1 x 16 bits, signed; qv_int16U 1 x 16 bits, unsigned; qv_f16 1 x 16 bits, floating point.
-/// Rule: src/float/scalars.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_TRUNC16_H(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
@@ -345,9 +322,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UTRUNC16_H(
     immediate scale);
 
 /// a rounded to an integer: FIROUND to nearest, ties away from zero, FICEIL up, FIFLOOR down, FITRUNC toward
-/// zero, FIRINT by RoundMode and alone in raising inexact. A zero has the sign of a.
-/// Lanes: qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits, floating point.
-/// Rule: src/float/scalars.def
+/// zero, FIRINT by RoundMode and alone in raising inexact. A zero has the sign of a; a NaN is made quiet, a
+/// signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_FIROUND_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
@@ -371,8 +347,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_FIRINT_S(const cstub_Km_ZNB_Orbi
 
 /// of a = +-m * 2^e, 1 <= m < 2: +-m (NEXP0), +-m or, for an odd e, +-2m (NEXP01); a zero, infinity or NaN as
 /// it is.
-/// Lanes: qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits, floating point.
-/// Rule: src/float/scalars.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_NEXP0_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
@@ -384,8 +358,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_NEXP01_S(const cstub_Km_ZNB_Orbi
 
 /// 2 to the power: e of a less e of b, clamped to the exponents of normal numbers (MKDADJ); half the e of a,
 /// rounded down (MKSADJ). The e of a zero, infinity or NaN is 0.
-/// Lanes: qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits, floating point.
-/// Rule: src/float/scalars.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MKDADJ_H(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
@@ -401,8 +373,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MKSADJ_S(const cstub_Km_ZNB_Orbi
 
 /// r = r * 2^(e of a): toward zero and without flags (ADDEXP), rounded by RoundMode with flags (ADDEXPM); r
 /// stays when either is zero, infinite or a NaN.
-/// Lanes: qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits, floating point.
-/// Rule: src/float/scalars.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ADDEXP_H(
     cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
@@ -422,9 +392,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ADDEXPM_S(
 
 /// a; r = a where the boolean is true (MOVT), false (MOVF), where the integer is 0 (MOVEQZ), not 0 (MOVNEZ),
 /// at least 0 (MOVGEZ), below 0 (MOVLTZ), and else as it was.
-/// Lanes: rkbool 1 x 1 bit, unsigned; qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits, floating
-/// point.
-/// Rule: src/float/scalars.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOV_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
@@ -491,8 +458,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVLTZ_S(
     int condition);
 
 /// the bits of a number, a number of the bits; a half is the low 16.
-/// Lanes: qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits, floating point.
-/// Rule: src/float/scalars.def
 KASTARRI_API unsigned
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_RFR_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a);
 KASTARRI_API unsigned
@@ -502,11 +467,12 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_WFR_H(unsigned bits);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_WFR_S(unsigned bits);
 
-/// lane i = a[i] + b[i], rounded by RoundMode, with flags. The first NaN operand is the result, made quiet.
-/// Lanes: qv_vecNxf16 32 x 16 bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point; vboolN 32 x 1
-/// bit; vboolN_2 16 x 1 bit; vbool1 1 x 1 bit; qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits,
-/// floating point.
-/// Rule: src/float/arithmetic.def
+/* Floating-point arithmetic on vectors of halves (NXF16) and singles (N_2XF32) and on one lane (F16, F32).
+   Results are rounded by RoundMode; flags are raised by enabled lanes alone.
+   Table: src/float/arithmetic.def */
+
+/// lane i = a[i] + b[i], rounded by RoundMode, with flags. The first NaN operand is the result, made quiet. T
+/// forms keep the destination's lanes whose predicate bit is 0, which raise no flag.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDNXF16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
@@ -548,11 +514,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDF32T(
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
-/// lane i = a[i] - b[i], otherwise as ADD.
-/// Lanes: qv_vecNxf16 32 x 16 bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point; vboolN 32 x 1
-/// bit; vboolN_2 16 x 1 bit; vbool1 1 x 1 bit; qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits,
-/// floating point.
-/// Rule: src/float/arithmetic.def
+/// lane i = a[i] - b[i], otherwise as ADD. T forms keep the destination's lanes whose predicate bit is 0,
+/// which raise no flag.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBNXF16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
@@ -594,11 +557,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBF32T(
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
-/// lane i = a[i] * b[i], otherwise as ADD.
-/// Lanes: qv_vecNxf16 32 x 16 bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point; vboolN 32 x 1
-/// bit; vboolN_2 16 x 1 bit; vbool1 1 x 1 bit; qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits,
-/// floating point.
-/// Rule: src/float/arithmetic.def
+/// lane i = a[i] * b[i], otherwise as ADD. T forms keep the destination's lanes whose predicate bit is 0,
+/// which raise no flag.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULNXF16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
@@ -641,11 +601,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULF32T(
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i of acc = acc[i] + a[i] * b[i], rounded once, by RoundMode, with flags. Of several NaNs, a[i] goes
-/// before b[i], b[i] before acc[i].
-/// Lanes: qv_vecNxf16 32 x 16 bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point; vboolN 32 x 1
-/// bit; vboolN_2 16 x 1 bit; vbool1 1 x 1 bit; qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits,
-/// floating point.
-/// Rule: src/float/arithmetic.def
+/// before b[i], b[i] before acc[i]. T forms keep the destination's lanes whose predicate bit is 0, which
+/// raise no flag.
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANXF16(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& acc,
@@ -691,11 +648,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAF32T(
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
-/// lane i of acc = acc[i] - a[i] * b[i], otherwise as MULA.
-/// Lanes: qv_vecNxf16 32 x 16 bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point; vboolN 32 x 1
-/// bit; vboolN_2 16 x 1 bit; vbool1 1 x 1 bit; qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits,
-/// floating point.
-/// Rule: src/float/arithmetic.def
+/// lane i of acc = acc[i] - a[i] * b[i], otherwise as MULA. T forms keep the destination's lanes whose
+/// predicate bit is 0, which raise no flag.
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSNXF16(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& acc,
@@ -741,11 +695,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSF32T(
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
-/// lane i = a[i] without its sign: bits only, NaNs too.
-/// Lanes: qv_vecNxf16 32 x 16 bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point; vboolN 32 x 1
-/// bit; vboolN_2 16 x 1 bit; vbool1 1 x 1 bit; qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits,
-/// floating point.
-/// Rule: src/float/arithmetic.def
+/// lane i = a[i] without its sign: bits only, NaNs too. T forms keep the destination's lanes whose predicate
+/// bit is 0, which raise no flag.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
@@ -775,11 +726,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSF32T(
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
-/// lane i = a[i] with its sign turned: bits only, NaNs too.
-/// Lanes: qv_vecNxf16 32 x 16 bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point; vboolN 32 x 1
-/// bit; vboolN_2 16 x 1 bit; vbool1 1 x 1 bit; qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits,
-/// floating point.
-/// Rule: src/float/arithmetic.def
+/// lane i = a[i] with its sign turned: bits only, NaNs too. T forms keep the destination's lanes whose
+/// predicate bit is 0, which raise no flag.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
@@ -809,11 +757,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGF32T(
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
-/// lane i = the smaller of a[i] and b[i]; -0 is below +0, a NaN is the result.
-/// Lanes: qv_vecNxf16 32 x 16 bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point; vboolN 32 x 1
-/// bit; vboolN_2 16 x 1 bit; vbool1 1 x 1 bit; qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits,
-/// floating point.
-/// Rule: src/float/arithmetic.def
+/// lane i = the smaller of a[i] and b[i]; -0 is below +0, a NaN is the result. T forms keep the destination's
+/// lanes whose predicate bit is 0, which raise no flag.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNXF16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
@@ -855,11 +800,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINF32T(
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
-/// lane i = the larger of a[i] and b[i]; -0 is below +0, a NaN is the result.
-/// Lanes: qv_vecNxf16 32 x 16 bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point; vboolN 32 x 1
-/// bit; vboolN_2 16 x 1 bit; vbool1 1 x 1 bit; qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits,
-/// floating point.
-/// Rule: src/float/arithmetic.def
+/// lane i = the larger of a[i] and b[i]; -0 is below +0, a NaN is the result. T forms keep the destination's
+/// lanes whose predicate bit is 0, which raise no flag.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNXF16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
@@ -901,11 +843,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXF32T(
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
-/// lane i = the smaller of a[i] and b[i]; -0 is below +0, a number wins over a NaN.
-/// Lanes: qv_vecNxf16 32 x 16 bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point; vboolN 32 x 1
-/// bit; vboolN_2 16 x 1 bit; vbool1 1 x 1 bit; qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits,
-/// floating point.
-/// Rule: src/float/arithmetic.def
+/// lane i = the smaller of a[i] and b[i]; -0 is below +0, a number wins over a NaN. T forms keep the
+/// destination's lanes whose predicate bit is 0, which raise no flag.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMNXF16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
@@ -947,11 +886,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMF32T(
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
-/// lane i = the larger of a[i] and b[i]; -0 is below +0, a number wins over a NaN.
-/// Lanes: qv_vecNxf16 32 x 16 bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point; vboolN 32 x 1
-/// bit; vboolN_2 16 x 1 bit; vbool1 1 x 1 bit; qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits,
-/// floating point.
-/// Rule: src/float/arithmetic.def
+/// lane i = the larger of a[i] and b[i]; -0 is below +0, a number wins over a NaN. T forms keep the
+/// destination's lanes whose predicate bit is 0, which raise no flag.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMNXF16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
@@ -995,10 +931,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMF32T(
 
 /// one bit for the class of a[i]: bits 0-4 -infinity, -normal, -subnormal, -0, +0; bits 5-7 +subnormal,
 /// +normal, +infinity; bit 8 signalling NaN, bit 9 quiet NaN.
-/// Lanes: qv_vecNx16U 32 x 16 bits, unsigned; qv_vecN_2x32Uv 16 x 32 bits, unsigned; qv_vecNxf16 32 x 16
-/// bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point; qv_int16U 1 x 16 bits, unsigned; qv_f16
-/// 1 x 16 bits, floating point; rkfloat 1 x 32 bits, floating point; qv_int32Uv 1 x 32 bits, unsigned.
-/// Rule: src/float/arithmetic.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CLSFYNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& acc);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
@@ -1010,9 +942,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CLSFYF32(const cstub_Km_ZNB_Orbis_R5
 
 /// every lane = constant number mod 16: 0, 1, 2, 0.5, 3, 4, 0.25, 10, 0.1, pi, pi/2, 1/pi, e, ln 2, log2 e,
 /// sqrt 2, rounded to nearest.
-/// Lanes: qv_vecNxf16 32 x 16 bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point; qv_f16 1 x 16
-/// bits, floating point; rkfloat 1 x 32 bits, floating point.
-/// Rule: src/float/arithmetic.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CONSTNXF16(immediate number);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
@@ -1022,10 +951,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CONSTF16(immediate number);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CONSTF32(immediate number);
 
-/// lane i = a[i] rounded to the nearest integer, ties away from zero.
-/// Lanes: qv_vecNxf16 32 x 16 bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point; qv_f16 1 x 16
-/// bits, floating point; rkfloat 1 x 32 bits, floating point.
-/// Rule: src/float/arithmetic.def
+/// lane i = a[i] rounded to the nearest integer, ties away from zero. A zero has the sign of a[i]; a NaN is
+/// made quiet, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FIROUNDNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
@@ -1035,10 +962,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FIROUNDF16(const cstub_Km_ZNB_Orbis_
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FIROUNDF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a);
 
-/// lane i = a[i] rounded up to an integer.
-/// Lanes: qv_vecNxf16 32 x 16 bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point; qv_f16 1 x 16
-/// bits, floating point; rkfloat 1 x 32 bits, floating point.
-/// Rule: src/float/arithmetic.def
+/// lane i = a[i] rounded up to an integer, otherwise as FIROUND.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FICEILNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
@@ -1048,10 +972,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FICEILF16(const cstub_Km_ZNB_Orbis_R
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FICEILF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a);
 
-/// lane i = a[i] rounded down to an integer.
-/// Lanes: qv_vecNxf16 32 x 16 bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point; qv_f16 1 x 16
-/// bits, floating point; rkfloat 1 x 32 bits, floating point.
-/// Rule: src/float/arithmetic.def
+/// lane i = a[i] rounded down to an integer, otherwise as FIROUND.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FIFLOORNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
@@ -1061,10 +982,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FIFLOORF16(const cstub_Km_ZNB_Orbis_
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FIFLOORF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a);
 
-/// lane i = a[i] rounded toward zero to an integer.
-/// Lanes: qv_vecNxf16 32 x 16 bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point; qv_f16 1 x 16
-/// bits, floating point; rkfloat 1 x 32 bits, floating point.
-/// Rule: src/float/arithmetic.def
+/// lane i = a[i] rounded toward zero to an integer, otherwise as FIROUND.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FITRUNCNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
@@ -1074,10 +992,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FITRUNCF16(const cstub_Km_ZNB_Orbis_
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FITRUNCF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a);
 
-/// lane i = a[i] rounded to an integer by RoundMode; raises inexact, which the others do not.
-/// Lanes: qv_vecNxf16 32 x 16 bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point; qv_f16 1 x 16
-/// bits, floating point; rkfloat 1 x 32 bits, floating point.
-/// Rule: src/float/arithmetic.def
+/// lane i = a[i] rounded to an integer by RoundMode, otherwise as FIROUND; raises inexact, which the others
+/// do not.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FIRINTNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
@@ -1087,11 +1003,11 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FIRINTF16(const cstub_Km_ZNB_Orbis_R
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FIRINTF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a);
 
-/// bit i = 1 when a[i] == b[i]; 0 for a NaN.
-/// Lanes: qv_vecNxf16 32 x 16 bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point; vboolN 32 x 1
-/// bit; vboolN_2 16 x 1 bit; vbool1 1 x 1 bit; qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits,
-/// floating point.
-/// Rule: src/float/compare.def
+/* Floating-point comparisons: bit i of the predicate is the relation between lanes i. O.. is false and U..
+   true when either is a NaN. A signalling NaN is invalid in all of them.
+   Table: src/float/compare.def */
+
+/// bit i = 1 when a[i] == b[i]; 0 for a NaN, a signalling one is invalid. -0 equals +0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OEQNXF16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
@@ -1110,10 +1026,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OEQF32(
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// bit i = 1 when a[i] < b[i]; 0 for a NaN, which is invalid.
-/// Lanes: qv_vecNxf16 32 x 16 bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point; vboolN 32 x 1
-/// bit; vboolN_2 16 x 1 bit; vbool1 1 x 1 bit; qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits,
-/// floating point.
-/// Rule: src/float/compare.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLTNXF16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
@@ -1132,10 +1044,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLTF32(
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// bit i = 1 when a[i] <= b[i]; 0 for a NaN, which is invalid.
-/// Lanes: qv_vecNxf16 32 x 16 bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point; vboolN 32 x 1
-/// bit; vboolN_2 16 x 1 bit; vbool1 1 x 1 bit; qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits,
-/// floating point.
-/// Rule: src/float/compare.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLENXF16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
@@ -1154,10 +1062,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLEF32(
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// bit i = 1 when a[i] > b[i]; 0 for a NaN, which is invalid.
-/// Lanes: qv_vecNxf16 32 x 16 bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point; vboolN 32 x 1
-/// bit; vboolN_2 16 x 1 bit; vbool1 1 x 1 bit; qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits,
-/// floating point.
-/// Rule: src/float/compare.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGTNXF16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
@@ -1176,10 +1080,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGTF32(
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// bit i = 1 when a[i] >= b[i]; 0 for a NaN, which is invalid.
-/// Lanes: qv_vecNxf16 32 x 16 bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point; vboolN 32 x 1
-/// bit; vboolN_2 16 x 1 bit; vbool1 1 x 1 bit; qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits,
-/// floating point.
-/// Rule: src/float/compare.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGENXF16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
@@ -1197,11 +1097,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGEF32(
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
-/// bit i = 1 when a[i] == b[i] or either is a NaN.
-/// Lanes: qv_vecNxf16 32 x 16 bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point; vboolN 32 x 1
-/// bit; vboolN_2 16 x 1 bit; vbool1 1 x 1 bit; qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits,
-/// floating point.
-/// Rule: src/float/compare.def
+/// bit i = 1 when a[i] == b[i] or either is a NaN, a signalling one is invalid. -0 equals +0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UEQNXF16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
@@ -1220,10 +1116,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UEQF32(
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// bit i = 1 when a[i] < b[i] or either is a NaN, which is invalid.
-/// Lanes: qv_vecNxf16 32 x 16 bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point; vboolN 32 x 1
-/// bit; vboolN_2 16 x 1 bit; vbool1 1 x 1 bit; qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits,
-/// floating point.
-/// Rule: src/float/compare.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTNXF16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
@@ -1242,10 +1134,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTF32(
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// bit i = 1 when a[i] <= b[i] or either is a NaN, which is invalid.
-/// Lanes: qv_vecNxf16 32 x 16 bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point; vboolN 32 x 1
-/// bit; vboolN_2 16 x 1 bit; vbool1 1 x 1 bit; qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits,
-/// floating point.
-/// Rule: src/float/compare.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULENXF16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
@@ -1263,11 +1151,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULEF32(
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
-/// bit i = 1 when a[i] or b[i] is a NaN.
-/// Lanes: qv_vecNxf16 32 x 16 bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point; vboolN 32 x 1
-/// bit; vboolN_2 16 x 1 bit; vbool1 1 x 1 bit; qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits,
-/// floating point.
-/// Rule: src/float/compare.def
+/// bit i = 1 when a[i] or b[i] is a NaN, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNNXF16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
@@ -1285,11 +1169,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNF32(
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
-/// bit i = 1 when a[i] <= b[i] or either is a NaN.
-/// Lanes: qv_vecNxf16 32 x 16 bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point; vboolN 32 x 1
-/// bit; vboolN_2 16 x 1 bit; vbool1 1 x 1 bit; qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits,
-/// floating point.
-/// Rule: src/float/compare.def
+/// bit i = 1 when a[i] <= b[i] or either is a NaN, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULEQNXF16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
@@ -1307,11 +1187,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULEQF32(
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
-/// bit i = 1 when a[i] < b[i] or either is a NaN.
-/// Lanes: qv_vecNxf16 32 x 16 bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point; vboolN 32 x 1
-/// bit; vboolN_2 16 x 1 bit; vbool1 1 x 1 bit; qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits,
-/// floating point.
-/// Rule: src/float/compare.def
+/// bit i = 1 when a[i] < b[i] or either is a NaN, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTQNXF16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
@@ -1329,11 +1205,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTQF32(
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
-/// bit i = 1 when a[i] != b[i] or either is a NaN.
-/// Lanes: qv_vecNxf16 32 x 16 bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point; vboolN 32 x 1
-/// bit; vboolN_2 16 x 1 bit; vbool1 1 x 1 bit; qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits,
-/// floating point.
-/// Rule: src/float/compare.def
+/// bit i = 1 when a[i] != b[i] or either is a NaN, a signalling one is invalid. -0 equals +0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNEQNXF16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
@@ -1351,10 +1223,10 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNEQF32(
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
+/* Conversions between integers and floating point, with a scale, and between the formats.
+   Table: src/float/scaled.def */
+
 /// lane i = a[i] / 2^(scale mod 32), rounded by RoundMode, with flags.
-/// Lanes: qv_vecN_2x32v 16 x 32 bits, signed; qv_vecN_2x32Uv 16 x 32 bits, unsigned; qv_vecN_2xf32 16 x 32
-/// bits, floating point.
-/// Rule: src/float/scaled.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FLOATN_2X32(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
@@ -1365,9 +1237,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UFLOATN_2X32(
     immediate scale);
 
 /// lane i = a[i] / 2^(scale mod 16), rounded by RoundMode, with flags.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecNxf16 32 x 16 bits,
-/// floating point.
-/// Rule: src/float/scaled.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FLOATNX16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
@@ -1379,9 +1248,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UFLOATNX16(
 
 /// lane i = a[i] * 2^(scale mod 32) truncated; the bound of the integer where that is out of range, the upper
 /// one for a NaN. Inexact when a fraction is dropped, invalid when out of range.
-/// Lanes: qv_vecN_2x32v 16 x 32 bits, signed; qv_vecN_2x32Uv 16 x 32 bits, unsigned; qv_vecN_2xf32 16 x 32
-/// bits, floating point.
-/// Rule: src/float/scaled.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_TRUNCN_2XF32(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
@@ -1392,9 +1258,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UTRUNCN_2XF32(
     immediate scale);
 
 /// lane i = a[i] * 2^(scale mod 16) truncated to 16 bits, otherwise as TRUNCN_2XF32.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecNxf16 32 x 16 bits,
-/// floating point.
-/// Rule: src/float/scaled.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_TRUNCNXF16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
@@ -1406,24 +1269,18 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UTRUNCNXF16(
 
 /// a in the other format, rounded by RoundMode, with flags. A NaN is made quiet and keeps the top of its
 /// fraction.
-/// Lanes: qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits, floating point.
-/// Rule: src/float/scaled.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CVTF16F32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CVTF32F16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc);
 
 /// lane i = half lane 2i (_0) or 2i + 1 (_1) of a in single precision.
-/// Lanes: qv_vecNxf16 32 x 16 bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point.
-/// Rule: src/float/scaled.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CVTF32NXF16_0(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& acc);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CVTF32NXF16_1(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& acc);
 
 /// half lane 2i (_0) or 2i + 1 (_1) = a[i] rounded by RoundMode, with flags; the other halves 0.
-/// Lanes: qv_vecNxf16 32 x 16 bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point.
-/// Rule: src/float/scaled.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CVTF16N_2XF32_0(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& acc);
@@ -1431,9 +1288,10 @@ KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CVTF16N_2XF32_1(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& acc);
 
+/* Loads and stores of singles that are halves in memory, at any byte address.
+   Table: src/float/memory.def */
+
 /// lane i = the half in memory in single precision; a signalling NaN becomes quiet and is invalid.
-/// Lanes: qv_vecN_2xf32 16 x 32 bits, floating point; qv_vecN_2xf16 16 x 16 bits, floating point.
-/// Rule: src/float/memory.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16_I(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base,
@@ -1455,9 +1313,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16_XP(
 
 /// lane i = the half in memory in single precision where predicate bit i is 1, else 0 and no flag; all 32
 /// bytes are read.
-/// Lanes: qv_vecN_2xf32 16 x 32 bits, floating point; qv_vecN_2xf16 16 x 16 bits, floating point; vboolN_2 16
-/// x 1 bit.
-/// Rule: src/float/memory.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16T_I(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base,
@@ -1482,8 +1337,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16T_XP(
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// writes the lanes as halves, rounded by RoundMode, with flags.
-/// Lanes: qv_vecN_2xf32 16 x 32 bits, floating point; qv_vecN_2xf16 16 x 16 bits, floating point.
-/// Rule: src/float/memory.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF16_I(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
@@ -1507,9 +1360,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF16_XP(
 
 /// writes the lanes whose predicate bit is 1 as halves, rounded by RoundMode, with their flags alone, and
 /// leaves the others in memory as they are; memory is not touched when every bit is 0.
-/// Lanes: qv_vecN_2xf32 16 x 32 bits, floating point; qv_vecN_2xf16 16 x 16 bits, floating point; vboolN_2 16
-/// x 1 bit.
-/// Rule: src/float/memory.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF16T_I(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,

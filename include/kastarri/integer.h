@@ -6,8 +6,10 @@
 #include "kastarri/library.h"
 #include "kastarri/types.h"
 
-/// lane i = a[i] + b[i], modulo 2^w.
-/// Rule: src/integer/arithmetic.def
+/* Addition, subtraction, negation, absolute values.
+   Table: src/integer/arithmetic.def */
+
+/// lane i = a[i] + b[i], modulo 2^w. T forms keep the destination's lanes whose predicate bit is 0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD8(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
@@ -129,8 +131,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDN_2X32UT(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
-/// lane i = a[i] - b[i], modulo 2^w.
-/// Rule: src/integer/arithmetic.def
+/// lane i = a[i] - b[i], modulo 2^w. T forms keep the destination's lanes whose predicate bit is 0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB8(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
@@ -252,8 +253,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBN_2X32UT(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
-/// lane i = -a[i], modulo 2^w: the most negative value is its own negative.
-/// Rule: src/integer/arithmetic.def
+/// lane i = -a[i], modulo 2^w: the most negative value is its own negative. T forms keep the destination's
+/// lanes whose predicate bit is 0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEG8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
@@ -299,9 +300,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGN_2X32(const cstub_Km_ZNB_Orbis_R
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
 
-/// lane i = a[i] + b[i], clamped to the signed range of the lane.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; vboolN 32 x 1 bit; vbool1 1 x 1 bit; qv_int16 1 x 16 bits, signed.
-/// Rule: src/integer/arithmetic.def
+/// lane i = a[i] + b[i], clamped to the signed range of the lane. T forms keep the destination's lanes whose
+/// predicate bit is 0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDS16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
@@ -323,9 +323,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDSNX16T(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
-/// lane i = a[i] - b[i], clamped to the signed range of the lane.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; vboolN 32 x 1 bit; vbool1 1 x 1 bit; qv_int16 1 x 16 bits, signed.
-/// Rule: src/integer/arithmetic.def
+/// lane i = a[i] - b[i], clamped to the signed range of the lane. T forms keep the destination's lanes whose
+/// predicate bit is 0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBS16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
@@ -347,9 +346,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBSNX16T(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
-/// lane i = -a[i], clamped to the signed range of the lane: the most negative value gives the largest one.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; vboolN 32 x 1 bit; vbool1 1 x 1 bit; qv_int16 1 x 16 bits, signed.
-/// Rule: src/integer/arithmetic.def
+/// lane i = -a[i], clamped to the signed range of the lane: the most negative value gives the largest one. T
+/// forms keep the destination's lanes whose predicate bit is 0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGS16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a);
 KASTARRI_API void
@@ -366,9 +364,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGSNX16T(
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// lane i = |a[i]|, modulo 2^w: the most negative value stays as it is.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits,
-/// signed; qv_int8 1 x 8 bits, signed; qv_int16 1 x 16 bits, signed; qv_int32v 1 x 32 bits, signed.
-/// Rule: src/integer/arithmetic.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABS8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
@@ -382,18 +377,21 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSNX16(const cstub_Km_ZNB_Orbis_R5_
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
 
+/// lane i = |a[i]|, modulo 2^w: the most negative value stays as it is; bit i of p = 1 when a[i] is negative,
+/// else 0.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_BABSNX16(
+    cstub_Km_ZNB_Orbis_R5_64k_vboolN& p,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
+
 /// lane i = |a[i]|, clamped to the signed range of the lane: the most negative value gives the largest one.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_int16 1 x 16 bits, signed.
-/// Rule: src/integer/arithmetic.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSS16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
 
 /// lane i = |a[i] - b[i]| of signed a[i] and b[i], exact as an unsigned lane.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vecNx16 32 x 16 bits, signed; qv_int8 1 x 8 bits, signed;
-/// qv_int16 1 x 16 bits, signed.
-/// Rule: src/integer/arithmetic.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSUB8(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
@@ -412,9 +410,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSUBNX16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
 /// lane i = |a[i] - b[i]| of unsigned a[i] and b[i].
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vecNx16 32 x 16 bits, signed;
-/// qv_vecNx16U 32 x 16 bits, unsigned; qv_int8U 1 x 8 bits, unsigned; qv_int16U 1 x 16 bits, unsigned.
-/// Rule: src/integer/arithmetic.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSUBU8U(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
@@ -441,8 +436,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSUBUNX16U(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
 
 /// lane i = |a[i] - b[i]| of signed a[i] and b[i], clamped to the signed range of the lane.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_int16 1 x 16 bits, signed.
-/// Rule: src/integer/arithmetic.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSSUB16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
@@ -452,11 +445,11 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSSUBNX16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
-/// lane i = the smaller of a[i] and b[i], compared as signed.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits,
-/// signed; vboolN 32 x 1 bit; vbool1 1 x 1 bit; qv_int8 1 x 8 bits, signed; qv_int16 1 x 16 bits, signed;
-/// qv_int32v 1 x 32 bits, signed.
-/// Rule: src/integer/extremes.def
+/* Smaller, larger and mean of two lanes.
+   Table: src/integer/extremes.def */
+
+/// lane i = the smaller of a[i] and b[i], compared as signed. T forms keep the destination's lanes whose
+/// predicate bit is 0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MIN8(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
@@ -494,11 +487,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINN_2X32(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
 
-/// lane i = the larger of a[i] and b[i], compared as signed.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits,
-/// signed; vboolN 32 x 1 bit; vbool1 1 x 1 bit; qv_int8 1 x 8 bits, signed; qv_int16 1 x 16 bits, signed;
-/// qv_int32v 1 x 32 bits, signed.
-/// Rule: src/integer/extremes.def
+/// lane i = the larger of a[i] and b[i], compared as signed. T forms keep the destination's lanes whose
+/// predicate bit is 0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAX8(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
@@ -536,8 +526,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXN_2X32(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
 
-/// lane i = the smaller of a[i] and b[i], compared as unsigned.
-/// Rule: src/integer/extremes.def
+/// lane i = the smaller of a[i] and b[i], compared as unsigned. T forms keep the destination's lanes whose
+/// predicate bit is 0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINU8U(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
@@ -593,8 +583,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINUN_2X32U(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
 
-/// lane i = the larger of a[i] and b[i], compared as unsigned.
-/// Rule: src/integer/extremes.def
+/// lane i = the larger of a[i] and b[i], compared as unsigned. T forms keep the destination's lanes whose
+/// predicate bit is 0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXU8U(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
@@ -651,9 +641,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXUN_2X32U(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
 
 /// lane i = floor((a[i] + b[i]) / 2) of signed a[i] and b[i], never overflowing.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vecNx16 32 x 16 bits, signed; qv_int8 1 x 8 bits, signed;
-/// qv_int16 1 x 16 bits, signed.
-/// Rule: src/integer/extremes.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVG8(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
@@ -672,9 +659,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGNX16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
 /// lane i = floor((a[i] + b[i]) / 2) of unsigned a[i] and b[i], never overflowing.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vecNx16 32 x 16 bits, signed;
-/// qv_vecNx16U 32 x 16 bits, unsigned; qv_int8U 1 x 8 bits, unsigned; qv_int16U 1 x 16 bits, unsigned.
-/// Rule: src/integer/extremes.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGU8U(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
@@ -701,9 +685,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGUNX16U(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
 
 /// lane i = floor((a[i] + b[i] + 1) / 2) of signed a[i] and b[i], never overflowing: halves round up.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vecNx16 32 x 16 bits, signed; qv_int8 1 x 8 bits, signed;
-/// qv_int16 1 x 16 bits, signed.
-/// Rule: src/integer/extremes.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGR8(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
@@ -722,9 +703,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGRNX16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
 /// lane i = floor((a[i] + b[i] + 1) / 2) of unsigned a[i] and b[i], never overflowing: halves round up.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vecNx16 32 x 16 bits, signed;
-/// qv_vecNx16U 32 x 16 bits, unsigned; qv_int8U 1 x 8 bits, unsigned; qv_int16U 1 x 16 bits, unsigned.
-/// Rule: src/integer/extremes.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGRU8U(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
@@ -750,8 +728,10 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGRUNX16U(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
 
+/* Bitwise logic on whole registers.
+   Table: src/integer/logic.def */
+
 /// the bits that are 1 in both a and b.
-/// Rule: src/integer/logic.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND8(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
@@ -810,7 +790,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDN_4X64(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& b);
 
 /// the bits that are 1 in a or b.
-/// Rule: src/integer/logic.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR8(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
@@ -869,7 +848,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORN_4X64(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& b);
 
 /// the bits in which a and b differ.
-/// Rule: src/integer/logic.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR8(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
@@ -928,7 +906,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORN_4X64(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& b);
 
 /// every bit of a turned.
-/// Rule: src/integer/logic.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NOT16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
@@ -952,12 +929,12 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NOTN_2X32U(const cstub_Km_ZNB_Orbis_
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NOTN_4X64(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& a);
 
+/* Shifts by a count a lane. A count is the whole signed lane, of the signed and of the unsigned types: a
+   negative one shifts the other way, and a magnitude of the lane width w or more leaves no bit of the lane.
+   Table: src/integer/shifts.def */
+
 /// lane i = a[i] shifted left by b[i], zeros shifted in; right by -b[i] when b[i] is negative; 0 when |b[i]|
 /// >= w.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecN_2x32v 16 x 32 bits,
-/// signed; qv_vecN_2x32Uv 16 x 32 bits, unsigned; qv_int16 1 x 16 bits, signed; qv_int16U 1 x 16 bits,
-/// unsigned; qv_int32v 1 x 32 bits, signed; qv_int32Uv 1 x 32 bits, unsigned.
-/// Rule: src/integer/shifts.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLL16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
@@ -993,10 +970,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLN_2X32U(
 
 /// lane i = a[i] shifted right by b[i], zeros shifted in; left by -b[i] when b[i] is negative; 0 when |b[i]|
 /// >= w.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecN_2x32v 16 x 32 bits,
-/// signed; qv_vecN_2x32Uv 16 x 32 bits, unsigned; qv_int16 1 x 16 bits, signed; qv_int16U 1 x 16 bits,
-/// unsigned; qv_int32v 1 x 32 bits, signed; qv_int32Uv 1 x 32 bits, unsigned.
-/// Rule: src/integer/shifts.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRL16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
@@ -1032,9 +1005,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLN_2X32U(
 
 /// lane i = a[i] shifted right by b[i], copies of the sign shifted in, all sign when b[i] >= w; left by -b[i]
 /// when b[i] is negative, 0 when b[i] <= -w.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits, signed; qv_int16 1 x 16 bits, signed;
-/// qv_int32v 1 x 32 bits, signed.
-/// Rule: src/integer/shifts.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRA16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
@@ -1054,9 +1024,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRAN_2X32(
 
 /// lane i = a[i] * 2^b[i], clamped to the signed range of the lane; when b[i] is negative a[i] shifted right
 /// by -b[i], copies of the sign shifted in.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits, signed; qv_int16 1 x 16 bits, signed;
-/// qv_int32v 1 x 32 bits, signed.
-/// Rule: src/integer/shifts.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLS16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
@@ -1074,8 +1041,10 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLSN_2X32(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
 
+/* Shifts by one immediate count for all lanes, which is taken modulo the lane width w.
+   Table: src/integer/immediate_shifts.def */
+
 /// lane i = a[i] shifted left by the immediate modulo w, zeros shifted in.
-/// Rule: src/integer/immediate_shifts.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLI8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a, immediate i);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
@@ -1118,7 +1087,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLIN_2X32U(
     immediate i);
 
 /// lane i = a[i] shifted right by the immediate modulo w, zeros shifted in.
-/// Rule: src/integer/immediate_shifts.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLI8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a, immediate i);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
@@ -1162,10 +1130,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLIN_2X32U(
 
 /// lane i = a[i] shifted right by the immediate modulo w, copies of the sign shifted in (of the unsigned
 /// types too).
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vecNx16 32 x 16 bits, signed;
-/// qv_vecN_2x32v 16 x 32 bits, signed; qv_int8 1 x 8 bits, signed; qv_int8U 1 x 8 bits, unsigned; qv_int16 1
-/// x 16 bits, signed; qv_int32v 1 x 32 bits, signed.
-/// Rule: src/integer/immediate_shifts.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRAI8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a, immediate i);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
@@ -1192,9 +1156,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRAIN_2X32(
     immediate i);
 
 /// lane i = a[i] * 2^(immediate modulo w), clamped to the signed range of the lane.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits, signed; qv_int16 1 x 16 bits, signed;
-/// qv_int32v 1 x 32 bits, signed.
-/// Rule: src/integer/immediate_shifts.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLSI16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, immediate i);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
@@ -1208,11 +1169,10 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLSIN_2X32(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     immediate i);
 
+/* Rotations and the counts by which a lane can be shifted left until it is normalised.
+   Table: src/integer/rotates.def */
+
 /// lane i = a[i] rotated right by b[i] modulo w.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecN_2x32v 16 x 32 bits,
-/// signed; qv_vecN_2x32Uv 16 x 32 bits, unsigned; qv_int16 1 x 16 bits, signed; qv_int16U 1 x 16 bits,
-/// unsigned; qv_int32v 1 x 32 bits, signed; qv_int32Uv 1 x 32 bits, unsigned.
-/// Rule: src/integer/rotates.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTR16(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
@@ -1247,7 +1207,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRN_2X32U(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
 
 /// lane i = a[i] rotated right by the immediate modulo w.
-/// Rule: src/integer/rotates.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRI8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a, immediate i);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
@@ -1292,9 +1251,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRIN_2X32U(
     immediate i);
 
 /// lane i = the number of copies of the sign bit below it in a[i]: w - 1 for 0 and -1.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecN_2x32v 16 x 32 bits, signed; qv_int16 1 x 16 bits, signed;
-/// qv_int32v 1 x 32 bits, signed.
-/// Rule: src/integer/rotates.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NSA16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
@@ -1305,10 +1261,6 @@ KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NSAN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
 
 /// lane i = the number of zero bits above the highest 1 in a[i]: w for 0.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecN_2x32v 16 x 32 bits,
-/// signed; qv_vecN_2x32Uv 16 x 32 bits, unsigned; qv_int16U 1 x 16 bits, unsigned; qv_int32Uv 1 x 32 bits,
-/// unsigned.
-/// Rule: src/integer/rotates.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NSAU16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
@@ -1322,8 +1274,11 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NSAUN_2X32(const cstub_Km_ZNB_Orbis_
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NSAUN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
 
-/// every lane = lane number (immediate modulo the number of lanes) of a.
-/// Rule: src/integer/replicate.def
+/* One value in every lane, and a lane alone.
+   Table: src/integer/replicate.def */
+
+/// every lane = lane number (immediate modulo the number of lanes) of a. T forms keep the destination's lanes
+/// whose predicate bit is 0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REP2NX8(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
@@ -1385,8 +1340,13 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REPN_2X32UT(
     immediate i,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
+/// lane number (immediate modulo the number of lanes) of a.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SELS2NX8(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    immediate i);
+
 /// every bit is 0.
-/// Rule: src/integer/replicate.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ZERO2NX8();
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ZERO2NX8U();
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ZERONX16();
@@ -1409,8 +1369,11 @@ KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48 cstub_Km_ZNB_Orbis_R5_64k__KOR
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ZERON_2X64W();
 
+/* Comparisons: bit i of the predicate is the relation between lanes i, the one bit of a vbool1 that of
+   scalars.
+   Table: src/integer/compare.def */
+
 /// bit i = 1 when a[i] == b[i], else 0.
-/// Rule: src/integer/compare.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQ8(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
@@ -1461,7 +1424,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQN_2X32U(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
 
 /// bit i = 1 when a[i] != b[i], else 0.
-/// Rule: src/integer/compare.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQ8(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
@@ -1512,7 +1474,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQN_2X32U(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
 
 /// bit i = 1 when a[i] < b[i], compared as signed, else 0.
-/// Rule: src/integer/compare.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LT8(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
@@ -1539,7 +1500,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTN_2X32(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
 
 /// bit i = 1 when a[i] <= b[i], compared as signed, else 0.
-/// Rule: src/integer/compare.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LE8(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
@@ -1566,7 +1526,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEN_2X32(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
 
 /// bit i = 1 when a[i] > b[i], compared as signed, else 0.
-/// Rule: src/integer/compare.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GT8(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
@@ -1593,7 +1552,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GTN_2X32(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
 
 /// bit i = 1 when a[i] >= b[i], compared as signed, else 0.
-/// Rule: src/integer/compare.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GE8(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
@@ -1620,7 +1578,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GEN_2X32(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
 
 /// bit i = 1 when a[i] < b[i], compared as unsigned, else 0.
-/// Rule: src/integer/compare.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTU8U(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
@@ -1659,7 +1616,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTUN_2X32U(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
 
 /// bit i = 1 when a[i] <= b[i], compared as unsigned, else 0.
-/// Rule: src/integer/compare.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEU8U(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
@@ -1698,7 +1654,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEUN_2X32U(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
 
 /// bit i = 1 when a[i] > b[i], compared as unsigned, else 0.
-/// Rule: src/integer/compare.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GTU8U(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
@@ -1725,7 +1680,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GTUN_2X32U(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
 
 /// bit i = 1 when a[i] >= b[i], compared as unsigned, else 0.
-/// Rule: src/integer/compare.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GEU8U(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
@@ -1751,10 +1705,10 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GEUN_2X32U(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
 
+/* Logic on predicates, their reductions, and predicates of the first lanes. One-bit results hold 0 or 1.
+   Table: src/integer/predicates.def */
+
 /// bit i = a[i] and b[i].
-/// Lanes: vboolN 32 x 1 bit; vbool2N 64 x 1 bit; vboolN_2 16 x 1 bit; vbool1 1 x 1 bit; rkbool 1 x 1 bit,
-/// unsigned.
-/// Rule: src/integer/predicates.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDB(
     const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
@@ -1777,9 +1731,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDBN_2(
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& b);
 
 /// bit i = a[i] or b[i].
-/// Lanes: vboolN 32 x 1 bit; vbool2N 64 x 1 bit; vboolN_2 16 x 1 bit; vbool1 1 x 1 bit; rkbool 1 x 1 bit,
-/// unsigned.
-/// Rule: src/integer/predicates.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORB(
     const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
@@ -1802,9 +1753,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORBN_2(
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& b);
 
 /// bit i = 1 when a[i] and b[i] differ.
-/// Lanes: vboolN 32 x 1 bit; vbool2N 64 x 1 bit; vboolN_2 16 x 1 bit; vbool1 1 x 1 bit; rkbool 1 x 1 bit,
-/// unsigned.
-/// Rule: src/integer/predicates.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORB(
     const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
@@ -1827,9 +1775,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORBN_2(
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& b);
 
 /// bit i = a[i] and not b[i].
-/// Lanes: vboolN 32 x 1 bit; vbool2N 64 x 1 bit; vboolN_2 16 x 1 bit; vbool1 1 x 1 bit; rkbool 1 x 1 bit,
-/// unsigned.
-/// Rule: src/integer/predicates.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDNOTB(
     const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
@@ -1852,9 +1797,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDNOTBN_2(
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& b);
 
 /// bit i = a[i] or not b[i].
-/// Lanes: vboolN 32 x 1 bit; vbool2N 64 x 1 bit; vboolN_2 16 x 1 bit; vbool1 1 x 1 bit; rkbool 1 x 1 bit,
-/// unsigned.
-/// Rule: src/integer/predicates.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORNOTB(
     const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
@@ -1877,9 +1819,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORNOTBN_2(
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& b);
 
 /// bit i = not a[i].
-/// Lanes: vboolN 32 x 1 bit; vbool2N 64 x 1 bit; vboolN_2 16 x 1 bit; vbool1 1 x 1 bit; rkbool 1 x 1 bit,
-/// unsigned.
-/// Rule: src/integer/predicates.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NOTB(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
@@ -1892,8 +1831,6 @@ KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NOTBN_2(const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& a);
 
 /// 1 when every bit of p is 1, else 0.
-/// Lanes: vboolN 32 x 1 bit; vbool2N 64 x 1 bit; vboolN_2 16 x 1 bit; vbool1 1 x 1 bit.
-/// Rule: src/integer/predicates.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDB2N(const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& a);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
@@ -1902,8 +1839,6 @@ KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDBN_2(const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& a);
 
 /// 1 when any bit of p is 1, else 0.
-/// Lanes: vboolN 32 x 1 bit; vbool2N 64 x 1 bit; vboolN_2 16 x 1 bit; vbool1 1 x 1 bit.
-/// Rule: src/integer/predicates.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORB2N(const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& a);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
@@ -1913,8 +1848,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORBN_2(const cstub_Km_ZNB_Orbis_R5_
 
 /// bits 0 to (n modulo the number of lanes) - 1 are 1, the others 0: none when n is a multiple of the number
 /// of lanes.
-/// Lanes: vboolN 32 x 1 bit; vbool2N 64 x 1 bit; vboolN_2 16 x 1 bit.
-/// Rule: src/integer/predicates.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool2N cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTR2N(int n);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool2N
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTR2NI(immediate n);
@@ -1925,25 +1858,20 @@ KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTRN_2I(immediate n);
 
 /// bits 0 to n - 1 are 1, the others 0: none when n is negative, all when n is the number of lanes or more.
-/// Lanes: vboolN 32 x 1 bit; vbool2N 64 x 1 bit; vboolN_2 16 x 1 bit.
-/// Rule: src/integer/predicates.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool2N cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTRS2N(int n);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTRSN(int n);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTRSN_2(int n);
 
+/* All lanes, or those whose predicate bit is 1, to one value: sums, extremes, bitwise logic.
+   Table: src/integer/reductions.def */
+
 /// the sum of all signed lanes, exact.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vecNx16 32 x 16 bits, signed; qv_int16 1 x 16 bits, signed;
-/// qv_int32v 1 x 32 bits, signed.
-/// Rule: src/integer/reductions.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADD2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADDNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
 
 /// the sum of the signed lanes whose predicate bit is 1, exact.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vecNx16 32 x 16 bits, signed; vboolN 32 x 1 bit; vbool2N 64 x 1
-/// bit; qv_int16 1 x 16 bits, signed; qv_int32v 1 x 32 bits, signed.
-/// Rule: src/integer/reductions.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADD2NX8T(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
@@ -1954,18 +1882,12 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADDNX16T(
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// the sum of all unsigned lanes, exact.
-/// Lanes: qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vecNx16U 32 x 16 bits, unsigned; qv_int16U 1 x 16 bits,
-/// unsigned; qv_int32Uv 1 x 32 bits, unsigned.
-/// Rule: src/integer/reductions.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADDU2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADDUNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
 
 /// the sum of the unsigned lanes whose predicate bit is 1, exact.
-/// Lanes: qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vecNx16U 32 x 16 bits, unsigned; vboolN 32 x 1 bit; vbool2N
-/// 64 x 1 bit; qv_int16U 1 x 16 bits, unsigned; qv_int32Uv 1 x 32 bits, unsigned.
-/// Rule: src/integer/reductions.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADDU2NX8T(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
@@ -1976,18 +1898,12 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADDUNX16T(
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// the sum of all lanes, modulo 2^32.
-/// Lanes: qv_vecN_2x32v 16 x 32 bits, signed; qv_vecN_2x32Uv 16 x 32 bits, unsigned; qv_int32v 1 x 32 bits,
-/// signed; qv_int32Uv 1 x 32 bits, unsigned.
-/// Rule: src/integer/reductions.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADDN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADDN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
 
 /// the sum of the lanes whose predicate bit is 1, modulo 2^32.
-/// Lanes: qv_vecN_2x32v 16 x 32 bits, signed; qv_vecN_2x32Uv 16 x 32 bits, unsigned; vboolN_2 16 x 1 bit;
-/// qv_int32v 1 x 32 bits, signed; qv_int32Uv 1 x 32 bits, unsigned.
-/// Rule: src/integer/reductions.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADDN_2X32T(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
@@ -1998,17 +1914,327 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADDN_2X32UT(
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// the sum of all signed lanes, clamped once to the signed range of a lane.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_int16 1 x 16 bits, signed.
-/// Rule: src/integer/reductions.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADDSNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
 
 /// the sum of the signed lanes whose predicate bit is 1, clamped once to the signed range of a lane.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; vboolN 32 x 1 bit; qv_int16 1 x 16 bits, signed.
-/// Rule: src/integer/reductions.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADDSNX16T(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// the largest signed lane.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAX2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
+
+/// the largest signed lane of those whose predicate bit is 1; without any, the lowest number of a lane.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAX2NX8T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXNX16T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXN_2X32T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// the smallest signed lane.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMIN2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
+
+/// the smallest signed lane of those whose predicate bit is 1; without any, the highest number of a lane.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMIN2NX8T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINNX16T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINN_2X32T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// the largest unsigned lane.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXU2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXUNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXUN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
+
+/// the largest unsigned lane of those whose predicate bit is 1; without any, 0.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXU2NX8T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXUNX16T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXUN_2X32T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// the smallest unsigned lane.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINU2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINUNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINUN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
+
+/// the smallest unsigned lane of those whose predicate bit is 1; without any, the highest number of a lane.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINU2NX8T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINUNX16T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINUN_2X32T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// the exclusive or of all lanes.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXOR2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXOR2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
+
+/// the exclusive or of the lanes whose predicate bit is 1; without any, 0.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXOR2NX8T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXOR2NX8UT(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORNX16T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORNX16UT(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORN_2X32T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORN_2X32UT(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// the bits that are 1 in any lane.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROR2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROR2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
+
+/// the bits that are 1 in any lane whose predicate bit is 1; without any such lane, 0.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROR2NX8T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROR2NX8UT(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORNX16T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORNX16UT(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORN_2X32T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORN_2X32UT(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// the bits that are 1 in every lane.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RAND2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RAND2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
+
+/// the bits that are 1 in every lane whose predicate bit is 1; without any such lane, all ones.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RAND2NX8T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RAND2NX8UT(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDNX16T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDNX16UT(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDN_2X32T(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDN_2X32UT(
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// acc = the larger of acc and the largest lane of a, all signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXA2NX8(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXANX16(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXAN_2X32(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
+
+/// acc = the smaller of acc and the smallest lane of a, all signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINA2NX8(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINANX16(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINAN_2X32(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
+
+/// acc = the exclusive or of acc and all lanes of a.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORA2NX8(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORA2NX8U(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORANX16(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORANX16U(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORAN_2X32(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORAN_2X32U(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
+
+/// acc = the bits that are 1 in acc or any lane of a.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORA2NX8(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORA2NX8U(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORANX16(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORANX16U(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORAN_2X32(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORAN_2X32U(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
+
+/// acc = the bits that are 1 in acc and every lane of a.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDA2NX8(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDA2NX8U(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDANX16(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDANX16U(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDAN_2X32(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDAN_2X32U(
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
 
 #endif

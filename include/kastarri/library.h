@@ -21,8 +21,8 @@ KASTARRI_API const char* cstub_Km_ZNB_Orbis_R5_64k_target();
 #define KASTARRI_DOTTED(MAJOR, MINOR, PATCH) KASTARRI_DOTTED_AS_IS(MAJOR, MINOR, PATCH)
 #define KASTARRI_DOTTED_AS_IS(MAJOR, MINOR, PATCH) #MAJOR "." #MINOR "." #PATCH
 
-#ifndef __i386__
-#error "kastarri is a library for 32-bit x86: compile with -m32"
+#if !defined __i386__ && !(defined __x86_64__ && defined __LP64__)
+#error "kastarri is a library for x86: compile with -m32 or -m64, the width of the library that you link"
 #endif
 
 #endif

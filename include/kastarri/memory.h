@@ -6,8 +6,12 @@
 #include "kastarri/library.h"
 #include "kastarri/types.h"
 
+/* Loads and stores of whole vectors, at any byte address: no alignment is tested and none is imposed. Modes:
+   _I and _X at base + offset bytes; _IP and _XP at the pointer, which then moves by the increment. In memory
+   all types look alike; the lanes matter to a predicate only.
+   Table: src/memory/vectors.def */
+
 /// the 64 bytes at the address.
-/// Rule: src/memory/vectors.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LV2NX8_I(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8* base,
@@ -172,7 +176,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_4X64_XP(
     int increment);
 
 /// lane i = the lane in memory where predicate bit i is 1, else 0; all 64 bytes are read.
-/// Rule: src/memory/vectors.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LV2NX8T_I(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8* base,
@@ -351,7 +354,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF32T_XP(
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// writes the 64 bytes at the address.
-/// Rule: src/memory/vectors.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SV2NX8_I(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
@@ -534,8 +536,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_4X64_XP(
     int increment);
 
 /// writes the lanes whose predicate bit is 1 and leaves the others in memory as they are; memory is not
-/// touched when every bit is 0, else all 64 bytes are read and written back.
-/// Rule: src/memory/vectors.def
+/// touched when every bit is 0, else all 64 bytes may be read and written back.
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SV2NX8T_I(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
@@ -729,11 +730,11 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF32T_XP(
     int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
+/* Loads into wider lanes and stores into narrower ones: 32 bytes of memory for a vector of 64, at any byte
+   address. Modes as of whole vectors.
+   Table: src/memory/widening.def */
+
 /// lane i = lane i of the 32 bytes at the address, sign-extended (..S) or zero-extended (..U).
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecN_2x32v 16 x 32 bits,
-/// signed; qv_vecN_2x32Uv 16 x 32 bits, unsigned; qv_vecNx8 32 x 8 bits, signed; qv_vecNx8U 32 x 8 bits,
-/// unsigned; qv_vecN_2x16 16 x 16 bits, signed; qv_vecN_2x16U 16 x 16 bits, unsigned.
-/// Rule: src/memory/widening.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX8S_I(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base,
@@ -809,7 +810,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X16U_XP(
 
 /// lane i = lane i of the 32 bytes at the address, extended, where predicate bit i is 1, else 0; all 32 bytes
 /// are read.
-/// Rule: src/memory/widening.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX8ST_I(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base,
@@ -900,10 +900,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X16UT_XP(
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// writes 32 bytes at the address: lane i saturated to half its width (..S) or its low half (..U).
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecN_2x32v 16 x 32 bits,
-/// signed; qv_vecN_2x32Uv 16 x 32 bits, unsigned; qv_vecNx8 32 x 8 bits, signed; qv_vecNx8U 32 x 8 bits,
-/// unsigned; qv_vecN_2x16 16 x 16 bits, signed; qv_vecN_2x16U 16 x 16 bits, unsigned.
-/// Rule: src/memory/widening.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8S_I(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
@@ -986,8 +982,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16U_XP(
     int increment);
 
 /// the same for the lanes whose predicate bit is 1; the others stay in memory as they are. Memory is not
-/// touched when every bit is 0, else all 32 bytes are read and written back.
-/// Rule: src/memory/widening.def
+/// touched when every bit is 0, else all 32 bytes may be read and written back.
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8ST_I(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
@@ -1085,9 +1080,11 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16UT_XP(
     int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
+/* Loads and stores of one element. The number in a name is the element's width in memory; NX8S to N_2X16U
+   are extended to the register's lane and narrowed from it. Modes as of whole vectors.
+   Table: src/memory/elements.def */
+
 /// the element at the address; no alignment is tested.
-/// Lanes: qv_int8 1 x 8 bits, signed; qv_int8U 1 x 8 bits, unsigned; qv_int256 1 x 256 bits.
-/// Rule: src/memory/elements.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LS2NX8_I(const signed char* base, int offset);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
@@ -1136,11 +1133,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_16X256_XP(
     int increment);
 
 /// the element at the address, which may be any. The post-increment modes demand of the destination object,
-/// not of the element, that it be aligned: to 2 bytes where it is made of 16-bit units, else to 4.
-/// Lanes: qv_int16 1 x 16 bits, signed; qv_int16U 1 x 16 bits, unsigned; qv_f16 1 x 16 bits, floating point;
-/// rkfloat 1 x 32 bits, floating point; qv_int32v 1 x 32 bits, signed; qv_int32Uv 1 x 32 bits, unsigned;
-/// qv_int64 1 x 64 bits, signed; qv_int128 1 x 128 bits.
-/// Rule: src/memory/elements.def
+/// not of the element, that it be aligned, or the program ends: to 2 bytes where it is made of 16-bit units,
+/// else to 4.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSNX16_I(const short* base, int offset);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
@@ -1267,10 +1261,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_8X128_XP(
     int increment);
 
 /// the element at the address, which may be any, sign-extended (..S) or zero-extended (..U). The
-/// post-increment modes demand that the destination object be aligned, as above.
-/// Lanes: qv_int16 1 x 16 bits, signed; qv_int16U 1 x 16 bits, unsigned; qv_int32v 1 x 32 bits, signed;
-/// qv_int32Uv 1 x 32 bits, unsigned.
-/// Rule: src/memory/elements.def
+/// post-increment modes demand that the destination object be aligned, or the program ends, as above.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSNX8S_I(const signed char* base, int offset);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
@@ -1330,9 +1321,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_2X16U_XP(
 
 /// writes lane 0 at the address; no alignment is tested. SSNX8S saturates it to 8 bits, SSNX8U writes its low
 /// byte.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vecNx16 32 x 16 bits, signed;
-/// qv_vecNx16U 32 x 16 bits, unsigned; qv_vecN_16x256 2 x 256 bits; qv_int256 1 x 256 bits.
-/// Rule: src/memory/elements.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SS2NX8_I(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
@@ -1434,9 +1422,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_16X256_XP(
     cstub_Km_ZNB_Orbis_R5_64k_qv_int256** pointer,
     int increment);
 
-/// writes lane 0 at the address, which must be aligned: to 2 bytes for 16-bit elements, else to 4. SSN_2X16S
-/// saturates it to 16 bits, SSN_2X16U writes its low half.
-/// Rule: src/memory/elements.def
+/// writes lane 0 at the address, which must be aligned, or the program ends: to 2 bytes for 16-bit elements,
+/// else to 4. SSN_2X16S saturates it to 16 bits, SSN_2X16U writes its low half.
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNX16_I(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
@@ -1640,7 +1627,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_8X128_XP(
 
 /// every lane = the element at the address; no alignment is tested. NX8S and N_2X16S sign-extend it, NX8U and
 /// N_2X16U zero-extend it.
-/// Rule: src/memory/elements.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSR2NX8_I(const signed char* base, int offset);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
@@ -1832,10 +1818,11 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_2X16U_XP(
     const unsigned short** pointer,
     int increment);
 
+/* Predicates in memory.
+   Table: src/memory/predicates.def */
+
 /// the predicate at the address: any address with an offset; with post-increment one aligned to 4 bytes, of
-/// LBN_2 to 2.
-/// Lanes: vboolN 32 x 1 bit; vbool2N 64 x 1 bit; vboolN_2 16 x 1 bit.
-/// Rule: src/memory/predicates.def
+/// LBN_2 to 2, or the program ends.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LBN_I(const cstub_Km_ZNB_Orbis_R5_64k_vboolN* base, int offset);
 KASTARRI_API void
@@ -1860,9 +1847,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LB2N_IP(
     const cstub_Km_ZNB_Orbis_R5_64k_vbool2N** pointer,
     int increment);
 
-/// writes the predicate at the address, which must be aligned to 4 bytes, of SBN_2 to 2.
-/// Lanes: vboolN 32 x 1 bit; vbool2N 64 x 1 bit; vboolN_2 16 x 1 bit.
-/// Rule: src/memory/predicates.def
+/// writes the predicate at the address, which must be aligned to 4 bytes, of SBN_2 to 2, or the program ends.
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SBN_I(
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& v,
@@ -1894,10 +1879,12 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SB2N_IP(
     cstub_Km_ZNB_Orbis_R5_64k_vbool2N** pointer,
     int increment);
 
+/* Gathers, in two steps: the elements into the gather register (GATHERA), and that into a vector (GATHERD).
+   No address is tested.
+   Table: src/memory/gather.def */
+
 /// element i, at base + offset i bytes, into 16-bit unit i, zero-extended; 0 and nothing read where predicate
 /// bit i is 0. The byte after each element is read too. The int of the _V forms is ignored.
-/// Lanes: qv_vecNx16U 32 x 16 bits, unsigned; qv_gsr 512 bits; vboolN 32 x 1 bit.
-/// Rule: src/memory/gather.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX8U(
     const unsigned char* base,
@@ -1941,9 +1928,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX8ST_V(
 
 /// element i, at base + offset i bytes, into lane i; 0 and nothing read where predicate bit i is 0. The int
 /// of the _V forms is ignored.
-/// Lanes: qv_vecNx16U 32 x 16 bits, unsigned; qv_vecN_2x32Uv 16 x 32 bits, unsigned; qv_gsr 512 bits; vboolN
-/// 32 x 1 bit; vboolN_2 16 x 1 bit; qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits, floating point.
-/// Rule: src/memory/gather.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX16(
     const short* base,
@@ -2066,10 +2050,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERAN_2XF32T_V(
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// the 64 bytes of the gather register.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits,
-/// unsigned; qv_vecN_2x32v 16 x 32 bits, signed; qv_vecN_2x32Uv 16 x 32 bits, unsigned; qv_vecNxf16 32 x 16
-/// bits, floating point; qv_vecN_2xf32 16 x 32 bits, floating point; qv_gsr 512 bits.
-/// Rule: src/memory/gather.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERDNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_gsr& gathered);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
@@ -2088,22 +2068,16 @@ KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MOVGATHERD(const cstub_Km_ZNB_Orbis_R5_64k_qv_gsr& gathered);
 
 /// byte i = the low byte of 16-bit unit i.
-/// Lanes: qv_vecNx8 32 x 8 bits, signed; qv_gsr 512 bits.
-/// Rule: src/memory/gather.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERDNX8S(const cstub_Km_ZNB_Orbis_R5_64k_qv_gsr& gathered);
 
 /// lane i = the low byte of 16-bit unit i for i below 32, else 0.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_gsr 512 bits.
-/// Rule: src/memory/gather.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERD2NX8_L(const cstub_Km_ZNB_Orbis_R5_64k_qv_gsr& gathered);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERD2NX8U_L(const cstub_Km_ZNB_Orbis_R5_64k_qv_gsr& gathered);
 
 /// lane 32 + i = the low byte of 16-bit unit i; lanes 0 to 31 keep their values.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_gsr 512 bits.
-/// Rule: src/memory/gather.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERD2NX8_H(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r,
@@ -2113,12 +2087,12 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERD2NX8U_H(
     cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& r,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_gsr& gathered);
 
+/* Scatters: elements at base + offset bytes, one after the other in ascending order, so that of several at
+   one address the last one stays. No address is tested.
+   Table: src/memory/scatter.def */
+
 /// writes lane i, of SCATTERNX8U its low byte, at base + offset i bytes. The byte after an 8-bit element is
 /// read too.
-/// Lanes: qv_vecNx16 32 x 16 bits, signed; qv_vecNx16U 32 x 16 bits, unsigned; qv_vecN_2x32v 16 x 32 bits,
-/// signed; qv_vecN_2x32Uv 16 x 32 bits, unsigned; qv_vecNxf16 32 x 16 bits, floating point; qv_vecN_2xf32 16
-/// x 32 bits, floating point; qv_f16 1 x 16 bits, floating point; rkfloat 1 x 32 bits, floating point.
-/// Rule: src/memory/scatter.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERNX8U(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
@@ -2156,7 +2130,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERN_2XF32(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets);
 
 /// the same for the elements whose predicate bit is 1; for the others memory is not touched.
-/// Rule: src/memory/scatter.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERNX8UT(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
@@ -2202,9 +2175,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERN_2XF32T(
 
 /// writes lane i (_L) or lane 32 + i (_H) at base + offset i bytes for i below 32, of the T forms where the
 /// lane's predicate bit is 1. The byte after an element is read too.
-/// Lanes: qv_vec2Nx8 64 x 8 bits, signed; qv_vec2Nx8U 64 x 8 bits, unsigned; qv_vecNx16U 32 x 16 bits,
-/// unsigned; vbool2N 64 x 1 bit.
-/// Rule: src/memory/scatter.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTER2NX8_L(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
@@ -2252,8 +2222,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTER2NX8UT_H(
 
 /// adds 1, wrapping, to the element at base + offset i bytes for every i: n to an element that n lanes
 /// address.
-/// Lanes: qv_vecNx16U 32 x 16 bits, unsigned; qv_vecN_2x32Uv 16 x 32 bits, unsigned.
-/// Rule: src/memory/scatter.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERINCNX16(
     const short* base,
@@ -2272,7 +2240,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERINCN_2X32U(
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets);
 
 /// waits for scatters to complete; here every one has when it returns.
-/// Rule: src/memory/scatter.def
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERW();
 
 #endif

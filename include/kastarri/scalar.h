@@ -6,61 +6,54 @@
 #include "kastarri/library.h"
 #include "kastarri/types.h"
 
+/* The external ports. kastarri/state.h tells what the handlers see.
+   Table: src/scalar/ports.def */
+
 /// takes the next entry of the input queue, which waits for one.
-/// Rule: src/scalar/ports.def
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_ioports_READ_IPQ();
 
 /// 1 when the input queue has no entry, else 0.
-/// Rule: src/scalar/ports.def
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_ioports_CHECK_IPQ();
 
 /// takes the next entry of the input queue if there is one: ok = 1 and value = the entry; else ok = 0 and
 /// value stays.
-/// Lanes: rkbool 1 x 1 bit, unsigned.
-/// Rule: src/scalar/ports.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_ioports_READ_IPQ_NBLK(
     unsigned& value,
     cstub_Km_ZNB_Orbis_R5_64k_rkbool& ok);
 
 /// puts the value into the output queue, which waits for room.
-/// Rule: src/scalar/ports.def
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_ioports_WRITE_OPQ(unsigned value);
 
 /// 1 when the output queue has no room, else 0.
-/// Rule: src/scalar/ports.def
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_ioports_CHECK_OPQ();
 
 /// puts the value into the output queue if there is room: 1 when it did, else 0.
-/// Lanes: rkbool 1 x 1 bit, unsigned.
-/// Rule: src/scalar/ports.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_ioports_WRITE_OPQ_NBLK(unsigned value);
 
 /// reads the exported state.
-/// Rule: src/scalar/ports.def
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_ioports_RUR_EXPSTATE();
 
 /// the handler is told the new value, then the exported state becomes it.
-/// Rule: src/scalar/ports.def
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_ioports_WUR_EXPSTATE(unsigned value);
 
 /// as WUR_EXPSTATE with bit (bit mod 32) of the exported state set, cleared.
-/// Rule: src/scalar/ports.def
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_ioports_SETB_EXPSTATE(immediate bit);
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_ioports_CLRB_EXPSTATE(immediate bit);
 
 /// the bits of the exported state that are 1 in mask become those of the value, then the handler is told the
 /// new value.
-/// Rule: src/scalar/ports.def
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_ioports_WRMSK_EXPSTATE(unsigned value, unsigned mask);
 
 /// the imported wire's value.
-/// Rule: src/scalar/ports.def
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_ioports_READ_IMPWIRE();
 
+/* The scalar core's arithmetic, logic, comparisons, moves and boolean registers, which are whole bytes.
+   Immediates come as the values that the instruction means, already scaled.
+   Table: src/scalar/scalar.def */
+
 /// a + b, modulo 2^32.
-/// Rule: src/scalar/scalar.def
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_ADD(int a, int b);
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_ADDI(int a, immediate b);
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_ADDMI(int a, immediate b);
@@ -71,7 +64,6 @@ KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_virtualops_ADDI_A(int a, imme
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_virtualops_ADDMI_A(int a, immediate b);
 
 /// n a + b, modulo 2^32, for n = 2, 4, 8.
-/// Rule: src/scalar/scalar.def
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_ADDX2(int a, int b);
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_ADDX4(int a, int b);
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_ADDX8(int a, int b);
@@ -80,94 +72,75 @@ KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_virtualops_ADDX4_A(int a, int
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_virtualops_ADDX8_A(int a, int b);
 
 /// a - b, modulo 2^32.
-/// Rule: src/scalar/scalar.def
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SUB(int a, int b);
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_virtualops_SUB_A(int a, int b);
 
 /// n a - b, modulo 2^32, for n = 2, 4, 8.
-/// Rule: src/scalar/scalar.def
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SUBX2(int a, int b);
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SUBX4(int a, int b);
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SUBX8(int a, int b);
 
 /// -a, and the magnitude of a; both wrap: -2^31 stays -2^31.
-/// Rule: src/scalar/scalar.def
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_NEG(int a);
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_ABS(int a);
 
 /// a * b, its low 32 bits.
-/// Rule: src/scalar/scalar.def
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_mul_MULL(int a, int b);
 
 /// a * b, the high 32 bits of the 64-bit product: of unsigned factors (U) and of signed ones (S).
-/// Rule: src/scalar/scalar.def
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_mul_MULUH(unsigned a, unsigned b);
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_mul_MULSH(int a, int b);
 
 /// the product of the factors' low halves, read as signed (S) and as unsigned (U).
-/// Rule: src/scalar/scalar.def
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_mul_MUL16S(int a, int b);
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_mul_MUL16U(unsigned a, unsigned b);
 
 /// bitwise and, or, exclusive or.
-/// Rule: src/scalar/scalar.def
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_AND(unsigned a, unsigned b);
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_OR(unsigned a, unsigned b);
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_XOR(unsigned a, unsigned b);
 
 /// 1 when a < b, else 0; SALTU compares as unsigned.
-/// Rule: src/scalar/scalar.def
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SALT(int a, int b);
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SALTU(unsigned a, unsigned b);
 
 /// the smaller and the larger of a and b; MINU and MAXU compare as unsigned.
-/// Rule: src/scalar/scalar.def
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_misc_MIN(int a, int b);
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_misc_MAX(int a, int b);
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_misc_MINU(unsigned a, unsigned b);
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_misc_MAXU(unsigned a, unsigned b);
 
 /// v clamped to -2^t .. 2^t - 1; v as it is when t is not in 0 .. 31.
-/// Rule: src/scalar/scalar.def
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_misc_CLAMPS(int v, int t);
 
 /// v sign-extended from bit b; v as it is when b is not in 0 .. 31.
-/// Rule: src/scalar/scalar.def
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_misc_SEXT(int v, int b);
 
 /// how far v can be shifted left without change of sign (31 for 0 and -1).
-/// Rule: src/scalar/scalar.def
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_misc_NSA(int v);
 
 /// the number of leading zero bits of v, 32 for 0.
-/// Rule: src/scalar/scalar.def
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_misc_NSAU(unsigned v);
 
 /// n bits of v from bit shift mod 32 up, zero-extended: n = 1 .. 16 for bits = 1 .. 16; bits counts modulo
 /// 16, so 0 means 16.
-/// Rule: src/scalar/scalar.def
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_EXTUI(unsigned v, int shift, unsigned bits);
 
 /// bits shift mod 32 and up of r become the low n bits of v, n as for EXTUI; what would lie above bit 31 is
 /// lost.
-/// Rule: src/scalar/scalar.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_DEPBITS(unsigned& r, unsigned v, int shift, unsigned bits);
 
 /// r = r shifted left by 16, or imm.
-/// Rule: src/scalar/scalar.def
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_CONST16(unsigned& r, unsigned short imm);
 
 /// the bytes of v in reverse order.
-/// Rule: src/scalar/scalar.def
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_virtualops_BSWP(unsigned v);
 
 /// bit i = 1 when byte i of a equals byte i of b, for i = 0 .. 3.
-/// Rule: src/scalar/scalar.def
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_virtualops_CMP4(unsigned a, unsigned b);
 
 /// the argument.
-/// Rule: src/scalar/scalar.def
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_MOVI(immediate a);
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_density_MOVI_N(immediate a);
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_density_MOV_N(int a);
@@ -175,15 +148,12 @@ KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_virtualops_MOV_A(int a);
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_uint32_move(unsigned a);
 
 /// r = v when t == 0, t != 0, t < 0, t >= 0; else r stays.
-/// Rule: src/scalar/scalar.def
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_MOVEQZ(int& r, int v, int t);
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_MOVNEZ(int& r, int v, int t);
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_MOVLTZ(int& r, int v, int t);
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_MOVGEZ(int& r, int v, int t);
 
 /// the bitwise and, or, exclusive or of the two bytes.
-/// Lanes: rkbool 1 x 1 bit, unsigned.
-/// Rule: src/scalar/scalar.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_ANDB(
     const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
@@ -198,8 +168,6 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_XORB(
     const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
 
 /// the bitwise and, or of the byte a and 1 when b is 0, else 0.
-/// Lanes: rkbool 1 x 1 bit, unsigned.
-/// Rule: src/scalar/scalar.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_ANDBC(
     const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
@@ -210,24 +178,18 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_ORBC(
     const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
 
 /// 1 when all 4 or 8 bits are 1 and no other bit of the byte is, else 0.
-/// Lanes: rkbool 1 x 1 bit, unsigned; rkbool4 1 x 4 bits, unsigned; rkbool8 1 x 8 bits, unsigned.
-/// Rule: src/scalar/scalar.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_ALL4(const cstub_Km_ZNB_Orbis_R5_64k_rkbool4& b);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_ALL8(const cstub_Km_ZNB_Orbis_R5_64k_rkbool8& b);
 
 /// 1 when any bit of the byte is 1, else 0.
-/// Lanes: rkbool 1 x 1 bit, unsigned; rkbool4 1 x 4 bits, unsigned; rkbool8 1 x 8 bits, unsigned.
-/// Rule: src/scalar/scalar.def
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_ANY4(const cstub_Km_ZNB_Orbis_R5_64k_rkbool4& b);
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_ANY8(const cstub_Km_ZNB_Orbis_R5_64k_rkbool8& b);
 
 /// r = v when the byte b is not 0 (MOVT), when it is 0 (MOVF); else r stays.
-/// Lanes: rkbool 1 x 1 bit, unsigned.
-/// Rule: src/scalar/scalar.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_MOVT(
     unsigned& r,
@@ -240,117 +202,102 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_MOVF(
     const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
 
 /// nothing.
-/// Rule: src/scalar/scalar.def
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_NOP();
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_density_NOP_N();
 
 /// the processor's number.
-/// Rule: src/scalar/scalar.def
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_RSR_PRID();
 
 /// quotient toward zero and remainder, which has the dividend's sign; a divisor of 0, and -2^31 by -1 in the
 /// signed forms, raise the host's division fault.
-/// Rule: src/scalar/scalar.def
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k_QUOU(unsigned a, unsigned b);
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k_QUOS(int a, int b);
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k_REMU(unsigned a, unsigned b);
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k_REMS(int a, int b);
 
+/* The shift-amount state SAR and the shifts of the scalar core. A funnel shift takes 64 bits, hi above lo,
+   shifts them right by an amount of 0 to 63 and keeps the low 32.
+   Table: src/scalar/funnel.def */
+
 /// SAR = s mod 32.
-/// Rule: src/scalar/funnel.def
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SSR(int s);
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SSAI(immediate s);
 
 /// SAR = 32 - s mod 32: what SLL needs to shift left by s.
-/// Rule: src/scalar/funnel.def
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SSL(int s);
 
 /// SAR = 8 s mod 32, and 32 less that: byte positions of unaligned data, little-endian and big-endian.
-/// Rule: src/scalar/funnel.def
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SSA8L(int s);
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SSA8B(int s);
 
 /// reads SAR.
-/// Rule: src/scalar/funnel.def
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_RSR_SAR();
 
 /// SAR = v mod 64.
-/// Rule: src/scalar/funnel.def
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_WSR_SAR(unsigned v);
 
 /// SAR = r mod 64, and r = what SAR was.
-/// Rule: src/scalar/funnel.def
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_XSR_SAR(unsigned& r);
 
 /// the funnel shift of a above b by SAR.
-/// Rule: src/scalar/funnel.def
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SRC(unsigned a, unsigned b);
 
-/// v above 32 zeros, shifted by SAR: v shifted left by 32 - SAR.
-/// Rule: src/scalar/funnel.def
+/// v above 32 zeros, shifted right by SAR: v shifted left by 32 - SAR.
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SLL(unsigned v);
 
-/// v below 32 copies of its sign, shifted by SAR.
-/// Rule: src/scalar/funnel.def
+/// v below 32 copies of its sign, shifted right by SAR.
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SRA(int v);
 
-/// v below 32 zeros, shifted by SAR.
-/// Rule: src/scalar/funnel.def
+/// v below 32 zeros, shifted right by SAR.
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SRL(unsigned v);
 
 /// SAR = s mod 32, then the funnel shift of a above b by it.
-/// Rule: src/scalar/funnel.def
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SSAI_SRC(unsigned a, unsigned b, immediate s);
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SSR_SRC(unsigned a, unsigned b, int s);
 
 /// SAR = s mod 32, then v shifted right by it: arithmetically (SRA), logically (SRL).
-/// Rule: src/scalar/funnel.def
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SSR_SRA(int v, int s);
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SSR_SRL(unsigned v, int s);
 
 /// SAR = 32 - s mod 32; v shifted left by s mod 32 (v itself when that is 0).
-/// Rule: src/scalar/funnel.def
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SSL_SLL(unsigned v, int s);
 
 /// v shifted left by s mod 32, and 0 when that is 0: the core's SLLI is a funnel shift of v above 32 zeros by
 /// (32 - s) mod 32.
-/// Rule: src/scalar/funnel.def
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SLLI(unsigned v, immediate s);
 
 /// v shifted right by s mod 32: arithmetically (SRAI), logically (SRLI).
-/// Rule: src/scalar/funnel.def
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SRAI(int v, immediate s);
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SRLI(unsigned v, immediate s);
 
-/// the word at the address, which has to be a multiple of 4.
-/// Rule: src/scalar/access.def
+/* Loads and stores of the scalar core, at base + offset bytes. A 32-bit access at an address that is not a
+   multiple of 4, or a 16-bit one at an odd address, ends the program before anything is read or written.
+   Table: src/scalar/access.def */
+
+/// the word at the address, which must be a multiple of 4, or the program ends.
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_L32I(const int* base, int offset);
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_density_L32I_N(const int* base, int offset);
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_uint32_loadi(const unsigned* base, int offset);
 
-/// writes the word at the address, which has to be a multiple of 4.
-/// Rule: src/scalar/access.def
+/// writes the word at the address, which must be a multiple of 4, or the program ends.
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_S32I(int value, const int* base, int offset);
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_density_S32I_N(int value, const int* base, int offset);
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_S32NB(int value, const int* base, int offset);
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_uint32_storei(unsigned value, const unsigned* base, int offset);
 
-/// the halfword at the address, which has to be even: zero-extended (L16UI), sign-extended (L16SI).
-/// Rule: src/scalar/access.def
+/// the halfword at the address, zero-extended (L16UI), sign-extended (L16SI); the address must be even, or
+/// the program ends.
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_L16UI(const unsigned short* base, int offset);
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_L16SI(const short* base, int offset);
 
-/// writes the low 16 bits at the address, which has to be even.
-/// Rule: src/scalar/access.def
+/// writes the low 16 bits at the address, which must be even, or the program ends.
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_S16I(int value, const short* base, int offset);
 
 /// the byte at the address, zero-extended.
-/// Rule: src/scalar/access.def
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_L8UI(const unsigned char* base, int offset);
 
 /// writes the low 8 bits at the address.
-/// Rule: src/scalar/access.def
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_S8I(int value, const unsigned char* base, int offset);
 

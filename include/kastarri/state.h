@@ -198,7 +198,7 @@ typedef struct cstub_Km_ZNB_Orbis_R5_64k_states {
   unsigned ERACCESS;
   unsigned RoundMode;     ///< bits 0-1: 0 to nearest, 1 toward zero, 2 toward +infinity, 3 toward -infinity
   unsigned StickyFlags;   ///< bit 0 inexact, 1 underflow, 2 overflow, 3 division by zero, 4 invalid
-  unsigned StickyEnable;  ///< enables of the flags, bit by bit as StickyFlags
+  unsigned StickyEnable;  ///< bit by bit as StickyFlags; it enables nothing: no operation traps
   unsigned ZRA_FS0[2];    ///< ZRA_FS0 to ZRA_FS7: 64-bit states of the vector unit, low word first
   unsigned ZRA_FS1[2];
   unsigned ZRA_FS2[2];
@@ -229,15 +229,20 @@ typedef struct cstub_Km_ZNB_Orbis_R5_64k_processor {
   void* last;
 } cstub_Km_ZNB_Orbis_R5_64k_processor_t;
 
-/// The processor.
+/// The processor. Where its members lie, in bytes, for programs that reach it without this header: pointers take 4
+/// bytes in a 32-bit program and 8 in a 64-bit one.
+///
+///            states  EXPSTATE  IPQ  cstub_IPQ_data  OPQ  IMPWIRE  callbacks  PRID  last  in all
+///   32 bits       0       340  356             380  384      404        420   424   428     432
+///   64 bits       0       344  376             424  432      472        504   512   520     528
 extern KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_processor_t cstub_Km_ZNB_Orbis_R5_64k_proc;
 
 /// Merges bytes of a word: byte j (byte 0 the lowest) of entry k is 0x00 where bit j of k is 1, else 0xFF.
 /// The library reads this table and never writes it.
 extern KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k_mask[16];
 
-/// What a load or store does at an address that it cannot use: prints the address and ends the program with
-/// exit status 1.
+/// What a load or store does at an address that it cannot use: prints the address to the standard error stream
+/// and ends the program with exit status 1. Intrinsics print all of a 64-bit address.
 KASTARRI_API void cstub_vaddr_not_aligned(unsigned address) __attribute__((noreturn));
 
 #endif

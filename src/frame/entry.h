@@ -40,8 +40,8 @@ using layout_of = typename layout_of_type<T>::type;
 
 }  // namespace
 
-// What an entry is declared with besides. The static library's are inlined into kernels whatever their size:
-// most of it is in loops over lanes that go with vectorisation, which comes after inlining.
+// The static library's entries are inlined into kernels whatever their size. The compiler judges sizes before it
+// vectorises: a loop over 32 lanes looks large then and ends as one or two instructions.
 #ifdef KASTARRI_INLINE_ENTRIES
 #define KASTARRI_ENTRY __attribute__((always_inline, flatten))
 constexpr bool entries_are_inlined = true;

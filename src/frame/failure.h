@@ -3,6 +3,8 @@
 #ifndef KASTARRI_FRAME_FAILURE_H
 #define KASTARRI_FRAME_FAILURE_H
 
+#include <cstdint>
+
 namespace kastarri {
 
 // Hidden, so that a caller needs nothing set up for the call before it knows that it fails.
@@ -11,11 +13,17 @@ namespace kastarri {
 KASTARRI_FAILURE void fail(const char* format, ...) __attribute__((format(printf, 1, 2)));
 
 // What the exported cstub_vaddr_not_aligned does.
-KASTARRI_FAILURE void not_aligned(unsigned address);
+KASTARRI_FAILURE void not_aligned(std::uintptr_t address);
 
-// The same for a caller to end in, whose way without failure is then that of a leaf: the address comes in a register,
-// and the compiler is not told that nothing returns, for it never ends a function in a call that does not.
-__attribute__((cold, regparm(1), visibility("hidden"))) void end_not_aligned(unsigned address);
+// The same, made for `return end_not_aligned(a);` at the end of an entry: that compiles to a jump, so that the entry
+// sets up no stack frame for it. Hence the address in a register, and no noreturn: compilers make no such jump to a
+// function that never returns.
+#ifdef __i386__
+#define KASTARRI_IN_REGISTER __attribute__((regparm(1)))
+#else
+#define KASTARRI_IN_REGISTER  // as every first argument
+#endif
+KASTARRI_IN_REGISTER __attribute__((cold, visibility("hidden"))) void end_not_aligned(std::uintptr_t address);
 
 }  // namespace kastarri
 

@@ -5,8 +5,8 @@
 #include "frame/layouts.h"
 #include "frame/predicate.h"
 
-// Lane i of a result depends on lane i of what it may share memory with, and on nothing else there:
-// a destination handed in as an operand too is fine, and the compiler may take it so.
+// A result may share memory with an operand: r = r + b. Lane i of the result depends on lane i of such an operand and
+// on none of its others, so the compiler may compute lanes in any order and many at a time. This tells it so.
 #ifdef __clang__
 #define KASTARRI_LANES_INDEPENDENT _Pragma("clang loop vectorize(assume_safety)")
 #else

@@ -1,4 +1,5 @@
-// Addresses of the core on the host: base plus byte offset, unsigned 32-bit, wrapping.
+// Addresses of the core on the host: base plus byte offset, wrapping. The offset is a signed number of 32 bits
+// whatever the width of an address: -4 is 4 bytes before the base.
 #ifndef KASTARRI_FRAME_MEMORY_H
 #define KASTARRI_FRAME_MEMORY_H
 

@@ -1,6 +1,6 @@
-// A lane times a power of two: shifts and rotations by a count a lane. The baseline target has no shift by
-// a count a lane, but it multiplies; one product holds the shift left in its low half and the shift right
-// by the rest of the width in its high half.
+// A lane times a power of two: shifts and rotations by a count a lane. SSE2 has no shift by a count a lane, but it
+// multiplies, and one product holds two shifts. Of 16 bits, x * 2^3 = 2^16 high + low, where low is x << 3 and high is
+// x >> 13.
 #ifndef KASTARRI_FRAME_SCALE_H
 #define KASTARRI_FRAME_SCALE_H
 
@@ -56,8 +56,8 @@ struct Scaled32 {
 template <class U>
 using Scaled = std::conditional_t<sizeof(U) == 2, Scaled16, Scaled32>;
 
-// Whether a count from -w to w - 1 leaves something of a lane. (-w is among them since the high half of
-// a product with 2^0 is 0.)
+// Whether a count is from -w to w - 1; by others nothing is left of a lane of w bits. Nothing is left by -w either, but
+// that comes out right by itself: 2^(-w mod w) is 1, and the high half of x * 1 is 0.
 template <class U>
 constexpr bool within(U count) {
   return static_cast<U>(count + width<U>) < 2 * width<U>;

@@ -11,38 +11,40 @@ constexpr auto ADD = [](auto x, auto y) { return unsigned_bits(x) + unsigned_bit
 constexpr auto SUB = [](auto x, auto y) { return unsigned_bits(x) - unsigned_bits(y); };
 constexpr auto NEG = [](auto x) { return 0u - unsigned_bits(x); };
 
-// The bound on the side of x: the sign fill with its top bit turned.
+// The end of the range on the side of x. Of 16 bits: 0x7FFF for x >= 0, else 0x8000, which is 0xFFFF ^ 0x7FFF.
 constexpr auto bound_of = [](auto x) {
   using T = decltype(x);
   return static_cast<T>(sign_fill(x) ^ std::numeric_limits<T>::max());
 };
 
-// On overflow both operands have the sign that the wrapped sum has not. Staying within the lane's width
-// is twice as fast as widening.
+// The wrapped sum has overflowed where its sign differs from that of both operands: of 8 bits, 100 + 100 = -56. No
+// wider type is needed, so that a register holds all its lanes throughout.
 constexpr auto ADDS = [](auto x, auto y) {
   using T = decltype(x);
   const T sum = static_cast<T>(ADD(x, y));
   return ((sum ^ x) & (sum ^ y)) < 0 ? bound_of(x) : sum;
 };
-// The same where the operands' signs differ and the difference has not the sign of x.
+// The wrapped difference has overflowed where the operands' signs differ and its own differs from that of x: of 8
+// bits, 100 - -100 = -56.
 constexpr auto SUBS = [](auto x, auto y) {
   using T = decltype(x);
   const T difference = static_cast<T>(SUB(x, y));
   return ((x ^ y) & (x ^ difference)) < 0 ? bound_of(x) : difference;
 };
-// Only the most negative value keeps its sign when negated, and one less is the bound.
+// The smallest value alone is negative before and after: of 8 bits, -(-128) wraps to -128. Adding -1 there wraps to
+// 127.
 constexpr auto NEGS = [](auto x) {
   using T = decltype(x);
   const T negative = static_cast<T>(NEG(x));
   return unsigned_bits(negative) + unsigned_bits(sign_fill(static_cast<T>(negative & x)));
 };
 
-// Turning all bits of a negative number and adding 1, by its sign fill.
+// (x ^ s) - s with the sign fill s: x where s = 0; where s = -1, ~x + 1, which is -x.
 constexpr auto ABS = [](auto x) {
   const auto sign = unsigned_bits(sign_fill(x));
   return static_cast<decltype(x)>((unsigned_bits(x) ^ sign) - sign);
 };
-// Only the most negative value is still negative, and one less is the bound.
+// The smallest value alone is still negative: of 8 bits, |-128| wraps to -128. Adding -1 there wraps to 127.
 constexpr auto ABSS = [](auto x) {
   const auto magnitude = ABS(x);
   return unsigned_bits(magnitude) + unsigned_bits(sign_fill(magnitude));
@@ -54,6 +56,15 @@ constexpr auto ABSSSUB = [](auto x, auto y) { return ABSS(SUBS(x, y)); };
 }  // namespace
 
 #include "integer/stamp.h"
+
+// The rule on every lane, and which lanes are negative.
+#define KERNEL_unary_and_signs(OP, RULE, L)                                     \
+  template <class Units, class Bits>                                            \
+  static inline void KASTARRI_SEMANTIC(OP)(const Units* a, Bits* p, Units* r) { \
+    lane_bits<L::bits, L::count>(                                               \
+        p, [](auto x) { return x < 0; }, Read<L>(a));                           \
+    lanes<L::count>(result<L>(r), RULE, Read<L>(a));                            \
+  }
 
 #include "integer/arithmetic.def"
 

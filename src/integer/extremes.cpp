@@ -8,15 +8,15 @@ namespace {
 constexpr auto MIN = [](auto x, auto y) { return x < y ? x : y; };
 constexpr auto MAX = [](auto x, auto y) { return x > y ? x : y; };
 
-// A lane shifted so that the smallest value of its type is 0: the order of numbers, as unsigned ones.
+// A lane minus the smallest value of its type, as an unsigned number: of 8 bits, -128 .. 127 become 0 .. 255.
 constexpr auto from_lowest = [](auto x) {
   using T = decltype(x);
   using U = std::make_unsigned_t<T>;
   return static_cast<U>(unsigned_bits(x) ^ unsigned_bits(std::numeric_limits<T>::min()));
 };
 
-// The mean of two lanes without the extra bit of their sum: what both have in common, and half of what
-// one of them has. Unsigned, for no target shifts signed bytes.
+// The mean of two lanes without the extra bit of their sum: (a + b) / 2 is (a & b) + ((a ^ b) >> 1) rounded down, and
+// (a | b) - ((a ^ b) >> 1) rounded up. Unsigned, for no target shifts signed bytes.
 template <class Combine>
 struct Mean {
   template <class T>

@@ -16,7 +16,8 @@ struct SRLI : ShiftRight<w, Unit> {
   explicit constexpr SRLI(word given) : ShiftRight<w, Unit>(given % w) {}
 };
 
-// The logical shift, and where the sign is 1 the bits from it down to its shifted self.
+// The logical shift, and for negative lanes ones from the sign bit down to where it was shifted to: of 8 bits by 3, the
+// sign 1000'0000 is shifted to 0001'0000, and 1000'0000 | (1000'0000 - 0001'0000) fills 1111'0000.
 template <int w, class Unit>
 struct SRAI {
   explicit constexpr SRAI(word given) : shift(given % w) {}
@@ -27,8 +28,9 @@ struct SRAI {
   ShiftRight<w, Unit> shift;
 };
 
-// A lane that the shift would take out of range becomes a bound. The shift is a product, which every
-// target has for halves too.
+// A lane that the shift would take out of range becomes the end of the range: of 8 bits by 2, `high` is 127 >> 2 = 31,
+// and lanes from -32 to 31 are in range. The shift is a product with 2^2, for not every target shifts 16-bit lanes by a
+// count known at run time.
 template <class T>
 struct SLSI {
   explicit constexpr SLSI(word given)

@@ -14,7 +14,8 @@ constexpr Unit in_every_lane(Unit lane) {
   return static_cast<Unit>(lane * one_of_each);
 }
 
-// Bits that a shift moves out of one lane into its neighbour are masked off. count < w.
+// The whole unit is shifted, and the bits that came from the neighbouring lane are masked off: bytes shifted left by 3
+// in a word keep 0xF8F8F8F8. count < w.
 template <int w, class Unit>
 struct ShiftLeft {
   explicit constexpr ShiftLeft(std::uint32_t s)

@@ -1,4 +1,4 @@
-// One value in every lane.
+// One value in every lane, and a lane alone.
 #include <cstring>
 
 #include "frame/lanes.h"
@@ -13,8 +13,12 @@
     lanes<L::count>(                                                             \
         result<L>(r), [chosen](int) { return chosen; }, Same(0));                \
   }
-// In registers of 64 bytes at most: longer ones the compiler fills with a string instruction, which takes
-// longer to start than all of this.
+#define KERNEL_selected(OP, L)                                                     \
+  template <class Units, class Unit>                                               \
+  static inline void KASTARRI_SEMANTIC(OP)(const Units* a, word number, Unit* r) { \
+    Write<L>(r).put(0, Read<L>(a)[static_cast<int>(number % L::count)]);           \
+  }
+// In pieces of 64 bytes at most. For longer ones compilers choose a string instruction, which is slow to start.
 #define KERNEL_filled(OP, BYTE)                                          \
   template <class Unit, std::size_t units>                               \
   static inline void KASTARRI_SEMANTIC(OP)(Unit(&r)[units]) {            \

@@ -5,7 +5,8 @@
 
 namespace {
 
-// Right by s is left by w - s: the product's low half, and in its high half what leaves the lane.
+// Right by s is left by w - s, which is -s mod w: x * 2^(w - s) has x << (w - s) in its low half and what that shifts
+// out of the lane, x >> s, in its high half.
 constexpr auto ROTR = [](auto x, auto count) {
   using U = decltype(x);
   const Scaled<U> product(x, static_cast<U>(0u - count));
@@ -20,7 +21,8 @@ struct ROTRI {
   ShiftLeft<w, Unit> left;
 };
 
-// Zero bits above the highest 1, which is looked for in the upper half of what is left each time.
+// Zero bits above the highest 1, by halving: if the upper half is 0, its width is counted and the lower half is looked
+// into, else the upper one. Of 16 bits the halves are 8, 4, 2 and 1 wide.
 template <class U, int Half = width<U> / 2>
 constexpr U leading_zeros(U x) {
   const bool empty = x >> (width<U> - Half) == 0;

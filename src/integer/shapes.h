@@ -29,6 +29,21 @@
   KASTARRI_SEMANTIC(K)(a._, p._, r._); \
   return r;
 
+// One value and a whole register to one value.
+#define SIG_acc_a(SYMBOL, R, T, K) void SYMBOL(R& acc, const T& a)
+#define BODY_acc_a(R, T, K) KASTARRI_SEMANTIC(K)(acc._, a._, acc._);
+
+// One lane of a register.
+#define SIG_a_i_lane(SYMBOL, R, T, K) R SYMBOL(const T& a, immediate i)
+#define BODY_a_i_lane(R, T, K)                          \
+  R r;                                                  \
+  KASTARRI_SEMANTIC(K)(a._, static_cast<word>(i), r._); \
+  return r;
+
+// A predicate, and a result that may be the operand.
+#define SIG_a_pr(SYMBOL, P, T, K) void SYMBOL(P& p, T& r, const T& a)
+#define BODY_a_pr(P, T, K) KASTARRI_SEMANTIC(K)(a._, p._, r._);
+
 // A predicate from a count of lanes.
 #define SIG_n_p(SYMBOL, P, COUNT, K) P SYMBOL(COUNT n)
 #define BODY_n_p(P, COUNT, K)   \

@@ -14,15 +14,16 @@ constexpr auto SLL = [](auto x, auto count) {
 };
 constexpr auto SRL = [](auto x, auto count) { return SLL(x, static_cast<decltype(x)>(0u - count)); };
 
-// A signed lane times 2^(count mod w), all of it with the sign folded away: -1 - f stands as f. The product
-// f * p holds the shift right in its high half, and tells whether the shift left stays in range.
+// A signed lane times p = 2^(count mod w). It is folded first: f = x for x >= 0, f = -1 - x (that is ~x) for x < 0, so
+// that -3 becomes 2. The product f * p has the shift right of f in its high half, and the shift left of x stays in
+// range while f * p < 2^(w-1). Unfolding turns the bits of what becomes of a negative lane.
 template <class T>
 struct ScaledSigned {
   using U = std::make_unsigned_t<T>;
   ScaledSigned(T x, U count)
       : sign(unsigned_bits(sign_fill(x))), folded(static_cast<U>(unsigned_bits(x) ^ sign), count) {}
 
-  // (-1 - f) * p is -1 - (f * p + p - 1).
+  // Folded: x * p = (-1 - f) * p = -1 - (f * p + p - 1).
   U left() const { return static_cast<U>(folded.low + (static_cast<U>(folded.power - 1u) & sign)); }
   U right() const { return folded.high; }
   // All ones when the shift left does not stay in range, else 0.
@@ -34,8 +35,8 @@ struct ScaledSigned {
   Scaled<U> folded;
 };
 
-// Shifting right by w - 1 leaves the same as shifting by more, the sign; shifting left by as much and
-// saturating too.
+// A count of w - 1 in place of greater ones gives the same. Shifted right it leaves the sign; shifted left and
+// saturated, the end of the range, or 0.
 constexpr auto at_most_the_width = [](auto count) {
   using T = decltype(count);
   constexpr T farthest = width<T> - 1;
@@ -51,7 +52,7 @@ constexpr auto SRA = [](auto x, auto count) {
   return count > 0 ? right : left;
 };
 
-// In masks rather than choices: compilers make many more instructions of those.
+// With masks in place of ?:, of which compilers make many more instructions here.
 constexpr auto SLS = [](auto x, auto count) {
   using T = decltype(x);
   using U = std::make_unsigned_t<T>;

@@ -1,4 +1,5 @@
-// Gather and scatter: elements at a base address plus a byte offset each, unsigned 32-bit, wrapping.
+// Gather and scatter: elements at a base address plus a byte offset each, wrapping. Offsets of 32 bits are signed,
+// those of 16 bits are not.
 #ifndef KASTARRI_MEMORY_GATHER_H
 #define KASTARRI_MEMORY_GATHER_H
 
@@ -10,39 +11,49 @@
 
 namespace {
 
+// What is added to the base for an offset, which may have no more bits than a word: -4 as a word is 2^32 - 4, which
+// compilers would make a distance of 64 bits without a sign and without a warning. Hence a type of its own.
+enum class Distance : std::uintptr_t {};
+
+inline Distance distance(word offset) {
+  return Distance(static_cast<std::uintptr_t>(static_cast<std::int32_t>(offset)));
+}
+
 template <class Unit>
-inline in_memory<Unit>& element(const void* base, word offset) {
-  return *reinterpret_cast<in_memory<Unit>*>(reinterpret_cast<std::uintptr_t>(base) + offset);
+inline in_memory<Unit>& element(const void* base, Distance from_base) {
+  return *reinterpret_cast<in_memory<Unit>*>(reinterpret_cast<std::uintptr_t>(base) +
+                                             static_cast<std::uintptr_t>(from_base));
 }
 
 // Which elements there are: all, or those that a predicate enables.
 struct EveryElement {
-  word at(word offset, int) const { return offset; }
+  Distance at(word offset, int) const { return distance(offset); }
 };
 
-// The offset of a disabled element is that of a word of no meaning, so that nothing branches on the predicate and
-// memory is left alone all the same. Offsets are chosen one by one: vectors of them would be there so late that
-// processors run out of steps to be done meanwhile.
+// A disabled element is looked for in a word of the library's own: its offset is replaced by the distance from the base
+// to that word. So nothing branches on the predicate, and the program's memory is left alone all the same. Offsets are
+// chosen one at a time, so that the first load need not wait until all offsets have been.
 class EnabledElements {
  public:
   EnabledElements(const void* base, word& nowhere, word predicate)
-      : away_(reinterpret_cast<std::uintptr_t>(&nowhere) - reinterpret_cast<std::uintptr_t>(base)),
+      : away_(Distance(reinterpret_cast<std::uintptr_t>(&nowhere) - reinterpret_cast<std::uintptr_t>(base))),
         predicate_(predicate) {
-    asm("" : "+m"(nowhere));  // in memory, whatever compilers make of its address
+    asm("" : "+m"(nowhere));  // has to lie in memory: compilers do not see that it is read through another pointer
   }
 
-  // The offset of element i where its own is given.
-  word at(word offset, int i) const {
-    asm("" : "+r"(offset));  // known by now, so that compilers choose rather than branch
-    return (predicate_ >> i & 1) != 0 ? offset : away_;
+  // The distance of element i where its offset is given.
+  Distance at(word offset, int i) const {
+    Distance own = distance(offset);
+    asm("" : "+r"(own));  // in a register already, so that compilers choose by a conditional move, not a branch
+    return (predicate_ >> i & 1) != 0 ? own : away_;
   }
 
  private:
-  word away_;
+  Distance away_;
   word predicate_;
 };
 
-// The word of no meaning is what disabled elements are gathered as.
+// What `nowhere` holds is what disabled elements are gathered as.
 inline EveryElement elements(const void*, word&) { return {}; }
 inline EnabledElements elements(const void* base, word& nowhere, word predicate) {
   return EnabledElements(base, nowhere, predicate);
@@ -50,8 +61,8 @@ inline EnabledElements elements(const void* base, word& nowhere, word predicate)
 
 // --- Gathers ----------------------------------------------------------------------------------------
 
-// The offset of element i. Of 16 bits every other two are loaded together: processors have as much to do with
-// loads here as with taking words apart.
+// The offset of element i. Of four offsets of 16 bits two are loaded as one word and taken apart, two one by one: that
+// shares the work between the processor's loads and its shifts.
 template <class O>
 inline word offset(const void* offsets, int i) {
   if (O::bits == 32 || i % 4 > 1) return Read<O>(offsets)[i];
@@ -76,8 +87,8 @@ inline __m128i fetch(const void* base, const void* offsets, Which which, std::in
 }
 
 // Gathers 32 elements of 16 or 8 bits or 16 of 32 bits into units of the offsets' width. The gather register is
-// stored and loaded in halves at most (see GatherRegister): registers of 512 bits would slow down what goes element
-// by element.
+// stored and loaded in halves at most (see GatherRegister): instructions on 512 bits would slow down the work on single
+// elements around them.
 template <class O, int Bits, class Which>
 inline void gather(const void* base, const void* offsets, Which which, word* out) {
   constexpr int count = O::count / 4;
@@ -99,7 +110,8 @@ inline void gather(const void* base, const void* offsets, Which which, word* out
 #endif
 }
 
-// The gather register as it is read: in the halves that it was stored in, so that stores forward to loads.
+// The gather register is loaded in the halves that it was stored in. Store forwarding, which hands what was just
+// stored to a load, fails for a load that spans two stores.
 class GatherRegister {
  public:
   explicit GatherRegister(const word* stored) {
@@ -120,8 +132,9 @@ class GatherRegister {
 
 // --- Scatters ---------------------------------------------------------------------------------------
 
-// The lanes of an operand in turn, from registers: what is stored between two of them may lie anywhere, in the
-// operand too, and a processor that takes a load to depend on such stores does one element after the other.
+// The lanes of an operand in turn. They are loaded before anything is stored and then come from registers. Between the
+// stores of elements loads would be slow: elements may lie anywhere, in the operand too, so a processor may let each
+// load wait for the store before it.
 template <class L>
 class InTurn {
  public:
@@ -172,7 +185,7 @@ inline void scatter(void* base, const void* offsets, Which which, const void* da
 template <class O, std::size_t... I>
 inline void increment(void* base, const void* offsets, std::index_sequence<I...>) {
   InTurn<O> to(offsets);
-  (++element<typename O::container>(base, to.template lane<I>()), ...);
+  (++element<typename O::container>(base, distance(to.template lane<I>())), ...);
 }
 template <class O>
 inline void increment(void* base, const void* offsets) {

@@ -9,7 +9,10 @@
 
 namespace {
 
-// How a word of a merging store is governed by lanes_a_word bits of a predicate.
+// How the words of a merging store are governed by a predicate, lanes_a_word bits each: 4 lanes of 8 bits, 2 of 16, 1
+// of
+// 32. Of 16-bit lanes, word 3 is governed by bits 6 and 7 (first_lane[3] = 6), and the lanes 01, the lower one, are the
+// bytes 0011 (bytes[1] = 3).
 template <int lanes_a_word>
 struct MergeStep {
   alignas(64) word first_lane[16] = {};  // of word w, within the predicate's unit
@@ -23,9 +26,10 @@ struct MergeStep {
   }
 };
 
-// For every word of a merging store, the entry of the byte-merge table that the word's disabled bytes
-// select. Each lane governs LaneBytes bytes of memory. The table is the program's to change, so it is
-// looked up in every store; vector registers hold it whole and look up all words at once.
+// For every word of a merging store, the entry of the byte-merge table that the set of its disabled bytes selects: with
+// bytes 0 and 1 disabled entry 3, which is 0xFFFF0000 unless the program has changed it. Since it may, the table is
+// looked up in every store: its 16 entries fill a register or two, and a shuffle looks up all words at once. Each lane
+// governs LaneBytes bytes of memory.
 template <int LaneBytes, int Words>
 class MergeMask {
  public:
@@ -83,8 +87,9 @@ class MergeMask {
   static constexpr MergeStep<lanes_a_word> step{};
 };
 
-// Whether the table is known to be as it was at first: a byte is then stored where its lane is enabled. Only where
-// registers do not hold the table does it pay to ask; and clang vectorises no two such merges side by side.
+// Whether the table is as the library came with it, so that a byte is stored where its lane is enabled and no entry
+// need be looked up. Asked on SSE2 alone, whose registers cannot look up the table; and not of clang, which does not
+// vectorise two merges in one function.
 inline bool merges_plainly() {
 #if defined __AVX2__ || defined __clang__
   return false;

@@ -13,7 +13,7 @@ namespace {
 template <class L>
 using All = Read<L>;
 
-// Every other 24-bit lane: two of them are the halves of a 64-bit container.
+// Every other 24-bit lane, the even ones (First = 0) or the odd ones (1): two are the halves of 64 bits.
 template <int First>
 class EveryOther {
  public:

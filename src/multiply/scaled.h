@@ -1,7 +1,7 @@
-// Lanes of 64 bits shifted right by counts of their own where the target has no such shift: they are scaled as
-// floating-point numbers, which is exact. A power of two, by its exponent, times a lane that the number holds; then a
-// half that it holds besides. What is beyond a word is clamped to it, and the truncation of negative numbers made a
-// floor. Compilers make jumps of the clamps in a loop over lanes, so this is written out, in registers of 128 bits.
+// SSE2 only: wide lanes shifted right by counts of their own and clamped to words. SSE2 has no shift by a count a lane,
+// so x >> n is computed as floor(x * 2^-n) in floating point, rounded half up as floor(x * 2^-n + 0.5). A double holds
+// x, 2^-n (made by its exponent), their product and the half exactly. Compilers make branches of the clamps in a loop
+// over lanes, so this is written out, in registers of 128 bits.
 #ifndef KASTARRI_MULTIPLY_SCALED_H
 #define KASTARRI_MULTIPLY_SCALED_H
 
@@ -14,15 +14,16 @@ namespace {
 inline __m128i both(std::uint64_t bits) { return _mm_set1_epi64x(static_cast<long long>(bits)); }
 inline __m128d number_of(__m128i bits, double less) { return _mm_sub_pd(_mm_castsi128_pd(bits), _mm_set1_pd(less)); }
 
-// The bits of a 48-bit lane, its top one flipped, under the exponent of 2^52 are the lane plus 2^52 and 2^47.
+// A 48-bit lane x as a double. Its bits below the exponent of 2^52 are the number 2^52 + x for x >= 0; with the top bit
+// of the lane flipped they are 2^52 + 2^47 + x for either sign. What is added is subtracted.
 struct Number48 {
   static __m128d of(__m128i lanes, __m128i) {
     const __m128i own = _mm_and_si128(lanes, both((std::uint64_t{1} << 48) - 1));
     return number_of(_mm_xor_si128(own, both(0x4330800000000000)), 0x1.08p52);
   }
 };
-// A 64-bit lane is the sum of two such numbers, of either word. Of a lane that is shifted by 12 or more the low 11
-// bits leave no trace, and one shifted by less saturates if it needs more than the 53 bits of the number.
+// A 64-bit lane is the sum of two such numbers, one of each word. A double has 53 bits: of a lane that is shifted by 12
+// or more the low 11 bits do not matter and are cleared; shifted by less, a lane of more than 53 bits saturates.
 struct Number64 {
   static __m128d of(__m128i lanes, __m128i counts) {
     const __m128i needed = _mm_or_si128(_mm_cmplt_epi32(counts, _mm_set1_epi32(12)), both(~std::uint64_t{0x7FF}));
@@ -33,8 +34,8 @@ struct Number64 {
   }
 };
 
-// Two lanes over 2 to their counts, plus Rounding::added, which is a half or nothing; the floors of these, clamped, as
-// words in the lower half.
+// floor(x * 2^-n + added) of two lanes x, clamped, as words in the lower half; Rounding::added is 0.5 or 0. Conversion
+// truncates toward zero, so that a negative number that was not whole comes out 1 too great.
 template <class Number, class Rounding>
 inline __m128i two_scaled(__m128i lanes, __m128i counts) {
   const __m128d number = Number::of(lanes, counts);
@@ -54,7 +55,7 @@ inline __m128i four_scaled(__m128i first, __m128i last, __m128i counts) {
                             two_scaled<Number, Rounding>(last, _mm_unpackhi_epi32(counts, zero)));
 }
 
-// Four words, of which a number of half the size holds what matters: a lane of 24 bits at the top.
+// The same of four words that have a 24-bit lane at their top, which a float holds.
 template <class Rounding>
 inline __m128i four_scaled(__m128i words, __m128i counts) {
   const __m128 scale = _mm_castsi128_ps(_mm_slli_epi32(_mm_sub_epi32(_mm_set1_epi32(127), counts), 23));

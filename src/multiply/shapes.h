@@ -32,35 +32,39 @@
   return r;
 
 // --- Vectors of type V and words of coefficients -----------------------------------------------------
+//
+// A semantic function gets the word in whose bytes the reference points (multiply/taps.h).
 
 #define WORD(S) const qv_int32pr& S
+#define SLOT(S) word_around(&S)
 
 #define SIG_as_w(SYMBOL, W, V, K) W SYMBOL(const V& a, WORD(s))
-#define BODY_as_w(W, V, K) FRESH(W, K, a._, s._)
+#define BODY_as_w(W, V, K) FRESH(W, K, a._, SLOT(s))
 #define SIG_acc_as(SYMBOL, W, V, K) void SYMBOL(W& acc, const V& a, WORD(s))
-#define BODY_acc_as(W, V, K) KASTARRI_SEMANTIC(K)(acc._, a._, s._, acc._);
+#define BODY_acc_as(W, V, K) KASTARRI_SEMANTIC(K)(acc._, a._, SLOT(s), acc._);
 
 #define SIG_abs_w(SYMBOL, W, V, K) W SYMBOL(const V& a, const V& b, WORD(s))
-#define BODY_abs_w(W, V, K) FRESH(W, K, a._, b._, s._)
+#define BODY_abs_w(W, V, K) FRESH(W, K, a._, b._, SLOT(s))
 #define SIG_acc_abs(SYMBOL, W, V, K) void SYMBOL(W& acc, const V& a, const V& b, WORD(s))
-#define BODY_acc_abs(W, V, K) KASTARRI_SEMANTIC(K)(acc._, a._, b._, s._, acc._);
+#define BODY_acc_abs(W, V, K) KASTARRI_SEMANTIC(K)(acc._, a._, b._, SLOT(s), acc._);
 
 #define ABCD(V) const V &a, const V &b, const V &c, const V &d
 
 #define SIG_abcds_w(SYMBOL, W, V, K) W SYMBOL(ABCD(V), WORD(s))
-#define BODY_abcds_w(W, V, K) FRESH(W, K, a._, b._, c._, d._, s._)
+#define BODY_abcds_w(W, V, K) FRESH(W, K, a._, b._, c._, d._, SLOT(s))
 #define SIG_acc_abcds(SYMBOL, W, V, K) void SYMBOL(W& acc, ABCD(V), WORD(s))
-#define BODY_acc_abcds(W, V, K) KASTARRI_SEMANTIC(K)(acc._, a._, b._, c._, d._, s._, acc._);
+#define BODY_acc_abcds(W, V, K) KASTARRI_SEMANTIC(K)(acc._, a._, b._, c._, d._, SLOT(s), acc._);
 
 #define SIG_abcdst_w(SYMBOL, W, V, K) W SYMBOL(ABCD(V), WORD(s), WORD(t))
-#define BODY_abcdst_w(W, V, K) FRESH(W, K, a._, b._, c._, d._, s._, t._)
+#define BODY_abcdst_w(W, V, K) FRESH(W, K, a._, b._, c._, d._, SLOT(s), SLOT(t))
 #define SIG_acc_abcdst(SYMBOL, W, V, K) void SYMBOL(W& acc, ABCD(V), WORD(s), WORD(t))
-#define BODY_acc_abcdst(W, V, K) KASTARRI_SEMANTIC(K)(acc._, a._, b._, c._, d._, s._, t._, acc._);
+#define BODY_acc_abcdst(W, V, K) KASTARRI_SEMANTIC(K)(acc._, a._, b._, c._, d._, SLOT(s), SLOT(t), acc._);
 
 #define SIG_abcdstuv_w(SYMBOL, W, V, K) W SYMBOL(ABCD(V), WORD(s), WORD(t), WORD(u), WORD(v))
-#define BODY_abcdstuv_w(W, V, K) FRESH(W, K, a._, b._, c._, d._, s._, t._, u._, v._)
+#define BODY_abcdstuv_w(W, V, K) FRESH(W, K, a._, b._, c._, d._, SLOT(s), SLOT(t), SLOT(u), SLOT(v))
 #define SIG_acc_abcdstuv(SYMBOL, W, V, K) void SYMBOL(W& acc, ABCD(V), WORD(s), WORD(t), WORD(u), WORD(v))
-#define BODY_acc_abcdstuv(W, V, K) KASTARRI_SEMANTIC(K)(acc._, a._, b._, c._, d._, s._, t._, u._, v._, acc._);
+#define BODY_acc_abcdstuv(W, V, K) \
+  KASTARRI_SEMANTIC(K)(acc._, a._, b._, c._, d._, SLOT(s), SLOT(t), SLOT(u), SLOT(v), acc._);
 
 // --- Packs -------------------------------------------------------------------------------------------
 

@@ -21,12 +21,13 @@ inline Integers either(Integers where, Integers there, Integers elsewhere) {
 inline Integers lower_halves_extended(Integers v) {
   return sums_of_products(in_bits<Shorts>(v), in_bits<Shorts>(Words{} + 1));
 }
-// The number of 32 bits nearest to those of this sign that do not fit.
+// The end of the range of 32 bits on the side of a number whose upper word this is.
 inline Integers bound(Integers high) { return (high >> 31) ^ std::numeric_limits<std::int32_t>::max(); }
 
 // --- Roundings -------------------------------------------------------------------------------------------
 
-// By N, a word that all lanes share or a vector of words. Rounded half up, x / 2^n is half of x / 2^(n-1), plus a half.
+// By n, a word that all lanes share or a vector of words. With t = x >> (n - 1), x / 2^n rounded half up is (t + 1) >>
+// 1, and that is t - (t >> 1), which does not overflow.
 struct Rounded {
   [[maybe_unused]] static constexpr double added = 0.5;
   template <class N>
@@ -43,8 +44,8 @@ struct Truncated {
   }
 };
 
-// 32 lanes packed to lanes of type Half, by a rule that makes a register of words from two of the accumulator: one of
-// every pair of words, block by block.
+// 32 lanes of two words each packed to lanes of type Half. The rule makes a register of words from two registers of the
+// accumulator, one word of every pair, block by block.
 template <class Half, class Rule>
 [[gnu::always_inline]] inline void pack_two_by_two(const word* acc, word* r, Rule rule) {
   const auto words = [acc, rule](int k) {
@@ -68,8 +69,8 @@ struct EveryOther24 {
   }
 };
 
-// A lane at the top of its word is shifted by 8 more, so that 0 is a count like others; or a half is added in the room
-// above the lane.
+// Shifted by n. To truncate, the lane is moved to the top of its word and shifted back by n + 8. To round, a half,
+// which is 2^(n-1) or for n = 0 nothing, is added in the 8 bits of room above the sign-extended lane.
 template <class Rounding>
 inline Integers shifted24(Words lanes, word n) {
   if constexpr (Rounding::added == 0) return Rounding::shifted(in_bits<Integers>(lanes << 8), n + 8);
@@ -85,15 +86,15 @@ inline Integers shifted24(Words lanes, Words n) {
 #endif
 }
 
-// By one count the lanes are put in order last.
+// By a count that all lanes share they are shifted block by block and put in order last.
 template <class Half, class Rounding, int First>
 inline void pack_every_other24(const word* acc, word n, word* r) {
   pack_two_by_two<Half>(acc, r, [n](auto a, auto b) { return shifted24<Rounding>(every_other_word<First>(a, b), n); });
 }
 
 // --- Lanes of 48 bits to 16 by one count -----------------------------------------------------------------
-// 32 bits of a lane are enough: for a count up to 16 the low ones, above 16 those without the low 16 bits, of which no
-// shift leaves a trace. A lane that does not fit the low 32 bits saturates by any count up to 16.
+// A word of each lane is enough. Count > 16: its bits 16 .. 47, for the low 16 are shifted out. Count <= 16: its bits
+// 0 .. 31 if it fits them; if not, it is 2^31 or more, and 2^31 >> 16 is beyond 16 bits already: it saturates.
 
 struct Windows {
   Integers low, high;
@@ -122,8 +123,8 @@ inline void pack48(const word* acc, word count, word* r) {
 
 // --- Lanes of 48 and 64 bits to 32 -----------------------------------------------------------------------
 
-// The lanes of two registers, first and last, that make register number k of words: all lanes, or every other one. Of
-// their words, the even and the odd are put in order.
+// The lanes that make register number k of words, in two registers: all lanes, or every other one. `ordered` puts words
+// that were taken from both of them in the order of the lanes.
 struct Two {
   LongWords first, last;
 };
@@ -162,8 +163,8 @@ inline Words joined(HalfOfWords a, HalfOfWords b, std::index_sequence<I...>) {
   return __builtin_shufflevector(a, b, I...);
 }
 
-// Lanes of 64 bits shift as signed and saturate. Rounded half up, x / 2^n is half of 2x / 2^n, plus a half, if there is
-// room for 2x; else the last bit shifted out is added.
+// Eight lanes x of 64 bits by counts n of their own. x / 2^n rounded half up is ((2x >> n) + 1) >> 1 where 2x fits,
+// else (x >> n) plus the last bit shifted out, bit n - 1 of x.
 template <class Rounding, int Bits>
 inline __m512i eight_shifted(LongWords lanes, __m512i n) {
   const auto right = [n](__m512i v) { return _mm512_maskz_srav_epi64(0xFF, v, n); };
@@ -208,8 +209,8 @@ inline void pack48_by_counts(const word* acc, const word* counts, word* r) {
   }
 }
 #else
-// The low words of the shifted lanes, bounded where the lanes do not fit them; rounded, a word is raised by the last
-// bit shifted out unless it is the largest already.
+// Lanes of two words shifted right by n and clamped to a word: low >> n | high << (32 - n), where high >> n is but its
+// sign, else the end of the range. To round, the last bit shifted out is added, unless the word is 2^31 - 1 already.
 template <class Rounding, int Bits, class N>
 inline Integers shifted_pairs(Words low_words, Words high_words, N n) {
   const Integers high =

@@ -1,6 +1,7 @@
-// Vectors times coefficients that come in words of the scalar core: one, two or four products a lane.
-// Vector operand v of V meets coefficient V - 1 - v of the word, counted from its low end and around:
-// the last operand meets the lowest coefficient.
+// Vectors times coefficients that come in words of the scalar core: one, two or four products a lane. The last operand
+// meets the lowest coefficient of the word, the one before it the next, and after the highest comes the lowest again:
+//   two operands, two coefficients    a[i] * s1 + b[i] * s0
+//   four operands, two coefficients   a[i] * s1 + b[i] * s0 + c[i] * s1 + d[i] * s0
 #ifndef KASTARRI_MULTIPLY_TAPS_H
 #define KASTARRI_MULTIPLY_TAPS_H
 
@@ -9,7 +10,7 @@
 
 namespace {
 
-// Coefficients stored as Stored in each of Count words, which lanes use in turn.
+// Coefficients of type Stored in Count words. Lane i uses word i mod Count.
 template <class Stored, int Count = 1>
 struct Coefficients {
   using stored = Stored;
@@ -29,11 +30,19 @@ using u16 = Coefficients<std::uint16_t>;
 using s16_in_2 = Coefficients<std::int16_t, 2>;
 using u16_in_2 = Coefficients<std::uint16_t, 2>;
 
-// --- Sums of products by pairs -------------------------------------------------------------------------
-// Targets multiply pairs of neighbouring 16-bit numbers and add the two products in one step. So operands
-// are interleaved two by two to meet words that hold two coefficients.
+// The word in whose bytes a reference to coefficients points: the low two bits of the address are ignored. Compilers
+// take references to be aligned, and would not clear those bits if they saw where the address comes from.
+inline const word* word_around(const void* reference) {
+  auto address = reinterpret_cast<std::uintptr_t>(reference);
+  asm("" : "+r"(address));
+  return reinterpret_cast<const word*>(address & ~std::uintptr_t{3});
+}
 
-// The coefficients of pairs as 16-bit numbers: those of 8 bits from the odd bytes and from the even ones.
+// --- Sums of products by pairs -------------------------------------------------------------------------
+// Targets multiply neighbouring 16-bit numbers and add the two products in one instruction (sums_of_products). So
+// operands are interleaved two by two: a0 b0 a1 b1 ... times x y x y ... makes a0 x + b0 y, a1 x + b1 y ...
+
+// 8-bit coefficients as 16-bit numbers, one of each half of a word: its odd byte, its even byte.
 template <class Stored>
 inline Shorts odd_bytes(Words words) {
   using Lanes = std::conditional_t<std::is_signed_v<Stored>, Shorts, Halves>;
@@ -44,9 +53,9 @@ inline Shorts even_bytes(Words words) {
   return odd_bytes<Stored>(in_bits<Words>(in_bits<Halves>(words) << 8));
 }
 
-// Which operands are a pair, the one that meets the lower half of a word and the one that meets the upper:
-// operands 4 by bytes of a word are paired as those bytes are extended, others with their neighbours. Of a
-// single operand the upper partner is missing.
+// The operands of a pair: the one that meets the lower half of a word and the one that meets the upper. Neighbours, but
+// for four operands by the four bytes of a word: odd_bytes gives bytes 1 and 3 as a pair, so operands 2 and 0, which
+// meet them, are one as well. A single operand has no partner.
 template <class C>
 constexpr int lower_of(int pair) {
   return C::in_a_word == 4 ? pair + 2 : 2 * pair + 1;
@@ -56,14 +65,14 @@ constexpr int upper_of(int pair) {
   return C::in_a_word == 4 ? pair : 2 * pair;
 }
 
-// A value that is made here and not where it is used: compilers would keep what it is made of, for want of registers in
-// memory.
+// Keeps compilers from making the value later, where it is used: until then they would have to keep the two that it is
+// made of, more than there are registers for.
 inline Bytes made_now(Bytes v) {
   asm("" : "+x"(v));
   return v;
 }
 
-// The lanes of pairs side by side: those that either half of a block makes.
+// The operands interleaved pair by pair. half[0] has the lanes of the lower half of every block, half[1] of the upper.
 template <class L, class C, int Count>
 struct Pairs {
   static constexpr int count = (Count + 1) / 2;
@@ -80,8 +89,9 @@ struct Pairs {
   }
 };
 
-// Sums of 8-bit lanes, four registers of words from one of lanes. A signed lane is extended as 2^8 times
-// itself, which is as far up as its sum then has to be for the sign of a 24-bit lane.
+// Sums of 8-bit lanes: four registers of words come of one of lanes. A signed lane x is taken as 2^8 x, for that is how
+// it is extended soonest: interleaved above a byte of 0. The sum is then 2^8 times as large (scale), which puts a
+// 24-bit sum at the top of its word, where a shift down extends its sign.
 template <class L, class C, int Count, bool = L::bits == 8>
 struct Sums {
   static constexpr bool is_signed = std::is_signed_v<typename L::container>;
@@ -112,14 +122,15 @@ struct Sums {
   }
 };
 
-// A 16-bit lane as a signed one: of an unsigned lane the top bit is flipped, which takes 2^15 from it.
+// A 16-bit lane as a signed one. Of an unsigned lane x it is x - 2^15: flipping the top bit does that.
 template <class L>
 inline Shorts made_signed(Bytes v) {
   return in_bits<Shorts>(std::is_signed_v<typename L::container> ? in_bits<Halves>(v) : in_bits<Halves>(v) ^ 0x8000);
 }
 
-// Sums of 16-bit lanes, four registers of pairs of words from one of lanes. A coefficient of 16 bits is split into
-// bytes, so that the sums of all products with its parts are exact in a word, of whichever sign the factors are.
+// Sums of 16-bit lanes: four registers of pairs of words come of one of lanes. A coefficient c of 16 bits is split into
+// bytes, c = 2^8 odd + even. The sums of products with either part fit a word whatever the signs, and the sum wanted is
+// 2^8 by_odd + by_even.
 template <class L, class C, int Count>
 struct Sums<L, C, Count, false> {
   static constexpr bool is_signed = std::is_signed_v<typename L::container>;
@@ -127,7 +138,7 @@ struct Sums<L, C, Count, false> {
   static constexpr int pairs = (Count + 1) / 2;
   static constexpr bool split = C::in_a_word == 2;
   Shorts odd, even;
-  Words odd_bias, even_bias;  // what unsigned lanes, made signed by flipping their top bit, are short of
+  Words odd_bias, even_bias;  // 2^15 times the coefficients: what sums of unsigned lanes, taken as x - 2^15, lack
 
   explicit Sums(const word* words) {
     using stored = typename C::stored;
@@ -162,8 +173,8 @@ struct Sums<L, C, Count, false> {
   }
 };
 
-// Sums of 16-bit lanes by signed coefficients of 16 bits, which need not be split unless both of a pair are -2^15:
-// then, and only then, the sum of two products may not fit a word.
+// Sums of 16-bit lanes by signed coefficients of 16 bits that are not split. The sum of two products fits a word unless
+// all four factors are -2^15; a word of coefficients 0x80008000 is left to the sums above.
 template <class L, class C, int Count>
 struct UnsplitSums {
   static constexpr int scale = 0;
@@ -190,7 +201,8 @@ struct UnsplitSums {
     if constexpr (pairs == 2) {
       const auto other = sum_of_pair(operands.half[Quarter / 2][1]);
       const auto all = in_bits<Integers>(in_bits<Words>(low) + in_bits<Words>(other));
-      sign = majority(low, other, all);  // of both if they agree, else of their sum, which then fits
+      // The sign of the exact sum: that of both terms if theirs agree, else that of the wrapped sum, which then fits.
+      sign = majority(low, other, all);
       low = all;
     }
     const auto sum = pairs_of_words<Quarter % 2>(in_bits<Words>(low), sign >> 31);
@@ -237,7 +249,7 @@ template <class R, class Kind, class L, class C, class... Operands>
     if (__builtin_expect(Unsplit::serves(words), true))
       return put_taps<R, Kind, L, C>(Unsplit(words), acc, r, operands...);
     if constexpr (!entries_are_inlined)
-      asm("" : : : "memory");  // lest compilers load what both ways need before the branch, and spill it
+      asm("" : : : "memory");  // else compilers load what both ways need before the branch, and spill it
   }
   put_taps<R, Kind, L, C>(Sums<L, C, sizeof...(Operands)>(words), acc, r, operands...);
 }

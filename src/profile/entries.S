@@ -1,20 +1,16 @@
 // An entry for every intrinsic, under its own name: it counts the call in the thread's counters and jumps on
-// to the library, with the arguments and the return address where they are. It changes eax, ecx and the flags,
-// which every i386 function may.
+// to the library, with the arguments and the return address where they are. It changes the flags and registers that
+// every function may change: eax and ecx of an i386, r11 of an x86-64.
 
         .text
 
+#ifdef __i386__
         .type   pc_in_eax, @function
 pc_in_eax:
         movl    (%esp), %eax
         ret
 
-        .macro  entry symbol, index
-        .p2align 4
-        .globl  \symbol
-        .type   \symbol, @function
-\symbol:
-        .cfi_startproc
+        .macro  count_and_go index
 .Lagain\@:
         call    pc_in_eax
         addl    $_GLOBAL_OFFSET_TABLE_, %eax
@@ -29,6 +25,56 @@ pc_in_eax:
 .Lfirst\@:
         call    kastarri_profile_begin_thread
         jmp     .Lagain\@
+        .endm
+#else
+        // A thread's first call. Arguments lie in registers, and so does what a caller of variable arguments tells.
+        .type   begin_thread, @function
+begin_thread:
+        .cfi_startproc
+        .irp    register, rax, rdi, rsi, rdx, rcx, r8, r9
+        pushq   %\register
+        .cfi_adjust_cfa_offset 8
+        .endr
+        subq    $136, %rsp
+        .cfi_adjust_cfa_offset 136
+        .irp    n, 0, 1, 2, 3, 4, 5, 6, 7
+        movups  %xmm\n, 16 * \n(%rsp)
+        .endr
+        call    kastarri_profile_begin_thread
+        .irp    n, 0, 1, 2, 3, 4, 5, 6, 7
+        movups  16 * \n(%rsp), %xmm\n
+        .endr
+        addq    $136, %rsp
+        .cfi_adjust_cfa_offset -136
+        .irp    register, r9, r8, rcx, rdx, rsi, rdi, rax
+        popq    %\register
+        .cfi_adjust_cfa_offset -8
+        .endr
+        ret
+        .cfi_endproc
+        .size   begin_thread, . - begin_thread
+
+        .macro  count_and_go index
+.Lagain\@:
+        movq    kastarri_profile_counters@gottpoff(%rip), %r11
+        movq    %fs:(%r11), %r11
+        testq   %r11, %r11
+        jz      .Lfirst\@
+        incq    8 * \index(%r11)
+        jmp     *kastarri_profile_targets + 8 * \index(%rip)
+.Lfirst\@:
+        call    begin_thread
+        jmp     .Lagain\@
+        .endm
+#endif
+
+        .macro  entry symbol, index
+        .p2align 4
+        .globl  \symbol
+        .type   \symbol, @function
+\symbol:
+        .cfi_startproc
+        count_and_go \index
         .cfi_endproc
         .size   \symbol, . - \symbol
         .endm

@@ -11,7 +11,7 @@ namespace {
 template <class T>
 const void* aligned(const T* base, int offset) {
   const T* const accessed = address(base, offset);
-  const auto number = reinterpret_cast<word>(accessed);
+  const auto number = reinterpret_cast<std::uintptr_t>(accessed);
   if (number % sizeof(T) != 0) kastarri::not_aligned(number);
   return accessed;
 }

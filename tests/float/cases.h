@@ -124,7 +124,7 @@ inline void add_registers_by_distance(std::vector<Case>& all, const exact::Forma
   }
   // A subnormal factor, whose exponent does not tell how far below acc the product is.
   for (int exponent = f.least; operands == 3 && exponent < f.least + 2 * f.precision; ++exponent)
-    for (std::size_t i = 0; i < lanes; ++i) all.push_back({number(exponent), 1 + random() % 7, number(0)});
+    for (std::size_t i = 0; i < lanes; ++i) all.push_back({number(exponent), 1 + below(random, 7), number(0)});
 }
 
 inline std::vector<Case> cases(const exact::Format& f, int operands) {
@@ -164,10 +164,10 @@ inline std::vector<Case> cases(const exact::Format& f, int operands) {
       // acc that takes from the product what it has beyond the format, but for an acc's last bit.
       mpfr_sub(product, product, exact::Number(f, rounded), MPFR_RNDN);
       const Bits beyond = exact::round(f, product, MPFR_RNDN).bits;
-      all.push_back({(beyond ^ f.sign()) + random() % 3 - 1, x, y});
+      all.push_back({(beyond ^ f.sign()) + below(random, 3) - 1, x, y});
       // acc a few powers above a product that its last bit alone keeps from being a short number.
       const auto [u, v] = nearly_short_product(f, random);
-      all.push_back({one + (2 + random() % 6) * f.unit() - 1 - random() % 4, one + u, one + v});
+      all.push_back({one + (2 + below(random, 6)) * f.unit() - 1 - below(random, 4), one + u, one + v});
     }
     all.push_back(
         {short_number(f, one, random) - static_cast<Bits>(f.precision - 1 + static_cast<int>(random() % 3)) * f.unit(),

@@ -150,6 +150,9 @@ TEST(conversions, known_values) {
 
 // What is not a lane's own is not seen, and does not come back.
 TEST(conversions, bits_beside_the_lanes_are_ignored) {
+  EXPECT_EQ(static_cast<int>(as_register<rkbool>("\x2")), 0);
+  EXPECT_EQ(static_cast<int>(as_register<rkbool>("\x3")), 1);
+  EXPECT_EQ(static_cast<int>(as_register<rkbool4>("\xF5")), 5);
   qv_vecNx48 wide(-2);
   qv_vec2Nx24 bytes(-2);
   const qv_wvecspill clean48(wide), clean24(bytes);

@@ -3,6 +3,7 @@
 #include <algorithm>
 
 #include "frame/convert.h"
+#include "support/addresses.h"
 #include "support/drivers.h"
 
 namespace {
@@ -12,25 +13,32 @@ using namespace testing_support;
 // Memory with an object somewhere in the middle; everything else must stay as it is.
 class Memory {
  public:
-  Memory() {
+  Memory() : now_(new_pages(size_of_pages) + size_of_pages / 2 - middle) {
+    mprotect(pages(), size_of_pages, PROT_READ | PROT_WRITE);
     std::mt19937 random(seed);
     for (auto& byte : before_) byte = static_cast<unsigned char>(random());
-    std::copy(std::begin(before_), std::end(before_), std::begin(now_));
+    std::copy(std::begin(before_), std::end(before_), now_);
   }
+  Memory(const Memory&) = delete;
+  ~Memory() { munmap(pages(), size_of_pages); }
   unsigned char* at(int offset) { return now_ + middle + offset; }
   const unsigned char* old(int offset) const { return before_ + middle + offset; }
   bool unchanged_but(int offset, std::size_t size) const {
-    const int begin = middle + offset, end = begin + static_cast<int>(size);
-    return std::equal(now_, now_ + begin, before_) && std::equal(now_ + end, std::end(now_), before_ + end);
+    const std::size_t begin = static_cast<std::size_t>(middle + offset), end = begin + size;
+    return std::equal(now_, now_ + begin, before_) && std::equal(now_ + end, now_ + length, before_ + end);
   }
 
  private:
-  static constexpr int middle = 512;
-  alignas(64) unsigned char before_[1280];
-  alignas(64) unsigned char now_[1280];
+  static constexpr int middle = 512, length = 1280;
+  static constexpr std::size_t size_of_pages = 8192;
+
+  unsigned char* pages() const { return now_ + middle - size_of_pages / 2; }
+
+  unsigned char before_[length];
+  unsigned char* now_;
 };
 
-constexpr int offsets[] = {0, 1, 3, 64, -64, -37};
+constexpr int offsets[] = {0, 1, 3, 64, -64, -37, std::numeric_limits<int>::min(), std::numeric_limits<int>::max()};
 
 // A pointer as the core has it: any address, whatever the type says.
 template <class M>
@@ -76,20 +84,21 @@ Access access(void (*store)(const V&, M**, int)) {
   };
 }
 
-// Copies `bytes` bytes at every misalignment, for offsets and increments of either sign.
+// Copies `bytes` bytes at every misalignment, for offsets and increments of either sign: an offset from a base that is
+// as far away.
 void drive_copy(std::size_t bytes, bool stores, bool increments, const Access& copy) {
   for (int misalignment = 0; misalignment < 8; ++misalignment)
     for (int offset : offsets) {
       Memory memory;
       Image value;
       std::memset(value.bytes, 0xA5, sizeof value.bytes);
-      const void* after = copy(memory.at(misalignment), offset, value.bytes);
-      const int place = increments ? misalignment : misalignment + offset;
-      const void* expected = stores ? memory.at(place) : memory.old(place);
+      const void* at = memory.at(misalignment);
+      const void* after = copy(increments ? at : moved_back<const void>(at, offset), offset, value.bytes);
+      const void* expected = stores ? at : memory.old(misalignment);
       ASSERT_EQ(std::memcmp(value.bytes, expected, bytes), 0) << "at " << misalignment << " + " << offset;
-      ASSERT_TRUE(memory.unchanged_but(place, stores ? bytes : 0));
+      ASSERT_TRUE(memory.unchanged_but(misalignment, stores ? bytes : 0));
       if (increments) {
-        ASSERT_EQ(after, memory.at(misalignment + offset));
+        ASSERT_EQ(after, moved<const void>(at, offset));
       }
     }
 }

@@ -36,6 +36,29 @@ constexpr auto ABSSSUB = [](Int a, Int b) { return clamped<w>(std::max(a - b, b 
 
 }  // namespace model
 
+namespace testing_support {
+
+// The result apart and in the operand's place; the predicate says which operands are negative.
+template <class Model, class P, class T>
+void drive_a_pr(const std::string& name, const Model& model, void (*f)(P&, T&, const T&)) {
+  check(name, model, [f](const auto* images) {
+    T r = as_register<T>(images[0].bytes), apart;
+    P p = filled<P>(0x5A), p_apart = filled<P>(0xA5);
+    const T a = r;
+    f(p_apart, apart, a);
+    f(p, r, r);
+    for (int i = 0; i < layout_of<T>::count; ++i)
+      EXPECT_EQ(lane<layout_of<P>>(p._, i), lane<layout_of<T>>(a._, i) < 0) << "lane " << i;
+    EXPECT_TRUE(same_bits(p, p_apart) && same_bits(r, apart)) << "in place";
+    return r;
+  });
+}
+
+}  // namespace testing_support
+
+#define KERNEL_unary_and_signs KERNEL_unary
+#define TEST_a_pr(NAME, F, P, T, K) testing_support::drive_a_pr(NAME, model_##K, F)
+
 #define KASTARRI_TEST_SUITE "arithmetic"
 #include "support/drivers_begin.h"
 

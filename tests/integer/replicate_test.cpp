@@ -43,6 +43,13 @@ void drive_a_i_r_T(const std::string& name, void (*f)(T&, const T&, int, const P
   });
 }
 
+template <class R, class T>
+void drive_a_i_lane(const std::string& name, R (*f)(const T&, int)) {
+  drive_replicate<layout_of<T>, T>(name, [f](const std::string& text, const T& a, int number, const Int* expected) {
+    expect_lanes<layout_of<R>>(text, 0, {expected[0]}, f(a, number), [](int) { return ""; });
+  });
+}
+
 // Whatever stood where the value is made.
 template <class T>
 void drive_zero(T (*f)()) {
@@ -55,10 +62,12 @@ void drive_zero(T (*f)()) {
 }  // namespace testing_support
 
 #define KERNEL_replicate(...)
+#define KERNEL_selected(...)
 #define KERNEL_filled(...)
 #define TEST_a_i_r_T(NAME, F, T, P, K) testing_support::drive_a_i_r_T(NAME, F)
 #undef TEST_a_i_r
 #define TEST_a_i_r(NAME, F, T, K) testing_support::drive_a_i_r(NAME, F)
+#define TEST_a_i_lane(NAME, F, R, T, K) testing_support::drive_a_i_lane(NAME, F)
 #define TEST_value_r(NAME, F, T, K) testing_support::drive_zero(F)
 
 #define KASTARRI_TEST_SUITE "replicate"

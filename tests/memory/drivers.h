@@ -67,7 +67,7 @@ void expect_loads(const std::string& name, const Model<R, Rule, L>& model, unsig
 template <class Model, class V, class M, class... P>
 void drive_load_I(const std::string& name, const Model& model, V (*f)(const M*, int, const P&...)) {
   expect_loads<P...>(name, model, 1, [f](const unsigned char* at, int offset, const P&... p) {
-    return f(moved<const M>(at, static_cast<int>(-static_cast<unsigned>(offset))), offset, p...);
+    return f(moved_back<const M>(at, offset), offset, p...);
   });
 }
 
@@ -163,7 +163,7 @@ template <class Model, class V, class M, class... P>
 void drive_store_I(const std::string& name, const Model& model, void (*f)(const V&, const M*, int, const P&...),
                    unsigned alignment = 1) {
   const auto store = [=](const V& v, unsigned char* at, int offset, const P&... p) {
-    f(v, moved<const M>(at, static_cast<int>(-static_cast<unsigned>(offset))), offset, p...);
+    f(v, moved_back<const M>(at, offset), offset, p...);
   };
   expect_stores<V, P...>(name, model, alignment, store);
   (expect_merges<V, P>(name, model, store, filled<P>(0)), ...);
@@ -188,12 +188,7 @@ constexpr unsigned alignment_of(std::size_t size) { return size < 4 ? static_cas
 // The access ends the program with the one line that names the address.
 template <class Access>
 void expect_failure(const std::string& name, const void* address, Access access) {
-  char line[200];
-  std::snprintf(line, sizeof line,
-                "Error: The config takes exception when the address of an load/store is unaligned. "
-                "The address 0x%x is not properly aligned.\n",
-                address_of(address));
-  EXPECT_EXIT(access(), testing::ExitedWithCode(1), testing::Eq(std::string(line))) << name;
+  EXPECT_EXIT(access(), testing::ExitedWithCode(1), testing::Eq(not_aligned_message(address_of(address)))) << name;
 }
 
 // Accesses at addresses that are not aligned, in memory that may not be touched. The pointer of a

@@ -35,8 +35,15 @@ Words packed(const Elements& e, const std::vector<unsigned>& numbers) {
   return words;
 }
 
+// The address of element i: offsets of 32 bits are signed.
+std::uintptr_t address_of(const void* base, const Elements& e, unsigned i) {
+  const unsigned offset = e.offsets[i];
+  return address_of(e.unit_bytes == 4 ? moved<const void>(base, static_cast<int>(offset))
+                                      : static_cast<const unsigned char*>(base) + offset);
+}
+
 // Number of n bytes at the address that the program gave.
-unsigned number_at(const Memory& memory, const std::vector<unsigned char>& image, unsigned address, unsigned n) {
+unsigned number_at(const Memory& memory, const std::vector<unsigned char>& image, std::uintptr_t address, unsigned n) {
   unsigned value = 0;
   while (n-- > 0) value = value << 8 | image[address - address_of(memory.begin()) + n];
   return value;
@@ -46,7 +53,7 @@ Words model_gather(const Memory& memory, const void* base, const Elements& e) {
   std::vector<unsigned> out(32);
   const auto image = memory.copy();
   for (unsigned i = 0; i < e.lanes; ++i)
-    if (e.masks[i]) out[i] = number_at(memory, image, address_of(base) + e.offsets[i], e.bytes) & e.masks[i];
+    if (e.masks[i]) out[i] = number_at(memory, image, address_of(base, e, i), e.bytes) & e.masks[i];
   return packed(e, out);
 }
 
@@ -54,7 +61,7 @@ std::vector<unsigned char> model_scatter(const Memory& memory, const void* base,
   auto image = memory.copy();
   for (unsigned i = 0; i < e.lanes; ++i) {
     if (!e.masks[i]) continue;
-    const unsigned address = address_of(base) + e.offsets[i];
+    const std::uintptr_t address = address_of(base, e, i);
     unsigned value = number_at(memory, image, address, e.bytes);
     value = increment ? value + e.masks[i] % 2 : (value & ~e.masks[i]) | (e.data[i] & e.masks[i]);
     for (unsigned k = 0; k < e.bytes; ++k)
@@ -64,8 +71,8 @@ std::vector<unsigned char> model_scatter(const Memory& memory, const void* base,
 }
 
 // Rounds of offsets into memory: spread over all that 16 bits reach, all equal, few different, one byte
-// apart, pairs from both ends. The base of 32-bit offsets is far away, so that addresses wrap. Disabled
-// elements lie where memory may not be touched.
+// apart, pairs from both ends. The base of 32-bit offsets is far away, so that addresses wrap, or in the middle, so
+// that offsets have both signs. Disabled elements lie where memory may not be touched.
 class Rounds {
  public:
   static constexpr int count = 60;
@@ -75,22 +82,24 @@ class Rounds {
     memory.fill(random);
     const bool wide = e.unit_bytes == 4;
     const unsigned range = wide ? memory.size() - 4 : 0x10000 - 4;
-    const unsigned first = random() % (range - 64);
+    const unsigned first = below(random, range - 64);
     for (unsigned i = 0; i < 32; ++i) {
-      const unsigned choices[] = {random() % range, first, first + random() % 5, first + i,
+      const unsigned choices[] = {below(random, range), first, first + below(random, 5), first + i,
                                   first + (i < 16 ? i : 31 - i)};
       e.offsets[i] = choices[n % 5];
-      e.data[i] = random() & e.all_ones();
+      e.data[i] = static_cast<unsigned>(random()) & e.all_ones();
     }
     unsigned char* base = memory.begin();
+    const int middle = -static_cast<int>(memory.size() / 2);
+    const int to_base = !wide ? 0 : n % 3 ? std::numeric_limits<int>::min() : middle;
     if (n % 2 && !wide) base = memory.end() - 0xFFFF;  // the last element reads the last bytes
     for (unsigned i = 0; i < 32; ++i) {
       if (!enabled[i]) e.masks[i] = 0;
       if (!enabled[i] && wide) e.offsets[i] = memory.size() + 4 * i;
       if (!enabled[i] && !wide && n % 2) e.offsets[i] = 0xFFFF;
-      if (wide) e.offsets[i] += 0x80000000u;
+      if (wide) e.offsets[i] += static_cast<unsigned>(to_base);
     }
-    return base - (wide ? 0x80000000u : 0);
+    return moved_back<void>(base, to_base);
   }
 
   std::mt19937 random{seed};
@@ -246,7 +255,7 @@ TEST(GatherHelpers, HonourEveryControlWordAndMask) {
     Elements e(control | (control >= 0x200 ? 0xABCDE000 : 0));
     const void* base = rounds.next(static_cast<int>(control), e);
     for (unsigned i = 0; i < 32; ++i) {
-      const unsigned masks[] = {0, e.all_ones(), rounds.random() & e.all_ones(), 1u << rounds.random() % 16};
+      const unsigned masks[] = {0, e.all_ones(), below(rounds.random, e.all_ones()), 1u << rounds.random() % 16};
       e.masks[i] = masks[rounds.random() % 4];
       if (e.masks[i] == 0 && e.unit_bytes == 4) e.offsets[i] = 0x7FFFFFFF;
     }

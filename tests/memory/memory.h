@@ -2,14 +2,13 @@
 #ifndef KASTARRI_TESTS_MEMORY_H
 #define KASTARRI_TESTS_MEMORY_H
 
-#include <sys/mman.h>
-
 #include <random>
 #include <vector>
 
 #include "kastarri/gather.h"
 #include "kastarri/memory.h"
 #include "memory/row_kinds.h"
+#include "support/addresses.h"
 #include "support/drivers.h"
 
 namespace testing_support {
@@ -19,10 +18,7 @@ class Memory {
  public:
   static constexpr unsigned page = 4096;
 
-  explicit Memory(unsigned pages = 1)
-      : size_(pages * page),
-        all_(static_cast<unsigned char*>(
-            mmap(nullptr, size_ + 2 * page, PROT_NONE, MAP_SHARED | MAP_ANONYMOUS, -1, 0))) {
+  explicit Memory(unsigned pages = 1) : size_(pages * page), all_(new_pages(size_ + 2 * page)) {
     mprotect(begin(), size_, PROT_READ | PROT_WRITE);
   }
   Memory(const Memory&) = delete;
@@ -47,14 +43,6 @@ class Memory {
   unsigned size_;
   unsigned char* all_;
 };
-
-inline unsigned address_of(const void* p) { return reinterpret_cast<unsigned>(p); }
-
-// p moved by a step that may wrap.
-template <class M>
-M* moved(const void* p, int step) {
-  return reinterpret_cast<M*>(address_of(p) + static_cast<unsigned>(step));
-}
 
 // Predicates of all zeros, all ones, then random bits.
 template <class P>

@@ -14,10 +14,11 @@ class MultiplyName {
  public:
   explicit MultiplyName(std::string name) : rest_(std::move(name)) {
     square = take("SQR");
+    widened = take("ADDW") ? '+' : take("SUBW") ? '-' : ' ';
     if (!square) take("MUL");
     transfer = take("SGN");
     saturating = transfer && take("S");
-    first_unsigned = second_unsigned = take("UU") || (square && take("U"));
+    first_unsigned = second_unsigned = take("UU") || ((square || widened != ' ') && take("U"));
     if (!first_unsigned && !(first_unsigned = take("US"))) second_unsigned = take("SU");
     window = take("4T");
     difference = take("PD");
@@ -34,7 +35,7 @@ class MultiplyName {
 
   bool square, transfer, saturating, first_unsigned, second_unsigned, window, difference, high, predicated;
   int products;
-  char kind, pack = ' ';
+  char kind, pack = ' ', widened;  // widened lanes are added or subtracted, not multiplied
   std::string shape;
 
  private:
@@ -46,9 +47,15 @@ class MultiplyName {
   std::string rest_;
 };
 
-// The operands of one call, as bytes in memory.
+// The operands of one call, as bytes in memory. A reference to one may point beyond its first byte, into the same word.
 struct Factors {
   const unsigned char* operand[8];
+  std::size_t beyond[8];
+
+  template <class A>
+  [[gnu::no_sanitize("undefined")]] const A& reference(std::size_t which) const {
+    return *reinterpret_cast<const A*>(operand[which] + beyond[which]);
+  }
 
   Bits at(int which, int lane, int bits, bool is_unsigned) const {
     Bits value = 0;
@@ -100,6 +107,10 @@ class MultiplyModel {
       const Bits x = f.at(n_.square ? p : 2 * p, i, bits_, n_.first_unsigned);
       return x * (n_.square ? x : f.at(2 * p + 1, i, bits_, n_.second_unsigned));
     };
+    if (n_.widened != ' ') {
+      const Bits a = f.at(0, i, bits_, n_.first_unsigned), b = f.at(1, i, bits_, n_.first_unsigned);
+      return n_.widened == '+' ? a + b : a - b;
+    }
     if (n_.transfer) return signed_by(f.at(0, i, bits_, false), f.at(1, i, bits_, false));
     if (n_.products == 1) return product(0);
     return n_.difference ? product(0) - product(1) : product(0) + product(1);
@@ -200,6 +211,7 @@ void drive_multiply(const std::string& op, Call call) {
       const unsigned char* from = factors[which].bytes;
       const std::size_t slot = random() % 16;
       if (is_word && n % 2) from = reinterpret_cast<unsigned char*>(acc._);
+      if (is_word && n % 3 == 0) f.beyond[which] = random() % 4;
       f.operand[which++] = is_word ? from + 4 * slot : from;
     };
     (place(is_coefficient<A>), ...);
@@ -223,13 +235,12 @@ void drive_multiply(const std::string& op, Call call) {
 
 template <class R, class... A, std::size_t... I>
 void drive_multiply(const std::string& op, R (*function)(const A&...), std::index_sequence<I...>) {
-  drive_multiply<R, A...>(
-      op, [function](R&, const Factors& f) { return function(*reinterpret_cast<const A*>(f.operand[I])...); });
+  drive_multiply<R, A...>(op, [function](R&, const Factors& f) { return function(f.template reference<A>(I)...); });
 }
 template <class W, class... A, std::size_t... I>
 void drive_multiply(const std::string& op, void (*function)(W&, const A&...), std::index_sequence<I...>) {
   drive_multiply<W, A...>(op, [function](W& acc, const Factors& f) {
-    function(acc, *reinterpret_cast<const A*>(f.operand[I])...);
+    function(acc, f.template reference<A>(I)...);
     return acc;
   });
 }

@@ -76,6 +76,9 @@ TEST_F(Identities, accumulating_adds_and_subtracting_undoes) {
     expect_kinds_agree(wide, ZRA(MULNX16), ZRA(MULANX16), ZRA(MULSNX16), a, b);
     expect_kinds_agree(wide, ZRA(MULPNX16), ZRA(MULPANX16), ZRA(MULPSNX16), a, b, c, d);
     expect_kinds_agree(wide, ZRA(MULNX16C), ZRA(MULANX16C), ZRA(MULSNX16C), a, b);
+    expect_kinds_agree(wide, ZRA(ADDWNX16), ZRA(ADDWANX16), ZRA(ADDWSNX16), a, b);
+    expect_kinds_agree(wide, ZRA(SUBWUNX16), ZRA(SUBWUANX16), ZRA(SUBWUSNX16), qv_vecNx16U(a), qv_vecNx16U(b));
+    expect_kinds_agree(random<qv_vec2Nx24>(), ZRA(SUBW2NX8), ZRA(SUBWA2NX8), ZRA(SUBWS2NX8), e, f);
     expect_kinds_agree(wide, ZRA(SQRPNX16), ZRA(SQRPANX16), ZRA(SQRPSNX16), a, b);
     expect_kinds_agree(random<qv_vec2Nx24>(), ZRA(MUL2NX8), ZRA(MULA2NX8), ZRA(MULS2NX8), e, f);
     expect_kinds_agree(longs, ZRA(MULN_2X32), ZRA(MULAN_2X32), ZRA(MULSN_2X32), x, y);

@@ -1,4 +1,4 @@
-// Every multiply, by its name.
+// Every multiply, and every sum in wide lanes, by its name.
 #include "multiply/drivers.h"
 
 #define ENTRY(SYMBOL, SHAPE, ...)                                                                             \
@@ -19,6 +19,7 @@ namespace {
 #include "multiply/mixed8x16.def"
 #include "multiply/complex.def"
 #include "multiply/narrow.def"
+#include "multiply/sums.def"
 
 }  // namespace
 

@@ -9,7 +9,7 @@ U within the operation reads the lanes as unsigned (LTUNX16); U behind the layou
 
 import re
 
-from vocabulary import LAYOUTS, PREDICATES, Expected, Unknown, alternatives, const, prototype
+from vocabulary import ELEMENTS, LAYOUTS, PREDICATES, Expected, Unknown, alternatives, const, prototype
 
 VECTORS_AND_SCALARS = ["2NX8", "NX16", "N_2X32", "N_4X64", "8", "16", "32", "64"]
 
@@ -168,5 +168,50 @@ def sum_of_lanes(name, twins):
                     [("sum", result.code(sign), "CLAMPED" if clamped else "EXACT", layout.code(sign))])
 
 
+def combined_lanes(name, twins):
+    """RMAX, RMIN, RXOR, ROR, RAND: all lanes combined into one as wide. A combines with the accumulator too; U behind the
+    operation reads the lanes as unsigned, and its types are then unsigned; U behind the layout only names the types."""
+    del twins
+    bitwise = ["RXOR", "ROR", "RAND"]
+    operation, suffix, unsigned, predicated = split(
+        name, ["RMAX", "RMIN", "RMAXU", "RMINU", "RMAXA", "RMINA", *bitwise, *(o + "A" for o in bitwise)],
+        ["2NX8", "NX16", "N_2X32"])
+    layout = LAYOUTS[suffix]
+    rule, letter = re.fullmatch(r"R(MAX|MIN|XOR|OR|AND)([UA]?)", operation).groups()
+    accumulated, is_bitwise = letter == "A", "R" + rule in bitwise
+    if unsigned and not is_bitwise or predicated and accumulated:
+        raise Unknown(name)
+    unsigned_types = "U" if letter == "U" else unsigned
+    result, operand = LAYOUTS[ELEMENTS[suffix]].types[unsigned_types], const(layout.types[unsigned_types])
+    lanes = layout.code("u" if letter == "U" or is_bitwise else "i")
+    if accumulated:
+        return Expected(prototype("void", f"{result}&", operand), "acc_a", [("combined_with", rule, lanes)])
+    operands = [operand] + ([const(layout.predicate)] if predicated else [])
+    return Expected(prototype(result, *operands), "reduce_T" if predicated else "reduce", [("combined", rule, lanes)])
+
+
+def selection(name, twins):
+    """SELS: lane `immediate` as a scalar."""
+    del twins
+    operation, suffix, unsigned, predicated = split(name, ["SELS"])
+    if unsigned or predicated or suffix not in ELEMENTS:
+        raise Unknown(name)
+    layout = LAYOUTS[suffix]
+    return Expected(prototype(LAYOUTS[ELEMENTS[suffix]].types[""], const(layout.types[""]), "immediate"), "a_i_lane",
+                    [("selected", layout.code("i"))])
+
+
+def with_predicate(name, twins):
+    """B in front: the operation, and a predicate of what it loses: of ABS, which lanes were negative."""
+    del twins
+    operation, suffix, unsigned, predicated = split(name, ["BABS"])
+    if unsigned or predicated:
+        raise Unknown(name)
+    layout = LAYOUTS[suffix]
+    register_type = layout.types[""]
+    return Expected(prototype("void", f"{layout.predicate}&", f"{register_type}&", const(register_type)), "a_pr",
+                    [("unary_and_signs", operation[1:], layout.code("i"))])
+
+
 RULES = [lane_by_lane, immediate_shift, comparison, replication, zero, predicate_logic, predicate_reduction, first_lanes,
-         sum_of_lanes]
+         sum_of_lanes, combined_lanes, selection, with_predicate]

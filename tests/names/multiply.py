@@ -1,4 +1,4 @@
-"""Multiplies and packs: what their names say.
+"""Multiplies, widened sums and packs: what their names say.
 
 A multiply's name is read letter by letter:
 
@@ -204,6 +204,24 @@ def complex_product(m):
     return Expected(*m.result(wide_type(wide, layout.lanes), [const(layout.types[""])] * 2, "ab"), kernels)
 
 
+def widened(name, twins):
+    """ADDW, SUBW: lanes added or subtracted, both unsigned with U, in the accumulator's lanes. A and S as of products."""
+    del twins
+    match = re.fullmatch(r"(ADD|SUB)W(U?)([AS]?)(2NX8|NX16)", name)
+    if not match:
+        raise Unknown(name)
+    operation, unsigned, kind, lanes = match.groups()
+    layout, kind = LAYOUTS[lanes], KINDS[kind]
+    wide, code = ACCUMULATORS[layout.bits], layout.code("u" if unsigned else "i")
+    # A fresh sum is in range and fills the whole container of a lane.
+    result = f"i{(32 if wide == 24 else 64) if kind == FRESH else wide}x{layout.lanes}"
+    register_type, operands = wide_type(wide, layout.lanes), [const(layout.types[unsigned])] * 2
+    kernels = [("by_lane", kind, result, {"ADD": "SUM", "SUB": "DIFFERENCE"}[operation], code, code)]
+    if kind == FRESH:
+        return Expected(prototype(register_type, *operands), "ab_w", kernels)
+    return Expected(prototype("void", f"{register_type}&", *operands), "acc_ab", kernels)
+
+
 PACK = re.compile(r"PACK(?P<how>L|M|H|Q|P|VRNR|VR|VNR|V)(?P<unsigned>U?)(?P<wide>2NX24|NX48|N_2X64W|N_2X96)(?P<parity>_[01]|)")
 FIXED = {"L": "LOW", "M": "MIDDLE", "H": "HIGH", "Q": "Q15", "P": "Q10"}
 # Accumulator type, result of all lanes and of every other one, the containers that a rule reads.
@@ -252,4 +270,4 @@ def shifted(form, code, wide, rounding, parity, *counts):
     return form, code, "WordsOfPairs", rounding, lanes, "32", *counts
 
 
-RULES = [multiply, pack]
+RULES = [multiply, widened, pack]

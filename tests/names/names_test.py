@@ -62,7 +62,9 @@ class Names(unittest.TestCase):
         for pair in (("LTUNX16", "LTNX16"), ("SUBSNX16T", "SUBNX16T"), ("SRAN_2X32", "SRLN_2X32"), ("LTRSN_2", "LTRN_2"),
                      ("LVNX8U_I", "LVNX8S_I"), ("GATHERANX8U", "GATHERANX16U"), ("MAXU2NX8", "MAX2NX8"),
                      ("LSN_2X32_IP", "LSN_2X32_I"), ("RADDUNX16", "RADDNX16"), ("MULUSANX16", "MULUSSNX16"),
-                     ("PACKVRNX48", "PACKVRNRNX48"), ("OLTNXF16", "ULTNXF16")):
+                     ("PACKVRNX48", "PACKVRNRNX48"), ("RMAXUNX16", "RMAXNX16"),
+                     ("RORANX16", "RORNX16"), ("RANDNX16", "RXORNX16"), ("SUBWUANX16", "SUBWUSNX16"), ("ADDWUNX16", "ADDWNX16"),
+                     ("ADDWNX16", "SUBWNX16"), ("OLTNXF16", "ULTNXF16")):
             expected = [expected_of(f"rk_zra32_ZRA_{name}", set()) for name in pair]
             self.assertNotEqual((expected[0].shape, expected[0].kernels), (expected[1].shape, expected[1].kernels), pair)
 

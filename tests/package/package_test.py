@@ -16,7 +16,6 @@ import unittest
 HERE = os.path.dirname(os.path.abspath(__file__))
 ROOT = os.path.dirname(os.path.dirname(HERE))
 BUILD = os.path.abspath(sys.argv[1])
-MULTIARCH = "lib/i386-linux-gnu"  # where the test preset installs libraries
 
 
 def run(*command, **options):
@@ -37,6 +36,13 @@ def cached(name):
 
 VERSION = cached("CMAKE_PROJECT_VERSION")
 STATIC_TARGET = cached("KASTARRI_STATIC_TARGET")
+BITS = cached("KASTARRI_BITS")
+OTHER = {"32": "64", "64": "32"}[BITS]
+ARCHITECTURE = {"32": "i386", "64": "amd64"}[BITS]
+MULTIARCH = {"32": "lib/i386-linux-gnu", "64": "lib/x86_64-linux-gnu"}[BITS]  # where the test presets install libraries
+# Where the files of CMake and pkg-config are found: those of 32 bits whatever a project says.
+CMAKE_DIRECTORY = {"32": "lib", "64": MULTIARCH}[BITS] + "/cmake/kastarri"
+PKGCONFIG_DIRECTORIES = {"32": ["lib/pkgconfig", MULTIARCH + "/pkgconfig"], "64": [MULTIARCH + "/pkgconfig"]}[BITS]
 
 
 def processor_runs_static():
@@ -74,8 +80,8 @@ class Installation(Directory):
         shutil.move(os.path.join(staging, "opt", "elsewhere"), cls.prefix)
         cls.libraries = os.path.join(cls.prefix, MULTIARCH)
 
-    def environment(self):
-        return dict(os.environ, PKG_CONFIG_PATH=os.path.join(self.prefix, "lib", "pkgconfig"))
+    def environment(self, directory=PKGCONFIG_DIRECTORIES[0]):
+        return dict(os.environ, PKG_CONFIG_PATH=os.path.join(self.prefix, directory))
 
     def configure(self, *arguments):
         return run("cmake", "-S", os.path.join(HERE, "consumer"), "-B", self.path("build"),
@@ -114,24 +120,37 @@ class Installation(Directory):
                 self.assertNotEqual(configured.returncode, 0)
                 self.assertIn(message, " ".join(configured.stdout.split()))
 
-    def test_a_compiler_that_makes_no_32_bit_programs_is_refused(self):
-        compiler = self.path("only64")
+    def test_a_compiler_that_makes_no_such_programs_is_refused(self):
+        compiler = self.path("only_other")
         with open(compiler, "w", encoding="utf-8") as script:
-            script.write('#!/bin/sh\nfor a; do test "$a" != -m32 || exit 1; done\nexec g++ "$@"\n')
+            script.write(f'#!/bin/sh\nfor a; do test "$a" != -m{BITS} || exit 1; done\nexec g++ -m{OTHER} "$@"\n')
         os.chmod(compiler, 0o755)
-        configured = self.configure(f"-DCMAKE_CXX_COMPILER={compiler}")
+        configured = self.configure(f"-DCMAKE_CXX_COMPILER={compiler}", f"-DKASTARRI_BITS={BITS}")
         self.assertNotEqual(configured.returncode, 0)
-        self.assertIn("kastarri is a 32-bit x86 library", configured.stdout)
+        self.assertIn(f"kastarri is a {BITS}-bit x86 library", configured.stdout)
+
+    def test_a_project_of_the_other_width_is_told(self):
+        configured = self.configure(f"-DKASTARRI_BITS={OTHER}")
+        self.assertNotEqual(configured.returncode, 0)
+        self.assertIn(f"version: {VERSION} for {BITS}-bit programs, not for those of this project",
+                      " ".join(configured.stdout.split()))
+        if OTHER == "32":  # CMake looks among libraries for 64 bits only where programs are
+            self.assertIn("Could not find a package configuration file provided by \"kastarri\"",
+                          " ".join(self.configure("-DCMAKE_CXX_FLAGS=-m32", "--fresh").stdout.split()))
+        # Who says nothing may have the 32-bit library, and hears of it.
+        told = "there is no library for 64-bit programs" in self.configure("--fresh", "-UKASTARRI_BITS").stdout
+        self.assertEqual(told, BITS == "32")
 
     def test_pkg_config_has_all_that_a_compiler_needs(self):
         modules = {"kastarri": True, "kastarri-static": processor_runs_static()}
-        for (module, runs), compiler in itertools.product(modules.items(), ("g++", "clang++")):
-            with self.subTest(module=module, compiler=compiler):
-                self.assertEqual(output("pkg-config", "--modversion", module, env=self.environment()).strip(), VERSION)
+        for module, directory, compiler in itertools.product(modules, PKGCONFIG_DIRECTORIES, ("g++", "clang++")):
+            with self.subTest(module=module, directory=directory, compiler=compiler):
+                environment = self.environment(directory)
+                self.assertEqual(output("pkg-config", "--modversion", module, env=environment).strip(), VERSION)
                 # The shell takes apart what pkg-config prints, spaces in the prefix being quoted.
                 output("sh", "-c", f'eval "{compiler} -O2 {HERE}/consumer/main.cpp -o {self.path(module)} '
-                       f'$(pkg-config --cflags --libs {module})"', env=self.environment())
-                if runs:
+                       f'$(pkg-config --cflags --libs {module})"', env=environment)
+                if modules[module]:
                     self.check_answer(self.path(module), LD_LIBRARY_PATH=self.libraries)
 
     def test_both_ways_compile_for_sse2_and_nothing_that_one_compiler_lacks(self):
@@ -146,10 +165,10 @@ class Installation(Directory):
                 self.assertTrue({"-msse2", "-mavx2", "-mavx512f"} & set(given))
                 self.assertEqual([flag for flag in given if "-max=" in flag], [])
 
-    def test_headers_say_that_the_library_is_32_bit(self):
-        compiled = run("g++", "-m64", "-fsyntax-only", "-I", os.path.join(self.prefix, "include"), "-x", "c++", "-",
+    def test_headers_say_which_programs_they_are_for(self):
+        compiled = run("g++", "-mx32", "-fsyntax-only", "-I", os.path.join(self.prefix, "include"), "-x", "c++", "-",
                        input='#include "kastarri.h"\n')
-        self.assertIn("compile with -m32", compiled.stdout)
+        self.assertIn("compile with -m32 or -m64", compiled.stdout)
 
     def test_links_of_the_library(self):
         major = VERSION.split(".", maxsplit=1)[0]
@@ -164,8 +183,8 @@ class DebianPackages(Directory):
         output("cpack", "--config", os.path.join(BUILD, "CPackConfig.cmake"), "-B", cls.shared)
         major = VERSION.split(".", maxsplit=1)[0]
         cls.runtime_name = f"libkastarri{major}"
-        cls.runtime = os.path.join(cls.shared, f"{cls.runtime_name}_{VERSION}_i386.deb")
-        cls.devel = os.path.join(cls.shared, f"libkastarri-dev_{VERSION}_i386.deb")
+        cls.runtime = os.path.join(cls.shared, f"{cls.runtime_name}_{VERSION}_{ARCHITECTURE}.deb")
+        cls.devel = os.path.join(cls.shared, f"libkastarri-dev_{VERSION}_{ARCHITECTURE}.deb")
 
     def fields(self, package, *names):
         return [output("dpkg-deb", "-f", package, name).strip() for name in names]
@@ -176,9 +195,9 @@ class DebianPackages(Directory):
         return {line[5].split(" -> ")[0].removeprefix("./"): (line[0], line[1]) for line in listed if line[0][0] != "d"}
 
     def test_what_packages_say_of_themselves(self):
-        fields = ("Version", "Architecture", "Section")
-        self.assertEqual(self.fields(self.runtime, *fields), [VERSION, "i386", "libs"])
-        self.assertEqual(self.fields(self.devel, *fields), [VERSION, "i386", "libdevel"])
+        fields = ("Version", "Architecture", "Multi-Arch", "Section")
+        self.assertEqual(self.fields(self.runtime, *fields), [VERSION, ARCHITECTURE, "same", "libs"])
+        self.assertEqual(self.fields(self.devel, *fields), [VERSION, ARCHITECTURE, "same", "libdevel"])
         self.assertEqual(self.fields(self.devel, "Depends"), [f"{self.runtime_name} (= {VERSION}), libc6 (>= 2.34), python3:any"])
         for package in self.runtime, self.devel:
             synopsis, *rest = self.fields(package, "Description")[0].splitlines()
@@ -203,7 +222,8 @@ class DebianPackages(Directory):
         headers = {"usr/include/" + os.path.relpath(path, os.path.join(ROOT, "include"))
                    for path in glob.glob(os.path.join(ROOT, "include", "**", "*.h"), recursive=True)}
         links = {f"usr/{MULTIARCH}/libkastarri.so", f"usr/{MULTIARCH}/libkastarri_static.a",
-                 "usr/lib/pkgconfig/kastarri.pc", "usr/lib/cmake/kastarri/kastarri-config.cmake"}
+                 "usr/bin/kastarri-port", "usr/share/kastarri/port.json", f"usr/{CMAKE_DIRECTORY}/kastarri-config.cmake",
+                 *(f"usr/{directory}/kastarri.pc" for directory in PKGCONFIG_DIRECTORIES)}
         self.assertEqual((headers | links | documents["libkastarri-dev"]) - set(devel), set(), "missing")
         self.assertEqual(set(runtime) & set(devel), set(), "in both packages")
         for name, (mode, owner) in {**runtime, **devel}.items():
@@ -233,10 +253,10 @@ class DebianPackages(Directory):
         os.makedirs(os.path.join(database, "updates"))
         open(os.path.join(database, "status"), "w", encoding="utf-8").close()
         dpkg = ["dpkg", f"--root={root}", f"--log={self.path('log')}", "--force-depends"]
-        output(*dpkg, "--add-architecture", "i386")
+        output(*dpkg, "--add-architecture", ARCHITECTURE)
         output(*dpkg, "-i", self.runtime, self.devel)
         self.assertTrue(os.path.exists(os.path.join(root, "usr", MULTIARCH, "libkastarri.so")))
-        output(*dpkg, "-P", "libkastarri-dev:i386", f"{self.runtime_name}:i386")
+        output(*dpkg, "-P", f"libkastarri-dev:{ARCHITECTURE}", f"{self.runtime_name}:{ARCHITECTURE}")
         left = [os.path.join(path, name) for path, _, files in os.walk(root) for name in files
                 if not path.startswith(os.path.join(root, "var"))]
         self.assertEqual(left, [])

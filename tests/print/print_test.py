@@ -21,7 +21,9 @@ import generate_headers  # noqa: E402
 
 LIBRARY = os.path.abspath(sys.argv[1])
 COMPILERS = ["g++", "clang++"]
-FLAGS = ["-m32", "-std=c++11", "-Wall", "-Wextra", "-Wpedantic", "-Wconversion", "-Wshadow", "-Werror",
+with open(LIBRARY, "rb") as library_file:
+    BITS = 32 * library_file.read(5)[4]  # by the class of the ELF file
+FLAGS = [f"-m{BITS}", "-std=c++11", "-Wall", "-Wextra", "-Wpedantic", "-Wconversion", "-Wshadow", "-Werror",
          "-I", os.path.join(ROOT, "include")]
 FORMS = ["decimal", "hex", "float", "half", "q0", "q7", "q15", "q31", "q63"]
 TYPES = generate_headers.read_types()

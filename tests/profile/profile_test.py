@@ -6,6 +6,7 @@ Run as: profile_test.py BUILD CMAKE
 import csv
 import os
 import signal
+import struct
 import subprocess
 import sys
 import tempfile
@@ -19,10 +20,26 @@ CALLS = os.path.join(PROGRAMS, "calls_lazy")
 BUILDS = [os.path.join(PROGRAMS, name) for name in ("calls_lazy", "calls_now", "calls_no_plt", "calls_fixed")]
 HOST, PLUGIN = os.path.join(PROGRAMS, "host"), os.path.join(PROGRAMS, "libplugin.so")
 
+with open(CALLS, "rb") as program:
+    IS_64_BIT = program.read(5)[4] == 2  # the class of an ELF file
+
 BEFORE_MAIN = {"RK_CLAMPS": 1, "int32_rtor_qv_vecNx16": 1}
 RESULTS = {"RK_CLAMPS": 2, "int32_rtor_qv_vecNx16": 1, "ZRA_LVNX16_IP": 1, "ZRA_MULNX16": 1, "ZRA_MULANX16": 1,
            "float_rtor_qv_vecN_2xf32": 1}
 SVG = "{http://www.w3.org/2000/svg}"
+
+
+def with_loader(header, name):
+    """An ELF header and behind it a table of one segment, which names the dynamic loader."""
+    if header[4] == 1:
+        segment = struct.pack("<8I", 3, len(header) + 32, 0, 0, len(name), len(name), 4, 1)
+        table = {28: struct.pack("<I", len(header)), 42: struct.pack("<HH", len(segment), 1)}
+    else:
+        segment = struct.pack("<IIQQQQQQ", 3, 4, len(header) + 56, 0, 0, len(name), len(name), 1)
+        table = {32: struct.pack("<Q", len(header)), 54: struct.pack("<HH", len(segment), 1)}
+    for place, number in table.items():
+        header = header[:place] + number + header[place + len(number):]
+    return header + segment + name
 
 
 class ProfileTest(unittest.TestCase):
@@ -167,6 +184,11 @@ class Errors(ProfileTest):
     def test_what_cannot_be_profiled_is_named(self):
         x86 = b"\x7fELF\x01\x01\x01" + bytes(9) + b"\x02\x00\x03\x00" + bytes(32)
         x86_64 = b"\x7fELF\x02\x01\x01" + bytes(9) + b"\x02\x00\x3e\x00" + bytes(44)
+        arm = b"\x7fELF\x01\x01\x01" + bytes(9) + b"\x02\x00\x28\x00" + bytes(32)
+        # A program of the other width that names its loader, where this build has the files of one width.
+        self.assertEqual(len(os.listdir(os.path.join(BUILD, "lib", "kastarri", "profile"))), 1)
+        other = (x86 if IS_64_BIT else x86_64)
+        other = with_loader(other, b"/lib/ld.so\0")
         for command, status, message in (
                 (["no-such-program"], 127, "there is no program no-such-program"),
                 ([self.path("absent")], 127, "there is no program"),
@@ -174,8 +196,10 @@ class Errors(ProfileTest):
                 ([self.program("plain", x86, mode=0o644)], 126, "not an executable file"),
                 ([self.program("script", b"#!/bin/sh\n")], 126, "not a program but a script"),
                 ([self.program("empty", b"")], 126, "not a program"),
-                ([self.program("wide", x86_64)], 126, "not a 32-bit x86 program"),
+                ([self.program("arm", arm)], 126, "not an x86 program"),
+                ([self.program("other", other)], 126, f"is a {32 if IS_64_BIT else 64}-bit program, and kastarri for those"),
                 ([self.program("static", x86)], 126, "linked statically"),
+                ([self.program("static64", x86_64)], 126, "linked statically"),
                 ([HOST], 126, "not linked with libkastarri.so"),
                 (["--csv", self.path("no/such.csv"), CALLS], 125, "cannot write .*no/such.csv: No such file"),
                 (["--top", "0", CALLS], 2, "--top: '0' is not a number above 0"),

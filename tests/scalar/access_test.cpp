@@ -1,8 +1,7 @@
 // Loads and stores of the scalar core: every width at every offset, and the failure at addresses that are
 // not aligned, before the memory is touched.
-#include <sys/mman.h>
-
 #include "kastarri/scalar.h"
+#include "support/addresses.h"
 #include "support/drivers.h"
 
 namespace {
@@ -54,31 +53,26 @@ void expect_stores(const char* name, void (*store)(V, const T*, int)) {
 // What an access at an address that is not aligned does, on a page that may not be touched: the line, the
 // status, and no fault.
 template <class Access>
-void expect_failure(const char* name, unsigned address, const Access& access) {
-  char line[200];
-  std::snprintf(line, sizeof line,
-                "Error: The config takes exception when the address of an load/store is unaligned. "
-                "The address 0x%x is not properly aligned.\n",
-                address);
-  EXPECT_EXIT(access(), testing::ExitedWithCode(1), testing::Eq(std::string(line))) << name;
+void expect_failure(const char* name, std::uintptr_t address, const Access& access) {
+  EXPECT_EXIT(access(), testing::ExitedWithCode(1), testing::Eq(not_aligned_message(address))) << name;
 }
 
 class AccessDeathTest : public testing::Test {
  protected:
-  AccessDeathTest() : page_(mmap(nullptr, 4096, PROT_NONE, MAP_PRIVATE | MAP_ANONYMOUS, -1, 0)) {}
-  ~AccessDeathTest() override { munmap(page_, 4096); }
+  AccessDeathTest() : page_(new_pages(SIZE_OF_PAGE)) {}
+  ~AccessDeathTest() override { munmap(page_, SIZE_OF_PAGE); }
 
   // Base and offset can each be aligned or not: their sum counts.
   template <class T, class Access>
   void expect_failures(const char* name, const Access& access) {
-    const auto base = reinterpret_cast<unsigned>(page_) + 1024;
-    for (const auto& [base_part, offset] : {std::pair{0u, 1}, {1u, 0}, {1u, -2}, {2u, 1}, {0u, 2}, {3u, 3}}) {
-      const unsigned address = base + base_part + static_cast<unsigned>(offset);
-      const auto* pointer = reinterpret_cast<const T*>(base + base_part);
+    for (const auto& [base_part, offset] : {std::pair{0, 1}, {1, 0}, {1, -2}, {2, 1}, {0, 2}, {3, 3}}) {
+      const auto* pointer = moved<const T>(page_, 1024 + base_part);
+      const auto address = address_of(moved<void>(pointer, offset));
       if (address % sizeof(T) != 0) expect_failure(name, address, [&, by = offset] { access(pointer, by); });
     }
   }
 
+  static constexpr std::size_t SIZE_OF_PAGE = 4096;
   void* page_;
 };
 
@@ -103,11 +97,20 @@ TEST(Access, StoresWriteTheirBytesAndNoOthers) {
   expect_stores("S8I", CORE(S8I));
 }
 
+// Offsets are signed and addresses wrap, where memory begins and ends as at each multiple of 4 GiB.
 TEST(Access, AddressesWrap) {
-  const int there = 0x1234567;
-  const auto address = reinterpret_cast<unsigned>(&there);
-  const auto* far_base = reinterpret_cast<const int*>(address - 0x80000000u);
-  EXPECT_EQ(CORE(L32I)(far_base, std::numeric_limits<int>::min()), there);
+  constexpr std::size_t size = 8192;
+  unsigned char* const pages = new_pages(size);
+  mprotect(pages, size, PROT_READ | PROT_WRITE);
+  for (int place = 4096 - 64; place < 4096 + 64; place += 4) {
+    for (int offset : {std::numeric_limits<int>::min(), -4096, -4, 0, 4, 4096, std::numeric_limits<int>::max()}) {
+      const int number = 0x1234567 ^ offset ^ place;
+      CORE(S32I)(number, moved_back<const int>(pages + place, offset), offset);
+      EXPECT_EQ(CORE(L32I)(moved_back<const int>(pages + place, offset), offset), number) << place << ' ' << offset;
+      EXPECT_EQ(std::memcmp(pages + place, &number, sizeof number), 0) << place << ' ' << offset;
+    }
+  }
+  munmap(pages, size);
 }
 
 TEST_F(AccessDeathTest, LoadsNeedTheirAlignment) {
@@ -130,6 +133,7 @@ TEST_F(AccessDeathTest, StoresNeedTheirAlignment) {
 TEST_F(AccessDeathTest, ReportsTheAddressItIsGiven) {
   expect_failure("low", 0x1002, [] { CORE(L32I)(reinterpret_cast<const int*>(0x1000), 2); });
   expect_failure("high", 0xFFFFFFFF, [] { cstub_vaddr_not_aligned(0xFFFFFFFF); });
+  expect_failure("whole", UINTPTR_MAX - 1, [] { CORE(L32I)(reinterpret_cast<const int*>(UINTPTR_MAX), -1); });
 }
 
 }  // namespace

@@ -12,6 +12,9 @@ namespace testing_support {
 
 inline constexpr unsigned seed = 20231;
 
+// A random number below n. The generator's own numbers have 64 bits on some hosts.
+inline unsigned below(std::mt19937& random, unsigned n) { return static_cast<unsigned>(random()) % n; }
+
 // The values of a lane at which rules change: small counts of either sign, bounds, powers of two and
 // their neighbours; every value of a lane of 8 bits or fewer.
 std::vector<Int> corners(const Format& format);
@@ -34,10 +37,10 @@ struct Image {
 
 // Rounds of register images for an operation's operands: every pair of corners of the last two operands
 // meets in some lane, the others run through their corners beside them; then random lanes. One operand
-// of 16 bits or fewer takes all its values.
+// of 16 bits or fewer takes all its values if it may.
 class OperandImages {
  public:
-  explicit OperandImages(std::vector<Format> formats);
+  explicit OperandImages(std::vector<Format> formats, bool all_values = true);
 
   int rounds() const { return cross_rounds_ + random_rounds; }
 

@@ -34,10 +34,11 @@ void scatter_masked(const void* base, const unsigned* offsets, const unsigned* m
   const Read<L> mask(masks), lane(data), offset(offsets);
   for (int i = 0; i < L::count; ++i) {
     if (mask[i] == 0) continue;
-    const Unit old = element<Unit>(base, offset[i]);
+    const Distance place = distance(offset[i]);
+    const Unit old = element<Unit>(base, place);
     asm volatile("" : : "r"(old));
     const auto merged = increment ? old + (mask[i] & 1u) : old ^ (mask[i] & (lane[i] ^ old));
-    element<Element>(base, offset[i]) = static_cast<Element>(merged);
+    element<Element>(base, place) = static_cast<Element>(merged);
   }
 }
 

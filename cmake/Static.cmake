@@ -1,10 +1,11 @@
 # The static library: one target, without dispatch. Its integer, multiply and memory intrinsics, moves and conversions
 # can be inlined into kernels at link time, by the compiler that built it. GCC's objects hold machine code besides, for
 # links without; clang's are bitcode alone, which the linker's plugin turns into code where no flag asks for more.
+# Vectors of floats can be inlined with AVX-512, where every operation is an instruction that carries its rounding.
 #
-# Floats and the scalar core stay calls. How the compiler may treat floating-point arithmetic is up to the
-# flags of the function that it is inlined into, and the rules count on theirs. The state block is looked up
-# in assembler statements, which the optimiser at link time does not read.
+# Floats of the other targets and the scalar core stay calls. How the compiler may treat floating-point arithmetic is up
+# to the flags of the function that it is inlined into, and the rules of those targets count on theirs. The core finds
+# its state in assembler statements, which the optimiser at link time does not read.
 if(NOT KASTARRI_STATIC_TARGET IN_LIST KASTARRI_KNOWN_TARGETS)
   message(FATAL_ERROR
     "KASTARRI_STATIC_TARGET: unknown target '${KASTARRI_STATIC_TARGET}'; known are ${KASTARRI_KNOWN_TARGETS}")
@@ -12,11 +13,6 @@ endif()
 if(KASTARRI_SANITIZE)
   message(FATAL_ERROR "KASTARRI_BUILD_STATIC: the static library is not built with sanitizers")
 endif()
-
-set(inlined ${KASTARRI_VECTOR_SOURCES})
-list(FILTER inlined EXCLUDE REGEX "/src/float/")
-set(called ${KASTARRI_VECTOR_SOURCES} ${KASTARRI_SCALAR_SOURCES})
-list(REMOVE_ITEM called ${inlined})
 
 # A kernel is compiled for the same machine: without, nothing may be inlined into it. How wide copies are g++ alone can
 # be told, and kernels gain nothing: intrinsics move whole registers.
@@ -28,6 +24,14 @@ endfunction()
 
 # The static library `name` for one target.
 function(kastarri_static_library name target)
+  set(inlined ${KASTARRI_VECTOR_SOURCES})
+  if(target STREQUAL avx512)
+    list(FILTER inlined EXCLUDE REGEX "/src/float/scalars.cpp$")
+  else()
+    list(FILTER inlined EXCLUDE REGEX "/src/float/")
+  endif()
+  set(called ${KASTARRI_VECTOR_SOURCES} ${KASTARRI_SCALAR_SOURCES})
+  list(REMOVE_ITEM called ${inlined})
   add_library(${name}_called OBJECT ${called})
   add_library(${name} STATIC ${inlined} $<TARGET_OBJECTS:${name}_called>)
   kastarri_build_targets(${CMAKE_CURRENT_BINARY_DIR}/${name}.dir ${target})

@@ -46,5 +46,15 @@ void chain_at(const short* x, const short* taps, short* y, int count, void* fram
 
 }  // namespace
 
+void multiply_add_multiply(const float* a, const float* b, const float* c, const float* gain, float* y, int samples) {
+  const auto load = [](const float* at) { return ZRA_LVN_2XF32_I(reinterpret_cast<const qv_vecN_2xf32*>(at), 0); };
+  const qv_vecN_2xf32 g = load(gain);
+  for (int i = 0; i < samples; i += 16) {
+    qv_vecN_2xf32 sum = load(c + i);
+    ZRA_MULAN_2XF32(sum, load(a + i), load(b + i));
+    ZRA_SVN_2XF32_I(ZRA_MULN_2XF32(sum, g), reinterpret_cast<qv_vecN_2xf32*>(y + i), 0);
+  }
+}
+
 extern "C" __attribute__((visibility("default"))) const Kernels kernels;
-const Kernels kernels = {fir, convolve, chain, chain_at, count_greys, look_up};
+const Kernels kernels = {fir, convolve, chain, chain_at, multiply_add_multiply, count_greys, look_up};

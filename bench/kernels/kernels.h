@@ -4,6 +4,7 @@
 
 #include "convolve/convolve.h"
 #include "fir/fir.h"
+#include "floats.h"
 #include "histogram/histogram.h"
 
 constexpr int CHAIN_TAPS = 16;
@@ -15,6 +16,7 @@ struct Kernels {
   decltype(&::convolve) convolve;
   decltype(&::fir) chain;  // the filter with a multiply-accumulate a tap, written without a thought of speed
   void (*chain_at)(const short* x, const short* taps, short* y, int count, void* frame);  // its registers there
+  decltype(&::multiply_add_multiply) multiply_add_multiply;
   decltype(&::count_greys) count_greys;
   decltype(&::look_up) look_up;
 };

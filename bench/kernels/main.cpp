@@ -3,6 +3,7 @@
 #include <dlfcn.h>
 
 #include <algorithm>
+#include <cmath>
 #include <cstdio>
 #include <cstdlib>
 #include <random>
@@ -108,6 +109,20 @@ void compare_convolution(const std::vector<Way>& ways, const char* name, const F
       [&](const Kernels& kernels) { out.make(kernels.convolve, in, filter); }, [&] { return out.picture().pixels; });
 }
 
+void compare_floats(const std::vector<Way>& ways) {
+  constexpr int samples = 1024;
+  std::minstd_rand random(1);
+  std::vector<float> a(samples), b(samples), c(samples), gain(16), y(samples);
+  for (auto* const operand : {&a, &b, &c, &gain})
+    for (float& x : *operand)
+      x = std::ldexp(1 + static_cast<float>(random() % 1000) / 1000, static_cast<int>(random() % 24) - 12);
+  compare_ways(
+      "float multiply-add and multiply", ways, 32, samples,
+      [](const Kernels& k) { return k.multiply_add_multiply != nullptr; },
+      [&](const Kernels& k) { k.multiply_add_multiply(a.data(), b.data(), c.data(), gain.data(), y.data(), samples); },
+      [&] { return y; });
+}
+
 void compare_tables(const std::vector<Way>& ways) {
   constexpr int pixels = 16384;
   std::minstd_rand random(1);
@@ -143,5 +158,6 @@ int main(int argc, char** argv) {
   compare_convolution(ways, "four masks of 3 x 3", sobel());
   compare_chain(ways);
   for (const int offset : {0, 16, 32}) compare_chain_at(ways, offset);
+  compare_floats(ways);
   compare_tables(ways);
 }

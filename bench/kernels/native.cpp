@@ -67,5 +67,11 @@ void convolve_native(const std::uint8_t* __restrict in, int in_stride, const Fil
 
 }  // namespace
 
+void multiply_add_multiply(const float* a, const float* b, const float* c, const float* gain, float* __restrict y,
+                           int samples) {
+  for (int i = 0; i < samples; i += 16)
+    for (int k = 0; k < 16; ++k) y[i + k] = __builtin_fmaf(a[i + k], b[i + k], c[i + k]) * gain[k];
+}
+
 extern "C" __attribute__((visibility("default"))) const Kernels kernels;
 const Kernels kernels = {fir_native, convolve_native, fir_native, nullptr, count_greys_reference, look_up_reference};

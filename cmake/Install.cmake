@@ -43,7 +43,7 @@ endfunction()
 
 kastarri_install(kastarri shared kastarri kastarri ${KASTARRI_USER_FLAGS})
 if(KASTARRI_BUILD_STATIC)
-  kastarri_install(kastarri_static static kastarri-static kastarri_static ${KASTARRI_STATIC_COMMON_FLAGS})
+  kastarri_install(kastarri_static static kastarri-static kastarri_static ${KASTARRI_STATIC_FLAGS})
 endif()
 
 # By the rules of semantic versioning, before 1.0.0 a new minor version may break what was.

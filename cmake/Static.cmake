@@ -1,6 +1,7 @@
-# The static library: one target, without dispatch. With GCC its integer, multiply and memory intrinsics, moves
-# and conversions can be inlined into kernels at link time; the objects hold machine code besides, for links without.
-# So can vectors of floats with AVX-512, where every operation is an instruction that carries its rounding.
+# The static library: one target, without dispatch. Its integer, multiply and memory intrinsics, moves and conversions
+# can be inlined into kernels at link time, by the compiler that built it. GCC's objects hold machine code besides, for
+# links without; clang's are bitcode alone, which the linker's plugin turns into code where no flag asks for more.
+# Vectors of floats can be inlined with AVX-512, where every operation is an instruction that carries its rounding.
 #
 # Floats of the other targets and the scalar core stay calls. How the compiler may treat floating-point arithmetic is up
 # to the flags of the function that it is inlined into, and the rules of those targets count on theirs. The core finds
@@ -13,38 +14,42 @@ if(KASTARRI_SANITIZE)
   message(FATAL_ERROR "KASTARRI_BUILD_STATIC: the static library is not built with sanitizers")
 endif()
 
-set(inlined ${KASTARRI_VECTOR_SOURCES})
-if(KASTARRI_STATIC_TARGET STREQUAL avx512)
-  list(FILTER inlined EXCLUDE REGEX "/src/float/scalars.cpp$")
-else()
-  list(FILTER inlined EXCLUDE REGEX "/src/float/")
-endif()
-set(called ${KASTARRI_VECTOR_SOURCES} ${KASTARRI_SCALAR_SOURCES})
-list(REMOVE_ITEM called ${inlined})
+# A kernel is compiled for the same machine: without, nothing may be inlined into it. How wide copies are g++ alone can
+# be told, and kernels gain nothing: intrinsics move whole registers.
+function(kastarri_static_flags variable target)
+  set(flags ${KASTARRI_FLAGS_${target}} -mfpmath=sse)
+  list(FILTER flags EXCLUDE REGEX "^-m(move|store)-max=")
+  set(${variable} ${flags} PARENT_SCOPE)
+endfunction()
 
-add_library(kastarri_static_called OBJECT ${called})
-add_library(kastarri_static STATIC ${inlined} $<TARGET_OBJECTS:kastarri_static_called>)
+# The static library `name` for one target.
+function(kastarri_static_library name target)
+  set(inlined ${KASTARRI_VECTOR_SOURCES})
+  if(target STREQUAL avx512)
+    list(FILTER inlined EXCLUDE REGEX "/src/float/scalars.cpp$")
+  else()
+    list(FILTER inlined EXCLUDE REGEX "/src/float/")
+  endif()
+  set(called ${KASTARRI_VECTOR_SOURCES} ${KASTARRI_SCALAR_SOURCES})
+  list(REMOVE_ITEM called ${inlined})
+  add_library(${name}_called OBJECT ${called})
+  add_library(${name} STATIC ${inlined} $<TARGET_OBJECTS:${name}_called>)
+  kastarri_build_targets(${CMAKE_CURRENT_BINARY_DIR}/${name}.dir ${target})
+  foreach(part IN ITEMS ${name} ${name}_called)
+    kastarri_compile_library(${part})
+    target_include_directories(${part} PRIVATE ${CMAKE_CURRENT_BINARY_DIR}/${name}.dir)
+    target_compile_options(${part} PRIVATE ${KASTARRI_FLAGS_${target}})
+  endforeach()
+  kastarri_static_flags(flags ${target})
+  target_compile_options(${name} INTERFACE ${flags})
+  # Realigning the stack is of the options that a function and what is inlined into it have to share.
+  target_compile_options(${name} PRIVATE -mno-stackrealign
+    $<$<CXX_COMPILER_ID:GNU>:-flto;-ffat-lto-objects;-Wno-attributes>
+    $<$<CXX_COMPILER_ID:Clang>:-flto=thin>)
+  target_compile_definitions(${name} PRIVATE KASTARRI_INLINE_ENTRIES)
+endfunction()
+
+kastarri_static_library(kastarri_static ${KASTARRI_STATIC_TARGET})
+kastarri_static_flags(KASTARRI_STATIC_FLAGS ${KASTARRI_STATIC_TARGET})
 add_library(kastarri::static ALIAS kastarri_static)
 set_target_properties(kastarri_static PROPERTIES EXPORT_NAME static)
-
-kastarri_build_targets(${CMAKE_CURRENT_BINARY_DIR}/kastarri_static.dir ${KASTARRI_STATIC_TARGET})
-foreach(target IN ITEMS kastarri_static kastarri_static_called)
-  kastarri_compile_library(${target})
-  target_include_directories(${target} PRIVATE ${CMAKE_CURRENT_BINARY_DIR}/kastarri_static.dir)
-  target_compile_options(${target} PRIVATE ${KASTARRI_FLAGS_${KASTARRI_STATIC_TARGET}})
-endforeach()
-
-# A kernel is compiled for the same machine: without, nothing may be inlined into it.
-set(KASTARRI_STATIC_FLAGS ${KASTARRI_FLAGS_${KASTARRI_STATIC_TARGET}} -mfpmath=sse)
-# Those that every compiler has; only g++ knows how wide copies may be.
-set(KASTARRI_STATIC_COMMON_FLAGS ${KASTARRI_STATIC_FLAGS})
-list(FILTER KASTARRI_STATIC_COMMON_FLAGS EXCLUDE REGEX "^-m(move|store)-max=")
-set(gnu_flags ${KASTARRI_STATIC_FLAGS})
-list(REMOVE_ITEM gnu_flags ${KASTARRI_STATIC_COMMON_FLAGS})
-target_compile_options(kastarri_static INTERFACE ${KASTARRI_STATIC_COMMON_FLAGS} "$<$<CXX_COMPILER_ID:GNU>:${gnu_flags}>")
-
-if(CMAKE_CXX_COMPILER_ID STREQUAL GNU)
-  # Realigning the stack is of the options that a function and what is inlined into it have to share.
-  target_compile_options(kastarri_static PRIVATE -flto -ffat-lto-objects -mno-stackrealign -Wno-attributes)
-  target_compile_definitions(kastarri_static PRIVATE KASTARRI_INLINE_ENTRIES)
-endif()

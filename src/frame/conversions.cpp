@@ -2,16 +2,24 @@
 #include <cstring>
 
 #include "frame/convert.h"
+#include "frame/registers.h"
 
 #include "frame/stamp.h"
 
+template <class T>
+static inline void copy(const void* from, void* to) {
+  if constexpr (sizeof(T) % register_bytes == 0)
+    copy_registers<sizeof(T)>(from, to);
+  else
+    std::memcpy(to, from, sizeof(T));
+}
 template <class T, class Units>
 static inline void KASTARRI_SEMANTIC(register_load)(const T* from, Units* r) {
-  std::memcpy(r, from, sizeof(T));
+  copy<T>(from, r);
 }
 template <class T, class Units>
 static inline void KASTARRI_SEMANTIC(register_store)(const Units* v, T* to) {
-  std::memcpy(to, v, sizeof(T));
+  copy<T>(v, to);
 }
 
 #include "frame/conversions.def"

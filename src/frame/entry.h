@@ -44,8 +44,10 @@ using layout_of = typename layout_of_type<T>::type;
 // vectorises: a loop over 32 lanes looks large then and ends as one or two instructions.
 #ifdef KASTARRI_INLINE_ENTRIES
 #define KASTARRI_ENTRY __attribute__((always_inline, flatten))
+constexpr bool entries_are_inlined = true;
 #else
 #define KASTARRI_ENTRY
+constexpr bool entries_are_inlined = false;
 #endif
 
 #endif

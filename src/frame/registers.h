@@ -46,7 +46,8 @@ inline To in_bits(From v) {
   return reinterpret_cast<To>(v);
 }
 
-// Register number k of those at an address.
+// Register number k of those at an address. One load each, also where processors forward a store that crosses cache
+// lines to two halves sooner than to the whole: bench/notes.md has what both cost.
 template <class Lane>
 inline Vector<Lane> load_register(const void* from, int k) {
   Vector<Lane> v;
@@ -56,6 +57,15 @@ inline Vector<Lane> load_register(const void* from, int k) {
 template <class V>
 inline void store_register(void* to, int k, V v) {
   std::memcpy(static_cast<unsigned char*>(to) + k * register_bytes, &v, sizeof v);
+}
+
+// A copy in whole registers, all of them loaded before the first is stored: source and target may overlap.
+template <int Size>
+inline void copy_registers(const void* from, void* to) {
+  static_assert(Size % register_bytes == 0);
+  Bytes all[Size / register_bytes];
+  for (int k = 0; k < Size / register_bytes; ++k) all[k] = load_register<std::uint8_t>(from, k);
+  for (int k = 0; k < Size / register_bytes; ++k) store_register(to, k, all[k]);
 }
 
 // Whether the top bit of any lane is set.

@@ -3,6 +3,7 @@
 #define KASTARRI_MEMORY_KERNELS_H
 
 #include "frame/arithmetic.h"
+#include "frame/registers.h"
 #include "memory/merge.h"
 
 namespace {
@@ -17,6 +18,16 @@ constexpr auto SATURATE16 = [](std::int32_t lane) {
 };
 
 }  // namespace
+
+// A whole register as it is; under a predicate lane by lane, of layout L.
+#define KERNEL_copy(OP, L)                                          \
+  template <class Units, class Out>                                 \
+  static inline void KASTARRI_SEMANTIC(OP)(const Units* a, Out r) { \
+    if constexpr (std::is_pointer_v<Out>)                           \
+      copy_registers<64>(a, r);                                     \
+    else                                                            \
+      lanes<L::count>(result<L>(r), SAME, Read<L>(a));              \
+  }
 
 // A predicated store: layout in memory, rule, layout in the register.
 #define KERNEL_store_where(OP, M, RULE, A)                                                       \

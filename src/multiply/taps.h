@@ -5,6 +5,7 @@
 #ifndef KASTARRI_MULTIPLY_TAPS_H
 #define KASTARRI_MULTIPLY_TAPS_H
 
+#include "frame/entry.h"
 #include "multiply/wide_sums.h"
 
 namespace {
@@ -218,6 +219,19 @@ struct Whole {
   Bytes part(int k) const { return load_register<std::uint8_t>(image, k); }
 };
 
+// An operand loaded before it is needed. Where an entry is inlined, its operands are in registers as a rule; loads
+// behind a branch would have them stored first, for the way that is hardly ever taken.
+struct Loaded {
+  Bytes registers[64 / register_bytes];
+  template <class Operand>
+  explicit Loaded(const Operand& operand) {
+    for (int k = 0; k < 64 / register_bytes; ++k) registers[k] = operand.part(k);
+  }
+  Bytes part(int k) const { return registers[k]; }
+};
+template <class Operand>
+using Held = std::conditional_t<entries_are_inlined, Loaded, const Operand&>;
+
 template <class R, class Kind, class L, class C, class Sums, class... Operands>
 [[gnu::always_inline]] inline void put_taps(const Sums& sums, const void* acc, void* r, const Operands&... operands) {
   for (int k = 0; k < 64 / register_bytes; ++k) {
@@ -228,15 +242,21 @@ template <class R, class Kind, class L, class C, class Sums, class... Operands>
 }
 
 template <class R, class Kind, class L, class C, class... Operands>
-[[gnu::always_inline]] inline void sum_of_taps(const void* acc, const word* words, void* r,
+[[gnu::always_inline]] inline void sum_of_held(const void* acc, const word* words, void* r,
                                                const Operands&... operands) {
   if constexpr (L::bits == 16 && C::in_a_word == 2 && std::is_signed_v<typename C::stored>) {
     using Unsplit = UnsplitSums<L, C, sizeof...(Operands)>;
     if (__builtin_expect(Unsplit::serves(words), true))
       return put_taps<R, Kind, L, C>(Unsplit(words), acc, r, operands...);
-    asm("" : : : "memory");  // else compilers load what both ways need before the branch, and spill it
+    if constexpr (!entries_are_inlined)
+      asm("" : : : "memory");  // else compilers load what both ways need before the branch, and spill it
   }
   put_taps<R, Kind, L, C>(Sums<L, C, sizeof...(Operands)>(words), acc, r, operands...);
+}
+template <class R, class Kind, class L, class C, class... Operands>
+[[gnu::always_inline]] inline void sum_of_taps(const void* acc, const word* words, void* r,
+                                               const Operands&... operands) {
+  sum_of_held<R, Kind, L, C>(acc, words, r, Held<Operands>(operands)...);
 }
 
 // Operands vectors of layout L, then the words of coefficients.

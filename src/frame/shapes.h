@@ -32,6 +32,13 @@
 #define SIG_ab_p(SYMBOL, P, T, K) P SYMBOL(const T& a, const T& b)
 #define BODY_ab_p(P, T, K) BODY_ab_r(P, K)
 
+// Products: W the accumulator, read and written, A and B the types of the two factors.
+#define SIG_acc_ab(SYMBOL, W, A, B, K) void SYMBOL(W& acc, const A& a, const B& b)
+#define BODY_acc_ab(W, A, B, K) KASTARRI_SEMANTIC(K)(acc._, a._, b._, acc._);
+
+#define SIG_acc_ab_T(SYMBOL, W, A, P, K) void SYMBOL(W& acc, const A& a, const A& b, const P& p)
+#define BODY_acc_ab_T(W, A, P, K) KASTARRI_SEMANTIC(K)(acc._, a._, b._, where(acc._, p._));
+
 // From an accumulator, or a register of another type than the result.
 #define SIG_w_r(SYMBOL, R, W, K) R SYMBOL(const W& acc)
 #define BODY_w_r(R, W, K)           \

@@ -8,12 +8,6 @@
 #define SIG_ab_w(SYMBOL, W, A, B, K) W SYMBOL(const A& a, const B& b)
 #define BODY_ab_w(W, A, B, K) BODY_ab_r(W, K)
 
-#define SIG_acc_ab(SYMBOL, W, A, B, K) void SYMBOL(W& acc, const A& a, const B& b)
-#define BODY_acc_ab(W, A, B, K) KASTARRI_SEMANTIC(K)(acc._, a._, b._, acc._);
-
-#define SIG_acc_ab_T(SYMBOL, W, A, P, K) void SYMBOL(W& acc, const A& a, const A& b, const P& p)
-#define BODY_acc_ab_T(W, A, P, K) KASTARRI_SEMANTIC(K)(acc._, a._, b._, where(acc._, p._));
-
 #define SIG_abc_w(SYMBOL, W, A, B, K) W SYMBOL(const A& a, const B& b, const B& c)
 #define BODY_abc_w(W, A, B, K) FRESH(W, K, a._, b._, c._)
 

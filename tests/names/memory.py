@@ -99,11 +99,13 @@ def whole_kernels(load, predicated, lanes):
     elif load:
         # 64-bit lanes have no predicated form and go as words.
         register = lanes.bits(layout.lanes) if layout.bits < 64 else "u32x16"
-        yield "a", register, "SAME", register
+        yield "copy", register
+    elif predicated:
+        register = lanes.bits(layout.lanes)
+        yield "store_where", register, "SAME", register
     else:
-        # Whole registers are stored alike, whatever their lanes; under a predicate the lanes matter.
-        register = lanes.bits(layout.lanes) if predicated else "u16x32"
-        yield ("store_where" if predicated else "a"), register, "SAME", register
+        # Whole registers are stored alike, whatever their lanes.
+        yield "copy", "u16x32"
 
 
 def element(name, twins):

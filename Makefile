@@ -7,7 +7,7 @@
 #   make mutants       plant faults in all rows and in some rules, and list those that no test finds (MUTANTS=40, SEED=1,
 #                      ONLY= a regular expression of tables and sources)
 #   make bench         time every intrinsic and write docs/performance.md, a summary, and build/performance.md
-#   make bench-static  time kernels with the static library against the shared one
+#   make bench-kernels time whole kernels: scalar C, loops that compilers vectorise, calls, inlined
 #   make docs          write build/docs/reference.html, all intrinsics on one page
 #   make picture       take docs/pictures/reference.png of that page
 #   make install       install libraries and headers (PREFIX=/usr/local, DESTDIR=, LIBDIR=lib or lib/x86_64-linux-gnu)
@@ -38,7 +38,7 @@ else
 $(error BITS is $(BITS); known are 32 and 64)
 endif
 
-.PHONY: help demo test try mutants bench bench-static docs picture install package headers format clean
+.PHONY: help demo test try mutants bench bench-kernels docs picture install package headers format clean
 
 help:
 	@sed -n 's/^#   //p' Makefile
@@ -68,14 +68,16 @@ mutants:
 bench:
 	tools/packages.sh build test$(WIDTH)
 	cmake --preset test$(WIDTH)
-	$(CMAKE_BUILD) test$(WIDTH)
-	tools/performance.py build/test$(WIDTH) --summary $(SUMMARY) --table build/performance$(WIDTH).md
+	$(CMAKE_BUILD) test$(WIDTH) --target all kernel_modules
+	cmake --preset clang$(WIDTH) -DKASTARRI_BUILD_BENCH=ON
+	$(CMAKE_BUILD) clang$(WIDTH) --target kernel_modules
+	tools/performance.py build/test$(WIDTH) --clang build/clang$(WIDTH) --summary $(SUMMARY) --table build/performance$(WIDTH).md
 
-bench-static:
+bench-kernels:
 	tools/packages.sh build test$(WIDTH)
 	cmake --preset test$(WIDTH)
-	$(CMAKE_BUILD) test$(WIDTH) --target static_bench
-	cd build/test$(WIDTH)/bench/static && ./static_bench ./libstatic_bench_shared.so ./libstatic_bench_static.so ./libstatic_bench_plain.so
+	$(CMAKE_BUILD) test$(WIDTH) --target kernel_modules kastarri_bench
+	tools/kernels.py build/test$(WIDTH)
 
 docs:
 	tools/packages.sh build

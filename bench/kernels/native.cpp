@@ -74,4 +74,5 @@ void multiply_add_multiply(const float* a, const float* b, const float* c, const
 }
 
 extern "C" __attribute__((visibility("default"))) const Kernels kernels;
-const Kernels kernels = {fir_native, convolve_native, fir_native, nullptr, count_greys_reference, look_up_reference};
+const Kernels kernels = {
+    fir_native, convolve_native, fir_native, nullptr, multiply_add_multiply, count_greys_reference, look_up_reference};

@@ -3,19 +3,25 @@
 #
 #   make demo          build the library and the examples, run them and write build/demo/index.html, before and after
 #   make test          build everything and run the tests
+#   make try           build for one target; test and time one intrinsic (NAME=ADDSNX16)
+#   make mutants       plant faults in all rows and in some rules, and list those that no test finds (MUTANTS=40, SEED=1,
+#                      ONLY= a regular expression of tables and sources)
 #   make bench         time every intrinsic and write docs/performance.md, a summary, and build/performance.md
 #   make bench-static  time kernels with the static library against the shared one
 #   make docs          write build/docs/reference.html, all intrinsics on one page
 #   make picture       take docs/pictures/reference.png of that page
 #   make install       install libraries and headers (PREFIX=/usr/local, DESTDIR=, LIBDIR=lib or lib/x86_64-linux-gnu)
 #   make package       make Debian packages in build/packages
-#   make headers       write the public headers, gdb's table of types, docs/coverage.md and docs/shapes.md from the tables
+#   make headers       write the public headers, gdb's table of types, docs/coverage.md, docs/shapes.md and the README's
+#                      counts from the tables
 #   make format        format the sources
 #   make clean         remove build/
 #   ... BITS=64        make, test, install ... the same for 64-bit programs, in build/demo-64, build/test-64 and so on
 
 BITS ?= 32
 PREFIX ?= /usr/local
+MUTANTS ?= 40
+SEED ?= 1
 CMAKE_BUILD = cmake --build --parallel --preset
 
 ifeq ($(BITS),32)
@@ -32,7 +38,7 @@ else
 $(error BITS is $(BITS); known are 32 and 64)
 endif
 
-.PHONY: help demo test bench bench-static docs picture install package headers format clean
+.PHONY: help demo test try mutants bench bench-static docs picture install package headers format clean
 
 help:
 	@sed -n 's/^#   //p' Makefile
@@ -48,6 +54,16 @@ test:
 	cmake --preset test$(WIDTH)
 	$(CMAKE_BUILD) test$(WIDTH)
 	ctest --preset test$(WIDTH)
+
+try:
+	tools/packages.sh build test
+	tools/try.py $(NAME)
+
+mutants:
+	tools/packages.sh build test
+	cmake --preset mutants
+	$(CMAKE_BUILD) mutants --target kastarri_tests
+	tools/mutants/mutants.py build/mutants --rules $(MUTANTS) --seed $(SEED) --only '$(ONLY)'
 
 bench:
 	tools/packages.sh build test$(WIDTH)

@@ -7,6 +7,7 @@
 #include <random>
 #include <regex>
 #include <string>
+#include <tuple>
 
 #include "families.h"
 #include "frame/entry.h"
@@ -23,25 +24,33 @@ struct Arena {
 
 Arena arena;
 
-enum class Operands { ordinary, special };
+std::minstd_rand random_numbers;
+
+// Of numbers: from 1 to 2; of many magnitudes, with a zero in every register; of many magnitudes, with an accumulator
+// of 0 as a filter's first; from 1 to 2 with a NaN, an infinity, a subnormal number and a zero in every register.
+enum class Operands { ordinary, spread, fresh, special };
 
 template <class L>
 constexpr bool holds_numbers =
     std::is_same_v<typename L::number, half_float> || std::is_same_v<typename L::number, single_float>;
 
-// Numbers from 1 to 2 of either sign in place of random bits: of those, most registers would hold a NaN.
-// Special operands have a NaN, an infinity, a subnormal number and a zero among them.
+// Numbers of either sign in place of random bits: of those, most registers would hold a NaN. Many magnitudes are from
+// 2^-12 to 2^12, of halves from 2^-6 to 2^6: products of two are normal numbers.
 template <class L>
 void make_numbers(typename L::container* lanes, Operands kind) {
-  constexpr word one = L::bits == 16 ? 0x3C00 : 0x3F800000, free = L::bits == 16 ? 0x83FF : 0x807FFFFF;
-  constexpr word nan = L::bits == 16 ? 0x7E00 : 0x7FC00000, infinity = L::bits == 16 ? 0x7C00 : 0x7F800000;
-  for (int i = 0; i < L::count; ++i) lanes[i] = static_cast<typename L::container>((lanes[i] & free) | one);
+  using Lane = typename L::container;
+  constexpr word unit = L::bits == 16 ? 0x0400 : 0x00800000, sign = word{1} << (L::bits - 1);
+  constexpr word one = L::bits == 16 ? 0x3C00 : 0x3F800000, infinity = sign - unit, nan = infinity + unit / 2;
+  constexpr word powers = L::bits == 16 ? 6 : 12;
+  const bool many = kind == Operands::spread || kind == Operands::fresh;
+  for (int i = 0; i < L::count; ++i) {
+    const word exponent = many ? random_numbers() % (2 * powers) - powers : 0;
+    lanes[i] = static_cast<Lane>((lanes[i] & (sign + unit - 1)) + one + exponent * unit);
+  }
+  if (kind == Operands::spread && L::count > 1) lanes[random_numbers() % L::count] = 0;
   constexpr word specials[] = {nan, infinity, 1, 0};
-  for (int i = 0; kind == Operands::special && i < 4 && i < L::count; ++i)
-    lanes[i] = static_cast<typename L::container>(specials[i]);
+  for (int i = 0; kind == Operands::special && i < 4 && i < L::count; ++i) lanes[i] = static_cast<Lane>(specials[i]);
 }
-
-std::minstd_rand random_numbers;
 
 void fill_randomly(unsigned char* bytes, std::size_t count) {
   for (std::size_t i = 0; i < count; ++i) bytes[i] = static_cast<unsigned char>(random_numbers());
@@ -137,8 +146,13 @@ struct Frame {
   }
 };
 
-// What a call writes besides its result is put back now and then: an accumulator would grow until it overflows.
+// What a call writes besides its result is put back now and then: an accumulator would grow until it overflows. Where
+// its magnitude counts it is put back before every call, by the copy that is the unit of all figures.
 constexpr int calls_between = 1024;
+
+void put_back(unsigned char* accumulator, const unsigned char* from) {
+  new (accumulator) qv_vecNx16(KASTARRI_SYMBOL(rk_zra32_qv_vecNx16_move)(*reinterpret_cast<const qv_vecNx16*>(from)));
+}
 
 template <class R, class... A>
 [[gnu::noinline]] void time_with(benchmark::State& state, R (*f)(A...), [[maybe_unused]] Operands kind, Frame& frame,
@@ -146,11 +160,14 @@ template <class R, class... A>
   (place_numbers<R>(a.get(), kind), ...);
   if constexpr ((std::is_pointer_v<A> || ...)) (place_in_arena(a.get()), ...);
   asm volatile("" : "+r"(f));  // a call, as from another library: the compiler knows nothing of it
+  const bool puts_back = kind == Operands::spread || kind == Operands::fresh;
+  if (kind == Operands::fresh) std::memset(frame.bytes, 0, sizeof(qv_vecNx16));
   const Frame untouched = frame;
   while (state.KeepRunningBatch(calls_between)) {
     std::memcpy(frame.bytes, untouched.bytes, frame.used);
     for (int i = 0; i < calls_between; ++i) {
       if constexpr (std::is_void_v<R>) {
+        if (puts_back) put_back(frame.bytes, untouched.bytes);
         f(a.get()...);
         benchmark::ClobberMemory();
       } else {
@@ -166,8 +183,11 @@ void time_calls(benchmark::State& state, R (*f)(A...), unsigned rounding, Operan
   Frame frame;
   random_numbers.seed(1);  // the same operands whatever has been timed before
   fill_arena(kind);
+  constexpr unsigned as_a_program_starts = 0x1F80;  // whatever the benchmarks' own arithmetic has raised is forgotten
+  asm volatile("ldmxcsr %0" : : "m"(as_a_program_starts));
   cstub_Km_ZNB_Orbis_R5_64k_proc.states.RoundMode = rounding;
-  time_with(state, f, kind, frame, frame.make<bare<A>>()...);
+  const std::tuple<Argument<bare<A>>&...> arguments{frame.make<bare<A>>()...};  // in this order, unlike a call's
+  std::apply([&](auto&... a) { time_with(state, f, kind, frame, a...); }, arguments);
 }
 
 struct Timed {
@@ -194,13 +214,14 @@ constexpr Timed timed[] = {
 #include "frame/rows_end.h"
 
 // An intrinsic with ordinary operands, rounding to nearest; arithmetic on numbers in the other rounding modes
-// too, and what has a fast path for numbers with special operands.
+// too, and of many magnitudes; what has a fast path for numbers with special operands.
 void register_row(const Timed& row) {
   static const std::regex rounded(R"(rk_zra32_ZRA_(ADD|SUB|MUL|MULA|MULS)(NXF16|N_2XF32)T?)"
                                   R"(|rk_zran_scalarfp_(ADD|SUB|MUL|MADD|MSUB)_[HS])");
   static const std::regex of_numbers(
       R"(rk_zra32_ZRA_((ADD|SUB|MULA?|MULS|(MIN|MAX)(NUM)?|[OU](EQ|LT|LE|N))(NXF16|N_2XF32)T?)"
       R"(|U?TRUNCN.*|CVTF(16|32)N.*|[LS]VN_2XF16T?_I))");
+  static const std::regex accumulates(R"(rk_zra32_ZRA_MUL[AS](NXF16|N_2XF32)T?)");
   const auto time = [&row](const char* variant, unsigned rounding, Operands kind) {
     auto* const timing = benchmark::RegisterBenchmark(
         (row.name + std::string(variant)).c_str(),
@@ -214,7 +235,16 @@ void register_row(const Timed& row) {
     time("/up", 2, Operands::ordinary);
     time("/down", 3, Operands::ordinary);
   }
+  if (std::regex_match(row.name, rounded)) time("/spread", 0, Operands::spread);
+  if (std::regex_match(row.name, accumulates)) time("/fresh", 0, Operands::fresh);
   if (std::regex_match(row.name, of_numbers)) time("/special", 0, Operands::special);
+}
+
+// A thousand multiplications, each of which waits for the one before, for three cycles of the processor's clock. (Some
+// processors add constants without taking time.)
+void time_cycles(benchmark::State& state) {
+  unsigned product = 3;
+  for (auto _ : state) asm volatile(".rept 1000\n\timull %0, %0\n\t.endr" : "+r"(product));
 }
 
 // Ports that are always ready, so that what is timed is the intrinsics.
@@ -234,6 +264,7 @@ int main(int argc, char** argv) {
   benchmark::Initialize(&argc, argv);
   benchmark::AddCustomContext("target", cstub_Km_ZNB_Orbis_R5_64k_target());
   open_ports();
+  benchmark::RegisterBenchmark("3000 cycles", time_cycles)->Repetitions(61);
   for (const Timed& row : timed) register_row(row);
   benchmark::RunSpecifiedBenchmarks();
 }

@@ -48,5 +48,5 @@ set(CPACK_DEBIAN_DEVEL_PACKAGE_SECTION libdevel${beside_the_other})
 set(CPACK_DEBIAN_DEVEL_PACKAGE_DEPENDS "${runtime_package} (= ${PROJECT_VERSION}), libc6 (>= 2.34), python3:any")
 set(CPACK_DEBIAN_DEVEL_DESCRIPTION "intrinsics of a DSP core as a library (development)\n${what}\n.
 This package has what programs are made with: headers, libraries to link, files for
-CMake and pkg-config, printers for gdb, the profiler and the reference page.")
+CMake and pkg-config, printers for gdb, the profiler, the checker of kernels and the reference page.")
 include(CPack)

@@ -1,9 +1,10 @@
 # The static library: one target, without dispatch. With GCC its integer, multiply and memory intrinsics, moves
 # and conversions can be inlined into kernels at link time; the objects hold machine code besides, for links without.
+# So can vectors of floats with AVX-512, where every operation is an instruction that carries its rounding.
 #
-# Floats and the scalar core stay calls. How the compiler may treat floating-point arithmetic is up to the
-# flags of the function that it is inlined into, and the rules count on theirs. The state block is looked up
-# in assembler statements, which the optimiser at link time does not read.
+# Floats of the other targets and the scalar core stay calls. How the compiler may treat floating-point arithmetic is up
+# to the flags of the function that it is inlined into, and the rules of those targets count on theirs. The core finds
+# its state in assembler statements, which the optimiser at link time does not read.
 if(NOT KASTARRI_STATIC_TARGET IN_LIST KASTARRI_KNOWN_TARGETS)
   message(FATAL_ERROR
     "KASTARRI_STATIC_TARGET: unknown target '${KASTARRI_STATIC_TARGET}'; known are ${KASTARRI_KNOWN_TARGETS}")
@@ -13,7 +14,11 @@ if(KASTARRI_SANITIZE)
 endif()
 
 set(inlined ${KASTARRI_VECTOR_SOURCES})
-list(FILTER inlined EXCLUDE REGEX "/src/float/")
+if(KASTARRI_STATIC_TARGET STREQUAL avx512)
+  list(FILTER inlined EXCLUDE REGEX "/src/float/scalars.cpp$")
+else()
+  list(FILTER inlined EXCLUDE REGEX "/src/float/")
+endif()
 set(called ${KASTARRI_VECTOR_SOURCES} ${KASTARRI_SCALAR_SOURCES})
 list(REMOVE_ITEM called ${inlined})
 

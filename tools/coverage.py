@@ -1,6 +1,6 @@
 #!/usr/bin/env python3
-"""Write docs/coverage.md, what is exported, by family, and what of the core is not, and docs/shapes.md, the shapes of
-all rows with an example each.
+"""Write docs/coverage.md, what is exported, by family, and what of the core is not, docs/shapes.md, the shapes of
+all rows with an example each, and the counts of the README.
 
     tools/coverage.py [--check]
 """
@@ -14,32 +14,7 @@ import sys
 ROOT = os.path.dirname(os.path.dirname(os.path.abspath(__file__)))
 sys.path.insert(0, os.path.join(ROOT, "tools"))
 import generate_headers  # noqa: E402
-
-# What, why, and what serves instead.
-NOT_BUILT = [
-    ("Aligning loads and stores through alignment registers, also of double width",
-     "how the registers buffer and rotate is not known well enough to give the core's bits",
-     "loads and stores of whole vectors take any byte address: a stream of aligning loads is `LV.._IP` with 64, of aligning "
-     "stores `SV.._IP` with 64, without priming and flushing"),
-    ("Select, shuffle, dual-select and unpack by pattern, but for `SELS2NX8`",
-     "the patterns are tables of the core that we do not have",
-     "lanes of two vectors by a predicate: `ADD..T` of one of them and zeros into the other; lanes in any order: store the "
-     "vector and gather from it (`GATHERA..`, `GATHERD..`); one lane everywhere: `REP..`; halves widened: `LVNX8..`, `LVN_2X16..`"),
-    ("The general wide partial-product engine", "its operand encoding is not known",
-     "the multiplies with coefficients (`..XR8`, `..XR16`) and the mixed ones, which add up in the accumulator"),
-    ("Division, reciprocal and square-root steps and their tables", "the seeds are not known",
-     "the exponent operations (`..NEXP..`, `..MKDADJ..`, `..MKSADJ..`, `..ADDEXP..`) around a quotient or root of mantissas, or "
-     "the host's `/` and `sqrtf` on lanes that are read through `_`: results to nearest, not the core's approximations"),
-    ("`ADDMOD16U`, `MINORMAX2NX8`", "where the modulus comes from and which of the two is chosen is not known",
-     "`ADD16U`, a comparison and `SUB16U`; `MIN2NX8` and `MAX2NX8`, the one stored over the other (`SV2NX8T_I`)"),
-    ("Compress and expand under a predicate (`SQZ..`, `UNSQZ..`)", "their operands and the lanes that are left over are not known",
-     "a gather with offsets counted from the bits of the predicate"),
-    ("Accumulating sums of lanes (`RADDA`, `RADDAU`), reductions that start anew (`.._rinit`)",
-     "how wide the accumulator is and what it starts from is not known", "`RADD..` and `ADD32`, `RMAX..`, `RMIN..` and the others"),
-    ("Extremes with their place (`RBMAX`, `RBMIN`)", "which of several equal lanes is told is not known",
-     "`RMAX..` or `RMIN..`, and `EQ..` with its result in every lane: the predicate of all such lanes"),
-    ("`LSFAST9_I`, `SSFAST9_I`, `LSCF_I`, `SSCF_I`", "nothing tells their operands", "`LS.._I`, `SS.._I`"),
-]
+import not_built  # noqa: E402
 
 
 def coverage():
@@ -55,8 +30,20 @@ def coverage():
               "A missing intrinsic is an error when a kernel is compiled; a guessed one would be a silent wrong answer. A "
               "kernel can do with what is there, and who knows how an intrinsic works adds it "
               "([adding-an-intrinsic.md](adding-an-intrinsic.md)).", "",
-              "| what | why | instead |", "|---|---|---|"] + [f"| {' | '.join(entry)} |" for entry in NOT_BUILT]
+              "| what | why | what to write instead |", "|---|---|---|"] + not_built.table()
     return "\n".join(lines) + "\n"
+
+
+def readme():
+    """The README with the counts of families, and of all, in the section of what is covered."""
+    with open(os.path.join(ROOT, "README.md"), encoding="utf-8") as file:
+        before, section, after = re.split(r"(^## What is covered$.*?)(?=^## )", file.read(), maxsplit=1, flags=re.M | re.S)
+    counts = [len(rows) for _, _, rows in generate_headers.all_rows().values()]
+    counts.append(sum(counts))
+    new = re.sub(r"\| \d+ \|$", lambda match: f"| {counts.pop(0)} |", section, count=len(counts), flags=re.M)
+    if counts:
+        sys.exit("README.md: What is covered has not a row a family and one of all")
+    return before + new + after
 
 
 def shapes():
@@ -77,8 +64,8 @@ def shapes():
 
 def main():
     stale = False
-    for name, text in (("coverage.md", coverage()), ("shapes.md", shapes())):
-        path = os.path.join(ROOT, "docs", name)
+    for name, text in (("docs/coverage.md", coverage()), ("docs/shapes.md", shapes()), ("README.md", readme())):
+        path = os.path.join(ROOT, name)
         if "--check" in sys.argv[1:]:
             stale = stale or not os.path.exists(path) or open(path, encoding="utf-8").read() != text
         else:

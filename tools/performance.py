@@ -23,14 +23,17 @@ import generate_headers  # noqa: E402
 
 TARGETS = ["avx512", "avx2", "sse2"]
 BASELINE = "rk_zra32_qv_vecNx16_move"
+CYCLES = "3000 cycles"
 DIRECTED = ["zero", "up", "down"]
+MAGNITUDES = ["spread", "fresh"]
 SPECIAL = 10
 
 
 def run(build, target, pattern, repetitions, seconds):
     """Benchmark -> median time in nanoseconds, or None where the processor does not run the target."""
     environment = dict(os.environ, LD_LIBRARY_PATH=os.path.join(build, "tests", "only", target))
-    command = [os.path.join(build, "bench", "kastarri_bench"), f"--benchmark_filter=^{BASELINE}(/repeats:[0-9]+)?$|{pattern}",
+    command = [os.path.join(build, "bench", "kastarri_bench"),
+               f"--benchmark_filter=^({BASELINE}|{CYCLES})(/repeats:[0-9]+)?$|{pattern}",
                f"--benchmark_repetitions={repetitions}", f"--benchmark_min_time={seconds}", "--benchmark_format=csv",
                "--benchmark_enable_random_interleaving=true"]
     result = subprocess.run(command, env=environment, capture_output=True, text=True, check=False)
@@ -88,15 +91,15 @@ def table_lines(names, ratios, limits):
 
 
 def variant_lines(ratios, limits):
-    """The slowest of the directed rounding modes, and operands with special values, of what is timed so."""
+    """The slowest of the directed rounding modes, of operands of many magnitudes, and those with special values."""
     measured = next(iter(ratios.values()))
-    yield from headed([f"{t} {kind}" for t in ratios for kind in ("directed", "special")], "intrinsic")
+    yield from headed([f"{t} {kind}" for t in ratios for kind in ("directed", "many magnitudes", "special")], "intrinsic")
     for name in dict.fromkeys(n.partition("/")[0] for n in measured if "/" in n):
         cells = []
         for target in ratios:
-            modes = [f"{name}/{mode}" for mode in DIRECTED if f"{name}/{mode}" in ratios[target]]
-            slowest = max(modes, key=ratios[target].get, default=name + "/none")
-            cells += [cell(slowest, target, ratios, limits), cell(name + "/special", target, ratios, limits)]
+            for variants in DIRECTED, MAGNITUDES, ["special"]:
+                found = [f"{name}/{variant}" for variant in variants if f"{name}/{variant}" in ratios[target]]
+                cells.append(cell(max(found, key=ratios[target].get, default=name + "/none"), target, ratios, limits))
         yield f"| `{name}` | " + " | ".join(cells) + " |"
 
 
@@ -135,7 +138,8 @@ class Measured:
             return (generate_headers.short_name(symbol) if symbol.startswith("rk_") else symbol) + slash + variant
 
         self.processor = processor_name
-        self.copies = {t: found[BASELINE] for t, found in times.items()}
+        cycles = {t: found.pop(CYCLES) / 3000 for t, found in times.items()}
+        self.copies = {t: (found[BASELINE], found[BASELINE] / cycles[t]) for t, found in times.items()}
         self.ratios = {t: {known_as(n): v / found[BASELINE] for n, v in found.items()} for t, found in times.items()}
         self.names = next(iter(self.ratios.values()))
         families = {}
@@ -145,11 +149,12 @@ class Measured:
         self.families = {title: names for title, names in families.items() if names}
 
     def introduction(self, what):
-        copies = ", ".join(f"{time:.1f} ns ({target})" for target, time in self.copies.items())
+        copies = ", ".join(f"{time:.1f} ns or {cycles:.1f} cycles ({target})" for target, (time, cycles) in self.copies.items())
         return ["# Performance", "",
                 f"{what}, operands in memory, as a multiple of an exported call that copies one",
                 "register (`qv_vecNx16_move`, 64 bytes) in the same run. Medians.", "",
-                f"Measured on: {self.processor}, where the copy took {copies}.", ""]
+                f"Measured on: {self.processor}, where the copy took {copies}. A cycle is a third of what an",
+                "integer multiplication takes in a chain of them, timed in the same run.", ""]
 
 
 def summary(measured, limits):
@@ -177,6 +182,8 @@ def full_table(measured, limits):
     if any("/" in n for n in measured.names):
         lines += ["## Rounding modes and special values", "",
                   "Directed: the slowest of rounding toward zero, up and down; the limit is that of rounding to nearest.",
+                  "Many magnitudes: exponents from -12 to 11 (of halves from -6 to 5), with a zero in every register, or with",
+                  "an accumulator of 0, the slower of both; an accumulator is put back before every call, by a copy.",
                   "Special: a NaN, an infinity, a subnormal number and a zero among the lanes of each operand; the limit",
                   f"is {SPECIAL} times as high.", "", *variant_lines(measured.ratios, limits), ""]
     return "\n".join(lines)

@@ -3,7 +3,7 @@
 
 extern "C" __attribute__((visibility("default"))) const Kernels kernels;
 #ifdef PLAIN
-const Kernels kernels = {fir_reference, convolve_reference};
+const Kernels kernels = {fir_reference, convolve_reference, multiply_add_multiply};
 #else
-const Kernels kernels = {fir, convolve};
+const Kernels kernels = {fir, convolve, multiply_add_multiply};
 #endif

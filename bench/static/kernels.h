@@ -4,10 +4,12 @@
 
 #include "convolve/convolve.h"
 #include "fir/fir.h"
+#include "floats.h"
 
 struct Kernels {
   decltype(&::fir) fir;
   decltype(&::convolve) convolve;
+  decltype(&::multiply_add_multiply) multiply_add_multiply;
 };
 
 #endif

@@ -3,6 +3,7 @@
 // library they are.
 #include <dlfcn.h>
 
+#include <cmath>
 #include <cstdio>
 #include <cstdlib>
 #include <random>
@@ -84,6 +85,21 @@ void compare_convolution(const std::vector<Way>& ways, const char* name, const F
       [&] { return out.picture().pixels; });
 }
 
+void compare_floats(const std::vector<Way>& ways) {
+  constexpr int samples = 1024;
+  std::minstd_rand random(1);
+  std::vector<float> a(samples), b(samples), c(samples), gain(16), y(samples);
+  for (auto* const operand : {&a, &b, &c, &gain})
+    for (float& x : *operand)
+      x = std::ldexp(1 + static_cast<float>(random() % 1000) / 1000, static_cast<int>(random() % 24) - 12);
+  compare_ways(
+      "multiply-add, multiply, a single", ways, 32, samples,
+      [&](const Kernels& kernels) {
+        kernels.multiply_add_multiply(a.data(), b.data(), c.data(), gain.data(), y.data(), samples);
+      },
+      [&] { return y; });
+}
+
 }  // namespace
 
 int main(int argc, char** argv) {
@@ -95,4 +111,5 @@ int main(int argc, char** argv) {
   for (const int taps : {16, 64}) compare_fir(ways, taps);
   compare_convolution(ways, "5 x 5", gauss());
   compare_convolution(ways, "four of 3 x 3", sobel());
+  compare_floats(ways);
 }

@@ -49,12 +49,8 @@ constexpr word widened_largest = F::bits == 32 ? Single::largest
                                                : (single_bits_of_power(Half::bias + 1) - 1) & ~word{0x1FFF};
 
 // In place of a Rounding: to the nearest integer, ties away from 0.
-struct TiesAway {};
-
-// What a vector computed on the unit tells: the flags to raise, and whether a lane is left to the reference.
-struct HostResult {
-  word flags;
-  bool some_left;
+struct TiesAway {
+  constexpr operator Rounding() const { return ties_away; }
 };
 
 // A rule on lanes, or one that asks for the mode too.

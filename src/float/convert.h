@@ -34,41 +34,25 @@ inline typename To::container convert_lane(Environment& env, typename From::cont
 
 // --- On the unit: a whole vector -----------------------------------------------------------------------
 
-// A whole vector on the unit.
-template <class From, class To, class Out, class Units, class Fast, class Exact>
-[[gnu::always_inline]] inline void convert_vector(Out* out, const Units* in, Fast fast, Exact exact) {
-  Environment env;
-  const auto fast_in = [ =, &env ](auto& results) __attribute__((always_inline)) {
-    const HostResult host = fast(env.rounding, results);
-    env.raise(host.flags);
-    return host.some_left;
-  };
-  store_results<To>(out, fast_in, [=, &env](int i) { return static_cast<word>(exact(env, Read<From>(in)[i])); });
-}
-
 template <class From, class To, class Out, class Units>
 [[gnu::always_inline]] inline void convert_register(Out* out, const Units* in, word scale) {
-  const auto exact = [scale](Environment& env, auto lane) { return convert_lane<From, To>(env, lane, scale); };
+  const Rounding mode = round_mode();
+  const auto exact = [=](auto lane) {
+    Environment env(mode);
+    return convert_lane<From, To>(env, lane, scale);
+  };
   if constexpr (From::count == 1 || To::count == 1) {
-    Environment env;
-    const auto lane = exact(env, Read<From>(in)[0]);
     lanes<To::count>(
-        Write<To>(out), [](auto same) { return same; }, Same(lane));
+        Write<To>(out), [](auto same) { return same; }, Same(exact(Read<From>(in)[0])));
   } else if constexpr (!is_float<To>) {
-    const auto fast = [=](Rounding, auto& results) __attribute__((always_inline)) {
-      return truncated_on_unit<To, From>(results, scale, in);
-    };
-    convert_vector<From, To>(out, in, fast, exact);
+    store_truncated<To, From>(out, scale, exact, in);
   } else {
     const float unit = as_float(single_bits_of_power(-static_cast<int>(scale)));
     const auto rule = [=](auto x) {
       if constexpr (is_float<From>) return exact_single_of(x);
       if constexpr (!is_float<From>) return scaled_single(x, unit);
     };
-    const auto fast = [=](Rounding rounding, auto& results) __attribute__((always_inline)) {
-      return on_unit<To, From>(rounding, results, rule, in);
-    };
-    convert_vector<From, To>(out, in, fast, exact);
+    store_by_rule<To, From>(out, mode, true, rule, exact, in);
   }
 }
 

@@ -46,13 +46,6 @@ class Destination<L, UnitsUnder<Unit, PredicateUnit, false>> {
   LaneMask<L::bits, L::count> mask_;
 };
 
-// Lanes that are left, a bit for each, by exact(number of the lane).
-template <class L, class Exact>
-inline void complete_lanes(lane_of<L>* lanes, std::uint32_t left, const Exact& exact) {
-  for (int i = 0; i < L::count; ++i)
-    if ((left >> i & 1) != 0) lanes[i] = static_cast<lane_of<L>>(exact(i));
-}
-
 // One lane: whether it is enabled, and where it is.
 template <class Unit>
 inline bool is_enabled(const Unit*) {

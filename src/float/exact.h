@@ -30,7 +30,9 @@ struct ExactBut {
 // What measured operands of a sum yield.
 template <class Lane>
 struct Measured {
-  Vector<Lane> far;          // in the top bit: lanes that cannot be computed as near
+  // In the top bit: lanes that cannot be computed as near, as exponents tell, and those of them without a 0, which is
+  // near to any number.
+  Vector<Lane> far, far_without_zero;
   Vector<Lane> either_sign;  // there too: the signs of both terms together
 };
 template <class T>
@@ -59,17 +61,6 @@ inline V magnitudes(V bits) {
   return bits & static_cast<typename F::lane>(F::sign - 1);
 }
 
-// The bits of x, but where x is not 0 and lies more than Gap powers of two below y, a number that lies Gap below.
-// Beside y it counts no more than any other: sums with y round alike as long as they keep less than Gap bits. Of
-// numbers no farther apart the sum has room in a format of Gap bits more than x has.
-template <int Gap>
-inline Words apart(Words x, Words y) {
-  const auto magnitude = in_bits<Integers>(x & single_magnitude);
-  const auto least = in_bits<Integers>((y & Single::infinity) - powers_of_two<Single>(Gap));
-  const auto lifted = in_bits<Words>(magnitude < least ? least : magnitude);
-  return (x & single_sign) | (lifted & in_bits<Words>(magnitude != 0));
-}
-
 // Singles that have been computed, as doubles.
 inline ExactDoubles as_doubles(Words singles) {
   alignas(64) float each[step];
@@ -77,6 +68,11 @@ inline ExactDoubles as_doubles(Words singles) {
   return {doubles_at(each), doubles_at(each + half_a_step)};
 }
 
+// In the top bit: magnitudes that are not 0.
+template <class V>
+inline V not_zero(V magnitudes) {
+  return 0 - magnitudes;
+}
 // In the top bit: magnitudes that are greater.
 template <class F, class V>
 inline V above(V magnitudes, word bound) {
@@ -109,16 +105,48 @@ inline Tame tame(Words singles) {
   return {singles & ~sign_masks(left), left};
 }
 
+// x + y, or a number that rounds as it does to 24 bits (of doubles) or 11 (of singles), in every mode. x and y have at
+// most 48 bits, or 22. The arithmetic is exact, so it raises no flag.
+//
+// Let 2^e be the power of two in the greater number. Its bits, and the numbers halfway between two results, are all
+// multiples of 2^(e - 50), or 2^(e - 21). So the lesser number may be any other between the same two such multiples:
+// what it has below half of that is cut off, with the last bit that is kept as a sticky bit, which is set where that
+// cuts anything. Where nothing would be kept it is that half. The sum then has room in 53 bits, or 24. (Where something
+// is cut off the lesser is the lesser by far, and at least 2^(e - 1) is left of a difference.)
+//
+// Example, in decimal, rounded to whole numbers: 1000 + 0.500000123 may be 1000 + 0.51.
+template <class V, class Bits>
+inline V sum_with_room(V x, V y) {
+  using Bit = std::remove_reference_t<decltype(Bits{}[0])>;
+  constexpr int fraction_bits = sizeof(Bit) == 8 ? 52 : Single::fraction_bits;
+  constexpr Bit one = 1, sign = one << (8 * sizeof(Bit) - 1), unit = one << fraction_bits, powers = sign - unit;
+  constexpr Bit bits_of_one = (sign >> 1) - unit;
+  const auto bits = [](auto v) { return in_bits<Bits>(v); };
+  const auto number = [](Bits v) { return in_bits<V>(v); };
+
+  const Bits swapped = (bits(x) ^ bits(y)) & bits(number(bits(x) & ~sign) < number(bits(y) & ~sign));
+  const Bits greater = bits(x) ^ swapped, lesser = bits(y) ^ swapped, power = greater & powers;
+  const Bits magnitude = lesser & ~sign, half = power - (fraction_bits - 1) * unit;
+  const Bits lifted = chosen(bits(number(magnitude) < number(half + unit)), half, magnitude);
+  // For n bits to be cut off, 1 to fraction_bits: 2^n, and 2^n - 1 from the last bits of 2^fraction_bits + 2^n.
+  const V cut_power = number(power - (lifted & powers) + (bits_of_one + unit));
+  const V shift = V{} + static_cast<decltype(x[0] + 0)>(unit);
+  const Bits cut = bits(shift + cut_power) - (bits(shift) + 1);
+  const Bits kept = (lifted | ((lifted & cut) + cut)) & ~cut;
+  return number(greater) + number((kept & bits(number(magnitude) != 0)) | (lesser & sign));
+}
+inline ExactDoubles sum_with_room(const ExactDoubles& x, const ExactDoubles& y) {
+  return {sum_with_room<Doubles, DoubleBits>(x.lower, y.lower), sum_with_room<Doubles, DoubleBits>(x.upper, y.upper)};
+}
+
 template <class A, class B>
 inline auto sum_of_halves(const A& a, const B& b) {
   if constexpr (A::reach == Reach::near) {
     return ExactSingles<Left::none>{a.value() + b.value()};
   } else {
-    // (The sum of a power of two and a number that has been lifted, where they differ in sign, may become a tie,
-    // between that power and the number below it; it goes to the power, which is right.)
     const Tame x = tame<Half>(words_of(a.value())), y = tame<Half>(words_of(b.value()));
-    const auto lifted = [](Words u, Words v) { return in_bits<Singles>(apart<12>(u, v)); };
-    return ExactBut<ExactSingles<Left::great>>{{lifted(x.bits, y.bits) + lifted(y.bits, x.bits)}, x.left | y.left};
+    const Singles sum = sum_with_room<Singles, Words>(in_bits<Singles>(x.bits), in_bits<Singles>(y.bits));
+    return ExactBut<ExactSingles<Left::great>>{{sum}, x.left | y.left};
   }
 }
 
@@ -128,21 +156,21 @@ inline auto sum_of_singles(const A& a, const B& b) {
     return ExactDoubles{a.lower() + b.lower(), a.upper() + b.upper()};
   } else {
     const Tame x = tame<Single>(a.bits()), y = tame<Single>(b.bits());
-    const ExactDoubles u = as_doubles(apart<28>(x.bits, y.bits)), v = as_doubles(apart<28>(y.bits, x.bits));
-    return ExactBut<ExactDoubles>{{u.lower + v.lower, u.upper + v.upper}, x.left | y.left};
+    return ExactBut<ExactDoubles>{sum_with_room(as_doubles(x.bits), as_doubles(y.bits)), x.left | y.left};
   }
 }
 
 template <class F, class A, class B>
 inline auto sum(const A& a, const B& b) {
   if constexpr (A::reach == Reach::measured) {
-    // In a format of n bits two numbers of m have room up to n - m - 1 powers of two apart. Halves are also so small
-    // that their sum does not overflow.
+    // In a format of n bits two numbers of m have room up to n - m - 1 powers of two apart, and with 0 always. Halves
+    // are also so small that their sum does not overflow.
     using Lane = typename F::lane;
     const auto x = magnitudes<F>(a.bits()), y = magnitudes<F>(b.bits());
-    auto far = beyond<Lane>(x - y, powers_of_two<F>(F::bits == 16 ? 12 : 28));
-    if constexpr (F::bits == 16) far |= above<F>(x, F::largest - F::unit) | above<F>(y, F::largest - F::unit);
-    return Measured<Lane>{far, a.bits() | b.bits()};
+    const auto far = beyond<Lane>(x - y, powers_of_two<F>(F::bits == 16 ? 12 : 28));
+    Vector<Lane> great = {};
+    if constexpr (F::bits == 16) great = above<F>(x, F::largest - F::unit) | above<F>(y, F::largest - F::unit);
+    return Measured<Lane>{far | great, (far & not_zero(x) & not_zero(y)) | great, a.bits() | b.bits()};
   } else if constexpr (F::bits == 16) {
     return sum_of_halves(a, b);
   } else {
@@ -155,7 +183,8 @@ inline auto product(const A& a, const B& b) {
   if constexpr (F::bits == 32) {
     return ExactDoubles{a.lower() * b.lower(), a.upper() * b.upper()};
   } else if constexpr (has_far_specials<F> && A::reach == Reach::measured) {
-    return Measured<typename F::lane>{specials<F>(magnitudes<F>(a.bits()), magnitudes<F>(b.bits())), {}};
+    const auto far = specials<F>(magnitudes<F>(a.bits()), magnitudes<F>(b.bits()));
+    return Measured<typename F::lane>{far, far, {}};
   } else {
     return ExactSingles<Left::great_and_tiny>{a.value() * b.value()};
   }
@@ -176,19 +205,6 @@ inline V headroom(V acc, V a, V b) {
   return magnitudes<F>(acc) - magnitudes<F>(a) - magnitudes<F>(b) + static_cast<typename F::lane>(F::one);
 }
 
-// c + p for the product p of two singles, 48 bits, which has room unless it is the greater by 2^28. Where c is the
-// greater by 2^3, of p counts what a single holds and whether there is more, which the last bit says: it lies below all
-// that decides how the sum, half of c at the least, is rounded. Where c is the greater by 2^28 not even that counts.
-inline Doubles sum_with_product(Doubles c, Doubles p) {
-  constexpr std::uint64_t sign = std::uint64_t{1} << 63, power = std::uint64_t{1} << 52;
-  const auto c_magnitude = in_bits<DoubleBits>(c) & ~sign, p_magnitude = in_bits<DoubleBits>(p) & ~sign;
-  const DoubleBits odd = cut_odd<rest_bits>(p_magnitude, ~DoubleBits{});
-  const DoubleBits least = (c_magnitude & ~(power - 1)) - 28 * power;
-  const DoubleBits lifted = chosen(sign_masks(odd - least), least, odd) & sign_masks(0 - p_magnitude);
-  const DoubleBits kept = chosen(sign_masks(p_magnitude + 3 * power - c_magnitude), lifted, p_magnitude);
-  return c + in_bits<Doubles>(kept | (in_bits<DoubleBits>(p) & sign));
-}
-
 // acc + a * b for halves.
 template <class C, class A, class B>
 inline auto fused_halves(const C& acc, const A& a, const B& b) {
@@ -201,9 +217,9 @@ inline auto fused_halves(const C& acc, const A& a, const B& b) {
   } else {
     const Tame c = tame<Half>(words_of(acc.value()));
     const Tame x = tame<Half>(words_of(a.value())), y = tame<Half>(words_of(b.value()));
-    const Words p = words_of(in_bits<Singles>(x.bits) * in_bits<Singles>(y.bits));
-    const ExactDoubles u = as_doubles(apart<30>(p, c.bits)), v = as_doubles(apart<30>(c.bits, p));
-    return ExactBut<ExactDoubles>{{u.lower + v.lower, u.upper + v.upper}, c.left | x.left | y.left};
+    const Singles p = in_bits<Singles>(x.bits) * in_bits<Singles>(y.bits);
+    const Singles sum = sum_with_room<Singles, Words>(in_bits<Singles>(c.bits), p);
+    return ExactBut<ExactSingles<Left::great_and_tiny>>{{sum}, c.left | x.left | y.left};
   }
 }
 
@@ -211,7 +227,8 @@ inline auto fused_halves(const C& acc, const A& a, const B& b) {
 template <class C, class A, class B>
 inline auto fused_singles(const C& acc, const A& a, const B& b) {
   if constexpr (C::reach == Reach::near) {
-    // From 3 powers of two on the product may be cut; up to 4 there is room for all of it.
+    // From 3 powers of two on the product may be cut; up to 4 there is room for all of it. (An acc of 0 is never ahead
+    // of a product that is a normal number.)
     const auto ahead = in_bits<Integers>(headroom<Single>(acc.bits(), a.bits(), b.bits()));
     const auto below = in_bits<Words>(ahead > static_cast<std::int32_t>(powers_of_two<Single>(7) / 2));
     const auto cut = [](Doubles p, DoubleBits masks) {
@@ -221,13 +238,9 @@ inline auto fused_singles(const C& acc, const A& a, const B& b) {
                         acc.upper() + cut(a.upper() * b.upper(), pair_masks<1>(below))};
   } else {
     const Tame c = tame<Single>(acc.bits()), x = tame<Single>(a.bits()), y = tame<Single>(b.bits());
-    const ExactDoubles u = as_doubles(c.bits), v = as_doubles(x.bits), w = as_doubles(y.bits);
-    // Where the product is the greater by 2^27, if neither is 0, there is no room.
-    const auto zero = [](const Tame& t) { return in_bits<Words>(magnitudes<Single>(t.bits) == 0); };
-    const Words too_far = headroom<Single>(c.bits, x.bits, y.bits) + powers_of_two<Single>(27);
-    return ExactBut<ExactDoubles>{
-        {sum_with_product(u.lower, v.lower * w.lower), sum_with_product(u.upper, v.upper * w.upper)},
-        c.left | x.left | y.left | (too_far & ~zero(x) & ~zero(y) & ~zero(c))};
+    const ExactDoubles u = as_doubles(x.bits), v = as_doubles(y.bits);
+    const ExactDoubles p = {u.lower * v.lower, u.upper * v.upper};
+    return ExactBut<ExactDoubles>{sum_with_room(as_doubles(c.bits), p), c.left | x.left | y.left};
   }
 }
 
@@ -237,11 +250,13 @@ inline auto fused(const C& acc, const A& a, const B& b) {
     // Exponents of factors that are not normal do not tell that of the product.
     using Lane = typename F::lane;
     const auto c = acc.bits(), x = a.bits(), y = b.bits(), m = magnitudes<F>(x), n = magnitudes<F>(y);
-    const auto least = static_cast<Lane>(F::unit);
-    auto far =
-        beyond<Lane>(headroom<F>(c, x, y), powers_of_two<F>(F::bits == 16 ? 11 : 26)) | (m - least) | (n - least);
-    if constexpr (has_far_specials<F>) far |= specials<F>(m, n, magnitudes<F>(c));
-    return Measured<Lane>{far, (x ^ y) | c};
+    const auto k = magnitudes<F>(c), least = Vector<Lane>{} + static_cast<Lane>(F::unit);
+    const auto apart = beyond<Lane>(headroom<F>(c, x, y), powers_of_two<F>(F::bits == 16 ? 11 : 26));
+    const auto subnormal = (m - least) | (n - least);
+    Vector<Lane> special = {};
+    if constexpr (has_far_specials<F>) special = specials<F>(m, n, k);
+    const auto without_zero = not_zero(m) & not_zero(n) & ((apart & not_zero(k)) | subnormal);
+    return Measured<Lane>{apart | subnormal | special, without_zero | special, (x ^ y) | c};
   } else if constexpr (F::bits == 16) {
     return fused_halves(acc, a, b);
   } else {

@@ -70,13 +70,17 @@ enum Rounding : word { to_nearest, toward_zero, upward, downward, ties_away };
 enum Flag : word { inexact = 1, underflow = 2, overflow = 4, division_by_zero = 8, invalid = 16 };
 constexpr word all_flags = 31;
 
-// What one call sees of the floating-point state: RoundMode as it stands when the call begins, and the
+inline Rounding round_mode() { return static_cast<Rounding>(cstub_Km_ZNB_Orbis_R5_64k_proc.states.RoundMode & 3); }
+inline void raise_sticky(word flags) { cstub_Km_ZNB_Orbis_R5_64k_proc.states.StickyFlags |= flags; }
+inline bool is_raised(Flag flag) { return (cstub_Km_ZNB_Orbis_R5_64k_proc.states.StickyFlags & flag) != 0; }
+
+// What one call of the reference sees of the floating-point state: RoundMode as it stands when the call begins, and the
 // flags that it raises, which join the sticky ones when it ends.
 class Environment {
  public:
-  Environment() : Environment(static_cast<Rounding>(cstub_Km_ZNB_Orbis_R5_64k_proc.states.RoundMode & 3)) {}
+  Environment() : Environment(round_mode()) {}
   explicit Environment(Rounding by) : rounding(by) {}
-  ~Environment() { cstub_Km_ZNB_Orbis_R5_64k_proc.states.StickyFlags |= raised_; }
+  ~Environment() { raise_sticky(raised_); }
   Environment(const Environment&) = delete;
   Environment& operator=(const Environment&) = delete;
 

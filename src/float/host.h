@@ -8,7 +8,7 @@
 //   halves    are computed as singles, 24 bits, in which every half is a number and the product of two exact;
 //   singles   as doubles, 53 bits, in which the product of two is exact;
 //   sums      have room there when the exponents of their terms are near, which is measured before; when a lane's are
-//             not, the vector is computed in the long way, in which a term far below the other is lifted (apart).
+//             not, the vector is computed in the long way, in which the lesser term is made to fit (sum_with_room).
 //
 // Lanes for which this does not hold are left to the reference: operands or results that are infinite or
 // NaNs, results that overflow or come near, tiny ones that need not be exact. They, and subnormal operands, raise
@@ -186,6 +186,21 @@ template <class F, class... Ls, class Rule, class... Units>
     far |= rule(Lanes<Ls, Reach::measured>(operands, from)...).far;
   return any_sign<Lane>(far);
 }
+// The same of lanes without a 0.
+template <class F, class... Ls, class Rule, class... Units>
+[[gnu::noinline, gnu::flatten]] bool any_far_without_zero(Rule rule, const Units*... operands) {
+  using Lane = typename F::lane;
+  Vector<Lane> far = {};
+  for (int from = 0; from < std::min({Ls::count...}); from += lanes_in_register<Lane>)
+    far |= rule(Lanes<Ls, Reach::measured>(operands, from)...).far_without_zero;
+  return any_sign<Lane>(far);
+}
+
+// What a vector computed on the unit tells: the flags to raise, and whether a lane is left to the reference.
+struct HostResult {
+  word flags;
+  bool some_left;
+};
 
 // A vector of results in registers, and a bit for each lane that is left.
 template <class L>
@@ -328,7 +343,9 @@ template <class R, class... Ls, class Mode, class Results, class Rule, class... 
 [[gnu::always_inline, gnu::flatten]] inline HostResult on_host_in(const Mode& mode, Results& results, Rule rule,
                                                                   const Units*... operands) {
   if constexpr (measures<Rule, Lanes<Ls, Reach::measured>...>) {
-    if (__builtin_expect(any_far<format_of<R>, Ls...>(rule, operands...), 0)) {
+    using F = format_of<R>;
+    if (__builtin_expect(any_far<F, Ls...>(rule, operands...), 0) &&
+        any_far_without_zero<F, Ls...>(rule, operands...)) {
       const FarResults<R> far = far_on_host<R, Ls...>(mode, rule, operands...);
       for (int k = 0; k < registers_of<R>; ++k) results.number[k] = far.results.number[k];
       results.left = far.results.left;
@@ -414,23 +431,48 @@ template <class R, class... Ls, class Results, class Rule, class... Units>
   return host;
 }
 
-// Lanes, with those that are left completed.
+// Lanes, with those that are left completed by exact(number of the lane).
 template <class L, class Out, class Exact>
 [[gnu::noinline, gnu::cold]] void store_completed(Out out, lane_of<L>* lanes, std::uint32_t left, Exact exact) {
-  complete_lanes<L>(lanes, left, exact);
+  for (int i = 0; i < L::count; ++i)
+    if ((left >> i & 1) != 0) lanes[i] = static_cast<lane_of<L>>(exact(i));
   const Destination<L, Out> to(out);
   for (int k = 0; k < registers_of<L>; ++k) to.store(k, load_register<lane_of<L>>(lanes, k));
 }
-
-// Results by fast(results), which says whether it has left a lane. Such lanes are completed from a copy: what is passed
-// by its address cannot stay in registers.
-template <class L, class Out, class Fast, class Exact>
-[[gnu::always_inline, gnu::flatten]] inline void store_results(Out out, Fast fast, Exact exact) {
-  ResultsTo<L, Out> results(out);
-  if (__builtin_expect(!fast(results), 1)) return results.store();
+// Left lanes are completed in a copy: what is passed by its address cannot stay in registers.
+template <class L, class Out, class Exact>
+[[gnu::always_inline, gnu::flatten]] inline void store_results(Out out, const ResultsTo<L, Out>& results,
+                                                               HostResult told, Exact exact) {
+  if (told.flags != 0) raise_sticky(told.flags);
+  if (__builtin_expect(!told.some_left, 1)) return results.store();
   alignas(64) lane_of<L> lanes[L::count];
   for (int k = 0; k < registers_of<L>; ++k) store_register(lanes, k, results.number[k]);
   store_completed<L>(out, lanes, results.left, exact);
+}
+
+// --- The unit's interface (unit.h) --------------------------------------------------------------------
+
+constexpr bool rounds_by_instruction = false;
+
+template <class R, class... Ls, class Out, class Mode, class Rule, class Exact, class... Units>
+[[gnu::always_inline, gnu::flatten]] inline void store_by_rule(Out out, Mode mode, bool tells_inexact, Rule rule,
+                                                               Exact exact, const Units*... operands) {
+  ResultsTo<R, Out> results(out);
+  HostResult told;
+  if constexpr (Destination<R, Out>::is_predicated)
+    told = on_host<R, Ls...>(mode, results, rule, EnabledLanes<Ls>(operands, results).lane...);
+  else
+    told = on_host<R, Ls...>(mode, results, rule, operands...);
+  if (!tells_inexact) told.flags = 0;
+  store_results<R>(out, results, told, [=](int i) { return exact(Read<Ls>(operands)[i]...); });
+}
+
+template <class R, class From, class Out, class Exact, class Units>
+[[gnu::always_inline, gnu::flatten]] inline void store_truncated(Out out, word scale, Exact exact,
+                                                                 const Units* operand) {
+  ResultsTo<R, Out> results(out);
+  const HostResult told = truncated_on_host<R, From>(results, scale, operand);
+  store_results<R>(out, results, told, [=](int i) { return exact(Read<From>(operand)[i]); });
 }
 
 }  // namespace

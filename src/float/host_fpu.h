@@ -18,6 +18,13 @@ inline V pinned(V result) {
   return result;
 }
 
+inline word read_control_word() {
+  word mxcsr;
+  asm volatile("stmxcsr %0" : "=m"(mxcsr) : : "memory");
+  return mxcsr;
+}
+inline void write_control_word(word mxcsr) { asm volatile("ldmxcsr %0" : : "m"(mxcsr) : "memory"); }
+
 // While it lives, subnormals are honoured, every exception is masked, and sums of 0 are +0. Afterwards MXCSR is as
 // it was before. It is written only where it differs.
 // Compilers know nothing of MXCSR and move arithmetic past its writes; they cannot where operands are read through
@@ -26,25 +33,18 @@ inline V pinned(V result) {
 class HostFpu {
  public:
   template <class... Pointers>
-  [[gnu::always_inline]] explicit HostFpu(Pointers&... operands) : found_(read()) {
-    if (__builtin_expect((found_ & ~flags) != all_masked, 0)) write(all_masked);
+  [[gnu::always_inline]] explicit HostFpu(Pointers&... operands) : found_(read_control_word()) {
+    if (__builtin_expect((found_ & ~flags) != all_masked, 0)) write_control_word(all_masked);
     (pin_operand(operands), ...);
   }
   [[gnu::always_inline]] ~HostFpu() {
-    if (__builtin_expect(read() != found_, 0)) write(found_);
+    if (__builtin_expect(read_control_word() != found_, 0)) write_control_word(found_);
   }
   HostFpu(const HostFpu&) = delete;
   HostFpu& operator=(const HostFpu&) = delete;
 
  private:
   static constexpr word all_masked = 0x1F80, flags = 0x3F;
-
-  static word read() {
-    word mxcsr;
-    asm volatile("stmxcsr %0" : "=m"(mxcsr) : : "memory");
-    return mxcsr;
-  }
-  static void write(word mxcsr) { asm volatile("ldmxcsr %0" : : "m"(mxcsr) : "memory"); }
 
   const word found_;
 };

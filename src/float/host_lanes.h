@@ -20,7 +20,6 @@ inline Words words_of(Singles x) { return in_bits<Words>(x); }
 
 // Lanes of ones where the sign is set.
 inline Words sign_masks(Words x) { return in_bits<Words>(in_bits<Integers>(x) >> 31); }
-inline DoubleBits sign_masks(DoubleBits x) { return in_bits<DoubleBits>(in_bits<Vector<std::int64_t>>(x) < 0); }
 
 inline bool any_bit(Words x) {
 #ifdef __AVX2__

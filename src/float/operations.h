@@ -1,6 +1,5 @@
-// The operations. Each has `exact`, one number by the reference, and may have `fast`, a whole vector at
-// once: it leaves a NaN in every lane that is not for it and says whether there is any. Those that only a NaN
-// keeps from integers have `of_numbers` or `on_numbers`, a register of numbers.
+// The operations. Each has `exact`, one number by the reference, and may have `on_unit`, a rule for whole vectors
+// (unit.h). Those that only a NaN keeps from integers have `of_numbers` or `on_numbers`, a register of numbers.
 #ifndef KASTARRI_FLOAT_OPERATIONS_H
 #define KASTARRI_FLOAT_OPERATIONS_H
 
@@ -14,20 +13,11 @@
 
 namespace {
 
-template <class L, class>
-using same_layout = L;
-
-// Operations whose fast path is the unit. It leaves results where on_unit does.
-struct OnUnit {};
-
-// A rule of two or three floats on the unit: results and flags into the register and env.
-template <class L, class Results, class Rule, class... Units>
-[[gnu::always_inline]] inline bool fast_on_unit(Environment& env, Results& results, Rule rule,
-                                                const Units*... operands) {
-  const HostResult host = on_unit<L, same_layout<L, Units>...>(env.rounding, results, rule, operands...);
-  env.raise(host.flags);
-  return host.some_left;
-}
+// Operations that the unit computes are rounded by RoundMode and tell when that drops anything, unless they say else.
+struct RoundedByMode {
+  static Rounding rounding(Rounding round_mode) { return round_mode; }
+  static constexpr bool tells_inexact = true;
+};
 
 // A float of the unit, its sign turned.
 template <bool Turned, class T>
@@ -40,45 +30,35 @@ inline auto turned_if(const T& x) {
 
 // a + b, or a - b.
 template <bool Subtract>
-struct Sum : OnUnit {
+struct Sum : RoundedByMode {
   template <class F>
   [[gnu::always_inline]] static word exact(Environment& env, word a, word b) {
     return add<F>(env, a, Subtract ? negated<F>(b) : b);
   }
-  template <class L, class Results, class Units>
-  [[gnu::always_inline]] static bool fast(Environment& env, Results& r, const Units* a, const Units* b) {
-    return fast_on_unit<L>(
-        env, r, [](auto x, auto y) { return sum<format_of<L>>(x, turned_if<Subtract>(y)); }, a, b);
-  }
+  template <class F>
+  static constexpr auto on_unit = [](auto x, auto y) { return sum<F>(x, turned_if<Subtract>(y)); };
 };
 using ADD = Sum<false>;
 using SUB = Sum<true>;
 
-struct MUL : OnUnit {
+struct MUL : RoundedByMode {
   template <class F>
   [[gnu::always_inline]] static word exact(Environment& env, word a, word b) {
     return multiply<F>(env, a, b);
   }
-  template <class L, class Results, class... Units>
-  [[gnu::always_inline]] static bool fast(Environment& env, Results& r, const Units*... ab) {
-    return fast_on_unit<L>(
-        env, r, [](auto a, auto b) { return product<format_of<L>>(a, b); }, ab...);
-  }
+  template <class F>
+  static constexpr auto on_unit = [](auto a, auto b) { return product<F>(a, b); };
 };
 
 // acc +- a * b
 template <bool Subtract>
-struct Fused : OnUnit {
+struct Fused : RoundedByMode {
   template <class F>
   [[gnu::always_inline]] static word exact(Environment& env, word acc, word a, word b) {
     return multiply_add<F>(env, acc, Subtract ? negated<F>(a) : a, b);
   }
-  template <class L, class Results, class... Units>
-  [[gnu::always_inline]] static bool fast(Environment& env, Results& r, const Units*... operands) {
-    return fast_on_unit<L>(
-        env, r, [](auto acc, auto a, auto b) { return fused<format_of<L>>(acc, turned_if<Subtract>(a), b); },
-        operands...);
-  }
+  template <class F>
+  static constexpr auto on_unit = [](auto acc, auto a, auto b) { return fused<F>(acc, turned_if<Subtract>(a), b); };
 };
 using MULA = Fused<false>;
 using MULS = Fused<true>;
@@ -162,27 +142,24 @@ struct CLSFY {
 enum class Direction { away, up, down, zero, by_mode };
 
 template <Direction D>
-struct Integral : OnUnit {
-  static Rounding rounding(const Environment& env) {
-    return D == Direction::away   ? ties_away
-           : D == Direction::up   ? upward
-           : D == Direction::down ? downward
-           : D == Direction::zero ? toward_zero
-                                  : env.rounding;
+struct Integral {
+  static constexpr bool tells_inexact = D == Direction::by_mode;
+  static auto rounding(Rounding round_mode) {
+    if constexpr (D == Direction::away)
+      return TiesAway();
+    else
+      return D == Direction::up     ? upward
+             : D == Direction::down ? downward
+             : D == Direction::zero ? toward_zero
+                                    : round_mode;
   }
   template <class F>
   static word exact(Environment& env, word a) {
-    return to_integral<F>(env, a, rounding(env), D == Direction::by_mode);
+    return to_integral<F>(env, a, rounding(env.rounding), tells_inexact);
   }
-  template <class L, class Results, class Units>
-  [[gnu::always_inline]] static bool fast(Environment& env, Results& r, const Units* a) {
-    const auto rule = [](const auto& mode, auto x) { return integral(mode, x); };
-    const HostResult host =
-        D == Direction::away ? on_unit<L, L>(TiesAway(), r, rule, a) : on_unit<L, L>(rounding(env), r, rule, a);
-    // Halves are integers before they are narrowed: what is inexact is the rounding to an integer.
-    if (D == Direction::by_mode) env.raise(host.flags);
-    return host.some_left;
-  }
+  // Halves are integers before they are narrowed: what is inexact is the rounding to an integer.
+  template <class F>
+  static constexpr auto on_unit = [](const auto& mode, auto x) { return integral(mode, x); };
 };
 using FIROUND = Integral<Direction::away>;
 using FICEIL = Integral<Direction::up>;

@@ -57,8 +57,7 @@ constexpr auto WRITE_STATUS = [](word value) { states.StickyFlags = value >> 7 &
 #define KERNEL_scalar_abc_to_nearest(OP, RULE)                                                     \
   template <class Unit>                                                                            \
   static inline void KASTARRI_SCALARFP(OP)(const Unit* a, const Unit* b, const Unit* c, Unit* r) { \
-    Environment env(to_nearest);                                                                   \
-    apply<layout_of_unit<Unit>, RULE>(env, r, a, b, c);                                            \
+    apply<layout_of_unit<Unit>, RULE>(to_nearest, r, a, b, c);                                     \
   }
 #define KERNEL_scalar_relation(OP, RULE)                                            \
   template <class Unit, class Bits>                                                 \

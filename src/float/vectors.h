@@ -15,16 +15,10 @@ inline word in_word(word lane) {
 
 // A lane of a vector, which is one of many places: there the reference is called, alone it is inlined.
 template <class Op, class F, class... X>
-[[gnu::noinline]] word exact_lane(Environment& env, X... x) {
+[[gnu::noinline]] word exact_lane(Rounding rounding, X... x) {
+  Environment env(rounding);
   return Op::template exact<F>(env, x...);
 }
-
-// One lane is quickest by the reference, but for the fused operations on singles where instructions carry their
-// rounding.
-template <class Op, class L>
-constexpr bool is_fast_alone = false;
-template <bool Subtract>
-constexpr bool is_fast_alone<Fused<Subtract>, f32x1> = rounds_by_instruction;
 
 // --- Operations on numbers ------------------------------------------------------------------------------
 
@@ -40,10 +34,9 @@ template <class L, class Op, class Out, class Units>
     store_register(left, k, to.enabled(nan_signs<F>(x) | nan_signs<F>(y), k));
     store_register(results, k, Op::of_numbers(x, y));
   }
-  Environment env;
   for (int i = 0; i < L::count; ++i)
     if (is_negative<F>(left[i]))
-      results[i] = static_cast<Lane>(exact_lane<Op, F>(env, word{Read<L>(a)[i]}, word{Read<L>(b)[i]}));
+      results[i] = static_cast<Lane>(exact_lane<Op, F>(to_nearest, word{Read<L>(a)[i]}, word{Read<L>(b)[i]}));
   for (int k = 0; k < registers_of<L>; ++k) to.store(k, load_register<Lane>(results, k));
 }
 
@@ -62,16 +55,28 @@ inline void apply_to_numbers(Out out, const Units* a, const Units* b) {
 
 // --- Operations on the unit -----------------------------------------------------------------------------
 
+// Whether the unit has a rule for an operation. One lane is quickest by the reference nevertheless, but for a single
+// where instructions carry their rounding: a half would have to be widened and narrowed.
+template <class L>
+constexpr bool is_for_unit = L::count > 1 || (rounds_by_instruction && L::bits == 32);
+template <class Op, class F, class = void>
+constexpr bool has_unit_rule = false;
+template <class Op, class F>
+constexpr bool has_unit_rule<Op, F, std::void_t<decltype(Op::template on_unit<F>)>> = true;
+
+template <class L, class>
+using same_layout = L;
+
 template <class L, class Op, class Out, class... Units>
-[[gnu::always_inline]] inline void apply(Environment& env, Out out, const Units*... operands) {
+[[gnu::always_inline]] inline void apply(Rounding mode, Out out, const Units*... operands) {
   using F = format_of<L>;
-  if constexpr (L::count == 1 && !is_fast_alone<Op, L>) {
+  if constexpr (!is_for_unit<L> || !has_unit_rule<Op, F>) {
+    Environment env(mode);
     Write<L>(units_of(out)).put(0, Op::template exact<F>(env, in_word(Read<L>(operands)[0])...));
   } else {
-    const auto fast = [ =, &env ](auto& results) __attribute__((always_inline)) {
-      return Op::template fast<L>(env, results, operands...);
-    };
-    store_results<L>(out, fast, [=, &env](int i) { return exact_lane<Op, F>(env, word{Read<L>(operands)[i]}...); });
+    const auto exact = [mode](auto... lanes) { return exact_lane<Op, F>(mode, word{lanes}...); };
+    store_by_rule<L, same_layout<L, Units>...>(out, Op::rounding(mode), Op::tells_inexact, Op::template on_unit<F>,
+                                               exact, operands...);
   }
 }
 
@@ -81,8 +86,7 @@ template <class L, class Op, class Out, class... Units>
     apply_to_numbers<L, Op>(out, operands...);
   } else {
     if (L::count == 1 && !is_enabled(out)) return;
-    Environment env;
-    apply<L, Op>(env, out, operands...);
+    apply<L, Op>(round_mode(), out, operands...);
   }
 }
 

@@ -48,10 +48,12 @@ inline Vector<Lane> bits_to_lanes(const Unit* predicate, int k) {
 #else
   const auto tested = tested_bits<Lane>(lane_numbers<Lane>()) << first % width;
   Vector<Lane> given;
-  if constexpr (width == 8)
+  if constexpr (width == 8) {
     given = byte_of_each(bits, k);
-  else
-    given = Vector<Lane>{} + static_cast<Lane>(bits >> first % unit_bits / width * width);
+  } else {
+    const Lane part = static_cast<Lane>(bits >> first % unit_bits / width * width);
+    given = Vector<Lane>{} + part;
+  }
   return in_bits<Vector<Lane>>((given & tested) == tested);
 #endif
 }

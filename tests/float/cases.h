@@ -122,6 +122,16 @@ inline void add_registers_by_distance(std::vector<Case>& all, const exact::Forma
       all.back() = {all.back()[0], one + u, one + v};
     }
   }
+  // Among lanes that are near, zeros, each operand's in turn, beside numbers of other exponents; or a special number.
+  const std::vector<Bits> edge = edges(f);
+  for (std::size_t i = 0; i < 16 * lanes; ++i) {
+    all.push_back({number(0), number(0), number(0)});
+    if (i % 4 != 0) continue;
+    const int reach = -f.least / 2;
+    for (Bits& x : all.back()) x = number(static_cast<int>(random()) % reach);
+    const std::size_t k = i / 4 % static_cast<std::size_t>(operands);
+    all.back()[k] = i / lanes % 4 == 3 ? edge[random() % edge.size()] : all.back()[k] & f.sign();
+  }
   // A subnormal factor, whose exponent does not tell how far below acc the product is.
   for (int exponent = f.least; operands == 3 && exponent < f.least + 2 * f.precision; ++exponent)
     for (std::size_t i = 0; i < lanes; ++i) all.push_back({number(exponent), 1 + below(random, 7), number(0)});

@@ -18,7 +18,7 @@
 #define TEST_w_r(NAME, F, R, A, K) testing_support::drive_float_a_r(NAME, model_##K, F)
 #define TEST_ab_r(NAME, F, T, K) testing_support::drive_float_ab_r(NAME, model_##K, F)
 #define TEST_ab_r_T(NAME, F, T, P, K) testing_support::drive_float_ab_r_T(NAME, model_##K, F)
-#define TEST_ab_p(NAME, F, P, T, K) testing_support::drive_float_ab_r(NAME, model_##K, F)
+#define TEST_ab_p(NAME, F, P, T, K) testing_support::drive_float_relation(NAME, model_##K, F)
 #define TEST_float_acc_ab(NAME, F, T, K) testing_support::drive_float_acc_ab(NAME, model_##K, F)
 #define TEST_float_acc_ab_T(NAME, F, T, P, K) testing_support::drive_float_acc_ab_T(NAME, model_##K, F)
 #define TEST_float_const(NAME, F, T, K) testing_support::drive_float_const(NAME, F)

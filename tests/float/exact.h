@@ -36,11 +36,12 @@ inline constexpr Format single{32, 24, -126, 127};
 // As RoundMode counts them.
 inline constexpr mpfr_rnd_t modes[] = {MPFR_RNDN, MPFR_RNDZ, MPFR_RNDU, MPFR_RNDD};
 
-// Room for any sum of products of singles, exactly.
+// A number that takes no memory but its own: with room for any sum of products of singles, exactly, or for what an
+// operand of a format is.
 class Number {
  public:
-  Number() { mpfr_init2(value_, 700); }
-  Number(const Format& format, Bits x) : Number() {
+  Number() : Number(700) {}
+  Number(const Format& format, Bits x) : Number(64) {
     const Bits m = format.magnitude(x), field = m / format.unit(), fraction = m % format.unit();
     if (m > format.infinity()) {
       mpfr_set_nan(value_);
@@ -52,13 +53,20 @@ class Number {
     }
     mpfr_setsign(value_, value_, x >= format.sign(), MPFR_RNDN);
   }
-  ~Number() { mpfr_clear(value_); }
   Number(const Number&) = delete;
   Number& operator=(const Number&) = delete;
   operator mpfr_ptr() { return value_; }
   operator mpfr_srcptr() const { return value_; }
 
  private:
+  friend Answer round(const Format& f, const Number& x, mpfr_rnd_t mode);
+
+  explicit Number(mpfr_prec_t precision) {
+    mpfr_custom_init(digits_, precision);
+    mpfr_custom_init_set(value_, MPFR_NAN_KIND, 0, precision, digits_);
+  }
+
+  alignas(mp_limb_t) unsigned char digits_[88];
   mpfr_t value_;
 };
 
@@ -76,11 +84,9 @@ inline Answer round(const Format& f, const Number& x, mpfr_rnd_t mode) {
   if (mpfr_nan_p(x)) return {f.infinity() | f.quiet(), 16};
   if (mpfr_inf_p(x)) return {sign | f.infinity(), 0};
   if (mpfr_zero_p(x)) return {sign, 0};
-  mpfr_t unbounded;  // rounded as if exponents had no bound
-  mpfr_init2(unbounded, f.precision);
+  Number unbounded(f.precision);  // rounded as if exponents had no bound
   mpfr_set(unbounded, x, mode);
   const long exponent = mpfr_get_exp(unbounded) - 1;
-  mpfr_clear(unbounded);
   if (exponent > f.greatest) {
     const bool to_infinity = mode == MPFR_RNDN || mode == (sign ? MPFR_RNDD : MPFR_RNDU);
     return {sign | (to_infinity ? f.infinity() : f.infinity() - 1), 5};

@@ -138,7 +138,7 @@ TEST(float_status, Accumulates) {
 #define TEST_scalarfp_ab_r(NAME, F, T, K) testing_support::drive_float_ab_r(NAME, model_##K, F)
 #define TEST_scalarfp_acc_ab(NAME, F, T, K) testing_support::drive_float_acc_ab(NAME, model_##K, F)
 #define TEST_scalarfp_ra(NAME, F, T, K) testing_support::drive_float_ra(NAME, model_##K, F)
-#define TEST_scalarfp_relation(NAME, F, T, B, K) testing_support::drive_float_ab_r(NAME, model_##K, F)
+#define TEST_scalarfp_relation(NAME, F, T, B, K) testing_support::drive_float_relation(NAME, model_##K, F)
 #define TEST_scalarfp_const(NAME, F, T, K) testing_support::drive_float_const(NAME, F)
 #define TEST_scalarfp_to_word(NAME, F, T, K) testing_support::drive_to_word(NAME, model_##K, F)
 #define TEST_scalarfp_from_word(NAME, F, T, K) testing_support::drive_from_word(NAME, F)

@@ -30,6 +30,15 @@ static_assert(plain<qv_f16, 2, 2> && plain<rkfloat, 4, 4> && plain<qv_int24, 4, 
 static_assert(plain<qv_int32Uv, 4, 4> && plain<qv_int32pr, 4, 4> && plain<qv_int48, 8, 4> && plain<qv_int64, 8, 4>);
 static_assert(plain<qv_int64pr, 8, 4> && plain<qv_int64w, 8, 4> && plain<qv_int128, 16, 4> && plain<qv_int256, 32, 4>);
 
+// The lanes of a register's layout are the whole register.
+template <class T, class L = layout_of<T>>
+constexpr bool filled = std::is_same_v<typename L::number, predicate_bit>
+                            ? 8 * sizeof(T) >= L::count
+                            : sizeof(T) == L::count * sizeof(typename L::container);
+#define TYPE(T, UNIT, UNITS, LAYOUT, MEANING) static_assert(filled<T>);
+#include "frame/types.def"
+#undef TYPE
+
 static_assert(std::is_same_v<qv_vecNx16, qv_vecNx16_space::qv_vecNx16_>);
 static_assert(std::is_same_v<immediate, int>);
 

@@ -15,7 +15,8 @@ constexpr auto SATURATE16 = SATURATE<16>;
 
 }  // namespace model
 
-#define KASTARRI_TEST_SUITE "memory"
+// By this name it goes first, while a child process that a store ends is still small.
+#define KASTARRI_TEST_SUITE "memoryDeathTest"
 #include "support/drivers_begin.h"
 
 #undef KERNEL_a

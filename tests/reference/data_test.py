@@ -15,6 +15,9 @@ sys.path[:0] = [os.path.join(ROOT, "tools"), os.path.join(ROOT, "tools", "refere
 import choices  # noqa: E402
 import entries  # noqa: E402
 import generate_headers  # noqa: E402
+import not_built  # noqa: E402
+import rules  # noqa: E402
+import words  # noqa: E402
 
 with open(sys.argv.pop(1), encoding="utf-8") as file:
     EXAMPLES = json.load(file)["examples"]
@@ -188,6 +191,57 @@ class Facts(unittest.TestCase):
         self.assertGreater(len(leaning), 50)
         self.assertEqual([e.id for e in leaning if not e.context], [])
 
+    def test_rules_of_conversions_are_what_the_library_computes(self):
+        types, computed = generate_headers.read_types(), 0
+        for e in ENTRIES:
+            if e.row.table != "frame/conversions.def" or not re.match("every lane|lane|the source", e.rule):
+                continue
+            (_, width, _), (kind, bits, _) = (rules.lanes_of(name, types) for name in e.id.split("_rtor_"))
+            if kind == "f":
+                continue
+            values, out = (numbers(EXAMPLES[e.row.name][key])[0] for key in ("in", "out"))
+            read = [signed(v, width) if "sign-extended" in e.rule else low(v, width) for v in values]
+            written = [signed(v, bits) if kind == "i" else low(v, bits) for v in read]
+            expected = written[:1] * len(out) if re.match("every lane|lane 0", e.rule) else written
+            self.assertEqual(out, expected, e.id)
+            computed += 1
+        self.assertGreater(computed, 200)
+
+    def test_every_entry_has_words_to_be_found_by(self):
+        self.assertEqual([e.id for e in ENTRIES if not words.words_of(e)[0].strip()], [])
+
+    def test_every_rule_speaks_of_its_own_row(self):
+        of_others = re.compile(r"\bforms?\b|\(\.\.|\((_\w+|[A-Z]{1,2}|[A-Z]\w{2,})\)|\bw\b|modes|\b_V\b|as above")
+        self.assertEqual([(e.id, text) for e in ENTRIES for text in [e.rule, *e.context] if of_others.search(text)], [])
+        for e in ENTRIES:
+            self.assertEqual("moves by increment" in e.rule, any(o.pointer for o in e.operands), e.id)
+            self.assertEqual(bool(re.match("loads", e.rule)), bool(re.match("load|mtor", e.row.shape)), e.id)
+            if e.predicated:
+                self.assertRegex(" ".join([e.rule, *e.context]), "predicate bit", e.id)
+            told, tested = (re.search(pattern, text) for pattern, text in
+                            ((r"aligned to (\d)", e.rule), (r"is tested: unless it is a multiple of (\d)", e.alignment or "")))
+            if e.family == "memory":
+                self.assertEqual(told and told[1], tested and tested[1], e.id)
+
+    def test_parts_that_rules_replace_stand_in_the_tables(self):
+        sentences = {e.row.doc for e in ENTRIES}
+        self.assertEqual([part.pattern for part, _ in rules.OWN_PARTS if not any(map(part.search, sentences))], [])
+
+    def test_rules_of_their_own(self):
+        found = {e.id: e.rule for e in ENTRIES}
+        for name, rule in {
+                "MULUSANX16": "lane i of acc = acc[i] + a[i] * b[i], modulo 2^48; the first factor is unsigned, the second signed",
+                "LVNX8S_IP": "loads: lane i = lane i of the 32 bytes at the address, sign-extended. The address is the pointer, which then "
+                             "moves by increment bytes",
+                "NEGNX16UT": "lane i = -a[i], modulo 2^16: the most negative value is its own negative. Where predicate bit i is 0, r keeps "
+                             "lane i",
+                "SCATTERNX16": "writes lane i at base + offset i bytes",
+                "GATHERANX16": "element i, at base + offset i bytes, into lane i",
+                "qv_vecNx16_rtor_int8": "lane 0 of the source, its low 8 bits",
+                "int8_rtor_qv_vecNx16": "every lane = the source, sign-extended",
+                "RK_ADDX4": "4 a + b, modulo 2^32"}.items():
+            self.assertEqual(found[name], rule)
+
     def test_facts_are_those_of_the_words(self):
         facts = {e.id: e.facts for e in ENTRIES}
         for name, expected in {"ADDSNX16": ["saturates"], "ADDNX16": ["wraps"], "MULNX16": ["exact"],
@@ -195,6 +249,23 @@ class Facts(unittest.TestCase):
                                "ANDNX16": [], "ADDNXF16": ["rounds", "flags"], "SUBF16T": ["rounds", "flags"],
                                "int16_mtor_qv_vecNx16": [], "MULNX16PACKQ": ["wraps", "rounds"]}.items():
             self.assertEqual(facts[name], expected, name)
+
+    def test_what_is_written_instead_is_there(self):
+        there = {e.id for e in ENTRIES} | {e.short for e in ENTRIES}
+        for topic in not_built.TOPICS:
+            names = [name for code in re.findall("`([^`]+)`", topic.instead) for name in re.findall(r"\b[A-Za-z]+\w*(?=\(|$)", code)]
+            self.assertTrue(names, topic.key)
+            self.assertLessEqual(set(names), there)
+
+    def test_what_is_not_built_is_not_there(self):
+        # Only names that are not there are asked for; the one that is, is named in the topic.
+        self.assertEqual([e.id for e in ENTRIES if not_built.topic_of(e.id)], ["SELS2NX8"])
+        for name, key in {"SELNX16I": "select", "SHFL2NX8": "select", "UNPKS2NX8": "select", "LANX16_IP": "aligning", "DIVNX16": "division",
+                          "RSQRTN_2XF32": "division", "ADDMOD16U": "ring", "UNSQZ2N": "compress", "RBMAXNX16": "places",
+                          "RADDANX16": "sums", "LSCF_I": "unknown-elements"}.items():
+            self.assertEqual(not_built.topic_of(name).key, key, name)
+        for name in ("ADDNX17", "SLLNX8", "FOONX16", "MULX", "LATER", "SATNX16", "LSNX17_I"):
+            self.assertIsNone(not_built.topic_of(name), name)
 
     def test_short_names_lead_to_one_entry(self):
         self.assertEqual(len({e.id for e in ENTRIES}), len(ENTRIES))

@@ -12,6 +12,7 @@ import unittest
 ROOT = os.path.dirname(os.path.dirname(os.path.dirname(os.path.abspath(__file__))))
 sys.path[:0] = [os.path.join(ROOT, "tools"), os.path.join(ROOT, "tools", "reference")]
 import generate_headers  # noqa: E402
+import not_built  # noqa: E402
 from browser import Browser  # noqa: E402
 
 PAGE = pathlib.Path(sys.argv.pop(1)).resolve().as_uri()
@@ -100,10 +101,20 @@ class Page(unittest.TestCase):
         self.assertEqual(self.names(), ["MULNX16C"])
         self.type("valign")
         self.assertEqual(set(self.names()), {short(row) for row in ROWS if "valign" in row.prototype})
-        self.type("mean ties"), self.assertEqual(self.names(), [])
+        self.type("qqqq")
+        self.assertEqual(self.names(), [])
         self.assertIn("No intrinsic matches", self.message())
         self.type("conjugated modulo")
-        self.assertEqual(set(self.names()), {short(row) for row in ROWS if "conjugated" in row.doc})
+        conjugating = {short(row) for row in ROWS if "conjugated" in row.doc}
+        self.assertEqual(set(self.first_names(len(conjugating))), conjugating)
+
+    def test_plain_forms_go_before_their_variants(self):
+        self.open()
+        for query, order in {"add 16 bit": ["ADDNX16", "ADDNX16U", "ADDNX16T"], "mulanx16": ["MULANX16", "MULANX16PACKL"],
+                             "shift left": ["SLLNX16", "SLLINX16"], "load 16 bit": ["LVNX16_I", "LVNX16_IP", "LVNX16T_I"]}.items():
+            self.type(query)
+            names = self.names()
+            self.assertEqual(sorted(order, key=names.index), order, query)
 
     def test_search_by_regular_expression(self):
         self.open()
@@ -130,13 +141,28 @@ class Page(unittest.TestCase):
 
     def test_links_open_entries(self):
         symbol = generate_headers.symbol("rk_zra32_ZRA_ADDNX16")
-        for part in ("#ADDNX16", "#ZRA_ADDNX16", "#" + symbol):
+        for part in ("#ADDNX16", "#ZRA_ADDNX16", "#addnx16", "#zra_AddNx16", "#" + symbol):
             self.open(part)
             self.assertEqual(self.title(), "ADDNX16")
         self.open("#ADDNX16&q=adds")
-        self.assertEqual((self.title(), self.first_names(1)), ("ADDNX16", ["ADDS16"]))
+        self.assertEqual((self.title(), self.first_names(1)), ("ADDNX16", ["ADDSNX16"]))
         self.open("#NOSUCH")
         self.assertIn("no intrinsic named NOSUCH", self.entry())
+        self.open("#addsnx61")
+        self.assertIn("Near it: ADDSNX16", self.entry())
+
+    def test_what_is_not_built_says_what_to_write_instead(self):
+        for part, topic in (("#selnx16", "select"), ("#ZRA_RADDANX16", "sums"), ("#q=shuffle", "select"), ("#q=SQZN", "compress")):
+            self.open(part)
+            if "q=" in part:
+                self.run_script("document.querySelector('#results a').click()")
+                self.until(True, lambda: self.title().startswith("Not built"))
+            expected = next(t for t in not_built.TOPICS if t.key == topic)
+            self.assertEqual(self.title(), "Not built: " + expected.title.replace("`", ""))
+            self.assertIn(expected.why.lower(), self.entry().lower())
+            self.assertIn(expected.instead.replace("`", ""), self.entry())
+        self.open("#SELS2NX8")
+        self.assertEqual(self.title(), "SELS2NX8", "what is there is not said to be missing")
 
     def test_an_entry_says_what_its_row_says(self):
         self.open("#LSNX16_IP")
@@ -144,11 +170,47 @@ class Page(unittest.TestCase):
                      "The address of the destination r is tested", "Post-increment element loads test the address",
                      "src/memory/elements.def", "a choice of this library"):
             self.assertIn(text, self.entry())
+        self.open("#LVNX16_IP")
+        self.assertIn("loads the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.", self.entry())
         self.open("#ADDSNX16T")
-        self.assertIn("r keeps the lane that it held", self.entry())
+        self.assertIn("Where predicate bit i is 0, r keeps lane i", self.entry())
         rows = self.run_script("return [...document.querySelectorAll('.lanes tr')].map((row) => row.innerText.split(/\\s+/))")
         self.assertEqual(rows[1][:4], ["r", "10", "-20", "30"])
         self.assertEqual(rows[5][:5], ["r", "after", "3", "-20", "293"])
+        self.open("#MULQAN16XR8")
+        self.assertIn("s3 = 4, s2 = 3, s1 = -1, s0 = -2 (0x0403fffe)", self.entry().replace("\N{NO-BREAK SPACE}", " "))
+        self.assertRegex(self.entry(), "acc\tqv_vecNx48\\s.*accumulator.*\\s.*read and written")
+        self.open("#MULUUPN16XR16")
+        self.assertIn("s1 = 1027, s0 = 65534", self.entry().replace("\N{NO-BREAK SPACE}", " "))
+
+    def test_calls_to_copy(self):
+        for name, call in {"ADDNX16": "const qv_vecNx16 result = ZRA_ADDNX16(a, b);", "MULANX16": "ZRA_MULANX16(acc, a, b);",
+                           "LVNX16_IP": "qv_vecNx16 r;\nZRA_LVNX16_IP(r, &pointer, increment);", "RK_NOP": "RK_NOP();"}.items():
+            self.open("#" + name)
+            self.assertEqual(self.run_script("return document.querySelector('.call pre').textContent"), call)
+
+    def test_twins(self):
+        self.open("#LVNX16_I")
+        twins = self.run_script("return Object.fromEntries(AXES.map((t, i) => [t, twinsOf(entryNamed('LVNX16_I'), i).map((e) => e.id)]))")
+        self.assertEqual(twins["With and without a predicate"], ["LVNX16T_I"])
+        self.assertEqual(twins["Other addressing"], ["LVNX16_X", "LVNX16_IP", "LVNX16_XP"])
+        self.assertEqual(twins["Other signs"], ["LVNX16U_I"])
+        self.assertEqual(set(twins["Other lanes"]), {"LV2NX8_I", "LVN_2X32_I", "LVN_4X64_I", "LVNXF16_I", "LVN_2XF32_I", "LVN_2XF16_I"})
+        self.run_script("[...document.querySelectorAll('.twins a')].find((a) => a.textContent === 'LVNX16_IP').click()")
+        self.until("LVNX16_IP", self.title)
+        found = self.run_script("""return ['MULANX16', 'ADDSNX16', 'LTUNX16', 'PACKVRNX48_0', 'scalarfp_ADD_H'].map((name) =>
+            AXES.flatMap((t, i) => twinsOf(entryNamed(name), i).map((e) => e.id)));""")
+        for name, several in zip(("MULNX16", "ADDNX16", "LTNX16", "PACKVR2NX24_0", "scalarfp_ADD_S"), found):
+            self.assertIn(name, several)
+
+    def test_the_start_page_explains_names_and_types(self):
+        self.open()
+        for text in ("N is 32", "_IP _XP", "NX48", "RoundMode", "qv_vecN_2x64w"):
+            self.assertIn(text, self.entry())
+        links = self.run_script("return [...document.querySelectorAll('.queries a')].map((a) => a.textContent)")
+        for query in links:
+            self.open("#q=" + query)
+            self.assertGreater(self.run_script("return found.length"), 0, query)
 
     def test_keyboard(self):
         self.open()

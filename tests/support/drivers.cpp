@@ -19,7 +19,7 @@ void expect_image(const std::string& name, int round, const Format& format, cons
 }
 
 void check(const Operation& operation) {
-  OperandImages operands(operation.operands);
+  OperandImages operands(operation.operands, operation.all_values);
   std::vector<Int> expected(static_cast<std::size_t>(operation.result.count));
   std::vector<Int> values(operation.operands.size());
   for (int n = 0; n < operands.rounds(); ++n) {

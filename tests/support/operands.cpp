@@ -6,7 +6,7 @@ namespace testing_support {
 
 namespace {
 
-std::vector<Int> all_values(const Format& format) {
+std::vector<Int> every_value(const Format& format) {
   std::vector<Int> values;
   for (Int v = 0; v < Int{1} << format.bits; ++v) values.push_back(as_lane(format, v));
   return values;
@@ -15,7 +15,7 @@ std::vector<Int> all_values(const Format& format) {
 }  // namespace
 
 std::vector<Int> corners(const Format& format) {
-  if (format.bits <= 8) return all_values(format);
+  if (format.bits <= 8) return every_value(format);
   std::vector<Int> values;
   for (Int v = -3; v <= 3; ++v) values.push_back(as_lane(format, v));
   for (Int v : {-70, -40, -33, -32, -31, -20, -17, -16, -15, -8, 7, 8, 15, 16, 17, 31, 32, 33, 40, 64, 70, 1000})
@@ -38,10 +38,10 @@ void fill_random(const Format& format, void* image, std::mt19937& random) {
   }
 }
 
-OperandImages::OperandImages(std::vector<Format> formats) : formats_(std::move(formats)), images_(formats_.size()) {
+OperandImages::OperandImages(std::vector<Format> formats, bool all_values)
+    : formats_(std::move(formats)), images_(formats_.size()) {
   for (const Format& format : formats_) {
-    const bool exhaustive = formats_.size() == 1 && format.bits <= 16;
-    values_.push_back(exhaustive ? all_values(format) : corners(format));
+    values_.push_back(all_values && formats_.size() == 1 && format.bits <= 16 ? every_value(format) : corners(format));
     lanes_ = std::max(lanes_, format.count);
   }
   std::size_t pairs = values_.back().size();

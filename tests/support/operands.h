@@ -37,10 +37,10 @@ struct Image {
 
 // Rounds of register images for an operation's operands: every pair of corners of the last two operands
 // meets in some lane, the others run through their corners beside them; then random lanes. One operand
-// of 16 bits or fewer takes all its values.
+// of 16 bits or fewer takes all its values if it may.
 class OperandImages {
  public:
-  explicit OperandImages(std::vector<Format> formats);
+  explicit OperandImages(std::vector<Format> formats, bool all_values = true);
 
   int rounds() const { return cross_rounds_ + random_rounds; }
 

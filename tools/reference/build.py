@@ -18,6 +18,9 @@ sys.path.insert(0, HERE)
 import choices  # noqa: E402
 import entries  # noqa: E402
 import generate_headers  # noqa: E402
+import not_built  # noqa: E402
+import twins  # noqa: E402
+import words  # noqa: E402
 
 FLAG_NAMES = ["inexact", "underflow", "overflow", "division-by-zero", "invalid"]
 
@@ -45,9 +48,24 @@ def flags_text(values):
     return " ".join(words(int(value)) for value in values.split())
 
 
-def example_data(example, initial, rule, text):
+def coefficients(entry, operand, value):
+    """A word of coefficients as what it holds: 0x0403fffe is s1 = 1027, s0 = -2."""
+    bits = 16 if "XR16" in entry.id else 8
+    unsigned = re.match(r"MUL(UU|SU)|.*R8UX", entry.id)
+    word, parts = int(value, 16), []
+    for i in reversed(range(32 // bits)):
+        part = word >> bits * i & (1 << bits) - 1
+        parts.append(f"{operand.name}{i} = {part if unsigned or part < 1 << bits - 1 else part - (1 << bits)}")
+    return f"{', '.join(parts)} ({value})".replace(" ", "\N{NO-BREAK SPACE}")
+
+
+def example_data(example, initial, entry, text):
     """What goes in and what comes out, without what only stays as it is."""
     given, got = example["in"], example["out"]
+    rule = " ".join([entry.rule] + entry.context)
+    words_of_coefficients = {o.name: o for o in entry.operands if o.type == "qv_int32pr" and entry.family == "multiply"}
+    given = [[name, coefficients(entry, words_of_coefficients[name], values) if name in words_of_coefficients else values]
+             for name, values in given]
     given = given + [[name, str(initial[name])] for name, pattern in STATES.items() if re.search(pattern, rule)]
     before = dict(map(tuple, given))
     got = [[name, flags_text(values) if name == "StickyFlags" else values] for name, values in got
@@ -61,12 +79,17 @@ def entry_data(entry, examples, text):
     row = entry.row
     prototype = row.prototype.replace(generate_headers.PREFIX, "$")
     operands = [number for o in entry.operands
-                for number in (text(o.name), text(o.type), text(o.role), text(o.shape))]
-    rule = " ".join([row.doc] + entry.context)
+                for number in (text(o.name), text(o.type), text(o.access), text(o.shape))]
+    stem, axes = twins.axes_of(entry)
     return [entry.short, entry.symbol.replace(generate_headers.PREFIX, "$"), list(generate_headers.FAMILIES).index(entry.family),
-            text(row.table), text(row.doc), [text(t) for t in entry.context], prototype, operands, entry.lane_bits,
-            entry.register_bits, int(entry.predicated), int(entry.keeps_lanes), entry.facts, text(entry.alignment),
-            entry.choices, example_data(examples["examples"][row.name], examples["initial"], rule, text)]
+            text(row.table), text(entry.rule), [text(t) for t in entry.context], prototype, operands, entry.lane_bits,
+            entry.register_bits, int(entry.predicated), entry.facts, text(entry.alignment),
+            entry.choices, example_data(examples["examples"][row.name], examples["initial"], entry, text),
+            [text(w) for w in words.words_of(entry)], round(100 * words.plainness(entry)), [text(t) for t in [stem, *axes]]]
+
+
+def topic_data(topic):
+    return {**topic._asdict(), "names": not_built.patterns(topic)}
 
 
 def page_data(examples, version):
@@ -76,7 +99,11 @@ def page_data(examples, version):
     rows = [entry_data(entry, examples, text) for entry in found]
     tables = {text(table): generate_headers.about_table(table) for table in dict.fromkeys(entry.row.table for entry in found)}
     return {"version": version, "prefix": generate_headers.PREFIX, "families": list(generate_headers.FAMILIES.items()),
-            "choices": [choice.text for choice in all_choices], "tables": tables, "texts": text.all(), "entries": rows}
+            "choices": [choice.text for choice in all_choices], "topics": [topic_data(topic) for topic in not_built.TOPICS],
+            "tables": tables,
+            "types": {name: [type.shape, type.units * type.unit_bits // 8, type.meaning]
+                      for name, type in generate_headers.read_types().items()},
+            "texts": text.all(), "entries": rows}
 
 
 def read(name):
@@ -87,8 +114,8 @@ def read(name):
 def page(data):
     # A script may hold anything but its own end tag.
     json_text = json.dumps(data, ensure_ascii=False, separators=(",", ":")).replace("</", "<\\/")
-    parts = {"style": read("page.css"), "script": read("page.js"), "data": json_text, "version": data["version"],
-             "count": f"{len(data['entries']):,}"}
+    parts = {"style": read("page.css"), "script": "\n".join(map(read, ["search.js", "entry.js", "page.js"])),
+             "start": read("start.html"), "data": json_text, "version": data["version"], "count": f"{len(data['entries']):,}"}
     return re.sub(r"\{\{(\w+)\}\}", lambda match: parts[match[1]], read("page.html"))
 
 

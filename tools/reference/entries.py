@@ -3,6 +3,7 @@
 import re
 
 import generate_headers
+import rules
 from generate_headers import PREFIX
 
 # Host types: bits, and how they are shown.
@@ -37,9 +38,15 @@ class Operand:
             const, self.type, mark, self.name = None, text, None, name or ""
         self.register = types.get(self.type)
         self.in_memory = bool(mark) and "*" in mark
+        self.pointer = mark == "**"
         self.role = ("result" if name == "result" else "in memory" if self.in_memory
                      else "written" if mark == "&" and not const else "read")
+        self.keeps = False  # whether what it held before the call matters
         self.bytes = self.register.units * self.register.unit_bits // 8 if self.register else HOST_TYPES[self.type][0] // 8
+
+    @property
+    def access(self):
+        return "read and written" if self.keeps else "read, moved" if self.pointer else self.role
 
     @property
     def shape(self):
@@ -54,6 +61,8 @@ class Operand:
 def operands_of(row, types):
     result, parameters = re.fullmatch(r"(.*?)\s*\bcstub\w+\((.*)\)", row.prototype).groups()
     operands = [Operand(text, types) for text in parameters.split(",") if text.strip()]
+    for operand in operands:
+        operand.keeps = operand.role == "written" and operand.name in ("r", "acc") and not row.shape.startswith("load")
     return operands if result == "void" else operands + [Operand(result, types, "result")]
 
 
@@ -80,8 +89,8 @@ def operation(name):
     return re.sub(r"^ZRA_", "", generate_headers.short_name(name))
 
 
-class Rules:
-    """The rules of a table, and which others a rule's words refer to."""
+class Sentences:
+    """The sentences of a table, and which others their words refer to."""
 
     def __init__(self, rows):
         self.texts = list(dict.fromkeys(row.doc for row in rows))
@@ -104,22 +113,18 @@ def facts(texts):
 
 
 class Entry:
-    def __init__(self, family, row, types, rules, choices):
+    def __init__(self, family, row, types, sentences, choices):
         self.row, self.family = row, family
         self.id = operation(row.name)
         self.short = generate_headers.short_name(row.name)
         self.symbol = generate_headers.symbol(row.name)
         self.operands = operands_of(row, types)
-        self.context = rules.context(row.doc)
-        self.facts = facts([row.doc] + self.context)
+        self.rule = rules.own(row, types)
+        self.context = [rules.own(row, types, sentence) for sentence in sentences.context(row.doc)]
+        self.facts = facts([self.rule] + self.context)
         self.alignment = alignment(row, self.operands)
         self.choices = [i for i, choice in enumerate(choices) if choice.family == family and choice.names(self.id)]
         self.predicated = "_T" in row.shape
-
-    @property
-    def keeps_lanes(self):
-        """Whether a predicated form leaves the lanes of its destination that are not enabled."""
-        return generate_headers.keeps_lanes(self.row)
 
     @property
     def lane_bits(self):
@@ -136,6 +141,6 @@ def read_entries(choices):
     types = generate_headers.read_types()
     entries = []
     for family, (_, tables, rows) in generate_headers.all_rows().items():
-        rules = {table: Rules([row for row in rows if row.table == table]) for table in tables}
-        entries += [Entry(family, row, types, rules[row.table], choices) for row in rows]
+        sentences = {table: Sentences([row for row in rows if row.table == table]) for table in tables}
+        entries += [Entry(family, row, types, sentences[row.table], choices) for row in rows]
     return entries

@@ -125,7 +125,8 @@ class Installation(Directory):
         with open(compiler, "w", encoding="utf-8") as script:
             script.write(f'#!/bin/sh\nfor a; do test "$a" != -m{BITS} || exit 1; done\nexec g++ -m{OTHER} "$@"\n')
         os.chmod(compiler, 0o755)
-        configured = self.configure(f"-DCMAKE_CXX_COMPILER={compiler}", f"-DKASTARRI_BITS={BITS}")
+        configured = self.configure(f"-DCMAKE_CXX_COMPILER={compiler}", f"-DKASTARRI_BITS={BITS}",
+                                    f"-Dkastarri_DIR={os.path.join(self.prefix, CMAKE_DIRECTORY)}")
         self.assertNotEqual(configured.returncode, 0)
         self.assertIn(f"kastarri is a {BITS}-bit x86 library", configured.stdout)
 
@@ -138,7 +139,7 @@ class Installation(Directory):
             self.assertIn("Could not find a package configuration file provided by \"kastarri\"",
                           " ".join(self.configure("-DCMAKE_CXX_FLAGS=-m32", "--fresh").stdout.split()))
         # Who says nothing may have the 32-bit library, and hears of it.
-        told = "there is no library for 64-bit programs" in self.configure("--fresh", "-UKASTARRI_BITS").stdout
+        told = "there is no library for 64-bit programs" in self.configure("--fresh").stdout
         self.assertEqual(told, BITS == "32")
 
     def test_pkg_config_has_all_that_a_compiler_needs(self):

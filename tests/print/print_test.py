@@ -46,7 +46,7 @@ def path(name):
 
 def build(compiler, program, *flags):
     subprocess.run([compiler, *FLAGS, "-Wno-uninitialized", "-Wno-unused-but-set-variable", "-Wno-unused-variable", "-g", *flags,
-                    os.path.join(HERE, program + ".cpp"), LIBRARY, "-Wl,-rpath," + os.path.dirname(LIBRARY),
+                    os.path.join(HERE, program + ".cpp"), "-Wl,--no-as-needed", LIBRARY, "-Wl,-rpath," + os.path.dirname(LIBRARY),
                     "-o", path(f"{program}_{compiler}")], check=True)
 
 

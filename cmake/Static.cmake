@@ -1,6 +1,6 @@
 # The static library: one target, without dispatch. Its integer, multiply and memory intrinsics, moves and conversions
 # can be inlined into kernels at link time, by the compiler that built it. GCC's objects hold machine code besides, for
-# links without; clang's are bitcode alone, which the linker's plugin turns into code where no flag asks for more.
+# links without; clang's are bitcode alone, so that all links have to be told of it.
 # Vectors of floats can be inlined with AVX-512, where every operation is an instruction that carries its rounding.
 #
 # Floats of the other targets and the scalar core stay calls. How the compiler may treat floating-point arithmetic is up
@@ -12,6 +12,16 @@ if(NOT KASTARRI_STATIC_TARGET IN_LIST KASTARRI_KNOWN_TARGETS)
 endif()
 if(KASTARRI_SANITIZE)
   message(FATAL_ERROR "KASTARRI_BUILD_STATIC: the static library is not built with sanitizers")
+endif()
+
+if(CMAKE_CXX_COMPILER_ID STREQUAL Clang)
+  set(KASTARRI_STATIC_LTO -flto=thin)
+  set(KASTARRI_STATIC_CODE)
+  set(KASTARRI_STATIC_LINK_FLAGS -flto=thin)
+else()
+  set(KASTARRI_STATIC_LTO -flto)
+  set(KASTARRI_STATIC_CODE -ffat-lto-objects -Wno-attributes)
+  set(KASTARRI_STATIC_LINK_FLAGS)
 endif()
 
 # A kernel is compiled for the same machine: without, nothing may be inlined into it. How wide copies are g++ alone can
@@ -43,9 +53,8 @@ function(kastarri_static_library name target)
   kastarri_static_flags(flags ${target})
   target_compile_options(${name} INTERFACE ${flags})
   # Realigning the stack is of the options that a function and what is inlined into it have to share.
-  target_compile_options(${name} PRIVATE -mno-stackrealign
-    $<$<CXX_COMPILER_ID:GNU>:-flto;-ffat-lto-objects;-Wno-attributes>
-    $<$<CXX_COMPILER_ID:Clang>:-flto=thin>)
+  target_compile_options(${name} PRIVATE -mno-stackrealign ${KASTARRI_STATIC_LTO} ${KASTARRI_STATIC_CODE})
+  target_link_options(${name} INTERFACE ${KASTARRI_STATIC_LINK_FLAGS})
   target_compile_definitions(${name} PRIVATE KASTARRI_INLINE_ENTRIES)
 endfunction()
 

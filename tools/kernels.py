@@ -37,7 +37,7 @@ def modules(build, clang_build, target):
 def runs(build, target):
     """Whether this processor runs a target: what the library that has no other says."""
     library = os.path.join(build, "tests", "only", target)
-    told = subprocess.run([os.path.join(build, "bench", "kastarri_bench"), "--benchmark_filter=^$"],
+    told = subprocess.run([os.path.join(build, "bench", "kastarri_bench"), "--benchmark_filter=vecNx16_move", "--benchmark_min_time=0.0001"],
                           env=dict(os.environ, LD_LIBRARY_PATH=library), capture_output=True, text=True, check=False)
     return f"target: {target}" in told.stderr
 

@@ -35,6 +35,8 @@ def cached(name):
 
 
 VERSION = cached("CMAKE_PROJECT_VERSION")
+COMPILER = cached("CMAKE_CXX_COMPILER")  # what it built others link, but for the static library of clang
+CLANG = "clang" in os.path.basename(COMPILER)
 STATIC_TARGET = cached("KASTARRI_STATIC_TARGET")
 BITS = cached("KASTARRI_BITS")
 OTHER = {"32": "64", "64": "32"}[BITS]
@@ -104,10 +106,10 @@ class Installation(Directory):
         self.assertIn("libkastarri.so.", output("readelf", "-d", program))
 
     def test_a_project_links_the_static_library(self):
-        program = self.consumer("-DLINKAGE=static")
+        program = self.consumer("-DLINKAGE=static", f"-DCMAKE_CXX_COMPILER={COMPILER}")
         self.assertNotIn("libkastarri", output("readelf", "-d", program))
         calls = [line for line in output("objdump", "-d", "--no-show-raw-insn", program).splitlines()
-                 if "call" in line and "ZRA_ADDNX16" in line]
+                 if re.search(r"call .*ZRA_ADDNX16[^+]*$", line)]
         self.assertEqual(calls, [], "what is optimised when it is linked has the intrinsic inlined")
         if processor_runs_static():
             self.assertEqual(self.check_answer(program), STATIC_TARGET)
@@ -146,6 +148,8 @@ class Installation(Directory):
         modules = {"kastarri": True, "kastarri-static": processor_runs_static()}
         for module, directory, compiler in itertools.product(modules, PKGCONFIG_DIRECTORIES, ("g++", "clang++")):
             with self.subTest(module=module, directory=directory, compiler=compiler):
+                if CLANG and module == "kastarri-static" and compiler == "g++":
+                    continue  # it reads no bitcode
                 environment = self.environment(directory)
                 self.assertEqual(output("pkg-config", "--modversion", module, env=environment).strip(), VERSION)
                 # The shell takes apart what pkg-config prints, spaces in the prefix being quoted.

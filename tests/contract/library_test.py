@@ -18,9 +18,7 @@ sys.path.insert(0, os.path.join(ROOT, "tools"))
 import generate_headers  # noqa: E402
 
 COMPILERS = ["g++", "clang++"]
-with open(LIBRARY, "rb") as library_file:
-    BITS = 32 * library_file.read(5)[4]  # by the class of the ELF file
-USER_FLAGS = [f"-m{BITS}", "-std=c++11", "-Wall", "-Wextra", "-Wpedantic", "-Wconversion", "-Wshadow", "-Werror",
+USER_FLAGS = ["-std=c++11", "-Wall", "-Wextra", "-Wpedantic", "-Wconversion", "-Wshadow", "-Werror",
               "-I", os.path.join(ROOT, "include")]
 
 SYSTEM_HEADERS = """
@@ -253,4 +251,7 @@ if __name__ == "__main__":
     parser.add_argument("--objects", nargs="+", default=[])
     arguments = parser.parse_args()
     LIBRARY, OBJECTS = os.path.abspath(arguments.library), arguments.objects
+    with open(LIBRARY, "rb") as library_file:
+        BITS = 32 * library_file.read(5)[4]  # by the class of the ELF file
+    USER_FLAGS.append(f"-m{BITS}")
     unittest.main(argv=[sys.argv[0], *arguments.tests])

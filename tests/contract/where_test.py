@@ -26,7 +26,7 @@ CASES = {
     "ZRA_MULANX16": {"row": "ROW(MULANX16,", "function": "Added", "form": "KERNEL_by_register", "shape": "SIG_acc_ab(",
                      "test": "multiply/products.def"},
     "LVNX16T_IP": {"row": "LOAD_ROWS_T(LVNX16T,", "kind of row": "#define LOAD_ROWS_T", "function": "KERNEL(LVNX16,",
-                   "rule": "auto SAME =", "shape": "SIG_load_IP_T", "test": "memory/vectors.def"},
+                   "form": "KERNEL_copy", "shape": "SIG_load_IP_T", "test": "memory/vectors.def"},
     "cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDN_2XF32": {
         "row": "(ADD)", "kind of row": "#define FLOAT_", "rule": " ADD", "shape": "SIG_ab_r(", "test": "float/arithmetic.def"},
     "ADD_S": {"row": "(ADD,", "kind of row": "#define SCALARFP_BOTH", "test": "float/scalars.def"},

@@ -67,10 +67,10 @@ inline void extend_lanes(const void* from, void* to) {
   using Wide = typename To::container;
   if constexpr (2 * sizeof(Narrow) == sizeof(Wide) && To::count * sizeof(Wide) == register_bytes &&
                 register_bytes == 64 && From::bits == 8 * sizeof(Narrow)) {
-    typedef Narrow Half __attribute__((vector_size(register_bytes / 2)));
-    Half half;
-    std::memcpy(&half, from, sizeof half);
-    store_register(to, 0, __builtin_convertvector(half, Vector<Wide>));
+    typedef Narrow NarrowLanes __attribute__((vector_size(register_bytes / 2)));
+    NarrowLanes narrow;
+    std::memcpy(&narrow, from, sizeof narrow);
+    store_register(to, 0, __builtin_convertvector(narrow, Vector<Wide>));
   } else {
     lanes<To::count>(Write<To>(to), same_value, Read<From>(from));
   }

@@ -1,6 +1,7 @@
 """Builds for both widths: every intrinsic gives the same bits, and the packages stand beside each other.
 
-Run as: widths_test.py BUILD-32 BUILD-64 (two build directories of the test presets, with all that these build).
+Run as: widths_test.py BUILD-32 BUILD-64 [BUILD...] (two build directories of the test presets, with all that these
+build, and others, by clang or with sanitizers, that have the target kastarri_results).
 """
 
 import filecmp
@@ -15,6 +16,7 @@ import unittest
 HERE = os.path.dirname(os.path.abspath(__file__))
 CONSUMER = os.path.join(os.path.dirname(HERE), "package", "consumer")
 BUILDS = {"32": os.path.abspath(sys.argv[1]), "64": os.path.abspath(sys.argv[2])}
+OTHERS = list(map(os.path.abspath, sys.argv[3:]))
 ARCHITECTURES = {"32": "i386", "64": "amd64"}
 TARGETS = ["avx512", "avx2", "sse2"]
 
@@ -37,30 +39,30 @@ def width_of(program):
 
 
 class SameBits(unittest.TestCase):
-    def results(self, bits, target):
-        """Name -> number, or None where the processor does not run the target."""
-        build = BUILDS[bits]
-        result = run(os.path.join(build, "tests", "kastarri_results"),
-                     env=dict(os.environ, LD_LIBRARY_PATH=os.path.join(build, "tests", "only", target)))
-        first, *lines = result.stdout.splitlines()
+    def results(self, build, library=None, header=""):
+        """Name -> number, with the build's own library or another; None where the processor does not run its target."""
+        environment = dict(os.environ, LD_LIBRARY_PATH=library) if library else None
+        result = run(os.path.join(build, "tests", "kastarri_results"), env=environment)
         if result.returncode == 77:
             return None
-        self.assertEqual((result.returncode, first), (0, f"{target} {bits}"))
+        self.assertEqual(result.returncode, 0, result.stdout[-2000:])
+        first, *lines = result.stdout.splitlines()
+        self.assertIn(header, first)
         return dict(line.split() for line in lines)
 
-    def test_every_intrinsic_gives_the_same_at_both_widths_on_every_target(self):
+    def test_every_intrinsic_gives_the_same_at_both_widths_on_every_target_and_in_every_build(self):
         first = None
-        for target in TARGETS:
-            for bits in BUILDS:
-                results = self.results(bits, target)
-                if results is None:
-                    print(f"this processor does not run {target}", file=sys.stderr)
-                    continue
-                first = first or results
-                different = [name for name in first if first[name] != results.get(name)]
-                with self.subTest(target=target, bits=bits):
-                    self.assertEqual(different, [])
-                    self.assertEqual(set(results), set(first))
+        runs = [(build, os.path.join(build, "tests", "only", target), f"{target} {bits}")
+                for target in TARGETS for bits, build in BUILDS.items()] + [(build,) for build in OTHERS]
+        for build in runs:
+            results = self.results(*build)
+            if results is None:
+                print(f"this processor does not run {build[-1]}", file=sys.stderr)
+                continue
+            first = first or results
+            with self.subTest(build=build):
+                self.assertEqual([name for name in first if first[name] != results.get(name)], [])
+                self.assertEqual(set(results), set(first))
         self.assertGreater(len(first), 2500)
         self.assertGreater(len(set(first.values())), 2000, "most intrinsics are not the same as another")
 

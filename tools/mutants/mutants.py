@@ -141,7 +141,7 @@ def tests_of(builder, objects):
         for name in os.listdir(os.path.join(ROOT, "tests", directory)):
             if name.endswith(".cpp"):
                 with open(os.path.join(ROOT, "tests", directory, name), encoding="utf-8") as file:
-                    suites.update(re.findall(r'(?:\bTEST\(|KASTARRI_TEST_SUITE ")(\w+)', file.read()))
+                    suites.update(re.findall(r'(?:\bTEST\(|\badd_test\("|KASTARRI_TEST_SUITE ")(\w+)', file.read()))
     return ":".join(f"{suite}.*" for suite in sorted(suites)) or "*"
 
 

@@ -62,7 +62,7 @@ def run(build, target, pattern, repetitions, seconds):
 
 def read_limits():
     """The processor that they are for, and [(pattern, {target: cycles})], of which the first that matches counts."""
-    limits = []
+    named, limits = None, []
     with open(os.path.join(ROOT, "bench", "limits.txt"), encoding="utf-8") as file:
         for line in file:
             if line.startswith("processor:"):

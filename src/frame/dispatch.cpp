@@ -20,7 +20,7 @@ constexpr bool contains(std::string_view text, std::string_view part) { return t
 
 // Rows that compute so much for what they load that 512 bits are the better choice on every processor that has them:
 // floats, packs, complex products, sums of four products.
-constexpr bool computes_much(std::string_view table, std::string_view symbol) {
+[[maybe_unused]] constexpr bool computes_much(std::string_view table, std::string_view symbol) {
   return contains(table, "src/float/") || contains(table, "src/multiply/pack.def") ||
          contains(table, "src/multiply/complex.def") || (contains(symbol, "_MUL") && contains(symbol, "Q"));
 }

@@ -53,7 +53,7 @@ struct Factors {
   std::size_t beyond[8];
 
   template <class A>
-  [[gnu::no_sanitize("undefined")]] const A& reference(std::size_t which) const {
+  __attribute__((no_sanitize("undefined"))) const A& reference(std::size_t which) const {
     return *reinterpret_cast<const A*>(operand[which] + beyond[which]);
   }
 

@@ -7,6 +7,7 @@
 #include "frame/arithmetic.h"
 #include "frame/entry.h"
 #include "frame/lanes.h"
+#include "frame/registers.h"
 #include "frame/spill.h"
 
 namespace {
@@ -58,6 +59,23 @@ template <class From, class To>
 constexpr bool are_different_numbers =
     !std::is_same_v<typename From::number, typename To::number> && From::bits != 1 && To::bits != 1;
 
+// Lanes extended to twice their bits. Where they make one register of 64 bytes it is stored at once: a loop over lanes
+// would store two halves, and a load of the whole is not forwarded from those.
+template <class From, class To>
+inline void extend_lanes(const void* from, void* to) {
+  using Narrow = typename From::container;
+  using Wide = typename To::container;
+  if constexpr (2 * sizeof(Narrow) == sizeof(Wide) && To::count * sizeof(Wide) == register_bytes &&
+                register_bytes == 64 && From::bits == 8 * sizeof(Narrow)) {
+    typedef Narrow NarrowLanes __attribute__((vector_size(register_bytes / 2)));
+    NarrowLanes narrow;
+    std::memcpy(&narrow, from, sizeof narrow);
+    store_register(to, 0, __builtin_convertvector(narrow, Vector<Wide>));
+  } else {
+    lanes<To::count>(Write<To>(to), same_value, Read<From>(from));
+  }
+}
+
 template <class From, class To, class Rule>
 inline void convert_lanes(const Read<From>& from, const Write<To>& to, Rule rule) {
   static_assert(std::is_same_v<typename From::number, typename To::number> || From::bits == 1 || To::bits == 1,
@@ -89,6 +107,8 @@ inline void convert(const FromUnit* from, ToUnit* to) {
     convert_numbers<From, To>(from, to);
   } else if constexpr (is_predicate<To> && To::count > 1) {
     replicate_bit<To>(from, to);
+  } else if constexpr (From::count == To::count) {
+    extend_lanes<From, To>(from, to);
   } else {
     convert_lanes(Read<From>(from), Write<To>(to), same_value);
   }

@@ -1,4 +1,5 @@
 // Loads that widen lanes and stores that narrow them.
+#include "frame/convert.h"
 #include "frame/registers.h"
 #include "memory/kernels.h"
 
@@ -32,6 +33,16 @@ inline void store_saturated(const void* vector, void* to) {
 }  // namespace
 
 #include "memory/stamp.h"
+
+// Lanes of layout A extended to those of R; under a predicate one by one.
+#define KERNEL_extend(OP, R, A)                                     \
+  template <class Units, class Out>                                 \
+  static inline void KASTARRI_SEMANTIC(OP)(const Units* a, Out r) { \
+    if constexpr (std::is_pointer_v<Out>)                           \
+      extend_lanes<A, R>(a, r);                                     \
+    else                                                            \
+      lanes<R::count>(result<R>(r), SAME, Read<A>(a));              \
+  }
 
 // Lanes of a vector saturated to lanes L of half their width.
 #define KERNEL_saturated(OP, L, V)                                       \

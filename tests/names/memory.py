@@ -91,7 +91,7 @@ def whole_kernels(load, predicated, lanes):
     elif lanes.halves:
         memory, register = lanes.bits(layout.lanes, 2), lanes.bits(layout.lanes)
         if load:
-            yield "a", register, "SAME", memory
+            yield "extend", register, memory
         elif not lanes.unsigned:
             yield ("saturated_where" if predicated else "saturated"), memory, register
         else:

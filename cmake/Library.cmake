@@ -3,11 +3,9 @@
 set(KASTARRI_FLAGS_sse2 -msse2)
 set(KASTARRI_FLAGS_avx2 -mavx2 -mfma -mf16c)
 set(KASTARRI_FLAGS_avx512 -mavx512f -mavx512bw -mavx512dq -mavx512vl -mfma -mf16c -mprefer-vector-width=512)
-# A register is stored in pieces as wide as those in which the next intrinsic loads it: narrower ones would not forward
-# from the store to the load. Other compilers than g++ 12 and later cannot be told.
-include(CheckCXXCompilerFlag)
-check_cxx_compiler_flag("-mmove-max=256 -mstore-max=256" KASTARRI_COMPILER_MOVES_AS_TOLD)
-if(KASTARRI_COMPILER_MOVES_AS_TOLD)
+if(CMAKE_CXX_COMPILER_ID STREQUAL GNU)
+  # A register is stored in pieces as wide as those in which the next intrinsic loads it: narrower ones
+  # would not forward from the store to the load.
   list(APPEND KASTARRI_FLAGS_avx2 -mmove-max=256 -mstore-max=256)
   list(APPEND KASTARRI_FLAGS_avx512 -mmove-max=512 -mstore-max=512)
 endif()

@@ -38,7 +38,7 @@ endfunction()
 set(KASTARRI_DOCUMENTS ${CMAKE_INSTALL_DATAROOTDIR}/doc/kastarri)
 kastarri_install(DIRECTORY ${PROJECT_SOURCE_DIR}/include/ DESTINATION ${CMAKE_INSTALL_INCLUDEDIR})
 kastarri_install(DIRECTORY ${PROJECT_SOURCE_DIR}/docs ${PROJECT_SOURCE_DIR}/examples DESTINATION ${KASTARRI_DOCUMENTS})
-kastarri_install(FILES ${PROJECT_SOURCE_DIR}/README.md DESTINATION ${KASTARRI_DOCUMENTS})
+kastarri_install(FILES ${PROJECT_SOURCE_DIR}/README.md ${PROJECT_SOURCE_DIR}/CHANGELOG.md DESTINATION ${KASTARRI_DOCUMENTS})
 
 # kastarri_install_library(<target> <component of find_package> <file of pkg-config> <library> [<flag> ...])
 function(kastarri_install_library target component module library)

@@ -122,7 +122,9 @@ class Callers(ProfileTest):
         self.assertEqual(self.callers(CALLS, "signal", str(int(signal.SIGKILL)), status=-signal.SIGKILL)[ADD], 5)
 
     def test_callers_in_plugins_are_named(self):
-        self.assertEqual(self.callers("--anyway", HOST, PLUGIN), {("RK_MAX", "plugin"): 1, ("RK_MIN", "plugin"): 1})
+        callers = self.callers("--anyway", HOST, PLUGIN)
+        self.assertEqual(callers.pop(("RK_MAX", "plugin")), 1)
+        self.assertEqual(list(callers.values()), [1], "its last call, which may be a jump, so that main has called")
 
     def test_results_are_those_of_the_program(self):
         for program in BUILDS:

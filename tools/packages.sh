@@ -9,7 +9,7 @@ set -euo pipefail
 
 # By Debian's names.
 declare -A packages=(
-  [build]="g++-multilib cmake ninja-build python3"
+  [build]="make g++-multilib cmake ninja-build python3"
   [install]="help2man"
   [release]="git clang gdb pkg-config"
   [demo]="librsvg2-bin"

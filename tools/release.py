@@ -109,8 +109,8 @@ def main():
     copy_tables(release, name)
     write_checksums(release)
     for directory in built:
-        run(sys.executable, os.path.join(tree, "tests", "package", "package_test.py"), directory, release,
-            "Archive", "DebianPackages", "Subproject")
+        for test, *classes in ("package_test.py", "Archive", "DebianPackages"), ("sources_test.py", "Subproject"):
+            run(sys.executable, os.path.join(tree, "tests", "package", test), directory, release, *classes)
     run("sha256sum", "--check", "--quiet", "SHA256SUMS", cwd=release)
     print(f"\n{release}:", *sorted(os.listdir(release)), sep="\n  ")
 

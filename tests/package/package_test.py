@@ -1,7 +1,7 @@
 """What is installed and packaged: that other projects find it, build against it, and that all versions agree.
 
 Run as: package_test.py BUILD [RELEASE] [TEST...] (a build directory whose libraries are built; archives and packages are
-made from it, or are those of the directory RELEASE, where what is built within another project is built to the end).
+made from it, or are those of the directory RELEASE).
 """
 
 import glob
@@ -9,40 +9,11 @@ import itertools
 import os
 import re
 import shutil
-import subprocess
 import sys
-import tarfile
-import tempfile
 import unittest
 
-HERE = os.path.dirname(os.path.abspath(__file__))
-ROOT = os.path.dirname(os.path.dirname(HERE))
-BUILD = os.path.abspath(sys.argv.pop(1))
-RELEASE = os.path.abspath(sys.argv.pop(1)) if os.path.isdir("".join(sys.argv[1:2])) else None
+from support import BITS, BUILD, CLANG, COMPILER, HERE, OTHER, RELEASE, ROOT, STATIC_TARGET, VERSION, Directory, cached, output, run
 
-
-def run(*command, **options):
-    return subprocess.run(command, stdout=subprocess.PIPE, stderr=subprocess.STDOUT, text=True, check=False, **options)
-
-
-def output(*command, **options):
-    result = run(*command, **options)
-    if result.returncode != 0:
-        raise AssertionError(" ".join(command) + "\n" + result.stdout)
-    return result.stdout
-
-
-def cached(name):
-    with open(os.path.join(BUILD, "CMakeCache.txt"), encoding="utf-8") as cache:
-        return re.search(rf"^{name}:\w+=(.*)$", cache.read(), re.M)[1]
-
-
-VERSION = cached("CMAKE_PROJECT_VERSION")
-COMPILER = cached("CMAKE_CXX_COMPILER")  # what it built others link, but for the static library of clang
-CLANG = "clang" in os.path.basename(COMPILER)
-STATIC_TARGET = cached("KASTARRI_STATIC_TARGET")
-BITS = cached("KASTARRI_BITS")
-OTHER = {"32": "64", "64": "32"}[BITS]
 ARCHITECTURE = {"32": "i386", "64": "amd64"}[BITS]
 MULTIARCH = {"32": "lib/i386-linux-gnu", "64": "lib/x86_64-linux-gnu"}[BITS]  # where the test presets install libraries
 # Where the files of CMake and pkg-config are found: those of 32 bits whatever a project says.
@@ -55,21 +26,6 @@ def processor_runs_static():
         flags = set(re.search(r"^flags\s*:(.*)$", file.read(), re.M)[1].split())
     return {"sse2": {"sse2"}, "avx2": {"avx2", "fma", "f16c"},
             "avx512": {"avx512f", "avx512bw", "avx512dq", "avx512vl"}}[STATIC_TARGET] <= flags
-
-
-class Directory(unittest.TestCase):
-    """Tests with a temporary directory for the class, and one in it for each test."""
-
-    @classmethod
-    def setUpClass(cls):
-        cls.shared = tempfile.mkdtemp()
-        cls.addClassCleanup(shutil.rmtree, cls.shared)
-
-    def setUp(self):
-        self.directory = tempfile.mkdtemp(dir=self.shared)
-
-    def path(self, *parts):
-        return os.path.join(self.directory, *parts)
 
 
 def cpack(generator, directory):
@@ -177,6 +133,12 @@ class Installation(Installed):
                 options = re.findall(r"^  (--\w+)", output(program, "--help"), re.M)
                 self.assertIn("--version", options)
                 self.assertEqual([option for option in options if option not in page], [])
+
+    def test_documents_know_the_version(self):
+        with open(os.path.join(ROOT, "CHANGELOG.md"), encoding="utf-8") as file:
+            self.assertEqual(re.findall(r"^## \[(\d.*?)\] - \d{4}-\d\d-\d\d$", file.read(), re.M)[0], VERSION)
+        with open(os.path.join(ROOT, "docs", "installing.md"), encoding="utf-8") as file:
+            self.assertIn(f"find_package(kastarri {VERSION.rpartition('.')[0]} CONFIG", file.read())
 
     def test_the_links_between_documents_hold(self):
         """Where the document that is named is not one of the sources, which are not installed."""
@@ -379,75 +341,6 @@ class DebianPackages(Installed):
         scripts = self.path("scripts")
         return ["gdb", "-nx", "-q", "-batch", "-ex", "set debuginfod enabled off",
                 "-iex", f"set auto-load scripts-directory {scripts}", "-iex", f"set auto-load safe-path {scripts}"]
-
-
-class Subproject(Directory):
-    """Within another project there is the library and nothing else."""
-
-    def configure(self, how, *arguments):
-        with open(self.path("CMakeLists.txt"), "w", encoding="utf-8") as file:
-            file.write(f"""cmake_minimum_required(VERSION 3.22)
-                project(whole LANGUAGES CXX)
-                {how}
-                add_executable(whole {HERE}/consumer/main.cpp)
-                target_link_libraries(whole PRIVATE kastarri::kastarri)""")
-        shutil.rmtree(self.path("build"), ignore_errors=True)
-        output("cmake", "-G", "Ninja", "-S", self.directory, "-B", self.path("build"), *arguments)
-        return set(re.findall(r"^(?:.*/)?([\w.-]+): \w+$", output("ninja", "-C", self.path("build"), "-t", "targets", "all"), re.M))
-
-    def rules(self):
-        """All rules of installing."""
-        text = ""
-        for path in glob.glob(self.path("build", "**", "cmake_install.cmake"), recursive=True):
-            with open(path, encoding="utf-8") as file:
-                text += file.read()
-        return "".join(re.findall(r"file\(INSTALL DESTINATION.*", text))
-
-    def test_the_library_alone_is_built(self):
-        added = f'add_subdirectory("{ROOT}" kastarri)'
-        fetched = f'include(FetchContent)\nFetchContent_Declare(kastarri SOURCE_DIR "{ROOT}")\nFetchContent_MakeAvailable(kastarri)'
-        for how, *arguments in ([added], [fetched, "-DCMAKE_CXX_FLAGS=-m32"], [added, f"-DKASTARRI_BITS={BITS}", "-DKASTARRI_INSTALL=ON"]):
-            with self.subTest(how=how, arguments=arguments):
-                targets = self.configure(how, *arguments)
-                self.assertIn("libkastarri.so", targets)
-                self.assertEqual({"kastarri_tests", "fir", "kastarri-port", "kastarri-profile", "kastarri_examples", "test"} & targets, set())
-                self.assertEqual("libkastarri.so" in self.rules(), "-DKASTARRI_INSTALL=ON" in arguments)
-                self.assertNotIn("kastarri-profile", self.rules())
-                # What uses it is of one width with it, which is that of the project if nothing is said.
-                main = glob.glob(os.path.join(HERE, "consumer", "main.cpp"))[0]
-                output("ninja", "-C", self.path("build"), f"{main}^")
-                width = BITS if len(arguments) > 1 else "32" if arguments else "64"
-                objects = glob.glob(self.path("build", "CMakeFiles", "whole.dir", "**", "*.o"), recursive=True)
-                self.assertRegex(output("readelf", "-h", *objects), f"ELF{width}")
-
-    @unittest.skipIf(not RELEASE, "it takes minutes to build")
-    def test_it_is_built(self):
-        self.configure(f'add_subdirectory("{ROOT}" kastarri)', f"-DKASTARRI_BITS={BITS}", "-DKASTARRI_TARGETS=sse2")
-        output("ninja", "-C", self.path("build"))
-        self.assertEqual(output(self.path("build", "whole")).split(), [VERSION, VERSION, "sse2", "255"])
-
-
-class Sources(Directory):
-    def archive(self, tree):
-        path = output(sys.executable, os.path.join(tree, "tools", "release.py"), "--sources", "--output", self.path("made")).split("\n")[-2]
-        self.assertEqual(os.path.basename(path), f"kastarri-{VERSION}.tar.gz")
-        return path
-
-    def names(self, path):
-        with tarfile.open(path) as archive:
-            return {member.name for member in archive if not member.isdir()}
-
-    def test_the_archive_is_a_tree_that_builds_without_git(self):
-        first = self.archive(ROOT)
-        names = self.names(first)
-        shutil.unpack_archive(first, self.directory)
-        tree = self.path(f"kastarri-{VERSION}")
-        self.assertEqual(self.names(self.archive(tree)), names)
-        output("cmake", "--preset", f"install{'' if BITS == '32' else '-64'}", cwd=tree)
-        # What is made of all tables, and a source of each kind; the whole is built for a release.
-        build = glob.glob(os.path.join(tree, "build", "*"))[0]
-        output("ninja", "-C", build, "kastarri-port", "kastarri-port-man" if shutil.which("help2man") else "kastarri-port",
-               *(os.path.join(tree, "src", source) + "^" for source in ("frame/library.cpp", "integer/logic.cpp")))
 
 
 if __name__ == "__main__":

@@ -1,6 +1,6 @@
-// Call sites, counted: which intrinsic, from which address. Each process has one table for all of its threads, a block of
-// a file: chains of sites by a hash of both. Sites are added under a lock and never change place, so that a site that is
-// there is found and counted without one.
+// Call sites, counted: which intrinsic, from which address. Each process has one table for all of its threads, a block
+// of a file: chains of sites by a hash of both. Sites are added under a lock and never change place, so that a site
+// that is there is found and counted without one.
 #include "callers.h"
 
 #include <dlfcn.h>
@@ -32,8 +32,8 @@ struct Site {
 };
 
 struct Table {
-  std::uint32_t sites, modules;                // module 0 is not known, site 0 ends the chains
-  std::uint32_t left_out, left_out_high;       // calls for whose site there was no room
+  std::uint32_t sites, modules;           // module 0 is not known, site 0 ends the chains
+  std::uint32_t left_out, left_out_high;  // calls for whose site there was no room
   Module module[max_modules];
   Site site[max_sites];
   std::uint32_t chain[chains];

@@ -1,6 +1,6 @@
-// The files into which a profiled program counts. The profiler made them and reads them afterwards, so that counts outlive
-// the process however it ends. Each is a page with its header, then block after block; forked and executed processes
-// add to it.
+// The files into which a profiled program counts. The profiler made them and reads them afterwards, so that counts
+// outlive the process however it ends. Each is a page with its header, then block after block; forked and executed
+// processes add to it.
 #ifndef KASTARRI_PROFILE_FILES_H
 #define KASTARRI_PROFILE_FILES_H
 

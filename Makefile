@@ -6,12 +6,16 @@
 #   make try           build for one target; test and time one intrinsic (NAME=ADDSNX16)
 #   make mutants       plant faults in all rows and in some rules, and list those that no test finds (MUTANTS=40, SEED=1,
 #                      ONLY= a regular expression of tables and sources)
-#   make bench         time every intrinsic and write docs/performance.md, a summary, and build/performance.md
+#   make bench         time every intrinsic and write docs/performance.md, a summary, build/performance.md and
+#                      bench/costs.csv, which kastarri-profile reads
 #   make bench-kernels time whole kernels: scalar C, loops that compilers vectorise, calls, inlined
 #   make docs          write build/docs/reference.html, all intrinsics on one page
 #   make picture       take docs/pictures/reference.png of that page
 #   make install       install libraries and headers (PREFIX=/usr/local, DESTDIR=, LIBDIR=lib or lib/x86_64-linux-gnu)
+#   make uninstall     remove what `make install` installed last (DESTDIR=)
 #   make package       make Debian packages in build/packages
+#   make release       make all that a release consists of, in build/release: sources, archives and Debian packages of
+#                      both widths, the reference page, the performance tables, checksums; install and try each
 #   make headers       write the public headers, gdb's table of types, docs/coverage.md, docs/shapes.md and the README's
 #                      counts from the tables
 #   make format        format the sources
@@ -29,16 +33,18 @@ WIDTH =
 MULTIARCH = i386-linux-gnu
 LIBDIR ?= lib
 SUMMARY = docs/performance.md
+COSTS = bench/costs.csv
 else ifeq ($(BITS),64)
 WIDTH = -64
 MULTIARCH = x86_64-linux-gnu
 LIBDIR ?= lib/$(MULTIARCH)
 SUMMARY = docs/performance-64.md
+COSTS = build/costs-64.csv
 else
 $(error BITS is $(BITS); known are 32 and 64)
 endif
 
-.PHONY: help demo test try mutants bench bench-kernels docs picture install package headers format clean
+.PHONY: help demo test try mutants bench bench-kernels docs picture install uninstall package release headers format clean
 
 help:
 	@sed -n 's/^#   //p' Makefile
@@ -71,7 +77,7 @@ bench:
 	$(CMAKE_BUILD) test$(WIDTH) --target all kernel_modules
 	cmake --preset clang$(WIDTH) -DKASTARRI_BUILD_BENCH=ON
 	$(CMAKE_BUILD) clang$(WIDTH) --target kernel_modules
-	tools/performance.py build/test$(WIDTH) --clang build/clang$(WIDTH) --summary $(SUMMARY) --table build/performance$(WIDTH).md
+	tools/performance.py build/test$(WIDTH) --clang build/clang$(WIDTH) --summary $(SUMMARY) --table build/performance$(WIDTH).md --costs $(COSTS)
 
 bench-kernels:
 	tools/packages.sh build test$(WIDTH)
@@ -89,16 +95,24 @@ picture: docs
 	tools/reference/picture.py build/docs$(WIDTH)/reference.html docs/pictures/reference.png
 
 install:
-	tools/packages.sh build
+	tools/packages.sh build install
 	cmake --preset install$(WIDTH) -DCMAKE_INSTALL_LIBDIR=$(LIBDIR)
 	$(CMAKE_BUILD) install$(WIDTH)
 	DESTDIR=$(DESTDIR) cmake --install build/install$(WIDTH) --prefix $(PREFIX)
 
 package:
-	tools/packages.sh build
+	tools/packages.sh build install
 	cmake --preset install$(WIDTH) -DCMAKE_INSTALL_LIBDIR=lib/$(MULTIARCH)
 	$(CMAKE_BUILD) install$(WIDTH)
 	cpack --config build/install$(WIDTH)/CPackConfig.cmake -B build/packages
+
+uninstall:
+	DESTDIR=$(DESTDIR) cmake -DBUILD=build/install$(WIDTH) "-DOTHERS=$(filter-out build/install$(WIDTH),build/install build/install-64)" \
+	  -P cmake/uninstall.cmake
+
+release:
+	tools/packages.sh build install release
+	tools/release.py
 
 headers:
 	tools/packages.sh build

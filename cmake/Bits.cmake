@@ -1,5 +1,10 @@
 # The width of the programs that the library is for, and all in the build that depends on it.
-set(KASTARRI_BITS 32 CACHE STRING "Width of the programs that the library is for: 32 (i386) or 64 (x86-64)")
+# Within another project it is that of the project's programs, if nothing is said.
+set(bits 32)
+if(NOT PROJECT_IS_TOP_LEVEL AND CMAKE_CXX_SIZEOF_DATA_PTR EQUAL 8)
+  set(bits 64)
+endif()
+set(KASTARRI_BITS ${bits} CACHE STRING "Width of the programs that the library is for: 32 (i386) or 64 (x86-64)")
 set_property(CACHE KASTARRI_BITS PROPERTY STRINGS 32 64)
 
 if(KASTARRI_BITS EQUAL 32)

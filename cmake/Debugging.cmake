@@ -8,5 +8,7 @@ foreach(module IN LISTS modules)
   configure_file(${PROJECT_SOURCE_DIR}/src/debug/gdb/${module} ${CMAKE_CURRENT_BINARY_DIR}/kastarri/gdb/${module} COPYONLY)
 endforeach()
 
-install(FILES ${CMAKE_CURRENT_BINARY_DIR}/${script} DESTINATION ${CMAKE_INSTALL_LIBDIR})
-install(DIRECTORY ${CMAKE_CURRENT_BINARY_DIR}/kastarri/gdb DESTINATION ${CMAKE_INSTALL_LIBDIR}/kastarri FILES_MATCHING PATTERN "*.py")
+# Where the script goes depends on the prefix, which is known when it is installed.
+configure_file(${PROJECT_SOURCE_DIR}/cmake/install_printers.cmake.in install_printers.cmake @ONLY)
+kastarri_install(SCRIPT ${CMAKE_CURRENT_BINARY_DIR}/install_printers.cmake)
+kastarri_install(DIRECTORY ${CMAKE_CURRENT_BINARY_DIR}/kastarri/gdb DESTINATION ${CMAKE_INSTALL_LIBDIR}/kastarri FILES_MATCHING PATTERN "*.py")

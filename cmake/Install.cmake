@@ -1,11 +1,15 @@
-# What is installed, and how other projects find it: a CMake package and pkg-config files.
+# What is installed, and how other projects find it: a CMake package and pkg-config files. Every rule goes through
+# kastarri_install, which is install() where this project is to be installed.
 #
 # Two components: `runtime` is the library that programs load; all the rest is `devel`, which is also
 # the component of every rule that names none.
 set(CMAKE_INSTALL_DEFAULT_COMPONENT_NAME devel)
 
-# Debian's multiarch directory would be that of the compiler's default, 64 bits.
-set(CMAKE_INSTALL_LIBDIR ${KASTARRI_DEFAULT_LIBDIR} CACHE STRING "Where libraries go, below the prefix")
+# Debian's multiarch directory would be that of the compiler's default, 64 bits. Within another project it is the project
+# that says where libraries go.
+if(PROJECT_IS_TOP_LEVEL)
+  set(CMAKE_INSTALL_LIBDIR ${KASTARRI_DEFAULT_LIBDIR} CACHE STRING "Where libraries go, below the prefix")
+endif()
 include(GNUInstallDirs)
 foreach(directory IN ITEMS CMAKE_INSTALL_LIBDIR CMAKE_INSTALL_INCLUDEDIR)
   if(IS_ABSOLUTE "${${directory}}")
@@ -24,28 +28,38 @@ if(KASTARRI_BITS EQUAL 32)
   list(REMOVE_DUPLICATES KASTARRI_PKGCONFIG_DIRS)
 endif()
 
-install(DIRECTORY ${PROJECT_SOURCE_DIR}/include/ DESTINATION ${CMAKE_INSTALL_INCLUDEDIR})
+function(kastarri_install)
+  if(KASTARRI_INSTALL)
+    install(${ARGV})
+  endif()
+endfunction()
 
-# kastarri_install(<target> <component of find_package> <file of pkg-config> <library> [<flag> ...])
-function(kastarri_install target component module library)
-  install(TARGETS ${target} EXPORT kastarri-${component}
+# Headers, and the documents in the places from which they name each other.
+set(KASTARRI_DOCUMENTS ${CMAKE_INSTALL_DATAROOTDIR}/doc/kastarri)
+kastarri_install(DIRECTORY ${PROJECT_SOURCE_DIR}/include/ DESTINATION ${CMAKE_INSTALL_INCLUDEDIR})
+kastarri_install(DIRECTORY ${PROJECT_SOURCE_DIR}/docs ${PROJECT_SOURCE_DIR}/examples DESTINATION ${KASTARRI_DOCUMENTS})
+kastarri_install(FILES ${PROJECT_SOURCE_DIR}/README.md ${PROJECT_SOURCE_DIR}/CHANGELOG.md DESTINATION ${KASTARRI_DOCUMENTS})
+
+# kastarri_install_library(<target> <component of find_package> <file of pkg-config> <library> [<flag> ...])
+function(kastarri_install_library target component module library)
+  kastarri_install(TARGETS ${target} EXPORT kastarri-${component}
     ARCHIVE DESTINATION ${CMAKE_INSTALL_LIBDIR}
     LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR} COMPONENT runtime NAMELINK_COMPONENT devel
     INCLUDES DESTINATION ${CMAKE_INSTALL_INCLUDEDIR})
-  install(EXPORT kastarri-${component} NAMESPACE kastarri:: DESTINATION ${KASTARRI_CMAKE_DIR})
+  kastarri_install(EXPORT kastarri-${component} NAMESPACE kastarri:: DESTINATION ${KASTARRI_CMAKE_DIR})
   list(JOIN ARGN " " flags)
   get_target_property(link_flags ${target} INTERFACE_LINK_OPTIONS)
   list(JOIN link_flags " " link_flags)
   foreach(directory IN LISTS KASTARRI_PKGCONFIG_DIRS)
     file(RELATIVE_PATH to_prefix /prefix/${directory} /prefix)
     configure_file(${PROJECT_SOURCE_DIR}/cmake/kastarri.pc.in ${directory}/${module}.pc @ONLY)
-    install(FILES ${CMAKE_CURRENT_BINARY_DIR}/${directory}/${module}.pc DESTINATION ${directory})
+    kastarri_install(FILES ${CMAKE_CURRENT_BINARY_DIR}/${directory}/${module}.pc DESTINATION ${directory})
   endforeach()
 endfunction()
 
-kastarri_install(kastarri shared kastarri kastarri ${KASTARRI_USER_FLAGS})
+kastarri_install_library(kastarri shared kastarri kastarri ${KASTARRI_USER_FLAGS})
 if(KASTARRI_BUILD_STATIC)
-  kastarri_install(kastarri_static static kastarri-static kastarri_static ${KASTARRI_STATIC_FLAGS})
+  kastarri_install_library(kastarri_static static kastarri-static kastarri_static ${KASTARRI_STATIC_FLAGS})
 endif()
 
 # By the rules of semantic versioning, before 1.0.0 a new minor version may break what was.
@@ -57,8 +71,8 @@ endif()
 include(CMakePackageConfigHelpers)
 # Independent of the architecture as far as CMake knows it: a width that the library is not for is its own matter.
 write_basic_package_version_file(kastarri-version.cmake COMPATIBILITY ${compatibility} ARCH_INDEPENDENT)
-install(FILES ${CMAKE_CURRENT_BINARY_DIR}/kastarri-version.cmake DESTINATION ${KASTARRI_CMAKE_DIR})
+kastarri_install(FILES ${CMAKE_CURRENT_BINARY_DIR}/kastarri-version.cmake DESTINATION ${KASTARRI_CMAKE_DIR})
 foreach(file IN ITEMS kastarri-config.cmake kastarri-config-version.cmake)
   configure_file(${PROJECT_SOURCE_DIR}/cmake/${file}.in ${file} @ONLY)
-  install(FILES ${CMAKE_CURRENT_BINARY_DIR}/${file} DESTINATION ${KASTARRI_CMAKE_DIR})
+  kastarri_install(FILES ${CMAKE_CURRENT_BINARY_DIR}/${file} DESTINATION ${KASTARRI_CMAKE_DIR})
 endforeach()

@@ -1,4 +1,4 @@
-# Debian packages, as Debian divides libraries: libkastarri<major> with what programs load, which other major
+# Archives that can be unpacked anywhere (cpack -G TGZ), and Debian packages, as Debian divides libraries: libkastarri<major> with what programs load, which other major
 # versions can stand beside, and libkastarri-dev with all that programs are made with.
 set(KASTARRI_MAINTAINER "The kastarri authors <maintainers@kastarri.invalid>" CACHE STRING "Maintainer of the packages")
 
@@ -9,8 +9,8 @@ execute_process(COMMAND ${KASTARRI_GZIP} -9nc ${PROJECT_SOURCE_DIR}/CHANGELOG.md
   OUTPUT_FILE ${CMAKE_CURRENT_BINARY_DIR}/changelog.gz COMMAND_ERROR_IS_FATAL ANY)
 foreach(component IN ITEMS runtime devel)
   set(documents ${CMAKE_INSTALL_DATAROOTDIR}/doc/${${component}_package})
-  install(FILES ${PROJECT_SOURCE_DIR}/LICENSE RENAME copyright DESTINATION ${documents} COMPONENT ${component})
-  install(FILES ${CMAKE_CURRENT_BINARY_DIR}/changelog.gz DESTINATION ${documents} COMPONENT ${component})
+  kastarri_install(FILES ${PROJECT_SOURCE_DIR}/LICENSE RENAME copyright DESTINATION ${documents} COMPONENT ${component})
+  kastarri_install(FILES ${CMAKE_CURRENT_BINARY_DIR}/changelog.gz DESTINATION ${documents} COMPONENT ${component})
 endforeach()
 
 # The loader's cache is renewed, and other packages learn what to depend on.
@@ -19,6 +19,7 @@ file(CONFIGURE OUTPUT package/shlibs CONTENT
   "libkastarri ${PROJECT_VERSION_MAJOR} ${runtime_package} (>= ${PROJECT_VERSION})\n")
 
 set(CPACK_GENERATOR DEB)
+set(CPACK_PACKAGE_FILE_NAME kastarri-${PROJECT_VERSION}-linux-${KASTARRI_DEBIAN_ARCHITECTURE})
 set(CPACK_PACKAGE_CONTACT ${KASTARRI_MAINTAINER})
 set(CPACK_COMPONENTS_ALL runtime devel)
 set(CPACK_DEB_COMPONENT_INSTALL ON)

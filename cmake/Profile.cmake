@@ -1,18 +1,15 @@
-# kastarri-profile: the counting library, the list of intrinsics beside it, and the program, which finds both by
-# their place relative to its own. The build tree is laid out as the installed one, where the program is the same
-# for both widths and finds the files of each.
-find_package(Python3 REQUIRED COMPONENTS Interpreter)
+# kastarri-profile: the counting library, the list of intrinsics beside it, what calls cost, and the program, which finds
+# them by their place relative to its own. It is the same for both widths and finds the files of each.
 enable_language(ASM)
 
 set(KASTARRI_PROFILE_DIR lib/kastarri/profile)
 file(RELATIVE_PATH KASTARRI_PROFILE_FILES ${CMAKE_INSTALL_FULL_BINDIR} ${CMAKE_INSTALL_PREFIX}/${KASTARRI_PROFILE_DIR})
-set(programs ${PROJECT_BINARY_DIR}/bin)
-cmake_path(ABSOLUTE_PATH KASTARRI_PROFILE_FILES BASE_DIRECTORY ${programs} NORMALIZE OUTPUT_VARIABLE files)
+cmake_path(ABSOLUTE_PATH KASTARRI_PROFILE_FILES BASE_DIRECTORY ${KASTARRI_BUILT_PROGRAMS} NORMALIZE OUTPUT_VARIABLE files)
 string(APPEND files /${KASTARRI_BITS})
 string(APPEND KASTARRI_PROFILE_DIR /${KASTARRI_BITS})
 file(MAKE_DIRECTORY ${files})
-configure_file(${PROJECT_SOURCE_DIR}/tools/kastarri-profile.in ${programs}/kastarri-profile @ONLY
-  FILE_PERMISSIONS OWNER_READ OWNER_WRITE OWNER_EXECUTE GROUP_READ GROUP_EXECUTE WORLD_READ WORLD_EXECUTE)
+kastarri_tool(kastarri-profile)
+configure_file(${PROJECT_SOURCE_DIR}/bench/costs.csv ${KASTARRI_BUILT_DATA}/costs.csv COPYONLY)
 
 set(tools ${PROJECT_SOURCE_DIR}/tools)
 add_custom_command(OUTPUT ${files}/intrinsics.inc ${files}/intrinsics.csv
@@ -21,7 +18,7 @@ add_custom_command(OUTPUT ${files}/intrinsics.inc ${files}/intrinsics.csv
   COMMENT "Listing the intrinsics for kastarri-profile" VERBATIM)
 
 set(source ${PROJECT_SOURCE_DIR}/src/profile)
-add_library(kastarri-profile MODULE ${source}/counters.cpp ${source}/entries.S
+add_library(kastarri-profile MODULE ${source}/counters.cpp ${source}/callers.cpp ${source}/entries.S
   ${files}/intrinsics.inc ${files}/intrinsics.csv)
 set_property(SOURCE ${source}/counters.cpp ${source}/entries.S APPEND PROPERTY OBJECT_DEPENDS ${files}/intrinsics.inc)
 set_target_properties(kastarri-profile PROPERTIES LIBRARY_OUTPUT_DIRECTORY ${files} LINKER_LANGUAGE C)
@@ -33,6 +30,6 @@ target_compile_options(kastarri-profile PRIVATE $<$<COMPILE_LANGUAGE:CXX>:
 target_link_options(kastarri-profile PRIVATE -static-libgcc -Wl,-z,text -Wl,-z,noexecstack -Wl,--no-undefined)
 target_link_libraries(kastarri-profile PRIVATE pthread ${CMAKE_DL_LIBS})
 
-install(PROGRAMS ${programs}/kastarri-profile DESTINATION ${CMAKE_INSTALL_BINDIR})
-install(TARGETS kastarri-profile LIBRARY DESTINATION ${KASTARRI_PROFILE_DIR})
-install(FILES ${files}/intrinsics.csv DESTINATION ${KASTARRI_PROFILE_DIR})
+kastarri_install(TARGETS kastarri-profile LIBRARY DESTINATION ${KASTARRI_PROFILE_DIR})
+kastarri_install(FILES ${files}/intrinsics.csv DESTINATION ${KASTARRI_PROFILE_DIR})
+kastarri_install(FILES ${PROJECT_SOURCE_DIR}/bench/costs.csv DESTINATION ${CMAKE_INSTALL_DATADIR}/kastarri)

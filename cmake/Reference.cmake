@@ -26,4 +26,4 @@ add_custom_command(OUTPUT ${KASTARRI_REFERENCE}
   COMMENT "Writing the reference of all intrinsics"
   VERBATIM)
 add_custom_target(reference ALL DEPENDS ${KASTARRI_REFERENCE})
-install(FILES ${KASTARRI_REFERENCE} DESTINATION ${CMAKE_INSTALL_DATAROOTDIR}/doc/kastarri)
+kastarri_install(FILES ${KASTARRI_REFERENCE} DESTINATION ${KASTARRI_DOCUMENTS})

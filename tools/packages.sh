@@ -1,18 +1,49 @@
 #!/usr/bin/env bash
-# Installs the Debian packages that are missing for the named purposes, as root or through sudo; where
-# neither works, prints the commands that do it and fails. On a system that is not Debian it names them and goes on.
+# Installs the packages of Debian or Ubuntu that are missing for the named purposes, as root or through sudo; where
+# neither works, prints the commands that do it and fails. For Fedora and Arch it prints the command, by their names of
+# the packages, and goes on; so it does on other systems, by Debian's names.
 #
-#   tools/packages.sh PURPOSE...     build, demo, test, test-64, picture, check
+#   tools/packages.sh PURPOSE...     build, install, release, demo, test, test-64, picture, check
+#   tools/packages.sh --for debian|ubuntu|fedora|arch PURPOSE...     only print the command for that system
 set -euo pipefail
 
+# By Debian's names.
 declare -A packages=(
-  [build]="g++-multilib cmake ninja-build python3"
+  [build]="make g++-multilib cmake ninja-build python3"
+  [install]="help2man"
+  [release]="git clang gdb pkg-config"
   [demo]="librsvg2-bin"
-  [test]="clang gdb pkg-config chromium chromium-driver libgtest-dev:i386 libbenchmark-dev:i386 libmpfr-dev:i386"
-  [test-64]="clang gdb pkg-config chromium chromium-driver libgtest-dev:amd64 libbenchmark-dev:amd64 libmpfr-dev:amd64"
+  [test]="clang gdb pkg-config help2man git chromium chromium-driver libgtest-dev:i386 libbenchmark-dev:i386 libmpfr-dev:i386"
+  [test-64]="clang gdb pkg-config help2man git chromium chromium-driver libgtest-dev:amd64 libbenchmark-dev:amd64 libmpfr-dev:amd64"
   [picture]="chromium chromium-driver"
   [check]="clang-format valgrind libc6-dbg:i386"
 )
+
+# The names of others, where they differ. Those for 32 bits are Fedora's of i686 and Arch's of multilib; what begins with
+# aur: is not among Arch's own packages.
+declare -A debian=()
+declare -A ubuntu=([chromium]="chromium-browser" [chromium-driver]="chromium-chromedriver")
+declare -A fedora=(
+  [g++-multilib]="gcc-c++ glibc-devel.i686 libstdc++-devel.i686 libgcc.i686"
+  [librsvg2-bin]="librsvg2-tools" [pkg-config]="pkgconf-pkg-config" [chromium-driver]="chromedriver"
+  [libgtest-dev:i386]="gtest-devel.i686" [libbenchmark-dev:i386]="google-benchmark-devel.i686"
+  [libmpfr-dev:i386]="mpfr-devel.i686 gmp-devel.i686" [libgtest-dev:amd64]="gtest-devel"
+  [libbenchmark-dev:amd64]="google-benchmark-devel" [libmpfr-dev:amd64]="mpfr-devel gmp-devel"
+  [clang-format]="clang-tools-extra" [libc6-dbg:i386]="glibc-debuginfo.i686"
+)
+declare -A arch=(
+  [g++-multilib]="gcc lib32-gcc-libs lib32-glibc" [ninja-build]="ninja" [python3]="python"
+  [librsvg2-bin]="librsvg" [pkg-config]="pkgconf" [chromium-driver]="chromium" [clang-format]="clang"
+  [libgtest-dev:i386]="aur:lib32-gtest" [libbenchmark-dev:i386]="aur:lib32-benchmark" [libmpfr-dev:i386]="aur:lib32-mpfr lib32-gmp"
+  [libgtest-dev:amd64]="gtest" [libbenchmark-dev:amd64]="benchmark" [libmpfr-dev:amd64]="mpfr gmp"
+  [libc6-dbg:i386]="debuginfod"
+)
+
+system=
+if [[ ${1:-} == --for ]]; then
+  system=$2
+  shift 2
+fi
 
 wanted=()
 for purpose in "$@"; do
@@ -21,8 +52,33 @@ for purpose in "$@"; do
   wanted+=("${names[@]}")
 done
 
+# The names of the wanted packages in the table that is named, each once.
+translated() {
+  local -n table=$1
+  for package in "${wanted[@]}"; do
+    tr ' ' '\n' <<<"${table[$package]:-$package}"
+  done | sort -u | paste -sd ' '
+}
+
+print_for() {
+  case $1 in
+    debian | ubuntu) echo "apt-get install $(translated "$1")" ;;
+    fedora) echo "dnf install $(translated fedora)" ;;
+    arch) echo "pacman -S --needed $(translated arch)" ;;
+    *) echo "packages.sh: unknown system '$1'; known are debian, ubuntu, fedora and arch" >&2; return 2 ;;
+  esac
+}
+
+if [[ -n $system ]]; then
+  print_for "$system"
+  exit
+fi
+system=debian
+! grep -qs '^ID=ubuntu' /etc/os-release || system=ubuntu
 if ! { command -v dpkg-query && command -v apt-get; } >/dev/null; then
-  echo "This is not a Debian system. What is needed here, by Debian's names: ${wanted[*]}" >&2
+  ! command -v dnf >/dev/null || system=fedora
+  ! command -v pacman >/dev/null || system=arch
+  echo "Packages are not installed here. What is needed, if it is missing: $(print_for "$system")" >&2
   exit 0
 fi
 
@@ -31,7 +87,7 @@ installed() {
 }
 
 missing=()
-for package in "${wanted[@]}"; do
+for package in $(translated "$system"); do
   installed "$package" || missing+=("$package")
 done
 [[ ${#missing[@]} -gt 0 ]] || exit 0

@@ -5,9 +5,9 @@
 /// What a declaration of the library carries: its symbol is exported.
 #define KASTARRI_API __attribute__((visibility("default")))
 
-/// The version of these headers, "0.1.0". The build and the packages take theirs from here.
+/// The version of these headers, "0.2.0". The build, the packages and the tools take theirs from here.
 #define KASTARRI_VERSION_MAJOR 0
-#define KASTARRI_VERSION_MINOR 1
+#define KASTARRI_VERSION_MINOR 2
 #define KASTARRI_VERSION_PATCH 0
 #define KASTARRI_VERSION KASTARRI_DOTTED(KASTARRI_VERSION_MAJOR, KASTARRI_VERSION_MINOR, KASTARRI_VERSION_PATCH)
 

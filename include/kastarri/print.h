@@ -22,9 +22,11 @@
 namespace kastarri {
 
 /// How the bits of a lane are read. Lanes that a form does not fit are shown in decimal: float takes 32 bits
-/// and half takes 16, and fixed point takes integers.
+/// and half takes 16, and fixed point takes integers. A word of coefficients (qv_int32pr, qv_int64pr) is shown by the
+/// numbers of 16 or 8 bits in it, in the forms halves and bytes, and in fixed point with 8 to 15 or 1 to 7 bits of
+/// fraction.
 struct Form {
-  enum Kind { decimal, hex, float_, half, fixed };
+  enum Kind { decimal, hex, float_, half, fixed, halves, bytes };
   Kind kind;
   int fraction_bits;
 };
@@ -34,6 +36,8 @@ constexpr Form decimal = {Form::decimal, 0};
 constexpr Form hex = {Form::hex, 0};
 constexpr Form float_ = {Form::float_, 0};
 constexpr Form half = {Form::half, 0};
+constexpr Form halves = {Form::halves, 0};
+constexpr Form bytes = {Form::bytes, 0};
 /// Fixed point with 0 to 63 bits of fraction.
 constexpr Form q(int fraction_bits) { return Form{Form::fixed, fraction_bits}; }
 }  // namespace form
@@ -48,6 +52,7 @@ struct Register {
   int size;
   char kind;
   int bits, count;
+  bool coefficients;  // a word of the scalar core
 
   const unsigned char* lane(int index) const { return bytes + size / count * index; }
   // A lane of up to 64 bits.
@@ -62,6 +67,19 @@ struct Register {
 template <class T>
 struct Lanes;
 
+// Into how many bits each a form takes a word of coefficients apart; 0 if it does not.
+inline int part_bits(Form form) {
+  if (form.kind == Form::halves) return 16;
+  if (form.kind == Form::bytes) return 8;
+  const bool fraction = form.kind == Form::fixed && form.fraction_bits >= 1 && form.fraction_bits <= 15;
+  return !fraction ? 0 : form.fraction_bits < 8 ? 8 : 16;
+}
+
+inline Register in_parts(Register r, Form form) {
+  const int bits = r.coefficients ? part_bits(form) : 0;
+  return bits == 0 ? r : Register{r.bytes, r.size, 'i', bits, r.bits / bits, false};
+}
+
 inline bool fits(const Register& r, Form form) {
   const bool number = r.kind == 'i' || r.kind == 'u';
   switch (form.kind) {
@@ -71,6 +89,9 @@ inline bool fits(const Register& r, Form form) {
       return (number || r.kind == 'f') && r.bits == 32;
     case Form::half:
       return (number || r.kind == 'f') && r.bits == 16;
+    case Form::halves:
+    case Form::bytes:
+      return false;
     default:
       return true;
   }
@@ -165,7 +186,8 @@ inline std::string kind_text(const Register& r) {
   return (r.kind == 'i' ? "int" : r.kind == 'u' ? "uint" : "bits") + std::to_string(r.bits);
 }
 
-inline std::string text_of(const Register& r, Form wanted) {
+inline std::string text_of(const Register& whole, Form wanted) {
+  const Register r = in_parts(whole, wanted);
   const Form form = fits(r, wanted) ? wanted : form::decimal;
   if (r.kind == 'b') return bits_text(r, form);
   const std::string told = form_to_tell(r, form);
@@ -173,6 +195,12 @@ inline std::string text_of(const Register& r, Form wanted) {
   std::string text = std::to_string(r.count) + " x " + kind_text(r) + (told.empty() ? "" : " " + told) + " = {";
   for (int i = 0; i < r.count; ++i) text += (i > 0 ? ", " : "") + lane_text(r, form, i);
   return text + "}";
+}
+
+// The types of the scalar core's words are those whose names end so.
+template <std::size_t size>
+constexpr bool is_word(const char (&name)[size]) {
+  return name[size - 3] == 'p' && name[size - 2] == 'r';
 }
 
 template <class T>
@@ -216,7 +244,7 @@ std::ostream& operator<<(std::ostream& out, const Shown<T>& shown) {
   template <>                                                                                                   \
   struct Lanes<T##_space::T##_> {                                                                               \
     static Register of(const T##_space::T##_& r) {                                                              \
-      return {reinterpret_cast<const unsigned char*>(r._), sizeof r, #KIND[0], BITS, COUNT};                    \
+      return {reinterpret_cast<const unsigned char*>(r._), sizeof r, #KIND[0], BITS, COUNT, is_word(#T)};       \
     }                                                                                                           \
   };                                                                                                            \
   }                                                                                                             \

@@ -1,5 +1,6 @@
-# gdb runs this when it loads the library beside which it lies, as <library>-gdb.py. The printers are modules in
-# kastarri/gdb below it: imported once, they keep their settings when the program is run again.
+# gdb runs this when it loads the library, as <library>-gdb.py beside it or in a directory of gdb's own. The printers are
+# modules in kastarri/gdb below the library, or below this file where a user sources it: imported once, they keep their
+# settings when the program is run again.
 import os
 import sys
 
@@ -7,11 +8,13 @@ import gdb
 
 
 def _load_kastarri():
-    modules = os.path.join(os.path.dirname(os.path.realpath(__file__)), "kastarri", "gdb")
+    library = gdb.current_objfile()  # none if a user sources this file
+    near = os.path.dirname(os.path.realpath(library.filename if library else __file__))
+    modules = os.path.join(near, "kastarri", "gdb")
     if modules not in sys.path:
         sys.path.append(modules)
     import kastarri_printers
-    kastarri_printers.register(gdb.current_objfile())  # none if a user sources this file
+    kastarri_printers.register(library)
 
 
 _load_kastarri()

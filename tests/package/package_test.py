@@ -1,6 +1,7 @@
 """What is installed and packaged: that other projects find it, build against it, and that all versions agree.
 
-Run as: package_test.py BUILD (a build directory whose libraries are built).
+Run as: package_test.py BUILD [RELEASE] [TEST...] (a build directory whose libraries are built; archives and packages are
+made from it, or are those of the directory RELEASE).
 """
 
 import glob
@@ -8,38 +9,11 @@ import itertools
 import os
 import re
 import shutil
-import subprocess
 import sys
-import tempfile
 import unittest
 
-HERE = os.path.dirname(os.path.abspath(__file__))
-ROOT = os.path.dirname(os.path.dirname(HERE))
-BUILD = os.path.abspath(sys.argv[1])
+from support import BITS, BUILD, CLANG, COMPILER, HERE, OTHER, RELEASE, ROOT, STATIC_TARGET, VERSION, Directory, cached, output, run
 
-
-def run(*command, **options):
-    return subprocess.run(command, stdout=subprocess.PIPE, stderr=subprocess.STDOUT, text=True, check=False, **options)
-
-
-def output(*command, **options):
-    result = run(*command, **options)
-    if result.returncode != 0:
-        raise AssertionError(" ".join(command) + "\n" + result.stdout)
-    return result.stdout
-
-
-def cached(name):
-    with open(os.path.join(BUILD, "CMakeCache.txt"), encoding="utf-8") as cache:
-        return re.search(rf"^{name}:\w+=(.*)$", cache.read(), re.M)[1]
-
-
-VERSION = cached("CMAKE_PROJECT_VERSION")
-COMPILER = cached("CMAKE_CXX_COMPILER")  # what it built others link, but for the static library of clang
-CLANG = "clang" in os.path.basename(COMPILER)
-STATIC_TARGET = cached("KASTARRI_STATIC_TARGET")
-BITS = cached("KASTARRI_BITS")
-OTHER = {"32": "64", "64": "32"}[BITS]
 ARCHITECTURE = {"32": "i386", "64": "amd64"}[BITS]
 MULTIARCH = {"32": "lib/i386-linux-gnu", "64": "lib/x86_64-linux-gnu"}[BITS]  # where the test presets install libraries
 # Where the files of CMake and pkg-config are found: those of 32 bits whatever a project says.
@@ -54,38 +28,21 @@ def processor_runs_static():
             "avx512": {"avx512f", "avx512bw", "avx512dq", "avx512vl"}}[STATIC_TARGET] <= flags
 
 
-class Directory(unittest.TestCase):
-    """Tests with a temporary directory for the class, and one in it for each test."""
-
-    @classmethod
-    def setUpClass(cls):
-        cls.shared = tempfile.mkdtemp()
-        cls.addClassCleanup(shutil.rmtree, cls.shared)
-
-    def setUp(self):
-        self.directory = tempfile.mkdtemp(dir=self.shared)
-
-    def path(self, *parts):
-        return os.path.join(self.directory, *parts)
+def cpack(generator, directory):
+    """The files of a release or, without one, those that the build makes."""
+    if not RELEASE:
+        output("cpack", "--config", os.path.join(BUILD, "CPackConfig.cmake"), "-G", generator, "-B", directory)
+    return RELEASE or directory
 
 
-class Installation(Directory):
-    """The installation is made in a staging directory, as packagers do, and moved: nothing in it may know where
-    it was made."""
-
-    @classmethod
-    def setUpClass(cls):
-        super().setUpClass()
-        staging = os.path.join(cls.shared, "staging")
-        output("cmake", "--install", BUILD, "--prefix", "/opt/elsewhere", env=dict(os.environ, DESTDIR=staging))
-        cls.prefix = os.path.join(cls.shared, "moved here")
-        shutil.move(os.path.join(staging, "opt", "elsewhere"), cls.prefix)
-        cls.libraries = os.path.join(cls.prefix, MULTIARCH)
+class Installed(Directory):
+    """What projects do with a library below `prefix`, whose libraries are in `libraries`."""
 
     def environment(self, directory=PKGCONFIG_DIRECTORIES[0]):
         return dict(os.environ, PKG_CONFIG_PATH=os.path.join(self.prefix, directory))
 
     def configure(self, *arguments):
+        shutil.rmtree(self.path("build"), ignore_errors=True)
         return run("cmake", "-S", os.path.join(HERE, "consumer"), "-B", self.path("build"),
                    "-DCMAKE_BUILD_TYPE=Release", f"-DCMAKE_PREFIX_PATH={self.prefix}", *arguments)
 
@@ -99,6 +56,100 @@ class Installation(Directory):
         self.assertEqual(configured.returncode, 0, configured.stdout)
         output("cmake", "--build", self.path("build"))
         return self.path("build", "consumer")
+
+    def check_use(self):
+        """A program is built, run, profiled and looked at in gdb, and so is an example."""
+        program = self.consumer("-DLINKAGE=shared", "-DCMAKE_BUILD_TYPE=Debug")
+        self.check_answer(program)
+        profile = run(os.path.join(self.prefix, "bin", "kastarri-profile"), "--callers", program)
+        self.assertRegex(profile.stdout, r" ZRA_ADDNX16 +main \(main\.cpp\)\n")
+        shown = run(*self.gdb(), "-ex", "break main.cpp:12", "-ex", "run", "-ex", "print a", program).stdout
+        self.assertIn("$1 = 32 x int16 = {300, 300, ", shown)
+        output("cmake", "-S", os.path.join(self.prefix, "share/doc/kastarri/examples"), "-B", self.path("examples"),
+               f"-DCMAKE_PREFIX_PATH={self.prefix}", f"-DKASTARRI_BITS={BITS}", "-DCMAKE_BUILD_TYPE=Release")
+        output("cmake", "--build", self.path("examples"), "--target", "threshold")
+        output(self.path("examples", "threshold"), cwd=self.directory)
+
+    def gdb(self):
+        return ["gdb", "-nx", "-q", "-batch", "-ex", "set debuginfod enabled off", "-iex", f"add-auto-load-safe-path {self.libraries}"]
+
+
+class Installation(Installed):
+    """The installation is made in a staging directory, as packagers do, and moved: nothing in it may know where
+    it was made."""
+
+    @classmethod
+    def setUpClass(cls):
+        super().setUpClass()
+        cls.prefix = os.path.join(cls.shared, "moved here")
+        cls.manifest = cls.install(os.path.join(cls.shared, "staging"))
+        shutil.move(os.path.join(cls.shared, "staging/opt/elsewhere"), cls.prefix)
+        cls.libraries = os.path.join(cls.prefix, MULTIARCH)
+
+    @staticmethod
+    def install(staging):
+        """What CMake says of it. Another test may install from the same build meanwhile."""
+        while True:
+            output("cmake", "--install", BUILD, "--prefix", "/opt/elsewhere", env=dict(os.environ, DESTDIR=staging))
+            with open(os.path.join(BUILD, "install_manifest.txt"), encoding="utf-8") as file:
+                manifest = file.read()
+            if manifest.startswith("/opt/elsewhere/"):
+                return manifest
+
+    def test_what_is_installed_can_be_removed(self):
+        # Beside it the library for the other width, with which it has the headers in common, and a user's file.
+        builds = [self.path("build"), self.path("other")]
+        headers = [line for line in self.manifest.split() if "/include/" in line]
+        for build, manifest in zip(builds, (self.manifest, "\n".join(headers))):
+            os.mkdir(build)
+            with open(os.path.join(build, "install_manifest.txt"), "w", encoding="utf-8") as file:
+                file.write(manifest)
+        root = self.path("root", "opt", "elsewhere")
+        shutil.copytree(self.prefix, root, symlinks=True)
+        kept = os.path.join(root, "share", "doc", "kastarri", "notes")
+        open(kept, "w", encoding="utf-8").close()
+        script = ("-P", os.path.join(ROOT, "cmake", "uninstall.cmake"))
+        environment = dict(os.environ, DESTDIR=self.path("root"))
+        output("cmake", f"-DBUILD={builds[0]}", f"-DOTHERS={builds[1]};{self.path('none')}", *script, env=environment)
+        left = {os.path.join(path, name) for path, _, files in os.walk(root) for name in files}
+        self.assertEqual(left, {self.path("root") + header for header in headers} | {kept})
+        self.assertFalse(os.path.exists(os.path.join(root, "lib", "kastarri")))
+        output("cmake", f"-DBUILD={builds[1]}", f"-DOTHERS={builds[0]}", *script, env=environment)
+        self.assertFalse(os.path.exists(os.path.join(root, "include", "kastarri")))
+        self.assertIn("Nothing was installed", run("cmake", f"-DBUILD={builds[0]}", *script).stdout)
+
+    def test_each_tool_tells_its_version_and_has_a_man_page(self):
+        tools = os.listdir(os.path.join(self.prefix, "bin"))
+        self.assertGreaterEqual(len(tools), 2)
+        for tool in tools:
+            with self.subTest(tool=tool):
+                program = os.path.join(self.prefix, "bin", tool)
+                self.assertEqual(output(program, "--version"), f"{tool} {VERSION}\n")
+                if cached("KASTARRI_HELP2MAN").endswith("NOTFOUND"):
+                    continue
+                with open(os.path.join(self.prefix, "share/man/man1", tool + ".1"), encoding="utf-8") as file:
+                    page = re.sub(r"\\f[BIR]", "", file.read().replace("\\-", "-"))
+                self.assertRegex(page, rf"(?m)^\.SH NAME\n{tool} - \w.*\w$")
+                options = re.findall(r"^  (--\w+)", output(program, "--help"), re.M)
+                self.assertIn("--version", options)
+                self.assertEqual([option for option in options if option not in page], [])
+
+    def test_documents_know_the_version(self):
+        with open(os.path.join(ROOT, "CHANGELOG.md"), encoding="utf-8") as file:
+            self.assertEqual(re.findall(r"^## \[(\d.*?)\] - \d{4}-\d\d-\d\d$", file.read(), re.M)[0], VERSION)
+        with open(os.path.join(ROOT, "docs", "installing.md"), encoding="utf-8") as file:
+            self.assertIn(f"find_package(kastarri {VERSION.rpartition('.')[0]} CONFIG", file.read())
+
+    def test_the_links_between_documents_hold(self):
+        """Where the document that is named is not one of the sources, which are not installed."""
+        documents = os.path.join(self.prefix, "share", "doc", "kastarri")
+        pages = glob.glob(os.path.join(documents, "**", "*.md"), recursive=True)
+        self.assertGreater(len(pages), 10)
+        for page in pages:
+            with open(page, encoding="utf-8") as file:
+                links = re.findall(r"\]\(((?:\.\./)*(?:docs/|examples/|pictures/)?[\w-]+\.(?:md|svg|png))", file.read())
+            for link in links:
+                self.assertTrue(os.path.exists(os.path.join(os.path.dirname(page), link)), f"{page}: {link}")
 
     def test_a_project_links_the_shared_library(self):
         program = self.consumer("-DLINKAGE=shared", f"-DWANTED_VERSION={VERSION}")
@@ -139,9 +190,9 @@ class Installation(Directory):
                       " ".join(configured.stdout.split()))
         if OTHER == "32":  # CMake looks among libraries for 64 bits only where programs are
             self.assertIn("Could not find a package configuration file provided by \"kastarri\"",
-                          " ".join(self.configure("-DCMAKE_CXX_FLAGS=-m32", "--fresh").stdout.split()))
+                          " ".join(self.configure("-DCMAKE_CXX_FLAGS=-m32").stdout.split()))
         # Who says nothing may have the 32-bit library, and hears of it.
-        told = "there is no library for 64-bit programs" in self.configure("--fresh").stdout
+        told = "there is no library for 64-bit programs" in self.configure().stdout
         self.assertEqual(told, BITS == "32")
 
     def test_pkg_config_has_all_that_a_compiler_needs(self):
@@ -181,15 +232,28 @@ class Installation(Directory):
         self.assertEqual(os.readlink(os.path.join(self.libraries, f"libkastarri.so.{major}")), f"libkastarri.so.{VERSION}")
 
 
-class DebianPackages(Directory):
+class Archive(Installed):
     @classmethod
     def setUpClass(cls):
         super().setUpClass()
-        output("cpack", "--config", os.path.join(BUILD, "CPackConfig.cmake"), "-B", cls.shared)
+        name = f"kastarri-{VERSION}-linux-{ARCHITECTURE}"
+        shutil.unpack_archive(os.path.join(cpack("TGZ", cls.shared), name + ".tar.gz"), cls.shared)
+        cls.prefix = os.path.join(cls.shared, name)
+        cls.libraries = os.path.dirname(glob.glob(os.path.join(cls.prefix, "lib", "**", "libkastarri.so"), recursive=True)[0])
+
+    def test_it_serves_where_it_is_unpacked(self):
+        self.check_use()
+
+
+class DebianPackages(Installed):
+    @classmethod
+    def setUpClass(cls):
+        super().setUpClass()
+        packages = cpack("DEB", cls.shared)
         major = VERSION.split(".", maxsplit=1)[0]
         cls.runtime_name = f"libkastarri{major}"
-        cls.runtime = os.path.join(cls.shared, f"{cls.runtime_name}_{VERSION}_{ARCHITECTURE}.deb")
-        cls.devel = os.path.join(cls.shared, f"libkastarri-dev_{VERSION}_{ARCHITECTURE}.deb")
+        cls.runtime = os.path.join(packages, f"{cls.runtime_name}_{VERSION}_{ARCHITECTURE}.deb")
+        cls.devel = os.path.join(packages, f"libkastarri-dev_{VERSION}_{ARCHITECTURE}.deb")
 
     def fields(self, package, *names):
         return [output("dpkg-deb", "-f", package, name).strip() for name in names]
@@ -250,9 +314,9 @@ class DebianPackages(Directory):
         self.assertEqual(control["shlibs"].split()[:3], [*soname.groups(), self.runtime_name])
 
     @unittest.skipIf(os.getuid() != 0, "dpkg installs for root alone")
-    def test_packages_install_and_leave_nothing(self):
+    def test_packages_install_serve_and_leave_nothing(self):
         # A root of its own: no package is installed there, so dependencies are forced.
-        root = self.path("root")
+        root = os.path.realpath(self.path("root"))
         database = os.path.join(root, "var/lib/dpkg")
         os.makedirs(os.path.join(database, "info"))
         os.makedirs(os.path.join(database, "updates"))
@@ -260,12 +324,24 @@ class DebianPackages(Directory):
         dpkg = ["dpkg", f"--root={root}", f"--log={self.path('log')}", "--force-depends"]
         output(*dpkg, "--add-architecture", ARCHITECTURE)
         output(*dpkg, "-i", self.runtime, self.devel)
-        self.assertTrue(os.path.exists(os.path.join(root, "usr", MULTIARCH, "libkastarri.so")))
+        self.prefix = os.path.join(root, "usr")
+        self.libraries = os.path.join(self.prefix, MULTIARCH)
+        self.scripts = os.path.join(self.path("scripts"), root[1:])
+        os.makedirs(os.path.dirname(self.scripts))
+        os.symlink(os.path.join(self.prefix, "share/gdb/auto-load"), self.scripts)
+        self.check_use()
         output(*dpkg, "-P", f"libkastarri-dev:{ARCHITECTURE}", f"{self.runtime_name}:{ARCHITECTURE}")
         left = [os.path.join(path, name) for path, _, files in os.walk(root) for name in files
                 if not path.startswith(os.path.join(root, "var"))]
         self.assertEqual(left, [])
 
+    def gdb(self):
+        """It trusts the directory of scripts that is its own, where the library's lies under the full path of the library,
+        here that of the root first."""
+        scripts = self.path("scripts")
+        return ["gdb", "-nx", "-q", "-batch", "-ex", "set debuginfod enabled off",
+                "-iex", f"set auto-load scripts-directory {scripts}", "-iex", f"set auto-load safe-path {scripts}"]
+
 
 if __name__ == "__main__":
-    unittest.main(argv=[sys.argv[0]])
+    unittest.main()

@@ -25,7 +25,7 @@ with open(LIBRARY, "rb") as library_file:
     BITS = 32 * library_file.read(5)[4]  # by the class of the ELF file
 FLAGS = [f"-m{BITS}", "-std=c++11", "-Wall", "-Wextra", "-Wpedantic", "-Wconversion", "-Wshadow", "-Werror",
          "-I", os.path.join(ROOT, "include")]
-FORMS = ["decimal", "hex", "float", "half", "q0", "q7", "q15", "q31", "q63"]
+FORMS = ["decimal", "hex", "float", "half", "halves", "bytes", "q0", "q7", "q8", "q15", "q16", "q31", "q63"]
 TYPES = generate_headers.read_types()
 DIRECTORY = tempfile.TemporaryDirectory()
 
@@ -115,6 +115,9 @@ def fits(kind, bits, form):
 @functools.lru_cache(maxsize=None)
 def expected(register, data, form):
     kind, bits, count, share = lanes(register)
+    parts = {"halves": 16, "bytes": 8, "q7": 8, "q8": 16, "q15": 16}.get(form)
+    if register.name.endswith("pr") and parts:
+        kind, bits, count, share = "i", parts, bits // parts, parts
     form = form if fits(kind, bits, form) else "decimal"
     whole = int.from_bytes(data, "little")
     if kind == "b":
@@ -206,12 +209,13 @@ for name in {list(TYPES)}:
 
     def test_one_value_in_a_form_of_its_own(self):
         output, errors = self.stopped("set kastarri format hex", "kastarri print/q15 a_qv_vecNx16", "kastarri print argument",
-                                      "kastarri print *&a_vboolN", "print filter")
+                                      "kastarri print *&a_vboolN", "kastarri print/bytes a_qv_int64pr", "print filter")
         register = TYPES["qv_vecNx16"]
         data = self.bytes_of["qv_vecNx16"]
-        self.assertEqual(output.splitlines()[-4:], [
+        self.assertEqual(output.splitlines()[-5:], [
             expected(register, data, "q15"), expected(register, data, "hex"),
-            expected(TYPES["vboolN"], self.bytes_of["vboolN"], "hex"), "$1 = {taps = {0xfffd, 0x0007}}"])
+            expected(TYPES["vboolN"], self.bytes_of["vboolN"], "hex"),
+            expected(TYPES["qv_int64pr"], self.bytes_of["qv_int64pr"], "bytes"), "$1 = {taps = {0xfffd, 0x0007}}"])
 
     def test_gdbs_own_output_formats_apply_to_numbers(self):
         output, _ = self.stopped("print/x a_qv_int48", "print/x a_qv_vecN_4x64")
@@ -219,7 +223,8 @@ for name in {list(TYPES)}:
         self.assertIn("= 8 x int64 = {" + ", ".join(f"{lane:#x}" for lane in lanes_64) + "}", output)
 
     def test_lanes_are_children_in_an_ide(self):
-        cases = [("decimal", "qv_vec2Nx24"), ("hex", "qv_vecNx48"), ("q15", "qv_vecNx16"), ("half", "qv_vecNxf16")]
+        cases = [("decimal", "qv_vec2Nx24"), ("hex", "qv_vecNx48"), ("q15", "qv_vecNx16"), ("half", "qv_vecNxf16"),
+                 ("q15", "qv_int32pr"), ("bytes", "qv_int64pr")]
         commands = []
         for form, name in cases:
             commands += [f"set kastarri format {form}", f'interpreter-exec mi "-var-create {name} * a_{name}"',
@@ -240,14 +245,19 @@ for name in {list(TYPES)}:
             "show kastarri format", "set kastarri format q14", "run", "show kastarri format", "set kastarri format q64",
             "show kastarri", "set kastarri format", "kastarri print/octal a_vboolN", "kastarri print",
             "kastarri print argc_", "kastarri print 3 + 4", "kastarri print/half a_qv_vecNx48", "kastarri print/q3 a_vboolN",
-            "kastarri print *(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16*)0")
+            "kastarri print/halves a_qv_int32v", "kastarri print *(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16*)0")
         self.assertEqual(re.findall(r"shown in the form (\w+)\.", output), ["decimal", "q14", "q14"])
-        forms = "a register is shown as decimal, hex, float, half, or q0 to q63 (fixed point with so many fraction bits)."
+        forms = "a register is shown as decimal, hex, float, half, halves, bytes, or q0 to q63 (fixed point with so many fraction bits)."
         self.assertEqual(errors.splitlines(), [
             f'Unknown form "q64": {forms}', f'Unknown form "": {forms}', f'Unknown form "octal": {forms}',
             "Usage: kastarri print[/FORM] EXPRESSION", 'No symbol "argc_" in current context.',
             "3 + 4 is of type int, which is not a register type.", "The form half does not fit lanes of 48 bits.",
-            "The form q3 does not fit bits.", "Cannot access memory at address 0x0"])
+            "The form q3 does not fit bits.", "The form halves does not fit lanes of 32 bits.", "Cannot access memory at address 0x0"])
+
+    def test_help_lists_the_forms(self):
+        output, _ = self.stopped("help kastarri")
+        for form in "decimal", "hex", "q0 to q63", "float, half", "halves, bytes":
+            self.assertRegex(output, rf"(?m)^  {form} ")
 
     def test_values_that_cannot_be_read_are_said_so(self):
         for compiler in COMPILERS:

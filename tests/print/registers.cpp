@@ -21,7 +21,9 @@ struct Named {
 const Named forms[] = {
     {"decimal", kastarri::form::decimal}, {"hex", kastarri::form::hex},   {"float", kastarri::form::float_},
     {"half", kastarri::form::half},       {"q0", kastarri::form::q(0)},   {"q7", kastarri::form::q(7)},
-    {"q15", kastarri::form::q(15)},       {"q31", kastarri::form::q(31)}, {"q63", kastarri::form::q(63)}};
+    {"q15", kastarri::form::q(15)},       {"q31", kastarri::form::q(31)}, {"q63", kastarri::form::q(63)},
+    {"q8", kastarri::form::q(8)},         {"q16", kastarri::form::q(16)}, {"halves", kastarri::form::halves},
+    {"bytes", kastarri::form::bytes}};
 
 // A user's locale, which must not show in the text.
 struct Grouped : std::numpunct<char> {

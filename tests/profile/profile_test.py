@@ -4,7 +4,9 @@ Run as: profile_test.py BUILD CMAKE
 """
 
 import csv
+import glob
 import os
+import re
 import signal
 import struct
 import subprocess
@@ -26,6 +28,7 @@ with open(CALLS, "rb") as program:
 BEFORE_MAIN = {"RK_CLAMPS": 1, "int32_rtor_qv_vecNx16": 1}
 RESULTS = {"RK_CLAMPS": 2, "int32_rtor_qv_vecNx16": 1, "ZRA_LVNX16_IP": 1, "ZRA_MULNX16": 1, "ZRA_MULANX16": 1,
            "float_rtor_qv_vecN_2xf32": 1}
+ADD = ("ZRA_ADDNX16", "add")
 SVG = "{http://www.w3.org/2000/svg}"
 
 
@@ -92,6 +95,43 @@ class Counts(ProfileTest):
         self.assertEqual(self.counts(CALLS, "unaligned", status=1), dict(BEFORE_MAIN, ZRA_SBN_I=1))
 
 
+class Callers(ProfileTest):
+    def callers(self, *command, status=0):
+        """(Intrinsic, function that calls it) -> calls. What is not told by the file of the source has that of the code."""
+        result = self.run_profiler("--callers", "--output", self.path("table"), *command)
+        self.assertEqual(result.returncode, status, result.stderr)
+        with open(self.path("table"), encoding="utf-8") as file:
+            table = re.search(r"^ +calls .* intrinsic +called by\n((?:.+\n)+)", file.read(), re.M)[1]
+        rows = re.findall(r"^ +([\d,]+) +\S+ .*? (\w+) +((?:\S+::)?\S+) \(\w.*\)$", table.replace("(anonymous namespace)::", ""), re.M)
+        self.assertEqual(len(rows), table.count("\n"), table)
+        return {(name, function): int(calls.replace(",", "")) for calls, name, function in rows}
+
+    def test_functions_that_call_are_named_however_the_program_is_linked(self):
+        for program in BUILDS:
+            with self.subTest(program=program):
+                callers = self.callers(program, "pointers")
+                self.assertEqual({name: calls for (name, _), calls in callers.items()}, dict(BEFORE_MAIN, ZRA_ADDNX16=3, ZRA_SUBNX16=3))
+                results = self.callers(program, "results")
+                self.assertEqual(sum(results.values()), sum(RESULTS.values()))
+                self.assertEqual(sum(calls for (name, _), calls in results.items() if name == "RK_CLAMPS"), 2)
+
+    def test_every_thread_and_process_is_there(self):
+        self.assertEqual(self.callers(CALLS, "threads")[ADD], 400000)
+        self.assertEqual(self.callers(CALLS, "fork")[ADD], 1 + 10 + 2 * 5000000)
+        self.assertEqual(self.callers(CALLS, "fork-exec")[ADD], 3)
+        self.assertEqual(self.callers(CALLS, "signal", str(int(signal.SIGKILL)), status=-signal.SIGKILL)[ADD], 5)
+
+    def test_callers_in_plugins_are_named(self):
+        callers = self.callers("--anyway", HOST, PLUGIN)
+        self.assertEqual(callers.pop(("RK_MAX", "plugin")), 1)
+        self.assertEqual(list(callers.values()), [1], "its last call, which may be a jump, so that main has called")
+
+    def test_results_are_those_of_the_program(self):
+        for program in BUILDS:
+            plain = subprocess.run([program, "results"], capture_output=True, text=True, check=True)
+            self.assertEqual(self.run_profiler("--callers", program, "results").stdout, plain.stdout)
+
+
 class Transparency(ProfileTest):
     def test_results_input_output_and_arguments_are_those_of_the_program(self):
         for program in BUILDS:
@@ -127,18 +167,51 @@ class Transparency(ProfileTest):
 
 
 class Output(ProfileTest):
+    def profiler_with_costs(self, costs):
+        """The profiler as it is installed, with other costs."""
+        subprocess.run([CMAKE, "--install", BUILD, "--prefix", self.path("installed")], check=True, capture_output=True)
+        with open(self.path("installed/share/kastarri/costs.csv"), "w", encoding="utf-8") as file:
+            file.write(costs)
+        return self.path("installed/bin/kastarri-profile")
+
+    def lines(self, *arguments, profiler=PROFILER):
+        table = self.run_profiler(*arguments, profiler=profiler).stderr
+        return [line.split() for line in table.splitlines() if line]
+
     def test_table_names_the_most_called_and_the_families(self):
-        table = self.run_profiler("--top", "2", CALLS, "pointers").stderr
-        self.assertEqual([line.split() for line in table.splitlines() if line], [
+        costs = "# measured on: a machine\nname,avx512,avx2,sse2\n" + "".join(
+            f"{name},{cycles},{cycles},{cycles}\n" for name, cycles in (("ZRA_ADDNX16", 4.0), ("ZRA_SUBNX16", 8.0), ("RK_CLAMPS", 14.0)))
+        *table, estimate = self.lines("--top", "2", CALLS, "pointers", profiler=self.profiler_with_costs(costs))
+        self.assertEqual(table, [
             ["calls_lazy:", "8", "calls", "of", "4", "intrinsics"],
-            ["calls", "share", "family", "intrinsic"],
-            ["3", "37.5%", "integer", "ZRA_ADDNX16"],
-            ["3", "37.5%", "integer", "ZRA_SUBNX16"],
-            ["2", "25.0%", "2", "more"],
-            ["calls", "share", "family"],
-            ["6", "75.0%", "integer"],
+            ["calls", "share", "cycles", "share", "family", "intrinsic"],
+            ["3", "37.5%", "12", "24.0%", "integer", "ZRA_ADDNX16"],
+            ["3", "37.5%", "24", "48.0%", "integer", "ZRA_SUBNX16"],
+            ["2", "25.0%", "14", "28.0%", "2", "more"],
+            ["calls", "share", "cycles", "share", "family"],
+            ["6", "75.0%", "36", "72.0%", "integer"],
             ["1", "12.5%", "conversions"],
-            ["1", "12.5%", "scalar"]])
+            ["1", "12.5%", "14", "28.0%", "scalar"]])
+        self.assertRegex(" ".join(estimate), r"cost on a machine with (avx512|avx2|sse2); not known of 1 call$")
+
+    def test_without_costs_there_are_counts_alone(self):
+        profiler = self.profiler_with_costs("# measured on: another machine\nname\nZRA_ADDNX16\n")
+        table = self.lines("--csv", self.path("counts.csv"), CALLS, "pointers", profiler=profiler)
+        self.assertEqual(table[1:3], [["calls", "share", "family", "intrinsic"], ["3", "37.5%", "integer", "ZRA_ADDNX16"]])
+        with open(self.path("counts.csv"), encoding="utf-8") as file:
+            self.assertIn("ZRA_ADDNX16,integer,3,\n", file.read())
+
+    def test_every_intrinsic_has_a_cost_on_every_target(self):
+        share = os.path.join(os.path.dirname(os.path.dirname(PROFILER)), "share", "kastarri", "costs.csv")
+        with open(share, encoding="utf-8") as file:
+            self.assertRegex(file.readline(), r"measured on: .*\(family \d+, model \d+\)\n")
+            costs = {row["name"]: [float(row[target]) for target in ("avx512", "avx2", "sse2")] for row in csv.DictReader(file)}
+        listed, = glob.glob(os.path.join(BUILD, "lib", "kastarri", "profile", "*", "intrinsics.csv"))
+        with open(listed, encoding="utf-8") as file:
+            names = {name for name, _ in csv.reader(file)}
+        self.assertGreater(len(names & set(costs)) / len(names), 0.95, "`make bench` measures those that are new")
+        self.assertEqual(set(costs) - names, set())
+        self.assertTrue(all(0.5 < cycles < 1000 for cells in costs.values() for cycles in cells))
 
     def test_picture_is_well_formed_and_inside_its_frame(self):
         program = self.path("a<b&c")
@@ -164,7 +237,7 @@ class Output(ProfileTest):
         result = self.run_profiler("--anyway", "--csv", self.path("counts.csv"), "--svg", self.path("p.svg"), HOST)
         self.assertEqual(result.stderr, "\nhost: 0 calls of 0 intrinsics\n")
         with open(self.path("counts.csv"), encoding="utf-8") as file:
-            self.assertEqual(file.read(), "name,family,calls\n")
+            self.assertEqual(file.read(), "name,family,calls,cycles\n")
         xml.etree.ElementTree.parse(self.path("p.svg"))
 
     def test_the_installed_profiler_works(self):

@@ -14,7 +14,16 @@ import gdb.printing
 
 from kastarri_register_types import REGISTER_TYPES
 
-FORMS = "decimal, hex, float, half, or q0 to q63 (fixed point with so many fraction bits)"
+FORMS = "decimal, hex, float, half, halves, bytes, or q0 to q63 (fixed point with so many fraction bits)"
+HELP = """FORM is how a lane is shown:
+  decimal        its number; half and single floats as the number that they stand for
+  hex            its bits
+  q0 to q63      a fixed-point number with so many bits of fraction
+  float, half    the float whose bits an integer lane of 32 or 16 bits holds
+  halves, bytes  a word of coefficients (qv_int32pr, qv_int64pr) as the numbers of 16 or 8 bits in it
+In q1 to q7 such a word is shown by its bytes, in q8 to q15 by its halves.
+Lanes that a form does not fit are shown in decimal."""
+PARTS = {"halves": 16, "bytes": 8}  # bits
 FLOATS = {16: ("half", 10), 32: ("float", 23)}  # bits: name, bits of the fraction
 
 
@@ -23,10 +32,16 @@ class Form:
 
     def __init__(self, name):
         fixed = re.match(r"q(\d{1,2})$", name)
-        if not (name in ("decimal", "hex", "float", "half") or fixed and int(fixed[1]) <= 63):
+        if not (name in ("decimal", "hex", "float", "half", *PARTS) or fixed and int(fixed[1]) <= 63):
             raise gdb.GdbError(f'Unknown form "{name}": a register is shown as {FORMS}.')
         self.name = name
         self.fraction_bits = int(fixed[1]) if fixed else None
+
+    def part_bits(self):
+        """Into how many bits each this form takes a word of coefficients apart; 0 if it does not."""
+        if self.fraction_bits is None:
+            return PARTS.get(self.name, 0)
+        return 0 if self.fraction_bits in (0, *range(16, 64)) else 8 if self.fraction_bits < 8 else 16
 
     def fits(self, kind, bits):
         """Whether lanes can be shown so; those that cannot are shown in decimal."""
@@ -179,10 +194,13 @@ def unreadable(error):
     return "<optimized out>" if "optimized out" in str(error) else f"<{error}>"
 
 
-def lanes_of(type_):
-    """Kind, bits and number of the lanes of a register type; None of another type."""
+def lanes_of(type_, form):
+    """Kind, bits and number of the lanes of a register type, as that form has them; None of another type."""
     name = re.match(r"(\w+)_space::\1_$", type_.strip_typedefs().unqualified().name or "")
-    return REGISTER_TYPES.get(name[1]) if name else None
+    lanes = REGISTER_TYPES.get(name[1]) if name else None
+    if lanes and name[1].endswith("pr") and form.part_bits():  # a word of the scalar core
+        return "i", form.part_bits(), lanes[1] // form.part_bits()
+    return lanes
 
 
 def referenced(value):
@@ -198,7 +216,7 @@ class Printers(gdb.printing.PrettyPrinter):
     def __call__(self, value):
         value = referenced(value)
         register_type = LaneText.register_type(value.type)
-        lanes = lanes_of(register_type or value.type)
+        lanes = lanes_of(register_type or value.type, self.form)
         if lanes is None:
             return None
         if register_type:
@@ -213,7 +231,7 @@ PRINTERS = Printers()
 class Format(gdb.Parameter):
     set_doc = "Set the form in which registers are shown."
     show_doc = "Show the form in which registers are shown."
-    __doc__ = f"A register is shown as {FORMS}.\nLanes that the form does not fit are shown in decimal."
+    __doc__ = HELP
 
     def __init__(self):
         super().__init__("kastarri format", gdb.COMMAND_DATA, gdb.PARAM_STRING_NOESCAPE)
@@ -231,7 +249,10 @@ class Format(gdb.Parameter):
 
 
 class Kastarri(gdb.Command):
-    """See registers of kastarri."""
+    __doc__ = f"""See registers of kastarri.
+set kastarri format FORM is for all, kastarri print/FORM for one.
+
+{HELP}"""
 
     def __init__(self):
         super().__init__("kastarri", gdb.COMMAND_DATA, gdb.COMPLETE_NONE, True)
@@ -256,7 +277,8 @@ class ShowKastarri(gdb.Command):
 
 class Print(gdb.Command):
     __doc__ = f"""Print a register in a form of its own: kastarri print[/FORM] EXPRESSION
-FORM is {FORMS}."""
+
+{HELP}"""
 
     def __init__(self):
         super().__init__("kastarri print", gdb.COMMAND_DATA, gdb.COMPLETE_EXPRESSION)
@@ -273,11 +295,11 @@ FORM is {FORMS}."""
     @staticmethod
     def print(expression, form, must_fit):
         value = referenced(gdb.parse_and_eval(expression))
-        lanes = lanes_of(value.type)
+        lanes = lanes_of(value.type, form)
         if lanes is None:
             raise gdb.GdbError(f"{expression} is of type {value.type}, which is not a register type.")
-        kind, bits, count = lanes
-        if must_fit and not form.fits(kind, bits):
+        kind, bits, _ = lanes
+        if must_fit and not form.fits(kind, bits) and bits != PARTS.get(form.name):
             kinds = {"b": "bits", "w": "words without a number", "f": FLOATS.get(bits, ("",))[0] + " lanes"}
             raise gdb.GdbError(f"The form {form.name} does not fit {kinds.get(kind, f'lanes of {bits} bits')}.")
         usual = PRINTERS.form

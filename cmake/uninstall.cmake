@@ -1,0 +1,36 @@
+# cmake -DBUILD=<build> [-DOTHERS=<build>;...] -P uninstall.cmake: removes what `cmake --install <build>` installed, as its
+# manifest says, but for what other builds installed as well: libraries of both widths share their headers. Directories
+# go that are named after the library and empty. DESTDIR is put before all paths.
+set(manifest ${BUILD}/install_manifest.txt)
+if(NOT EXISTS ${manifest})
+  message(FATAL_ERROR "Nothing was installed from ${BUILD}: there is no ${manifest}")
+endif()
+file(STRINGS ${manifest} files)
+foreach(build IN LISTS OTHERS)
+  if(EXISTS ${build}/install_manifest.txt)
+    file(STRINGS ${build}/install_manifest.txt shared)
+    list(REMOVE_ITEM files ${shared})
+  endif()
+endforeach()
+
+set(directories)
+foreach(file IN LISTS files)
+  file(REMOVE "$ENV{DESTDIR}${file}")
+  cmake_path(GET file PARENT_PATH directory)
+  while(directory MATCHES "kastarri")
+    list(APPEND directories "${directory}")
+    cmake_path(GET directory PARENT_PATH directory)
+  endwhile()
+endforeach()
+file(REMOVE ${manifest})
+
+list(REMOVE_DUPLICATES directories)
+list(SORT directories ORDER DESCENDING)  # a directory comes after those in it
+foreach(directory IN LISTS directories)
+  file(GLOB left LIST_DIRECTORIES true "$ENV{DESTDIR}${directory}/*")
+  if(NOT left)
+    file(REMOVE_RECURSE "$ENV{DESTDIR}${directory}")
+  endif()
+endforeach()
+list(LENGTH files count)
+message(STATUS "Removed ${count} files")

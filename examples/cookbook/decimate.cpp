@@ -4,9 +4,8 @@
 #include "kastarri/lanes.h"
 #include "kastarri/names.h"
 
-// y[n] = (x[2n] + 2 x[2n + 1] + x[2n + 2]) / 4, rounded half up, for 16 n at a time; count is a multiple of 16. All 32
-// lanes are computed, and the pack takes the even ones: half of the products are in vain, but every load is a whole
-// register and no sample has to be moved. Reads x[0] to x[2 count + 1].
+// y[n] = (x[2n] + 2 x[2n + 1] + x[2n + 2]) / 4, rounded half up, for count n, a multiple of 16. All 32 lanes are
+// computed, and the pack takes the even ones. Reads x[0] to x[2 count + 1].
 void halved_rate(const short* x, short* y, int count) {
   const qv_vecNx16 one = 1, two = 2;
   qv_vecN_2x16* out = reinterpret_cast<qv_vecN_2x16*>(y);

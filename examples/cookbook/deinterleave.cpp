@@ -24,8 +24,8 @@ int main() {
   ZRA_SCATTERNX16(ZRA_SLLINX16(right, 1), stereo + 1, every_other);
   std::printf("interleaved %d %d %d %d ...\n", stereo[0], stereo[1], stereo[2], stereo[3]);
 
-  // Pairs without a gather: a lane of 32 bits is a pair, the one of lower address in its low half. Quicker, and what
-  // comes out has 32 bits.
+  // Pairs without a gather, where lanes of 32 bits are wanted: such a lane is a pair, the number of lower address in
+  // its low half.
   const qv_vecN_2x32v pairs = ZRA_LVN_2X32_I(reinterpret_cast<const qv_vecN_2x32v*>(stereo), 0);
   const qv_vecN_2x32v later = ZRA_SRAIN_2X32(pairs, 16);
   const qv_vecN_2x32v earlier = ZRA_SRAIN_2X32(ZRA_SLLIN_2X32(pairs, 16), 16);

@@ -77,7 +77,7 @@ TEST(Kernels, Fft) {
     for (std::size_t i = 0; i < room; ++i) ASSERT_EQ(y[i] + y[y.size() - 1 - i], 2 * 12345);
     Noise noise;
     noise.add(x, plain, exponent);
-    EXPECT_GT(noise.ratio(), 60) << quieter;
+    EXPECT_GT(noise.ratio(), 58) << quieter;
   }
   Samples silence(2 * FFT_SIZE, 0), y(2 * FFT_SIZE, 1);
   EXPECT_EQ(fft(silence.data(), table.data(), y.data()), 0);

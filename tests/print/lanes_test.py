@@ -24,7 +24,8 @@ class Lanes(unittest.TestCase):
     def test_numbers_are_those_of_the_bits(self):
         for compiler in COMPILERS:
             for standard in ("c++11", "c++17"):
-                print_test.build(compiler, "lanes", "-O2", "-std=" + standard)
+                # Without SSE compilers move singles through the x87, which makes signalling NaNs quiet.
+                print_test.build(compiler, "lanes", "-O2", "-msse2", "-mfpmath=sse", "-std=" + standard)
                 for seed in range(3):
                     bytes_of = image(seed)
                     run = subprocess.run([path("lanes_" + compiler), write_image("image", bytes_of)], capture_output=True,

@@ -98,7 +98,7 @@ void draw(const Program& program, const Settings& s, const Wav& sound, const Pic
   const Plot before = waveform("Before: the sound", what, sound);
   Plot after("After: its spectrogram",
              "transforms of 1,024 points, one every " + std::to_string(s.hop) + " samples, under a Hann window");
-  after.x = before.x;
+  after.x = {"time (s)", 0, static_cast<double>(levels.width) * s.hop / sound.rate};
   const double step = static_cast<double>(sound.rate) / FFT_SIZE;
   after.y = {"frequency (Hz)", -step / 2, (levels.height - 0.5) * step};  // the lowest row is about 0 Hz
   after.picture("power (dB, 0 = a sine of full scale)", levels, DARKEST, BRIGHTEST);

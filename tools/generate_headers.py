@@ -1,7 +1,7 @@
 #!/usr/bin/env python3
 """Write the public headers from the tables of rows.
 
-Only declarations come from here: the register types with their conversions (types.h) and their lanes (lanes.h
+Only declarations come from here: the register types with their conversions (types.h) and their lanes (layouts.h
 and the debugger's table), the prototypes of the intrinsics by family, and the short names. The compiler's
 preprocessor reads the tables, so a prototype here is the prototype that the library is compiled with.
 
@@ -181,7 +181,7 @@ LANES = [
 ]
 
 
-def lanes_header(types):
+def layouts_header(types):
     return [f"/// {line}" for line in ["X(type, kind, bits, number) for every register type.", *LANES]] + [
         "#define KASTARRI_REGISTER_TYPES(X) \\",
         " \\\n".join(f"  X({t.name}, {', '.join(map(str, t.lanes))})" for t in types.values())]
@@ -329,8 +329,8 @@ def outputs():
     families = all_rows()
     headers = {"types": header_text("types", "The register types of the core", "src/frame/types.def and conversions.def",
                                     types_header(types) + ['#include "kastarri/conversions.h"'])}
-    headers["lanes"] = header_text("lanes", "The lanes of the register types, for programs that handle them all",
-                                   "src/frame/types.def", lanes_header(types))
+    headers["layouts"] = header_text("layouts", "How lanes lie in each register type, for programs that handle them all",
+                                     "src/frame/types.def", layouts_header(types))
     for name, (title, tables, rows) in families.items():
         body = family_body(rows)
         includes = ["library", "types"]

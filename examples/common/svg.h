@@ -17,6 +17,7 @@
 #include <vector>
 
 #include "common/files.h"
+#include "common/heat.h"
 
 namespace examples {
 
@@ -48,6 +49,11 @@ class Plot {
   void bars(const std::string& name, const std::vector<double>& xs, const std::vector<double>& ys) {
     series_.push_back({name, xs, ys, Kind::bar, 0});
   }
+  // A picture that fills the plot, its greys from 0 to 255 as colours for numbers from low to high, with a key.
+  void picture(const std::string& name, const Picture& greys, double low, double high) {
+    picture_ = "data:image/png;base64," + base64(png_bytes(greys, heat_colours()));
+    series_.push_back({name, {low, high}, {}, Kind::picture, 0});
+  }
   // A dashed upright line with a word at its top.
   void mark(double at, const std::string& word) { marks_.emplace_back(at, word); }
 
@@ -76,7 +82,7 @@ class Plot {
   }
 
  private:
-  enum class Kind { background, bar, line };
+  enum class Kind { background, bar, line, picture };
   struct Series {
     std::string name;
     std::vector<double> xs, ys;
@@ -103,6 +109,7 @@ class Plot {
     text(out, LEFT, 56, "start", "font-size='13' fill='#616e7c'", subtitle_);
     draw_axes(out);
     add(out, "<g clip-path='url(#inside%zu)'>\n", number);
+    if (!picture_.empty()) draw_picture(out);
     for (const Kind kind : {Kind::background, Kind::bar, Kind::line}) {
       for (std::size_t i = 0; i < series_.size(); ++i) {
         if (series_[i].kind == kind) kind == Kind::bar ? draw_bars(out, i) : draw_curve(out, i);
@@ -111,6 +118,7 @@ class Plot {
     add(out, "</g>\n");
     draw_marks(out);
     draw_legend(out);
+    draw_key(out, number);
   }
 
   // Colours that people with any colour vision tell apart (Okabe and Ito).
@@ -235,6 +243,30 @@ class Plot {
     out += "'/>\n";
   }
 
+  void draw_picture(std::string& out) const {
+    add(out, "<image x='%g' y='%g' width='%g' height='%g' preserveAspectRatio='none' href='", LEFT, top(), RIGHT - LEFT,
+        bottom() - top());
+    out += picture_ + "'/>\n";
+  }
+
+  // What the colours of a picture stand for: a strip of them above its right end, with the numbers at the ends.
+  void draw_key(std::string& out, std::size_t plot) const {
+    constexpr double FROM = RIGHT - 150, HIGH = 22, WORDS = HIGH + 11;
+    for (const Series& s : series_) {
+      if (s.kind != Kind::picture) continue;
+      add(out, "<linearGradient id='heat%zu'>", plot);
+      for (int i = 0; i <= 8; ++i) {
+        const Colour c = heat_colours()[static_cast<std::size_t>(i * 255 / 8)];
+        add(out, "<stop offset='%g' stop-color='#%02x%02x%02x'/>", i / 8.0, c[0], c[1], c[2]);
+      }
+      add(out, "</linearGradient><rect x='%g' y='%g' width='110' height='12' fill='url(#heat%zu)'/>\n", FROM, HIGH,
+          plot);
+      const char* const small = "font-size='12' fill='#52606d'";
+      text(out, FROM - 6, WORDS, "end", small, s.name + "  " + tick_label(s.xs.front()));
+      text(out, FROM + 116, WORDS, "start", small, tick_label(s.xs.back()));
+    }
+  }
+
   // Words of neighbours stand on two lines, so that close marks can be read.
   void draw_marks(std::string& out) const {
     for (std::size_t i = 0; i < marks_.size(); ++i) {
@@ -260,7 +292,7 @@ class Plot {
     }
   }
 
-  std::string title_, subtitle_;
+  std::string title_, subtitle_, picture_;
   std::vector<Series> series_;
   std::vector<std::pair<double, std::string>> marks_;
 };

@@ -16,7 +16,7 @@
 #include <sstream>
 #include <string>
 
-#include "kastarri/lanes.h"
+#include "kastarri/layouts.h"
 #include "kastarri/types.h"
 
 namespace kastarri {
@@ -46,7 +46,7 @@ namespace print_detail {
 
 using Pattern = unsigned long long;
 
-// The register's bytes, and its lanes as in lanes.h.
+// The register's bytes, and its lanes as in layouts.h.
 struct Register {
   const unsigned char* bytes;
   int size;

@@ -9,6 +9,7 @@
 #include "biquad/biquad.h"
 #include "biquad/design.h"
 #include "convolve/filters.h"
+#include "fft/design.h"
 #include "fir/fir.h"
 #include "histogram/histogram.h"
 #include "mixer/analytic.h"
@@ -60,6 +61,27 @@ TEST(Kernels, Mixer) {
     EXPECT_EQ(y[n], q15(product.real())) << n;
     EXPECT_EQ(y[n + 1], q15(product.imag())) << n;
   }
+}
+
+// Of whatever size the numbers are, what ten stages of 16 bits add stays far below them: an overflow, a wrong turn or a
+// wrong exponent would be as loud as they are. The last ones have the largest part that there is.
+TEST(Kernels, Fft) {
+  constexpr std::size_t room = 4;
+  const Samples table = turns();
+  for (int quieter = 0; quieter < 18; ++quieter) {
+    Samples x = noise<short>(2 * FFT_SIZE), y(room + x.size() + room, 12345), plain(x.size());
+    for (auto& part : x) part = static_cast<short>(quieter == 17 ? -32768 : part >> quieter);
+    const int exponent = fft(x.data(), table.data(), &y[room]);
+    ASSERT_EQ(exponent, fft_reference(x.data(), table.data(), plain.data()));
+    ASSERT_EQ(Samples(y.begin() + room, y.end() - room), plain) << quieter;
+    for (std::size_t i = 0; i < room; ++i) ASSERT_EQ(y[i] + y[y.size() - 1 - i], 2 * 12345);
+    Noise noise;
+    noise.add(x, plain, exponent);
+    EXPECT_GT(noise.ratio(), 58) << quieter;
+  }
+  Samples silence(2 * FFT_SIZE, 0), y(2 * FFT_SIZE, 1);
+  EXPECT_EQ(fft(silence.data(), table.data(), y.data()), 0);
+  EXPECT_EQ(y, silence);
 }
 
 // Each lane is a sound of its own, loud enough to saturate here and there.

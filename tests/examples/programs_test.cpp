@@ -2,8 +2,10 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
+#include <cmath>
 
 #include "common/pgm.h"
+#include "common/spectrum.h"
 #include "common/wav.h"
 #include "support.h"
 
@@ -22,6 +24,26 @@ TEST(Programs, FirKeepsSoundsWhereTheyAre) {
   const Samples after = read_wav(directory.file("fir.wav")).samples;
   EXPECT_EQ(std::max_element(after.begin(), after.end()) - after.begin(), 40);
   EXPECT_EQ(directory.names(), (std::set<std::string>{"click.wav", "fir.wav", "fir.svg"}));
+}
+
+// Two tones of -30 dB, one a channel: the mean power of the channels is 3 dB less, which is 67 of the 90 dB that greys
+// stand for. Frequency 128 lies 128 rows above the lowest.
+TEST(Programs, FftFindsTheTonesOfBothChannels) {
+  const Directory directory;
+  Wav tones{8000, 2, Samples(2 * 8000)};
+  for (std::size_t n = 0; n < tones.samples.size(); ++n) {
+    const double turns = static_cast<double>(n / 2) * (n % 2 == 0 ? 1000 : 3000) / 8000;
+    tones.samples[n] = static_cast<std::int16_t>(std::lround(1036 * std::cos(2 * PI * turns)));
+  }
+  write_wav(directory.file("tones.wav"), tones);
+  ASSERT_EQ(run_example(directory, "fft", "--input tones.wav --top 4000 --hop 500"), "0: ");
+  const Picture picture = read_pgm(directory.file("fft.pgm"));
+  EXPECT_EQ(describe(picture), "16 x 512 pixels");
+  for (int row = 0; row < picture.height; ++row) {
+    const int away = std::min(std::abs(511 - row - 128), std::abs(511 - row - 384));
+    const int grey = picture.row(row)[8];
+    ASSERT_TRUE(away == 0 ? grey >= 189 && grey <= 191 : away <= 4 || grey < 60) << "row " << row << ": " << grey;
+  }
 }
 
 // Without gains every section is 1 but for rounding: the pieces of the sound are back in their places.
@@ -60,6 +82,7 @@ TEST(Programs, RefuseWhatTheyCannotDo) {
       {"fir", "--input good.wav --type high --taps 16", "--taps must be odd"},
       {"fir", "--input good.wav --output none/o.wav", "none/o.wav: No such file"},
       {"mixer", "--input good.wav --shift -4000", "within half the sample rate, 4000 Hz"},
+      {"fft", "--input good.wav --hop 0", "between 32 and 1024"},
       {"biquad", "--input good.wav", "sample rate of at least 10000 Hz"},
       {"convolve", "--input good.wav", "not a binary PGM"},
   };

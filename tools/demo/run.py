@@ -20,26 +20,28 @@ import zlib
 HERE = os.path.dirname(os.path.abspath(__file__))
 ROOT = os.path.dirname(os.path.dirname(HERE))
 DATA = os.path.join("examples", "data")
-INPUTS = {".wav": "guitar.wav", ".pgm": "camera.pgm"}
+SOUND, PHOTO = "guitar.wav", "camera.pgm"
 
-# Name, kind of its output, whether it draws a picture of what happened, and what the page says of it.
+# Name, its input, the kind of its output, whether it draws a picture of what happened, and what the page says of it.
 EXAMPLES = [
-    ("fir", ".wav", True, "A low-pass filter", "Takes the treble out of the recording, with 64 taps."),
-    ("mixer", ".wav", True, "A frequency shift", "Moves every frequency up by the same amount; chords turn into bells."),
-    ("biquad", ".wav", True, "An equaliser", "Less bass and middle, more treble, in single precision. In half precision "
+    ("fir", SOUND, ".wav", True, "A low-pass filter", "Takes the treble out of the recording, with 64 taps."),
+    ("mixer", SOUND, ".wav", True, "A frequency shift", "Moves every frequency up by the same amount; chords turn into bells."),
+    ("biquad", SOUND, ".wav", True, "An equaliser", "Less bass and middle, more treble, in single precision. In half precision "
      "its coefficients are too coarse for the bass."),
-    ("convolve", ".pgm", False, "Edges", "The steepest of four slopes about each pixel, by four masks."),
-    ("threshold", ".pgm", False, "Dark and light", "Parted at a level that the kernel finds by its reductions."),
-    ("histogram", ".pgm", True, "A gamma curve", "Each grey looked up in a table by a gather, and counted by a scatter. "
+    ("fft", SOUND, ".pgm", True, "A spectrogram", "Which frequencies sound when: Fourier transforms of 1,024 points, one after "
+     "the other. All numbers of a block share an exponent, which each of ten stages chooses anew."),
+    ("convolve", PHOTO, ".pgm", False, "Edges", "The steepest of four slopes about each pixel, by four masks."),
+    ("threshold", PHOTO, ".pgm", False, "Dark and light", "Parted at a level that the kernel finds by its reductions."),
+    ("histogram", PHOTO, ".pgm", True, "A gamma curve", "Each grey looked up in a table by a gather, and counted by a scatter. "
      "Both reach one element at a time, as plain C does, and put it into a register besides: plain C is faster."),
-    ("ports", ".wav", False, "A volume control", "The recording goes through the core's queues, sample by sample, to half "
+    ("ports", SOUND, ".wav", False, "A volume control", "The recording goes through the core's queues, sample by sample, to half "
      "its volume."),
 ]
 
 
 def run(example, build, out, wrapper):
     """What an example printed, complaints included, and its exit status."""
-    name, kind, draws, *_ = example
+    name, _, kind, draws, *_ = example
     command = [*wrapper, os.path.join(build, "examples", name), "--output", os.path.join(out, name + kind)]
     if draws:
         command += ["--picture", os.path.join(out, name + "-plot.svg")]
@@ -89,16 +91,16 @@ def media(kind, source, what):
 
 
 def section(example, report):
-    name, kind, draws, title, text = example
+    name, source, kind, draws, title, text = example
 
-    def file(stem):
-        return "demo-output/" + stem + (".png" if kind == ".pgm" else kind)
+    def figure(file, what):
+        stem, its_kind = os.path.splitext(file)
+        return media(its_kind, "demo-output/" + (stem + ".png" if its_kind == ".pgm" else file), what)
 
-    before = os.path.splitext(INPUTS[kind])[0]
     plot = (f'<figure class="plot"><img src="demo-output/{name}-plot.svg" alt="What {name} did, as a plot"></figure>'
             if draws else "")
     return (f'<section><h2>{html.escape(title)} <code>{name}</code></h2><p>{html.escape(text)}</p>'
-            f'<div class="pair">{media(kind, file(before), "before")}{media(kind, file(name), "after")}</div>{plot}'
+            f'<div class="pair">{figure(source, "before")}{figure(name + kind, "after")}</div>{plot}'
             f"<pre>{html.escape(report)}</pre></section>")
 
 
@@ -117,7 +119,7 @@ def main():
     out = os.path.join(build, "demo-output")
     shutil.rmtree(out, ignore_errors=True)
     os.makedirs(out)
-    for name in INPUTS.values():
+    for name in (SOUND, PHOTO):
         shutil.copy(os.path.join(DATA, name), out)
 
     print(f"{len(EXAMPLES)} kernels on a recording and a photograph, each checked against plain C\n")

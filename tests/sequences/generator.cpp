@@ -15,6 +15,9 @@ using What = Parameter::What;
 // Where accesses begin: all that they touch lies in the memory.
 constexpr int lowest = 128, highest = 1280;
 
+// Where a pointer is before it has been set.
+constexpr int nowhere = -memory_bytes;
+
 // Neighbouring numbers become far apart.
 std::uint64_t mixed(std::uint64_t x) {
   x += 0x9E3779B97F4A7C15u;
@@ -25,7 +28,7 @@ std::uint64_t mixed(std::uint64_t x) {
 
 class Generator {
  public:
-  explicit Generator(std::uint64_t key) : random_(key), at_(vocabulary().pointers.size(), -1) {}
+  explicit Generator(std::uint64_t key) : random_(key), at_(vocabulary().pointers.size(), nowhere) {}
 
   Program program(std::uint64_t key) {
     const int length = 5 + below(46);
@@ -145,7 +148,7 @@ class Generator {
       pointer->value = place;
       increment->value = by_chance() ? 64 - 128 * below(2) : a_place(is_aligned) - place;
     } else if (offset) {
-      pointer->value = at >= 0 && by_chance() ? at : place + below(513) - 256;
+      pointer->value = at != nowhere && by_chance() ? at : place + below(513) - 256;
       offset->value = place - pointer->value;
     } else {
       pointer->value = place;
@@ -164,7 +167,7 @@ class Generator {
   std::vector<Step> steps_;
   std::deque<int> recent_;  // registers that were written, the last one first
   int taken_ = -1;          // the one that the step is to take
-  std::vector<int> at_;     // where each pointer is; -1 before it is anywhere
+  std::vector<int> at_;     // where each pointer is
   int last_place_ = lowest;
 };
 
@@ -177,7 +180,7 @@ Program program_of(std::uint64_t seed, std::uint64_t number) {
 
 Program with(Program program, const std::set<int>& kept) {
   std::vector<Step> steps;
-  std::vector<int> at(vocabulary().pointers.size(), -1);
+  std::vector<int> at(vocabulary().pointers.size(), nowhere);
   for (Step& step : program.steps) {
     if (!kept.empty() && kept.count(step.number) == 0) continue;
     for (std::size_t i = 0; i < step.arguments.size(); ++i) {

@@ -22,7 +22,7 @@ void print_hex(const unsigned char* bytes, std::size_t size) {
 
 std::string name_of(int reg) {
   const Type& type = vocabulary().type_of(reg);
-  std::string name = type.name + "_" + std::to_string(reg - type.first);
+  std::string name = type.name + "_r" + std::to_string(reg - type.first);
   for (char& c : name)
     if (c == ' ') c = '_';
   return name;
@@ -121,8 +121,7 @@ void show(const Program& program) {
     separator = ", ";
   }
   std::printf("},\n\"states\": {");
-  for (int i = 0; i < states; ++i)
-    std::printf("%s\"%s\": %u", i ? ", " : "", names_of_states[i], machine.state(i));
+  for (int i = 0; i < states; ++i) std::printf("%s\"%s\": %u", i ? ", " : "", names_of_states[i], machine.state(i));
   std::printf("},\n\"steps\": [");
   separator = "";
   for (const Step& step : program.steps) {

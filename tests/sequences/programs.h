@@ -42,7 +42,8 @@ struct Operation {
   std::vector<Parameter> parameters;  // the result as the last
 };
 
-// Of the registers of a type the first are used freely; behind them lie a mask of offsets, which nothing writes, and offsets that have been masked.
+// Of the registers of a type the first are used freely; behind them lie a mask of offsets, which nothing writes, and
+// offsets that have been masked.
 constexpr int freely_used = 3, mask_of_offsets = 3, masked_offsets = 4, in_a_type = 5;
 constexpr Int highest_offset = 0x3FF;
 
@@ -65,9 +66,9 @@ const Vocabulary& vocabulary();
 // --- Programs ---------------------------------------------------------------------------------------
 
 struct Argument {
-  int index;   // of a register or a pointer
-  int value;   // a number; where the pointer has to be, from the beginning of the memory
-  int after;   // where a moving pointer is then
+  int index;    // of a register or a pointer
+  int value;    // a number; where the pointer has to be, from the beginning of the memory
+  int after;    // where a moving pointer is then
   bool is_set;  // the pointer is set first; else it is there already
 };
 

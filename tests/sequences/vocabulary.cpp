@@ -42,7 +42,7 @@ std::vector<std::string> words_of(const std::string& text) {
 std::string joined(const std::vector<std::string>& words) {
   std::string text;
   for (const std::string& word : words) text += (text.empty() ? "" : " ") + word;
-  return text;
+  return text == "unsigned" ? "unsigned int" : text;
 }
 
 template <class List, class Make>

@@ -85,8 +85,7 @@ std::uint64_t Machine::sum() const {
   testing_support::Sum sum;
   for (const int reg : live_.registers)
     sum.add(image(reg), testing_support::bytes_of(vocabulary().type_of(reg).view.format));
-  for (const int pointer : live_.pointers)
-    sum.add(static_cast<std::uint64_t>(pointers_[static_cast<std::size_t>(pointer)] - memory_));
+  for (const int pointer : live_.pointers) sum.add(static_cast<std::uint64_t>(std::int64_t{place(pointer)}));
   sum.add(memory_, sizeof memory_);
   for (const unsigned* state : states_used) sum.add(*state);
   return sum.value();

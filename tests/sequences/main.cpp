@@ -72,6 +72,7 @@ void print_values(const Program& program) {
   std::printf("memory ");
   print_hex(machine.memory(), memory_bytes);
   std::printf("\n");
+  for (const int pointer : machine.live().pointers) std::printf("p%d %d\n", pointer, machine.place(pointer));
   for (int i = 0; i < states; ++i) std::printf("%s %u\n", names_of_states[i], machine.state(i));
 }
 

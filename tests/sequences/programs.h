@@ -108,6 +108,7 @@ class Machine {
 
   const unsigned char* image(int reg) const { return images_[static_cast<std::size_t>(reg)].bytes; }
   const unsigned char* memory() const { return memory_; }
+  int place(int pointer) const { return static_cast<int>(pointers_[static_cast<std::size_t>(pointer)] - memory_); }
   const LiveRegisters& live() const { return live_; }
   unsigned state(int number) const;
 

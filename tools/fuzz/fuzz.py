@@ -12,6 +12,7 @@ made as short as it can be, and printed as C++ that stands alone. Exit status 1 
 import argparse
 import concurrent.futures
 import glob
+import itertools
 import json
 import os
 import subprocess
@@ -26,8 +27,8 @@ ROOT = source.ROOT
 IN_A_RUN = 2000  # programs
 
 
-class Variant:
-    """A library, and the program that runs against it."""
+class Called:
+    """A library whose intrinsics are called, by a program that makes up programs."""
 
     def __init__(self, label, program, library=None, preload=None):
         self.label, self.program = label, program
@@ -44,110 +45,123 @@ class Variant:
         return self.run("run", 0, 0, 0).returncode != 77
 
     def numbers(self, seed, first, count):
-        """Program -> its number or how it ended, and what was called."""
+        """Program -> its number or how it ended; the number of calls, and of intrinsics; which were called."""
         result = self.run("run", seed, first, count)
         lines = [line.split() for line in result.stdout.splitlines()[1:]]
         numbers = {int(words[0]): words[1] for words in lines if words[0].isdigit()}
         if result.returncode:
-            numbers[first + len(numbers)] = f"ended with {result.returncode}: {result.stderr.strip()[-300:]}"
+            numbers[first + len(numbers)] = ending(result)
         told = {words[0]: int(words[1]) for words in lines if words[0] in ("steps", "of")}
         return numbers, told, {words[1] for words in lines if words[0] == "called"}
 
     def steps(self, seed, program, kept=()):
-        """(step, number after it, intrinsic) of each, and how the program ended."""
+        """(step, number after it, intrinsic) of each; the last has no number if the program crashed."""
         result = self.run("steps", seed, program, *kept)
-        lines = [line.split() for line in result.stdout.splitlines()]
-        return [(int(step), number, name) for step, number, name in lines], result.returncode
+        steps = [(int(step), number, name) for step, number, name in map(str.split, result.stdout.splitlines())]
+        return steps + [(-1, ending(result), "")] if result.returncode else steps
+
+    def number(self, seed, program, kept):
+        return self.steps(seed, program, kept)[-1][1]
 
     def values(self, seed, program, kept):
-        result = self.run("values", seed, program, *kept)
-        return dict(line.split() for line in result.stdout.splitlines()), result.returncode
+        return dict(map(str.split, self.run("values", seed, program, *kept).stdout.splitlines()))
 
     def show(self, seed, program, kept=()):
         return json.loads(self.run("show", seed, program, *kept).stdout)
 
 
-def variants_of(build):
-    """Those of a build directory. The first is the library as shipped."""
+def ending(result):
+    return f"ended with status {result.returncode} {result.stderr.strip()[-300:]}"
+
+
+class Inlined:
+    """A static library, whose intrinsics the compiler that built it inlines into programs."""
+
+    def __init__(self, label, settings, reference):
+        self.label, self.settings, self.reference = label, settings, reference
+
+    def numbers(self, seed, programs):
+        """Program -> its number, of the given ones: program -> the steps that are kept, none for all."""
+        settings = self.settings
+        with tempfile.TemporaryDirectory() as directory:
+            text, made = (os.path.join(directory, name) for name in ("programs.cpp", "programs"))
+            with open(text, "w", encoding="utf-8") as file:
+                file.write(source.batch({n: self.reference.show(seed, n, kept) for n, kept in programs.items()}))
+            includes = [f"-I{os.path.join(ROOT, directory)}" for directory in ("include", "tests")]
+            result = subprocess.run([settings["compiler"], "-std=c++17", *settings["flags"], *includes, text,
+                                     settings["library"], *settings["link_flags"], "-o", made],
+                                    capture_output=True, text=True, check=False)
+            if result.returncode:
+                raise SystemExit("programs do not compile:\n" + result.stderr[:4000])
+            result = subprocess.run([made], capture_output=True, text=True, check=False)
+        numbers = {int(n): number for n, number in map(str.split, result.stdout.splitlines())}
+        return {n: numbers.get(n, ending(result)) for n in programs}
+
+    def number(self, seed, program, kept):
+        return self.numbers(seed, {program: kept})[program]
+
+
+def called_of(build):
+    """The libraries of a build directory. The first is the one as shipped."""
     name, tests = os.path.basename(os.path.normpath(build)), os.path.join(build, "tests")
     program = os.path.join(tests, "sequences", "kastarri_sequences")
-    found = [Variant(f"{name}, shipped", program)]
+    found = [Called(f"{name} as shipped", program)]
     for library in sorted(glob.glob(os.path.join(tests, "only", "*", "libkastarri.so"))):
         directory = os.path.dirname(library)
-        found.append(Variant(f"{name}, {os.path.basename(directory)}", program, directory))
+        found.append(Called(f"{name} {os.path.basename(directory)}", program, directory))
     if os.path.exists(program + "_static"):
-        found.append(Variant(f"{name}, static", program + "_static"))
-    return [variant for variant in found if variant.is_runnable]
+        found.append(Called(f"{name} static", program + "_static"))
+    return [library for library in found if library.is_runnable]
+
+
+def inlined_of(build, reference):
+    """None or one."""
+    directory = os.path.join(build, "tests", "sequences")
+    program = os.path.join(directory, "kastarri_sequences_static")
+    if not os.path.exists(program) or not Called("", program).is_runnable:
+        return []
+    with open(os.path.join(directory, "inlined.json"), encoding="utf-8") as file:
+        return [Inlined(f"{os.path.basename(os.path.normpath(build))} inlined", json.load(file), reference)]
 
 
 # --- A difference -------------------------------------------------------------------------------------
 
 
-def differ(one, other, seed, program, kept):
-    return one.steps(seed, program, kept) != other.steps(seed, program, kept) if kept else False
-
-
-def shortest(one, other, seed, program):
+def shortest(kept, differs):
     """The steps that it takes to differ: each is left out that can be, from the last to the first."""
-    all_steps, _ = one.steps(seed, program)
-    others, _ = other.steps(seed, program)
-    same = next((i for i, (a, b) in enumerate(zip(all_steps, others)) if a != b), len(others))
-    kept = [step for step, *_ in all_steps[:same + 1]]
-    if not differ(one, other, seed, program, kept):
-        return [step for step, *_ in all_steps]
-    for step in reversed(list(kept)):
+    for step in reversed(kept):
         fewer = [k for k in kept if k != step]
-        if differ(one, other, seed, program, fewer):
+        if fewer and differs(fewer):
             kept = fewer
     return kept
 
 
-def explain(one, other, seed, program):
+def explain(reference, other, seed, program):
     """What differs, as text."""
-    kept = shortest(one, other, seed, program)
-    (steps, _), (others, status) = one.steps(seed, program, kept), other.steps(seed, program, kept)
-    first = next((a for a, b in zip(steps, others) if a != b), steps[len(others)] if len(others) < len(steps) else steps[-1])
-    lines = [f"Program {program} of seed {seed} differs: {one.label} | {other.label}",
-             f"first in step {first[0]}, {first[2]}; it takes {len(kept)} of its steps: {' '.join(map(str, kept))}"]
-    if status:
-        lines.append(f"{other.label} ends with status {status}")
-    here, there = one.values(seed, program, kept)[0], other.values(seed, program, kept)[0]
-    for name, value in here.items():
-        if there and value != there.get(name):
-            lines += difference(name, value, there.get(name, ""))
-    shown = source.snippet(one.show(seed, program, kept))
-    return "\n".join(lines + ["", shown])
+    steps = reference.steps(seed, program)
+    lines = [f"Program {program} of seed {seed} differs: {reference.label} | {other.label}"]
+    kept = [step for step, *_ in steps if step >= 0]
+    if isinstance(other, Called):
+        first = next((i for i, pair in enumerate(itertools.zip_longest(steps, other.steps(seed, program))) if pair[0] != pair[1]), 0)
+        lines.append(f"first in step {steps[first][0]}, {steps[first][2]}")
+        kept = kept[:first + 1]
+    kept = shortest(kept, lambda few: reference.number(seed, program, few) != other.number(seed, program, few))
+    lines.append(f"it takes {len(kept)} of {len(steps)} steps: {' '.join(map(str, kept))}")
+    one, two = reference.number(seed, program, kept), other.number(seed, program, kept)
+    lines.append(f"their numbers: {one} | {two}")
+    if isinstance(other, Called):
+        values = other.values(seed, program, kept)
+        lines += [difference(name, value, values[name]) for name, value in reference.values(seed, program, kept).items()
+                  if value != values.get(name, value)]
+    return "\n".join(lines + ["", source.snippet(reference.show(seed, program, kept))])
 
 
 def difference(name, value, other):
-    """A few bytes around the first that differs."""
-    place = next((i for i, (a, b) in enumerate(zip(value, other)) if a != b), 0) // 2
-    begin = max(0, place - 4)
-    return [f"  {name} from byte {begin} on: {value[2 * begin:2 * begin + 32]} | {other[2 * begin:2 * begin + 32]}"]
-
-
-# --- Inlined ------------------------------------------------------------------------------------------
-
-
-def inlined(build, reference, seed, programs):
-    """Program -> its number, inlined by the compiler and with the library of the build; None if it has no static one."""
-    path = os.path.join(build, "tests", "sequences", "inlined.json")
-    if not os.path.exists(path):
-        return None
-    with open(path, encoding="utf-8") as file:
-        settings = json.load(file)
-    with tempfile.TemporaryDirectory() as directory:
-        text, program = (os.path.join(directory, name) for name in ("programs.cpp", "programs"))
-        with open(text, "w", encoding="utf-8") as file:
-            file.write(source.batch({n: reference.show(seed, n) for n in programs}))
-        includes = [f"-I{os.path.join(ROOT, directory)}" for directory in ("include", "tests")]
-        made = subprocess.run([settings["compiler"], "-std=c++17", *settings["flags"], *includes, text,
-                               settings["library"], *settings["link_flags"], "-o", program],
-                              capture_output=True, text=True, check=False)
-        if made.returncode:
-            raise SystemExit("programs do not compile:\n" + made.stderr[:4000])
-        result = subprocess.run([program], capture_output=True, text=True, check=False)
-        return {int(n): number for n, number in map(str.split, result.stdout.splitlines())}
+    """A few bytes around the first that differs; numbers as they are."""
+    if len(value) < 8 or len(value) != len(other):
+        return f"  {name}: {value} | {other}"
+    begin = max(0, next(i for i, (a, b) in enumerate(zip(value, other)) if a != b) // 2 - 4)
+    return f"  {name} from byte {begin} on: {value[2 * begin:2 * begin + 32]} | {other[2 * begin:2 * begin + 32]}"
 
 
 # --- The run ------------------------------------------------------------------------------------------
@@ -155,44 +169,38 @@ def inlined(build, reference, seed, programs):
 
 class Run:
     def __init__(self, builds, seed):
-        self.builds, self.seed = builds, seed
-        self.variants = [variant for build in builds for variant in variants_of(build)]
-        if not self.variants:
+        self.seed = seed
+        self.called = [library for build in builds for library in called_of(build)]
+        if not self.called:
             raise SystemExit("no library here is for this processor")
-        self.called, self.told = set(), {"steps": 0, "of": 0}
-        self.programs = 0
+        self.reference = self.called[0]
+        self.inlined = [library for build in builds for library in inlined_of(build, self.reference)]
+        self.programs, self.calls, self.seen, self.intrinsics = 0, 0, set(), 0
+        self.programs_inlined = 0
 
-    @property
-    def reference(self):
-        return self.variants[0]
-
-    def compare(self, first, count):
-        """(program, variant) where numbers differ, the first of each variant."""
+    def compare(self, count, inlined):
+        """The next programs: the first that differs of each library, as text. Some are compiled, too."""
+        first = self.programs
         with concurrent.futures.ThreadPoolExecutor(os.cpu_count()) as pool:
-            found = list(pool.map(lambda variant: variant.numbers(self.seed, first, count), self.variants))
-        expected, told, called = found[0]
-        self.called |= called
-        self.told = {"steps": self.told["steps"] + told.get("steps", 0), "of": told.get("of", 0)}
-        self.programs += len(expected)
-        different = []
-        for variant, (numbers, *_) in zip(self.variants[1:], found[1:]):
-            programs = [n for n in expected if numbers.get(n) != expected[n]]
-            different += [(n, variant) for n in programs[:1]]
-        crashed = [(n, self.reference) for n, number in expected.items() if " " in number]
-        return crashed + different
+            found = list(pool.map(lambda library: library.numbers(self.seed, first, count), self.called))
+        expected, told, seen = found[0]
+        found = [numbers for numbers, *_ in found[1:]]
+        if " " in list(expected.values())[-1]:
+            return [explain(self.reference, self.reference, self.seed, first + len(expected) - 1)]
+        self.seen |= seen
+        self.calls, self.intrinsics, self.programs = self.calls + told["steps"], told["of"], first + count
+        some = {n: () for n in range(first, first + min(inlined, count))}
+        if some:
+            self.programs_inlined += len(some)
+            found += [library.numbers(self.seed, some) for library in self.inlined]
+        return [explain(self.reference, library, self.seed, n) for library, numbers in zip(self.called[1:] + self.inlined, found)
+                for n in [n for n in numbers if numbers[n] != expected[n]][:1]]
 
-    def compare_inlined(self, programs):
-        """Text for each build that differs."""
-        expected = {n: self.reference.steps(self.seed, n)[0][-1][1] for n in programs}
-        texts = []
-        for build in self.builds:
-            numbers = inlined(build, self.reference, self.seed, programs)
-            if numbers is None:
-                continue
-            different = [n for n in programs if numbers.get(n) != expected[n]]
-            texts += [f"Inlined with {build}, program {n} of seed {self.seed} differs from calls:\n"
-                      + source.snippet(self.reference.show(self.seed, n)) for n in different[:1]]
-        return texts
+    def summary(self, texts):
+        labels = "; ".join(library.label for library in self.called + (self.inlined if self.programs_inlined else []))
+        return (f"seed {self.seed}: {self.programs} programs, {self.calls} calls of {len(self.seen)} of {self.intrinsics} "
+                f"intrinsics, {self.programs_inlined} programs inlined: {labels}: "
+                + (f"{len(texts)} differ" if texts else "all the same"))
 
 
 def parse(arguments):
@@ -201,8 +209,9 @@ def parse(arguments):
     parser.add_argument("--seconds", type=float, default=60, help="how long (default: %(default)s)")
     parser.add_argument("--seed", type=int, default=1)
     parser.add_argument("--programs", type=int, help="how many, however long it takes")
-    parser.add_argument("--inlined", type=int, default=8, help="how many are compiled with the static library")
-    parser.add_argument("--preload", metavar="LIBRARY", help="one more variant: what is loaded before the first library")
+    parser.add_argument("--inlined", type=int, default=8, metavar="N",
+                        help=f"how many of each {IN_A_RUN} are compiled with the static library (default: %(default)s)")
+    parser.add_argument("--preload", metavar="LIBRARY", help="compare with the first library behind this one, too")
     return parser.parse_args(arguments)
 
 
@@ -210,17 +219,14 @@ def main(arguments=None):
     settings = parse(arguments)
     run = Run(settings.builds, settings.seed)
     if settings.preload:
-        run.variants.append(Variant(f"with {settings.preload}", run.reference.program, preload=settings.preload))
-    begin, texts = time.monotonic(), []
-    while not texts and (run.programs < settings.programs if settings.programs else time.monotonic() - begin < settings.seconds):
-        count = min(IN_A_RUN, settings.programs - run.programs) if settings.programs else IN_A_RUN
-        texts += [explain(run.reference, variant, settings.seed, n) for n, variant in run.compare(run.programs, count)]
-    if settings.inlined and not texts:
-        texts += run.compare_inlined(range(settings.inlined))
-    print(*texts, sep="\n")
-    print(f"seed {settings.seed}: {run.programs} programs, {run.told['steps']} calls of {len(run.called)} of {run.told['of']} "
-          f"intrinsics, {len(run.variants)} libraries ({'; '.join(variant.label for variant in run.variants)}): "
-          + (f"{len(texts)} differ" if texts else "all the same"))
+        run.called.append(Called(settings.preload, run.reference.program, preload=settings.preload))
+    end, texts = time.monotonic() + settings.seconds, []
+    left = settings.programs
+    while not texts and (left > 0 if left is not None else time.monotonic() < end):
+        count = IN_A_RUN if left is None else min(IN_A_RUN, left)
+        texts = run.compare(count, settings.inlined)
+        left = None if left is None else left - count
+    print(*texts, run.summary(texts), sep="\n")
     return 1 if texts else 0
 
 

@@ -81,6 +81,8 @@ def snippet(program):
     text += block([f"print(\"{register['name']}\", &{register['name']}, sizeof {register['name']});" for register in registers])
     if program["pointers"]:
         text += block(["print(\"memory\", memory, sizeof memory);"])
+        text += block([f"std::printf(\"{name} %d\\n\", static_cast<int>(reinterpret_cast<const unsigned char*>({name}) - memory));"
+                       for name in program["pointers"]])
     text += block([f"std::printf(\"{name} %u\\n\", {STATES}.{name});" for name in program["states"]])
     return text + "}\n"
 

@@ -8,8 +8,8 @@ set -euo pipefail
 declare -A packages=(
   [build]="g++-multilib cmake ninja-build python3"
   [demo]="librsvg2-bin"
-  [test]="clang gdb pkg-config chromium chromium-driver libgtest-dev:i386 libbenchmark-dev:i386 libmpfr-dev:i386"
-  [test-64]="clang gdb pkg-config chromium chromium-driver libgtest-dev:amd64 libbenchmark-dev:amd64 libmpfr-dev:amd64"
+  [test]="clang libclang-rt-dev valgrind libc6-dbg:i386 gdb pkg-config chromium chromium-driver libgtest-dev:i386 libbenchmark-dev:i386 libmpfr-dev:i386"
+  [test-64]="clang libclang-rt-dev valgrind gdb pkg-config chromium chromium-driver libgtest-dev:amd64 libbenchmark-dev:amd64 libmpfr-dev:amd64"
   [picture]="chromium chromium-driver"
   [check]="clang-format valgrind libc6-dbg:i386"
 )

@@ -24,9 +24,10 @@ def run(*command, **environment):
 
 class Programs(unittest.TestCase):
     def test_every_library_of_the_build_gives_the_same(self):
-        result = run(FUZZ, BUILD, "--programs", "3000", "--inlined", "4")
+        # Inlined, program 24 of this seed once gathered what the stack held where a predicate was 0 (32 bits, g++).
+        result = run(FUZZ, BUILD, "--programs", "2000", "--seed", "1", "--inlined", "30")
         self.assertEqual(result.returncode, 0, result.stdout)
-        self.assertRegex(result.stdout, r"seed 1: 3000 programs, \d+ calls of (\d+) of \1 intrinsics, .*: all the same\n")
+        self.assertRegex(result.stdout, r"seed 1: 2000 programs, \d+ calls of (\d+) of \1 intrinsics, .*: all the same\n")
 
     def test_a_seed_gives_the_same_programs_wherever_they_begin(self):
         library = fuzz.called_of(BUILD)[0]

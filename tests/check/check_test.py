@@ -3,6 +3,7 @@
 Run as: check_test.py BUILD
 """
 
+import glob
 import os
 import re
 import shutil
@@ -13,7 +14,8 @@ import unittest
 BUILD = sys.argv[1]
 HERE = os.path.dirname(os.path.abspath(__file__))
 CHECKER = os.path.join(BUILD, "bin", "kastarri-check")
-SLIPS, UNINITIALISED = (os.path.join(BUILD, "tests", "check", name) for name in ("slips", "uninitialised"))
+SLIPS, UNINITIALISED, TOUCHED = (os.path.join(BUILD, "tests", "check", name)
+                                 for name in ("slips", "uninitialised", "touched_bytes"))
 
 READ, WRITE = "READ", "WRITE"
 # Mode -> the intrinsic, what it does with how many bytes, and what the sanitizer calls that.
@@ -60,6 +62,12 @@ class Slips(unittest.TestCase):
         """Or what is checked here would be no more than what it does by itself."""
         for mode in "load", "predicated", "gather", "operand":
             self.assertEqual(run(SLIPS, mode).stdout, "finished\n")
+
+    def test_the_bytes_of_every_row_are_those_that_it_touches(self):
+        library, = glob.glob(os.path.join(BUILD, "lib", "kastarri", "check", "*", "libkastarri-check.so"))
+        result = run(TOUCHED, LD_PRELOAD=library)
+        self.assertEqual(result.returncode, 0, result.stdout)
+        self.assertGreater(int(result.stdout.split()[0]), 700)
 
     def test_what_is_no_slip_is_not_reported(self):
         for mode in "clean", "last_byte", "disabled":

@@ -60,6 +60,8 @@ struct Vocabulary {
  private:
   Parameter parameter(const std::string& text, const std::string& name, const worked::Kind& kind);
   void add(const worked::Row& row);
+
+  std::map<std::string, int> type_numbers_, pointer_numbers_;
 };
 const Vocabulary& vocabulary();
 

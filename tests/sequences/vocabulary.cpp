@@ -45,20 +45,6 @@ std::string joined(const std::vector<std::string>& words) {
   return text == "unsigned" ? "unsigned int" : text;
 }
 
-template <class List, class Make>
-int index_in(List& list, const std::string& name, Make make) {
-  const auto name_of = [](const auto& item) {
-    if constexpr (std::is_same_v<std::decay_t<decltype(item)>, std::string>)
-      return item;
-    else
-      return item.name;
-  };
-  const auto found = std::find_if(list.begin(), list.end(), [&](const auto& item) { return name_of(item) == name; });
-  if (found != list.end()) return static_cast<int>(found - list.begin());
-  list.push_back(make());
-  return static_cast<int>(list.size()) - 1;
-}
-
 bool is_usable(const worked::Row& row) {
   const std::string name = row.name;
   const bool divides = row.most_calls < worked::columns;
@@ -74,12 +60,15 @@ Parameter Vocabulary::parameter(const std::string& text, const std::string& name
   if (kind.pointer != Pointer::none) {
     made.what = kind.pointer == Pointer::moving ? Parameter::What::moving_pointer : Parameter::What::fixed_pointer;
     if (text.find("const ") != std::string::npos) made.type = "const " + made.type;
-    made.index = index_in(pointers, made.type, [&] { return made.type; });
+    const auto [found, is_new] = pointer_numbers_.try_emplace(made.type, static_cast<int>(pointers.size()));
+    if (is_new) pointers.push_back(made.type);
+    made.index = found->second;
   } else if (made.type == "immediate" || name == "offset" || name == "increment") {
     made.what = Parameter::What::number;
   } else {
-    const int first = static_cast<int>(types.size()) * in_a_type;
-    made.index = index_in(types, made.type, [&] { return Type{made.type, kind.view, first, {}}; });
+    const auto [found, is_new] = type_numbers_.try_emplace(made.type, static_cast<int>(types.size()));
+    made.index = found->second;
+    if (is_new) types.push_back({made.type, kind.view, made.index * in_a_type, {}});
     made.is_written = kind.role == Role::output;
   }
   return made;

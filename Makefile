@@ -6,6 +6,8 @@
 #   make try           build for one target; test and time one intrinsic (NAME=ADDSNX16)
 #   make mutants       plant faults in all rows and in some rules, and list those that no test finds (MUTANTS=40, SEED=1,
 #                      ONLY= a regular expression of tables and sources)
+#   make fuzz          run random programs of intrinsics against every library (SECONDS=60, SEED=1, ALSO= other build
+#                      directories with the target `sequences`)
 #   make bench         time every intrinsic and write docs/performance.md, a summary, build/performance.md and
 #                      bench/costs.csv, which kastarri-profile reads
 #   make bench-kernels time whole kernels: scalar C, loops that compilers vectorise, calls, inlined
@@ -26,6 +28,7 @@ BITS ?= 32
 PREFIX ?= /usr/local
 MUTANTS ?= 40
 SEED ?= 1
+SECONDS ?= 60
 CMAKE_BUILD = cmake --build --parallel --preset
 
 ifeq ($(BITS),32)
@@ -44,7 +47,7 @@ else
 $(error BITS is $(BITS); known are 32 and 64)
 endif
 
-.PHONY: help demo test try mutants bench bench-kernels docs picture install uninstall package release headers format clean
+.PHONY: help demo test try mutants fuzz bench bench-kernels docs picture install uninstall package release headers format clean
 
 help:
 	@sed -n 's/^#   //p' Makefile
@@ -70,6 +73,12 @@ mutants:
 	cmake --preset mutants
 	$(CMAKE_BUILD) mutants --target kastarri_tests
 	tools/mutants/mutants.py build/mutants --rules $(MUTANTS) --seed $(SEED) --only '$(ONLY)'
+
+fuzz:
+	tools/packages.sh build test$(WIDTH)
+	cmake --preset test$(WIDTH)
+	$(CMAKE_BUILD) test$(WIDTH) --target sequences
+	tools/fuzz/fuzz.py build/test$(WIDTH) $(ALSO) --seconds $(SECONDS) --seed $(SEED)
 
 bench:
 	tools/packages.sh build test$(WIDTH)

@@ -13,8 +13,8 @@ declare -A packages=(
   [install]="help2man"
   [release]="git clang gdb pkg-config"
   [demo]="librsvg2-bin"
-  [test]="clang gdb pkg-config help2man git chromium chromium-driver libgtest-dev:i386 libbenchmark-dev:i386 libmpfr-dev:i386"
-  [test-64]="clang gdb pkg-config help2man git chromium chromium-driver libgtest-dev:amd64 libbenchmark-dev:amd64 libmpfr-dev:amd64"
+  [test]="clang libclang-rt-dev valgrind gdb pkg-config help2man git chromium chromium-driver libc6-dbg:i386 libgtest-dev:i386 libbenchmark-dev:i386 libmpfr-dev:i386"
+  [test-64]="clang libclang-rt-dev valgrind gdb pkg-config help2man git chromium chromium-driver libgtest-dev:amd64 libbenchmark-dev:amd64 libmpfr-dev:amd64"
   [picture]="chromium chromium-driver"
   [check]="clang-format valgrind libc6-dbg:i386"
 )
@@ -29,14 +29,14 @@ declare -A fedora=(
   [libgtest-dev:i386]="gtest-devel.i686" [libbenchmark-dev:i386]="google-benchmark-devel.i686"
   [libmpfr-dev:i386]="mpfr-devel.i686 gmp-devel.i686" [libgtest-dev:amd64]="gtest-devel"
   [libbenchmark-dev:amd64]="google-benchmark-devel" [libmpfr-dev:amd64]="mpfr-devel gmp-devel"
-  [clang-format]="clang-tools-extra" [libc6-dbg:i386]="glibc-debuginfo.i686"
+  [clang-format]="clang-tools-extra" [libc6-dbg:i386]="glibc-debuginfo.i686" [libclang-rt-dev]="compiler-rt"
 )
 declare -A arch=(
   [g++-multilib]="gcc lib32-gcc-libs lib32-glibc" [ninja-build]="ninja" [python3]="python"
   [librsvg2-bin]="librsvg" [pkg-config]="pkgconf" [chromium-driver]="chromium" [clang-format]="clang"
   [libgtest-dev:i386]="aur:lib32-gtest" [libbenchmark-dev:i386]="aur:lib32-benchmark" [libmpfr-dev:i386]="aur:lib32-mpfr lib32-gmp"
   [libgtest-dev:amd64]="gtest" [libbenchmark-dev:amd64]="benchmark" [libmpfr-dev:amd64]="mpfr gmp"
-  [libc6-dbg:i386]="debuginfod"
+  [libc6-dbg:i386]="debuginfod" [libclang-rt-dev]="compiler-rt"
 )
 
 system=

@@ -10,6 +10,7 @@
   static inline void KASTARRI_SEMANTIC(OP)(const Memory* base, const Units* offsets, word* r, \
                                            const Predicate*... predicate) {                   \
     word nowhere = 0;                                                                         \
+    base = anywhere(base);                                                                    \
     gather<O, BITS>(base, offsets, elements(base, nowhere, *predicate...), r);                \
   }
 

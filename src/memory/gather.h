@@ -25,6 +25,15 @@ inline in_memory<Unit>& element(const void* base, Distance from_base) {
                                              static_cast<std::uintptr_t>(from_base));
 }
 
+// The same pointer, from which compilers cannot tell what it points to. Inlined into a kernel they know the array
+// behind a base, and take no distance from it to lead to another object: the word that disabled elements are looked for
+// in.
+template <class M>
+inline M* anywhere(M* base) {
+  asm("" : "+r"(base));
+  return base;
+}
+
 // Which elements there are: all, or those that a predicate enables.
 struct EveryElement {
   Distance at(word offset, int) const { return distance(offset); }

@@ -9,6 +9,7 @@
   static inline void KASTARRI_SEMANTIC(OP)(const Units* v, const Offsets* offsets, Memory* base, \
                                            const Predicate*... predicate) {                      \
     word nowhere = 0;                                                                            \
+    base = anywhere(base);                                                                       \
     scatter<ELEMENT, O, D>(base, offsets, elements(base, nowhere, predicate[FIRST / 32]...),     \
                            v + FIRST * D::bits / 32);                                            \
   }

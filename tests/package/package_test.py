@@ -274,8 +274,9 @@ class DebianPackages(Installed):
 
     def test_the_libc_that_is_asked_for_has_what_the_libraries_use(self):
         number = lambda version: tuple(map(int, version))
-        profiler, = glob.glob(os.path.join(BUILD, "lib", "**", "libkastarri-profile.so"), recursive=True)
-        for package, library in (self.runtime, os.path.join(BUILD, "libkastarri.so")), (self.devel, profiler):
+        tools = glob.glob(os.path.join(BUILD, "lib", "**", "libkastarri-*.so"), recursive=True)
+        self.assertEqual(len(tools), 2, "the profiler's and the checker's")
+        for package, library in [(self.runtime, os.path.join(BUILD, "libkastarri.so")), *((self.devel, tool) for tool in tools)]:
             depends = re.search(r"libc6 \(>= (\d+)\.(\d+)\)", self.fields(package, "Depends")[0])
             used = re.findall(r"GLIBC_(\d+)\.(\d+)", output("objdump", "-p", library))
             self.assertTrue(used)
@@ -291,7 +292,7 @@ class DebianPackages(Installed):
         headers = {"usr/include/" + os.path.relpath(path, os.path.join(ROOT, "include"))
                    for path in glob.glob(os.path.join(ROOT, "include", "**", "*.h"), recursive=True)}
         links = {f"usr/{MULTIARCH}/libkastarri.so", f"usr/{MULTIARCH}/libkastarri_static.a",
-                 "usr/bin/kastarri-port", "usr/share/kastarri/port.json", f"usr/{CMAKE_DIRECTORY}/kastarri-config.cmake",
+                 "usr/bin/kastarri-port", "usr/bin/kastarri-check", "usr/share/kastarri/port.json", f"usr/{CMAKE_DIRECTORY}/kastarri-config.cmake",
                  *(f"usr/{directory}/kastarri.pc" for directory in PKGCONFIG_DIRECTORIES)}
         self.assertEqual((headers | links | documents["libkastarri-dev"]) - set(devel), set(), "missing")
         self.assertEqual(set(runtime) & set(devel), set(), "in both packages")

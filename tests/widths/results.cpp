@@ -6,13 +6,13 @@
 #include <csetjmp>
 #include <csignal>
 #include <cstdio>
-#include <random>
 
 #include "calls.h"
 #include "kastarri/library.h"
 #include "kastarri/state.h"
 #include "support/addresses.h"
-#include "support/operands.h"
+#include "support/numbers.h"
+#include "support/sum.h"
 
 namespace {
 
@@ -22,44 +22,12 @@ using worked::Number;
 using worked::Operand;
 using worked::Role;
 using worked::Row;
-using Random = std::mt19937_64;
 
 auto& processor = cstub_Km_ZNB_Orbis_R5_64k_proc;
 
 // --- What was done ----------------------------------------------------------------------------------
 
-// FNV-1a on words of 64 bits.
-class Sum {
- public:
-  void add(std::uint64_t number) { sum_ = (sum_ ^ number) * 0x100000001B3u; }
-  void add(const void* bytes, std::size_t size) {
-    const auto* from = static_cast<const unsigned char*>(bytes);
-    for (std::size_t i = 0; i < size; i += 8) {
-      std::uint64_t number = 0;
-      std::memcpy(&number, from + i, std::min<std::size_t>(8, size - i));
-      add(number);
-      sum_ ^= sum_ >> 29;
-    }
-  }
-  std::uint64_t value() const { return sum_; }
-
- private:
-  std::uint64_t sum_ = 0xCBF29CE484222325u;
-};
 Sum sum;
-
-// An i386 returns the host's floats in a register of its x87, where a signalling NaN becomes quiet.
-void quieten(unsigned char* image) {
-  unsigned bits;
-  std::memcpy(&bits, image, sizeof bits);
-  if ((bits & 0x7FFFFFFF) > 0x7F800000) bits |= 0x400000;
-  std::memcpy(image, &bits, sizeof bits);
-}
-
-std::size_t bytes_of(const Operand& operand) {
-  const Format& format = operand.view.format;
-  return static_cast<std::size_t>(format.is_predicate ? (format.count + 7) / 8 : format.count * format.container_bytes);
-}
 
 // --- Memory -----------------------------------------------------------------------------------------
 
@@ -101,38 +69,9 @@ void aim(Call& call, unsigned char* place, Random& random) {
 
 // --- Operands ---------------------------------------------------------------------------------------
 
-// Floats by their bits: of any magnitude; about 1, so that sums cancel and round; the ends of the ranges.
-Int a_float(int bits, Random& random) {
-  const int fraction = bits == 16 ? 10 : 23, exponents = bits - 1 - fraction;
-  const Int one = ((Int{1} << (exponents - 1)) - 1) << fraction, unit = Int{1} << fraction;
-  const Int infinity = ((Int{1} << exponents) - 1) << fraction;
-  const Int ends[] = {
-      0, 1, unit - 1, unit, unit + 1, one, infinity - 1, infinity, infinity + 1, infinity + unit / 2 + 5};
-  const Int sign = random() % 2 ? Int{1} << (bits - 1) : 0;
-  const auto any = static_cast<Int>(random() >> 1);
-  switch (random() % 4) {
-    case 0:
-      return any;
-    case 1:
-      return sign + ends[random() % std::size(ends)];
-    case 2:
-      return sign + one + (any % 9 - 4) * unit;
-    default:
-      return sign + one + (any % 7 - 3) * unit + any / 7 % unit;
-  }
-}
-
-void fill_lanes(const Operand& operand, const std::vector<Int>& corners, Random& random) {
-  const Format& format = operand.view.format;
-  for (int i = 0; i < format.count; ++i) {
-    const bool is_float = operand.view.number == Number::half || operand.view.number == Number::single;
-    const std::uint64_t bits = random();
-    const Int value = is_float        ? a_float(format.bits, random)
-                      : bits % 4 == 0 ? corners[random() % corners.size()]
-                      : bits % 4 == 1 ? static_cast<Int>(bits) >> (64 - std::min(64, format.bits / 2 + 1))
-                                      : static_cast<Int>(random());
-    set_lane(format, operand.image, i, value);
-  }
+void fill(const Operand& operand, const std::vector<Int>& corners, Random& random) {
+  const bool is_float = operand.view.number == Number::half || operand.view.number == Number::single;
+  fill_lanes(operand.view.format, is_float, corners, operand.image, random);
 }
 
 void set_states(Random& random) {
@@ -176,14 +115,14 @@ std::uint64_t sum_of(const Row& row, int calls) {
       std::memcpy(middle - seen / 2 + i, &bytes, sizeof bytes);
     }
     for (std::size_t i = 0; i < call.operands.size(); ++i)
-      if (call.operands[i].role != Role::memory) fill_lanes(call.operands[i], corners_of[i], random);
+      if (call.operands[i].role != Role::memory) fill(call.operands[i], corners_of[i], random);
     unsigned char* const place = middle + 4 * (static_cast<int>(random() % 128) - 64);
     aim(call, place, random);
     set_states(random);
     make(call);
     if (std::strncmp(row.prototype, "float ", 6) == 0) quieten(call.operands.back().image);
     for (const Operand& operand : call.operands) {
-      if (operand.role != Role::memory) sum.add(operand.image, bytes_of(operand));
+      if (operand.role != Role::memory) sum.add(operand.image, bytes_of(operand.view.format));
       if (operand.pointer) sum.add(static_cast<std::uint64_t>(std::int64_t{*operand.pointer - place}));
     }
     sum.add(middle - seen / 2, seen);

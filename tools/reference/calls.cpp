@@ -169,12 +169,13 @@ void open_ports(void (*note_event)(const char* event, unsigned value)) {
 
 #define TEXT(...) TEXT_(__VA_ARGS__)
 #define TEXT_(...) #__VA_ARGS__
-#define EXAMPLE(NAME, F, CALLS, ...) \
-  {#NAME, TEXT(__VA_ARGS__), reinterpret_cast<worked::Function>(&F), worked::signature(&F), CALLS},
+#define EXAMPLE(NAME, SHAPE, F, CALLS, ...) \
+  {#NAME, TEXT(__VA_ARGS__), SHAPE, reinterpret_cast<worked::Function>(&F), worked::signature(&F), CALLS},
 #define ENTRY(SYMBOL, SHAPE, ...) \
-  EXAMPLE(SYMBOL, KASTARRI_SYMBOL(SYMBOL), worked::columns, SIG_##SHAPE(SYMBOL, __VA_ARGS__))
+  EXAMPLE(SYMBOL, #SHAPE, KASTARRI_SYMBOL(SYMBOL), worked::columns, SIG_##SHAPE(SYMBOL, __VA_ARGS__))
 // In the last columns divisions would fault.
-#define HELPER(NAME, SHAPE, ...) EXAMPLE(NAME, cstub_Km_ZNB_Orbis_R5_64k_##NAME, 4, SIG_##SHAPE(NAME, __VA_ARGS__))
+#define HELPER(NAME, SHAPE, ...) \
+  EXAMPLE(NAME, #SHAPE, cstub_Km_ZNB_Orbis_R5_64k_##NAME, 4, SIG_##SHAPE(NAME, __VA_ARGS__))
 
 namespace {
 

@@ -31,6 +31,7 @@ struct Signature {
 struct Row {
   const char* name;
   const char* prototype;
+  const char* shape;
   Function function;
   Signature signature;
   int most_calls;

@@ -3,6 +3,9 @@
 #ifndef KASTARRI_TYPES
 #define KASTARRI_TYPES
 
+#include "kastarri/library.h"
+#include "kastarri/replicate.h"
+
 /// The type of every immediate operand.
 typedef int immediate;
 
@@ -137,6 +140,10 @@ class qv_vec2Nx8_ {
   inline qv_vec2Nx8_& operator=(const qv_int8_space::qv_int8_& from);
   inline operator qv_vec2Nx8U_space::qv_vec2Nx8U_() const;
   inline operator qv_int8_space::qv_int8_() const;
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vec2Nx8_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vec2Nx8_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[16];
 };
@@ -167,6 +174,10 @@ class qv_vec2Nx8U_ {
   inline qv_vec2Nx8U_& operator=(const qv_int8U_space::qv_int8U_& from);
   inline operator qv_vec2Nx8_space::qv_vec2Nx8_() const;
   inline operator qv_int8U_space::qv_int8U_() const;
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vec2Nx8U_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vec2Nx8U_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[16];
 };
@@ -205,6 +216,10 @@ class qv_vecNx16_ {
   inline operator qv_int8_space::qv_int8_() const;
   inline operator qv_int16_space::qv_int16_() const;
   inline operator qv_vecNxf16_space::qv_vecNxf16_() const;
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecNx16_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecNx16_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[16];
 };
@@ -244,6 +259,10 @@ class qv_vecNx16U_ {
   inline operator qv_int8U_space::qv_int8U_() const;
   inline operator qv_int16U_space::qv_int16U_() const;
   inline operator qv_vecNxf16_space::qv_vecNxf16_() const;
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecNx16U_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecNx16U_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[16];
 };
@@ -282,6 +301,10 @@ class qv_vecN_2x32v_ {
   inline operator qv_int16_space::qv_int16_() const;
   inline operator qv_int32v_space::qv_int32v_() const;
   inline operator qv_vecN_2xf32_space::qv_vecN_2xf32_() const;
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecN_2x32v_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecN_2x32v_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[16];
 };
@@ -321,6 +344,10 @@ class qv_vecN_2x32Uv_ {
   inline operator qv_int16U_space::qv_int16U_() const;
   inline operator qv_int32Uv_space::qv_int32Uv_() const;
   inline operator qv_vecN_2xf32_space::qv_vecN_2xf32_() const;
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecN_2x32Uv_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecN_2x32Uv_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[16];
 };
@@ -390,6 +417,10 @@ class qv_vecNxf16_ {
   inline operator qv_vecNx16_space::qv_vecNx16_() const;
   inline operator qv_vecNx16U_space::qv_vecNx16U_() const;
   inline operator rkfloat_space::rkfloat_() const;
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecNxf16_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecNxf16_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[16];
 };
@@ -418,6 +449,10 @@ class qv_vecN_2xf32_ {
   inline operator qv_vecN_2x32v_space::qv_vecN_2x32v_() const;
   inline operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_() const;
   inline operator qv_vecN_2xf16_space::qv_vecN_2xf16_() const;
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecN_2xf32_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecN_2xf32_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[16];
 };
@@ -439,6 +474,10 @@ class qv_vecNx8_ {
   inline operator qv_vecNx16_space::qv_vecNx16_() const;
   inline operator qv_vecNx16U_space::qv_vecNx16U_() const;
   inline operator qv_int8_space::qv_int8_() const;
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecNx8_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecNx8_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[8];
 };
@@ -464,6 +503,10 @@ class qv_vecNx8U_ {
   inline operator qv_vecNx16_space::qv_vecNx16_() const;
   inline operator qv_vecNx16U_space::qv_vecNx16U_() const;
   inline operator qv_int8U_space::qv_int8U_() const;
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecNx8U_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecNx8U_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[8];
 };
@@ -485,6 +528,10 @@ class qv_vecN_2x16_ {
   inline operator qv_vecN_2x32v_space::qv_vecN_2x32v_() const;
   inline operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_() const;
   inline operator qv_int16_space::qv_int16_() const;
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecN_2x16_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecN_2x16_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[8];
 };
@@ -510,6 +557,10 @@ class qv_vecN_2x16U_ {
   inline operator qv_vecN_2x32v_space::qv_vecN_2x32v_() const;
   inline operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_() const;
   inline operator qv_int16U_space::qv_int16U_() const;
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecN_2x16U_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecN_2x16U_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[8];
 };
@@ -554,6 +605,10 @@ class qv_vec2Nx24_ {
   inline operator qv_vec2Nx16w_space::qv_vec2Nx16w_() const;
   inline operator qv_vec2Nx16Uw_space::qv_vec2Nx16Uw_() const;
   inline operator qv_wvecspill_space::qv_wvecspill_() const;
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vec2Nx24_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vec2Nx24_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[64];
 };
@@ -578,6 +633,10 @@ class qv_vecNx48_ {
   inline operator qv_vecNx32_space::qv_vecNx32_() const;
   inline operator qv_vecNx32U_space::qv_vecNx32U_() const;
   inline operator qv_wvecspill_space::qv_wvecspill_() const;
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecNx48_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecNx48_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[64];
 };
@@ -730,6 +789,10 @@ class vbool1_ {
   inline operator vboolN_space::vboolN_() const;
   inline operator vbool2N_space::vbool2N_() const;
   inline operator vboolN_2_space::vboolN_2_() const;
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  vbool1_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  vbool1_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned char _[1];
 };
@@ -761,6 +824,10 @@ class rkbool_ {
   inline operator int() const;
   inline operator unsigned int() const;
   inline operator bool() const;
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  rkbool_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  rkbool_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned char _[1];
 };
@@ -789,6 +856,10 @@ class rkbool4_ {
   inline operator unsigned short() const;
   inline operator int() const;
   inline operator unsigned int() const;
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  rkbool4_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  rkbool4_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned char _[1];
 };
@@ -817,6 +888,10 @@ class rkbool8_ {
   inline operator unsigned short() const;
   inline operator int() const;
   inline operator unsigned int() const;
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  rkbool8_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  rkbool8_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned char _[1];
 };
@@ -849,6 +924,10 @@ class qv_int8_ {
   inline operator qv_int8U_space::qv_int8U_() const;
   inline operator qv_int16_space::qv_int16_() const;
   inline operator qv_int32pr_space::qv_int32pr_() const;
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int8_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int8_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned char _[1];
 };
@@ -883,6 +962,10 @@ class qv_int8U_ {
   inline operator qv_int16_space::qv_int16_() const;
   inline operator qv_int16U_space::qv_int16U_() const;
   inline operator qv_int32pr_space::qv_int32pr_() const;
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int8U_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int8U_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned char _[1];
 };
@@ -924,6 +1007,10 @@ class qv_int16_ {
   inline operator qv_int16U_space::qv_int16U_() const;
   inline operator qv_int32pr_space::qv_int32pr_() const;
   inline operator qv_f16_space::qv_f16_() const;
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int16_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int16_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned short _[1];
 };
@@ -966,6 +1053,10 @@ class qv_int16U_ {
   inline operator qv_int16_space::qv_int16_() const;
   inline operator qv_int32pr_space::qv_int32pr_() const;
   inline operator qv_f16_space::qv_f16_() const;
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int16U_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int16U_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned short _[1];
 };
@@ -1011,6 +1102,10 @@ class qv_f16_ {
   inline operator rkfloat_space::rkfloat_() const;
   inline operator qv_int32v_space::qv_int32v_() const;
   inline operator qv_int32Uv_space::qv_int32Uv_() const;
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_f16_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_f16_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned short _[1];
 };
@@ -1050,6 +1145,10 @@ class qv_int24_ {
   inline qv_int24_& operator=(unsigned short from);
   inline qv_int24_& operator=(int from);
   inline qv_int24_& operator=(unsigned int from);
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int24_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int24_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[1];
 };
@@ -1074,6 +1173,10 @@ class qv_int32v_ {
   inline operator qv_int32Uv_space::qv_int32Uv_() const;
   inline operator qv_int32pr_space::qv_int32pr_() const;
   inline operator qv_f16_space::qv_f16_() const;
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int32v_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int32v_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[1];
 };
@@ -1098,6 +1201,10 @@ class qv_int32Uv_ {
   inline operator qv_int32v_space::qv_int32v_() const;
   inline operator qv_int32pr_space::qv_int32pr_() const;
   inline operator qv_f16_space::qv_f16_() const;
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int32Uv_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int32Uv_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[1];
 };
@@ -1132,6 +1239,10 @@ class qv_int32pr_ {
   inline qv_int32pr_& operator=(const qv_int16U_space::qv_int16U_& from);
   inline qv_int32pr_& operator=(const qv_int32v_space::qv_int32v_& from);
   inline qv_int32pr_& operator=(const qv_int32Uv_space::qv_int32Uv_& from);
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int32pr_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int32pr_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[1];
 };
@@ -1149,6 +1260,10 @@ class qv_int48_ {
   inline qv_int48_& operator=(unsigned int from);
   inline qv_int48_& operator=(long long from);
   inline operator qv_int16U_space::qv_int16U_() const;
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int48_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int48_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[2];
 };

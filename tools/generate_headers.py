@@ -98,7 +98,7 @@ def outputs():
                                     types_header(types) + ['#include "kastarri/conversions.h"'],
                                     ["library", "replicate"])}
     headers["lanes"] = header_text("lanes", "The lanes of the register types, for programs that handle them all",
-                                   "src/frame/types.def", lanes_header(types))
+                                   "src/frame/types.def", lanes_header(types), ["library"])
     for name, (title, tables, rows) in families.items():
         body = family_body(rows, lambda row: declaration(row, symbol(row.name)))
         includes = ["library", "types"]

@@ -11,8 +11,8 @@
 
 namespace kastarri {
 
-/// The scalars that registers made from several types of scalar do not take: which of those it is to become, the program
-/// has to say.
+/// The scalars that registers made from several types of scalar do not take: which of those it is to become, the
+/// program has to say.
 template <class Scalar>
 struct not_taken {};
 template <>

@@ -13,6 +13,7 @@ import argparse
 import os
 import sys
 
+import rules
 import short_names
 from declarations import GENERATED, declaration, family_body, header_text
 from read_tables import (FAMILIES, PREFIX, READER, ROOT, about_table, all_rows, keeps_lanes, listed_tables,  # noqa: F401
@@ -20,7 +21,12 @@ from read_tables import (FAMILIES, PREFIX, READER, ROOT, about_table, all_rows, 
 
 DEBUGGER_TABLE = "src/debug/gdb/kastarri_register_types.py"
 
-def types_header(types):
+def types_header(types, rows):
+    """The classes; a member that converts has the rule of its conversion's row."""
+    rule = {row.name: rules.own(row, types) for row in rows}
+
+    def member(declaration, conversion):
+        return f"  {declaration};  ///< {rule['rk_zra32_' + conversion]}"
     body = [
         "/// The type of every immediate operand.",
         "typedef int immediate;",
@@ -34,17 +40,19 @@ def types_header(types):
     ]
     body += [f"namespace {t.name}_space {{ class {t.name}_; }}" for t in types.values()]
     body += ["namespace rkbool2_space {}", "namespace rkbool16_space {}", ""]
-    body += [f"typedef {t.cls} {PREFIX}{t.name};" for t in types.values()] + [""]
     for t in types.values():
-        body += [f"/// {t.about}.", f"namespace {t.name}_space {{",
-                 f"class {t.name}_ {{", " public:", f"  {t.name}_() = default;"]
-        body += [f"  {'explicit ' * source.endswith('&')}inline {t.name}_({source} from);" for source, *_ in t.sources]
-        body += [f"  inline {t.name}_& operator=({source} from);" for source, *_ in t.sources]
-        body += [f"  inline operator {target}() const;" for target, _ in t.targets]
+        body += [f"/// {t.about}.", f"typedef {t.cls} {PREFIX}{t.name};"]
+    for t in types.values():
+        body += ["", f"namespace {t.name}_space {{", f"/// {t.about}.", f"class {t.name}_ {{", " public:",
+                 f"  {t.name}_() = default;  ///< uninitialised"]
+        body += [member(f"{'explicit ' * source.endswith('&')}inline {t.name}_({source} from)", conversion)
+                 for source, conversion, _ in t.sources]
+        body += [member(f"inline {t.name}_& operator=({source} from)", conversion) for source, conversion, _ in t.sources]
+        body += [member(f"inline operator {target}() const", conversion) for target, conversion in t.targets]
         if sum(not source.type.endswith("&") for source in t.sources) > 1:
             body += [f"  {line}" for line in not_taken(t)]
-        body += ["", f"  {t.unit} _[{t.units}];", "};", "}", ""]
-    return body
+        body += ["", f"  {t.unit} _[{t.units}];", "};", "}"]
+    return body + [""]
 
 
 def not_taken(t):
@@ -95,7 +103,7 @@ def conversion_bodies(types):
 def outputs():
     types, families = read_types(), all_rows()
     headers = {"types": header_text("types", "The register types of the core", "src/frame/types.def and conversions.def",
-                                    types_header(types) + ['#include "kastarri/conversions.h"'],
+                                    types_header(types, families["conversions"][2]) + ['#include "kastarri/conversions.h"'],
                                     ["library", "replicate"])}
     headers["lanes"] = header_text("lanes", "The lanes of the register types, for programs that handle them all",
                                    "src/frame/types.def", lanes_header(types), ["library"])

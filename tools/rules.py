@@ -178,28 +178,29 @@ def float_conversion(text, name):
 
 
 def conversion(text, row, types):
-    """A conversion between integers, register to register: by the number and width of the lanes."""
+    """A conversion between registers of bits: by the number and width of the lanes."""
     if not text.startswith("the register's lanes from the source"):
         return text
     source, target = re.search(r"(\w+?)_rtor_(\w+)", read_tables.short_name(row.name)).groups()
     (from_kind, from_bits, from_lanes), (to_kind, to_bits, to_lanes) = (lanes_of(name, types) for name in (source, target))
-    if not (from_kind in "iu" and to_kind in "iu") and not (from_kind == to_kind == "f" and from_bits == to_bits):
-        return text
+    if not from_bits:  # packed lanes have no width of their own
+        return f"lane i = bits {to_bits} i to {to_bits} i + {to_bits - 1} of the source, sign-extended"
+    if not to_bits:
+        return f"lane i of the source in bits {from_bits} i to {from_bits} i + {from_bits - 1}, without gaps"
     which = ("lane i = lane i of the source" if from_lanes == to_lanes > 1 else "the source" if to_lanes == 1 == from_lanes
-             else "every lane = the source" if from_lanes == 1 else "lane 0 of the source" if to_lanes == 1 else None)
-    if not which:
-        return text
+             else f"every {'bit' if to_kind == 'b' else 'lane'} = the source" if from_lanes == 1 else "lane 0 of the source")
     if to_bits < from_bits:
-        return f"{which}, its low {to_bits} bits"
+        return f"{which}, its low {to_bits} bits" if to_bits > 1 else f"{which}, its lowest bit"
     return which + ("" if to_bits == from_bits else ", sign-extended" if from_kind == "i" else ", zero-extended")
 
 
 def lanes_of(name, types):
     """Kind, bits and number of the lanes of a register type or of a host scalar."""
     if name in types:
-        return types[name].lanes if re.match(r"[iufwb]\d+x", types[name].layout) else ("w", 0, 0)
+        kind, bits, lanes = re.fullmatch(r"([iufwb])(\d+)x(\d+)|.*", types[name].layout).groups(default="0")
+        return kind, int(bits), int(lanes)
     match = re.fullmatch(r"(u?)int(\d+)", name)
-    return ("u" if match[1] else "i", int(match[2]), 1) if match else ("f", 32, 1) if name == "float" else ("w", 0, 0)
+    return ("u" if match[1] else "i", int(match[2]), 1) if match else ("f", 32, 1) if name == "float" else ("u", 1, 1)
 
 
 def loading(text, shape):

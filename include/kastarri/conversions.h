@@ -2220,8 +2220,7 @@ KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16Uw_rtor_qv_vec2Nx24(const
     cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw& from);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// lane i = bits 24 i to 24 i + 23 of the source, sign-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_rtor_qv_vec2Nx24(const
     cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill& from);
@@ -2254,8 +2253,7 @@ KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32U_rtor_qv_vecNx48(const
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U& from);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// lane i = bits 48 i to 48 i + 47 of the source, sign-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_rtor_qv_vecNx48(const
     cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill& from);
@@ -2280,240 +2278,193 @@ KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_vecNx32U(const
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& from);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// lane i of the source in bits 24 i to 24 i + 23, without gaps.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_wvecspill(const
     cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& from);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// lane i of the source in bits 48 i to 48 i + 47, without gaps.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_wvecspill(const
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& from);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// every bit = the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_rtor_vboolN(const cstub_Km_ZNB_Orbis_R5_64k_vbool1& from);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// every bit = the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_rtor_vbool2N(const cstub_Km_ZNB_Orbis_R5_64k_vbool1& from);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// every bit = the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_rtor_vboolN_2(const cstub_Km_ZNB_Orbis_R5_64k_vbool1& from);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its lowest bit.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_vbool1(int value);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_vbool1& from);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its lowest bit.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_vbool1(unsigned int value);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT unsigned int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_vbool1& from);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its lowest bit.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_rkbool(char value);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT char
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_int8(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& from);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its lowest bit.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_rkbool(unsigned char value);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT unsigned char
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_uint8(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& from);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its lowest bit.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_rkbool(short value);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT short
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_int16(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& from);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its lowest bit.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_rkbool(unsigned short value);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT unsigned short
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_uint16(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& from);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its lowest bit.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_rkbool(int value);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& from);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its lowest bit.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_rkbool(unsigned int value);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT unsigned int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& from);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_bool_rtor_rkbool(bool value);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source.
 KASTARRI_RESULT bool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_bool(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& from);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its low 4 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool4
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_rkbool4(char value);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT char
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool4_rtor_int8(const cstub_Km_ZNB_Orbis_R5_64k_rkbool4& from);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its low 4 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool4
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_rkbool4(unsigned char value);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT unsigned char
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool4_rtor_uint8(const cstub_Km_ZNB_Orbis_R5_64k_rkbool4& from);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its low 4 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool4
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_rkbool4(short value);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT short
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool4_rtor_int16(const cstub_Km_ZNB_Orbis_R5_64k_rkbool4& from);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its low 4 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool4
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_rkbool4(unsigned short value);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT unsigned short
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool4_rtor_uint16(const cstub_Km_ZNB_Orbis_R5_64k_rkbool4& from);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its low 4 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool4
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_rkbool4(int value);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool4_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_rkbool4& from);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its low 4 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool4
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_rkbool4(unsigned int value);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT unsigned int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool4_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_rkbool4& from);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_rkbool8(char value);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source.
 KASTARRI_RESULT char
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool8_rtor_int8(const cstub_Km_ZNB_Orbis_R5_64k_rkbool8& from);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_rkbool8(unsigned char value);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source.
 KASTARRI_RESULT unsigned char
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool8_rtor_uint8(const cstub_Km_ZNB_Orbis_R5_64k_rkbool8& from);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its low 8 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_rkbool8(short value);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT short
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool8_rtor_int16(const cstub_Km_ZNB_Orbis_R5_64k_rkbool8& from);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its low 8 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_rkbool8(unsigned short value);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT unsigned short
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool8_rtor_uint16(const cstub_Km_ZNB_Orbis_R5_64k_rkbool8& from);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its low 8 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_rkbool8(int value);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool8_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_rkbool8& from);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its low 8 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_rkbool8(unsigned int value);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT unsigned int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool8_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_rkbool8& from);
 
@@ -3016,14 +2967,12 @@ KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int64
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_rtor_qv_int64(const
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& from);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// lane 0 of the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int128
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_rtor_qv_int128(const
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& from);
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// lane 0 of the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int256
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_rtor_qv_int256(const
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& from);
@@ -3740,225 +3689,225 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_rtom_int64(const cstub_Km_ZNB_O
    Table: src/float/conversions.def */
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_vecNx16(const
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_vecNx16U(const
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2x32v(const
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2x32Uv(const
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_vecNxf16(short value);
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT short
+KASTARRI_API short
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_int16(const
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_vecNxf16(unsigned short value);
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT unsigned short
+KASTARRI_API unsigned short
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_uint16(const
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vecNxf16(int value);
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT int
+KASTARRI_API int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_int32(const
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vecNxf16(unsigned int value);
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT unsigned int
+KASTARRI_API unsigned int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_uint32(const
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_float_rtor_qv_vecNxf16(float value);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT float
+KASTARRI_API float
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_float(const
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNxf16(const
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_vecNxf16(const
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_rtor_qv_vecNxf16(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat&
     from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vecN_2xf32(int value);
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT int
+KASTARRI_API int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_int32(const
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vecN_2xf32(unsigned int value);
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT unsigned int
+KASTARRI_API unsigned int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_uint32(const
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2xf32(const
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_vecN_2xf32(const
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_rtor_qv_vecN_2xf32(const
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2xf16(const
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& from);
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_f16
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_qv_f16(signed char value);
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT signed char
+KASTARRI_API signed char
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_f16
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_qv_f16(unsigned char value);
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT unsigned char
+KASTARRI_API unsigned char
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_f16
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_f16(short value);
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT short
+KASTARRI_API short
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_f16
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_f16(unsigned short value);
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT unsigned short
+KASTARRI_API unsigned short
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_f16
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_f16(int value);
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT int
+KASTARRI_API int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_f16
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_f16(unsigned int value);
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT unsigned int
+KASTARRI_API unsigned int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_f16
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_float_rtor_qv_f16(float value);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT float
+KASTARRI_API float
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_float(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_f16
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_f16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_f16
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_f16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U&
     from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_f16
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_rtor_qv_f16(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_f16
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_f16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v&
     from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_f16
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_f16(const
     cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkfloat
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_rkfloat(const
     cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkfloat
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_rkfloat(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& from);
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int32v(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& from);
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int32Uv(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& from);
 
 /* Constructors, assignments and conversion operators of the register types. */

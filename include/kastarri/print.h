@@ -38,6 +38,7 @@ constexpr Form q(int fraction_bits) { return Form{Form::fixed, fraction_bits}; }
 
 namespace print_detail {
 
+// The bits of a lane.
 using Pattern = unsigned long long;
 
 // The register's bytes, and its lanes as in lanes.h.

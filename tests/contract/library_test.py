@@ -132,8 +132,11 @@ class Headers(unittest.TestCase):
         for path in self.headers():
             lines = read(path).splitlines()
             for above, line in zip(lines, lines[1:]):
-                if re.match(r"KASTARRI_(API|RESULT)\b|extern KASTARRI|using|struct|class|typedef (?!struct)|#define (?!KASTARRI_\w+$)", line):
-                    self.assertRegex(above, "^///", f"{path}: {line}")
+                with self.subTest(path=path, line=line):
+                    if re.match(r"(extern )?KASTARRI_(API|RESULT)\b|using|typedef|class", line):
+                        self.assertRegex(above, "^//")
+                    if re.match(r"  (explicit )?inline.*;", line):
+                        self.assertRegex(line, "; +///< ")
 
     def headers(self):
         return sorted(glob.glob(os.path.join(ROOT, "include", "**", "*.h"), recursive=True))

@@ -1827,8 +1827,7 @@ KASTARRI_RESULT qv_vec2Nx24 qv_vec2Nx16w_rtor_qv_vec2Nx24(const qv_vec2Nx16w& fr
 KASTARRI_RESULT qv_vec2Nx24 qv_vec2Nx16Uw_rtor_qv_vec2Nx24(const qv_vec2Nx16Uw& from)
     __asm__("_Z70cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16Uw_rtor_qv_vec2Nx24RKN19qv_vec2Nx16Uw_space14qv_vec2Nx16Uw_E");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// lane i = bits 24 i to 24 i + 23 of the source, sign-extended.
 KASTARRI_RESULT qv_vec2Nx24 qv_wvecspill_rtor_qv_vec2Nx24(const qv_wvecspill& from)
     __asm__("_Z69cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_rtor_qv_vec2Nx24RKN18qv_wvecspill_space13qv_wvecspill_E");
 
@@ -1856,8 +1855,7 @@ KASTARRI_RESULT qv_vecNx48 qv_vecNx32_rtor_qv_vecNx48(const qv_vecNx32& from)
 KASTARRI_RESULT qv_vecNx48 qv_vecNx32U_rtor_qv_vecNx48(const qv_vecNx32U& from)
     __asm__("_Z67cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32U_rtor_qv_vecNx48RKN17qv_vecNx32U_space12qv_vecNx32U_E");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// lane i = bits 48 i to 48 i + 47 of the source, sign-extended.
 KASTARRI_RESULT qv_vecNx48 qv_wvecspill_rtor_qv_vecNx48(const qv_wvecspill& from)
     __asm__("_Z68cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_rtor_qv_vecNx48RKN18qv_wvecspill_space13qv_wvecspill_E");
 
@@ -1877,238 +1875,191 @@ KASTARRI_RESULT qv_vecNx32 qv_vecNx48_rtor_qv_vecNx32(const qv_vecNx48& from)
 KASTARRI_RESULT qv_vecNx32U qv_vecNx48_rtor_qv_vecNx32U(const qv_vecNx48& from)
     __asm__("_Z67cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_vecNx32URKN16qv_vecNx48_space11qv_vecNx48_E");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// lane i of the source in bits 24 i to 24 i + 23, without gaps.
 KASTARRI_RESULT qv_wvecspill qv_vec2Nx24_rtor_qv_wvecspill(const qv_vec2Nx24& from)
     __asm__("_Z69cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_wvecspillRKN17qv_vec2Nx24_space12qv_vec2Nx24_E");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// lane i of the source in bits 48 i to 48 i + 47, without gaps.
 KASTARRI_RESULT qv_wvecspill qv_vecNx48_rtor_qv_wvecspill(const qv_vecNx48& from)
     __asm__("_Z68cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_wvecspillRKN16qv_vecNx48_space11qv_vecNx48_E");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// every bit = the source.
 KASTARRI_RESULT vboolN vbool1_rtor_vboolN(const vbool1& from)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_rtor_vboolNRKN12vbool1_space7vbool1_E");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// every bit = the source.
 KASTARRI_RESULT vbool2N vbool1_rtor_vbool2N(const vbool1& from)
     __asm__("_Z59cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_rtor_vbool2NRKN12vbool1_space7vbool1_E");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// every bit = the source.
 KASTARRI_RESULT vboolN_2 vbool1_rtor_vboolN_2(const vbool1& from)
     __asm__("_Z60cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_rtor_vboolN_2RKN12vbool1_space7vbool1_E");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its lowest bit.
 KASTARRI_RESULT vbool1 int32_rtor_vbool1(int value)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_vbool1i");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT int vbool1_rtor_int32(const vbool1& from)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_rtor_int32RKN12vbool1_space7vbool1_E");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its lowest bit.
 KASTARRI_RESULT vbool1 uint32_rtor_vbool1(unsigned int value)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_vbool1j");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT unsigned int vbool1_rtor_uint32(const vbool1& from)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_rtor_uint32RKN12vbool1_space7vbool1_E");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its lowest bit.
 KASTARRI_RESULT rkbool int8_rtor_rkbool(char value)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_rkboolc");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT char rkbool_rtor_int8(const rkbool& from)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_int8RKN12rkbool_space7rkbool_E");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its lowest bit.
 KASTARRI_RESULT rkbool uint8_rtor_rkbool(unsigned char value)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_rkboolh");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT unsigned char rkbool_rtor_uint8(const rkbool& from)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_uint8RKN12rkbool_space7rkbool_E");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its lowest bit.
 KASTARRI_RESULT rkbool int16_rtor_rkbool(short value)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_rkbools");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT short rkbool_rtor_int16(const rkbool& from)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_int16RKN12rkbool_space7rkbool_E");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its lowest bit.
 KASTARRI_RESULT rkbool uint16_rtor_rkbool(unsigned short value)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_rkboolt");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT unsigned short rkbool_rtor_uint16(const rkbool& from)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_uint16RKN12rkbool_space7rkbool_E");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its lowest bit.
 KASTARRI_RESULT rkbool int32_rtor_rkbool(int value)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_rkbooli");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT int rkbool_rtor_int32(const rkbool& from)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_int32RKN12rkbool_space7rkbool_E");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its lowest bit.
 KASTARRI_RESULT rkbool uint32_rtor_rkbool(unsigned int value)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_rkboolj");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT unsigned int rkbool_rtor_uint32(const rkbool& from)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_uint32RKN12rkbool_space7rkbool_E");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source.
 KASTARRI_RESULT rkbool bool_rtor_rkbool(bool value)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_bool_rtor_rkboolb");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source.
 KASTARRI_RESULT bool rkbool_rtor_bool(const rkbool& from)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_boolRKN12rkbool_space7rkbool_E");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its low 4 bits.
 KASTARRI_RESULT rkbool4 int8_rtor_rkbool4(char value)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_rkbool4c");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT char rkbool4_rtor_int8(const rkbool4& from)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool4_rtor_int8RKN13rkbool4_space8rkbool4_E");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its low 4 bits.
 KASTARRI_RESULT rkbool4 uint8_rtor_rkbool4(unsigned char value)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_rkbool4h");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT unsigned char rkbool4_rtor_uint8(const rkbool4& from)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool4_rtor_uint8RKN13rkbool4_space8rkbool4_E");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its low 4 bits.
 KASTARRI_RESULT rkbool4 int16_rtor_rkbool4(short value)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_rkbool4s");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT short rkbool4_rtor_int16(const rkbool4& from)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool4_rtor_int16RKN13rkbool4_space8rkbool4_E");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its low 4 bits.
 KASTARRI_RESULT rkbool4 uint16_rtor_rkbool4(unsigned short value)
     __asm__("_Z59cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_rkbool4t");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT unsigned short rkbool4_rtor_uint16(const rkbool4& from)
     __asm__("_Z59cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool4_rtor_uint16RKN13rkbool4_space8rkbool4_E");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its low 4 bits.
 KASTARRI_RESULT rkbool4 int32_rtor_rkbool4(int value)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_rkbool4i");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT int rkbool4_rtor_int32(const rkbool4& from)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool4_rtor_int32RKN13rkbool4_space8rkbool4_E");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its low 4 bits.
 KASTARRI_RESULT rkbool4 uint32_rtor_rkbool4(unsigned int value)
     __asm__("_Z59cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_rkbool4j");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT unsigned int rkbool4_rtor_uint32(const rkbool4& from)
     __asm__("_Z59cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool4_rtor_uint32RKN13rkbool4_space8rkbool4_E");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source.
 KASTARRI_RESULT rkbool8 int8_rtor_rkbool8(char value)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_rkbool8c");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source.
 KASTARRI_RESULT char rkbool8_rtor_int8(const rkbool8& from)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool8_rtor_int8RKN13rkbool8_space8rkbool8_E");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source.
 KASTARRI_RESULT rkbool8 uint8_rtor_rkbool8(unsigned char value)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_rkbool8h");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source.
 KASTARRI_RESULT unsigned char rkbool8_rtor_uint8(const rkbool8& from)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool8_rtor_uint8RKN13rkbool8_space8rkbool8_E");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its low 8 bits.
 KASTARRI_RESULT rkbool8 int16_rtor_rkbool8(short value)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_rkbool8s");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT short rkbool8_rtor_int16(const rkbool8& from)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool8_rtor_int16RKN13rkbool8_space8rkbool8_E");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its low 8 bits.
 KASTARRI_RESULT rkbool8 uint16_rtor_rkbool8(unsigned short value)
     __asm__("_Z59cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_rkbool8t");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT unsigned short rkbool8_rtor_uint16(const rkbool8& from)
     __asm__("_Z59cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool8_rtor_uint16RKN13rkbool8_space8rkbool8_E");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its low 8 bits.
 KASTARRI_RESULT rkbool8 int32_rtor_rkbool8(int value)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_rkbool8i");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT int rkbool8_rtor_int32(const rkbool8& from)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool8_rtor_int32RKN13rkbool8_space8rkbool8_E");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, its low 8 bits.
 KASTARRI_RESULT rkbool8 uint32_rtor_rkbool8(unsigned int value)
     __asm__("_Z59cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_rkbool8j");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// the source, zero-extended.
 KASTARRI_RESULT unsigned int rkbool8_rtor_uint32(const rkbool8& from)
     __asm__("_Z59cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool8_rtor_uint32RKN13rkbool8_space8rkbool8_E");
 
@@ -2568,13 +2519,11 @@ KASTARRI_RESULT long long qv_int64_rtor_int64(const qv_int64& from)
 KASTARRI_RESULT qv_int64 qv_vecN_4x64_rtor_qv_int64(const qv_vecN_4x64& from)
     __asm__("_Z66cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_rtor_qv_int64RKN18qv_vecN_4x64_space13qv_vecN_4x64_E");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// lane 0 of the source.
 KASTARRI_RESULT qv_int128 qv_vecN_8x128_rtor_qv_int128(const qv_vecN_8x128& from)
     __asm__("_Z68cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_rtor_qv_int128RKN19qv_vecN_8x128_space14qv_vecN_8x128_E");
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
+/// lane 0 of the source.
 KASTARRI_RESULT qv_int256 qv_vecN_16x256_rtor_qv_int256(const qv_vecN_16x256& from)
     __asm__("_Z69cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_rtor_qv_int256RKN20qv_vecN_16x256_space15qv_vecN_16x256_E");
 
@@ -3175,203 +3124,203 @@ KASTARRI_API void qv_int64_rtom_int64(const qv_int64& value, const long long* ba
    Table: src/float/conversions.def */
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT qv_vecNx16 qv_vecNxf16_rtor_qv_vecNx16(const qv_vecNxf16& from)
+KASTARRI_API qv_vecNx16 qv_vecNxf16_rtor_qv_vecNx16(const qv_vecNxf16& from)
     __asm__("_Z67cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_vecNx16RKN17qv_vecNxf16_space12qv_vecNxf16_E");
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT qv_vecNx16U qv_vecNxf16_rtor_qv_vecNx16U(const qv_vecNxf16& from)
+KASTARRI_API qv_vecNx16U qv_vecNxf16_rtor_qv_vecNx16U(const qv_vecNxf16& from)
     __asm__("_Z68cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_vecNx16URKN17qv_vecNxf16_space12qv_vecNxf16_E");
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT qv_vecN_2x32v qv_vecN_2xf32_rtor_qv_vecN_2x32v(const qv_vecN_2xf32& from)
+KASTARRI_API qv_vecN_2x32v qv_vecN_2xf32_rtor_qv_vecN_2x32v(const qv_vecN_2xf32& from)
     __asm__("_Z72cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2x32vRKN19qv_vecN_2xf32_space14qv_vecN_2xf32_E");
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT qv_vecN_2x32Uv qv_vecN_2xf32_rtor_qv_vecN_2x32Uv(const qv_vecN_2xf32& from)
+KASTARRI_API qv_vecN_2x32Uv qv_vecN_2xf32_rtor_qv_vecN_2x32Uv(const qv_vecN_2xf32& from)
     __asm__("_Z73cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2x32UvRKN19qv_vecN_2xf32_space14qv_vecN_2xf32_E");
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT qv_vecNxf16 int16_rtor_qv_vecNxf16(short value)
+KASTARRI_API qv_vecNxf16 int16_rtor_qv_vecNxf16(short value)
     __asm__("_Z62cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_vecNxf16s");
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT short qv_vecNxf16_rtor_int16(const qv_vecNxf16& from)
+KASTARRI_API short qv_vecNxf16_rtor_int16(const qv_vecNxf16& from)
     __asm__("_Z62cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_int16RKN17qv_vecNxf16_space12qv_vecNxf16_E");
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT qv_vecNxf16 uint16_rtor_qv_vecNxf16(unsigned short value)
+KASTARRI_API qv_vecNxf16 uint16_rtor_qv_vecNxf16(unsigned short value)
     __asm__("_Z63cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_vecNxf16t");
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT unsigned short qv_vecNxf16_rtor_uint16(const qv_vecNxf16& from)
+KASTARRI_API unsigned short qv_vecNxf16_rtor_uint16(const qv_vecNxf16& from)
     __asm__("_Z63cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_uint16RKN17qv_vecNxf16_space12qv_vecNxf16_E");
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT qv_vecNxf16 int32_rtor_qv_vecNxf16(int value)
+KASTARRI_API qv_vecNxf16 int32_rtor_qv_vecNxf16(int value)
     __asm__("_Z62cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vecNxf16i");
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT int qv_vecNxf16_rtor_int32(const qv_vecNxf16& from)
+KASTARRI_API int qv_vecNxf16_rtor_int32(const qv_vecNxf16& from)
     __asm__("_Z62cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_int32RKN17qv_vecNxf16_space12qv_vecNxf16_E");
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT qv_vecNxf16 uint32_rtor_qv_vecNxf16(unsigned int value)
+KASTARRI_API qv_vecNxf16 uint32_rtor_qv_vecNxf16(unsigned int value)
     __asm__("_Z63cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vecNxf16j");
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT unsigned int qv_vecNxf16_rtor_uint32(const qv_vecNxf16& from)
+KASTARRI_API unsigned int qv_vecNxf16_rtor_uint32(const qv_vecNxf16& from)
     __asm__("_Z63cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_uint32RKN17qv_vecNxf16_space12qv_vecNxf16_E");
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT qv_vecNxf16 float_rtor_qv_vecNxf16(float value)
+KASTARRI_API qv_vecNxf16 float_rtor_qv_vecNxf16(float value)
     __asm__("_Z62cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_float_rtor_qv_vecNxf16f");
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT float qv_vecNxf16_rtor_float(const qv_vecNxf16& from)
+KASTARRI_API float qv_vecNxf16_rtor_float(const qv_vecNxf16& from)
     __asm__("_Z62cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_floatRKN17qv_vecNxf16_space12qv_vecNxf16_E");
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT qv_vecNxf16 qv_vecNx16_rtor_qv_vecNxf16(const qv_vecNx16& from)
+KASTARRI_API qv_vecNxf16 qv_vecNx16_rtor_qv_vecNxf16(const qv_vecNx16& from)
     __asm__("_Z67cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNxf16RKN16qv_vecNx16_space11qv_vecNx16_E");
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT qv_vecNxf16 qv_vecNx16U_rtor_qv_vecNxf16(const qv_vecNx16U& from)
+KASTARRI_API qv_vecNxf16 qv_vecNx16U_rtor_qv_vecNxf16(const qv_vecNx16U& from)
     __asm__("_Z68cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_vecNxf16RKN17qv_vecNx16U_space12qv_vecNx16U_E");
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT qv_vecNxf16 rkfloat_rtor_qv_vecNxf16(const rkfloat& from)
+KASTARRI_API qv_vecNxf16 rkfloat_rtor_qv_vecNxf16(const rkfloat& from)
     __asm__("_Z64cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_rtor_qv_vecNxf16RKN13rkfloat_space8rkfloat_E");
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT qv_vecN_2xf32 int32_rtor_qv_vecN_2xf32(int value)
+KASTARRI_API qv_vecN_2xf32 int32_rtor_qv_vecN_2xf32(int value)
     __asm__("_Z64cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vecN_2xf32i");
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT int qv_vecN_2xf32_rtor_int32(const qv_vecN_2xf32& from)
+KASTARRI_API int qv_vecN_2xf32_rtor_int32(const qv_vecN_2xf32& from)
     __asm__("_Z64cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_int32RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_E");
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT qv_vecN_2xf32 uint32_rtor_qv_vecN_2xf32(unsigned int value)
+KASTARRI_API qv_vecN_2xf32 uint32_rtor_qv_vecN_2xf32(unsigned int value)
     __asm__("_Z65cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vecN_2xf32j");
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT unsigned int qv_vecN_2xf32_rtor_uint32(const qv_vecN_2xf32& from)
+KASTARRI_API unsigned int qv_vecN_2xf32_rtor_uint32(const qv_vecN_2xf32& from)
     __asm__("_Z65cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_uint32RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_E");
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT qv_vecN_2xf32 qv_vecN_2x32v_rtor_qv_vecN_2xf32(const qv_vecN_2x32v& from)
+KASTARRI_API qv_vecN_2xf32 qv_vecN_2x32v_rtor_qv_vecN_2xf32(const qv_vecN_2x32v& from)
     __asm__("_Z72cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2xf32RKN19qv_vecN_2x32v_space14qv_vecN_2x32v_E");
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT qv_vecN_2xf32 qv_vecN_2x32Uv_rtor_qv_vecN_2xf32(const qv_vecN_2x32Uv& from)
+KASTARRI_API qv_vecN_2xf32 qv_vecN_2x32Uv_rtor_qv_vecN_2xf32(const qv_vecN_2x32Uv& from)
     __asm__("_Z73cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_vecN_2xf32RKN20qv_vecN_2x32Uv_space15qv_vecN_2x32Uv_E");
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT qv_vecN_2xf32 qv_vecN_2xf16_rtor_qv_vecN_2xf32(const qv_vecN_2xf16& from)
+KASTARRI_API qv_vecN_2xf32 qv_vecN_2xf16_rtor_qv_vecN_2xf32(const qv_vecN_2xf16& from)
     __asm__("_Z72cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_rtor_qv_vecN_2xf32RKN19qv_vecN_2xf16_space14qv_vecN_2xf16_E");
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT qv_vecN_2xf16 qv_vecN_2xf32_rtor_qv_vecN_2xf16(const qv_vecN_2xf32& from)
+KASTARRI_API qv_vecN_2xf16 qv_vecN_2xf32_rtor_qv_vecN_2xf16(const qv_vecN_2xf32& from)
     __asm__("_Z72cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2xf16RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_E");
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT qv_int16 qv_f16_rtor_qv_int16(const qv_f16& from)
+KASTARRI_API qv_int16 qv_f16_rtor_qv_int16(const qv_f16& from)
     __asm__("_Z60cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int16RKN12qv_f16_space7qv_f16_E");
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT qv_int16U qv_f16_rtor_qv_int16U(const qv_f16& from)
+KASTARRI_API qv_int16U qv_f16_rtor_qv_int16U(const qv_f16& from)
     __asm__("_Z61cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int16URKN12qv_f16_space7qv_f16_E");
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT qv_f16 int8_rtor_qv_f16(signed char value)
+KASTARRI_API qv_f16 int8_rtor_qv_f16(signed char value)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_qv_f16a");
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT signed char qv_f16_rtor_int8(const qv_f16& from)
+KASTARRI_API signed char qv_f16_rtor_int8(const qv_f16& from)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_int8RKN12qv_f16_space7qv_f16_E");
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT qv_f16 uint8_rtor_qv_f16(unsigned char value)
+KASTARRI_API qv_f16 uint8_rtor_qv_f16(unsigned char value)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_qv_f16h");
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT unsigned char qv_f16_rtor_uint8(const qv_f16& from)
+KASTARRI_API unsigned char qv_f16_rtor_uint8(const qv_f16& from)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_uint8RKN12qv_f16_space7qv_f16_E");
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT qv_f16 int16_rtor_qv_f16(short value)
+KASTARRI_API qv_f16 int16_rtor_qv_f16(short value)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_f16s");
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT short qv_f16_rtor_int16(const qv_f16& from)
+KASTARRI_API short qv_f16_rtor_int16(const qv_f16& from)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_int16RKN12qv_f16_space7qv_f16_E");
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT qv_f16 uint16_rtor_qv_f16(unsigned short value)
+KASTARRI_API qv_f16 uint16_rtor_qv_f16(unsigned short value)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_f16t");
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT unsigned short qv_f16_rtor_uint16(const qv_f16& from)
+KASTARRI_API unsigned short qv_f16_rtor_uint16(const qv_f16& from)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_uint16RKN12qv_f16_space7qv_f16_E");
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT qv_f16 int32_rtor_qv_f16(int value)
+KASTARRI_API qv_f16 int32_rtor_qv_f16(int value)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_f16i");
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT int qv_f16_rtor_int32(const qv_f16& from)
+KASTARRI_API int qv_f16_rtor_int32(const qv_f16& from)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_int32RKN12qv_f16_space7qv_f16_E");
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT qv_f16 uint32_rtor_qv_f16(unsigned int value)
+KASTARRI_API qv_f16 uint32_rtor_qv_f16(unsigned int value)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_f16j");
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT unsigned int qv_f16_rtor_uint32(const qv_f16& from)
+KASTARRI_API unsigned int qv_f16_rtor_uint32(const qv_f16& from)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_uint32RKN12qv_f16_space7qv_f16_E");
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT qv_f16 float_rtor_qv_f16(float value)
+KASTARRI_API qv_f16 float_rtor_qv_f16(float value)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_float_rtor_qv_f16f");
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT float qv_f16_rtor_float(const qv_f16& from)
+KASTARRI_API float qv_f16_rtor_float(const qv_f16& from)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_floatRKN12qv_f16_space7qv_f16_E");
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT qv_f16 qv_int16_rtor_qv_f16(const qv_int16& from)
+KASTARRI_API qv_f16 qv_int16_rtor_qv_f16(const qv_int16& from)
     __asm__("_Z60cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_f16RKN14qv_int16_space9qv_int16_E");
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT qv_f16 qv_int16U_rtor_qv_f16(const qv_int16U& from)
+KASTARRI_API qv_f16 qv_int16U_rtor_qv_f16(const qv_int16U& from)
     __asm__("_Z61cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_f16RKN15qv_int16U_space10qv_int16U_E");
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT qv_f16 rkfloat_rtor_qv_f16(const rkfloat& from)
+KASTARRI_API qv_f16 rkfloat_rtor_qv_f16(const rkfloat& from)
     __asm__("_Z59cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_rtor_qv_f16RKN13rkfloat_space8rkfloat_E");
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT qv_f16 qv_int32v_rtor_qv_f16(const qv_int32v& from)
+KASTARRI_API qv_f16 qv_int32v_rtor_qv_f16(const qv_int32v& from)
     __asm__("_Z61cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_f16RKN15qv_int32v_space10qv_int32v_E");
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT qv_f16 qv_int32Uv_rtor_qv_f16(const qv_int32Uv& from)
+KASTARRI_API qv_f16 qv_int32Uv_rtor_qv_f16(const qv_int32Uv& from)
     __asm__("_Z62cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_f16RKN16qv_int32Uv_space11qv_int32Uv_E");
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT rkfloat qv_vecNxf16_rtor_rkfloat(const qv_vecNxf16& from)
+KASTARRI_API rkfloat qv_vecNxf16_rtor_rkfloat(const qv_vecNxf16& from)
     __asm__("_Z64cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_rkfloatRKN17qv_vecNxf16_space12qv_vecNxf16_E");
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
-KASTARRI_RESULT rkfloat qv_f16_rtor_rkfloat(const qv_f16& from)
+KASTARRI_API rkfloat qv_f16_rtor_rkfloat(const qv_f16& from)
     __asm__("_Z59cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_rkfloatRKN12qv_f16_space7qv_f16_E");
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT qv_int32v qv_f16_rtor_qv_int32v(const qv_f16& from)
+KASTARRI_API qv_int32v qv_f16_rtor_qv_int32v(const qv_f16& from)
     __asm__("_Z61cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int32vRKN12qv_f16_space7qv_f16_E");
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
-KASTARRI_RESULT qv_int32Uv qv_f16_rtor_qv_int32Uv(const qv_f16& from)
+KASTARRI_API qv_int32Uv qv_f16_rtor_qv_int32Uv(const qv_f16& from)
     __asm__("_Z62cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int32UvRKN12qv_f16_space7qv_f16_E");
 
 #endif

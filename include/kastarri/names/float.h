@@ -12,7 +12,7 @@
 
 /// control: bits 0-1 RoundMode, bits 2-6 StickyEnable, which enables nothing; other bits read as 0 and are
 /// dropped when written.
-KASTARRI_RESULT unsigned scalarfp_RUR_FCR()
+KASTARRI_API unsigned scalarfp_RUR_FCR()
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_RUR_FCRv");
 
 /// control: bits 0-1 RoundMode, bits 2-6 StickyEnable, which enables nothing; other bits read as 0 and are
@@ -22,7 +22,7 @@ KASTARRI_API void scalarfp_WUR_FCR(unsigned value)
 
 /// status: bits 7-11 StickyFlags (inexact, underflow, overflow, division by zero, invalid); other bits read
 /// as 0 and are dropped when written. Flags are cleared in no other way.
-KASTARRI_RESULT unsigned scalarfp_RUR_FSR()
+KASTARRI_API unsigned scalarfp_RUR_FSR()
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_RUR_FSRv");
 
 /// status: bits 7-11 StickyFlags (inexact, underflow, overflow, division by zero, invalid); other bits read
@@ -32,32 +32,32 @@ KASTARRI_API void scalarfp_WUR_FSR(unsigned value)
 
 /// a + b, rounded by RoundMode, with flags. A NaN among the operands is the result, the first one, made
 /// quiet.
-KASTARRI_RESULT qv_f16 scalarfp_ADD_H(const qv_f16& a, const qv_f16& b)
+KASTARRI_API qv_f16 scalarfp_ADD_H(const qv_f16& a, const qv_f16& b)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ADD_HRKN12qv_f16_space7qv_f16_ES2_");
 
 /// a + b, rounded by RoundMode, with flags. A NaN among the operands is the result, the first one, made
 /// quiet.
-KASTARRI_RESULT rkfloat scalarfp_ADD_S(const rkfloat& a, const rkfloat& b)
+KASTARRI_API rkfloat scalarfp_ADD_S(const rkfloat& a, const rkfloat& b)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ADD_SRKN13rkfloat_space8rkfloat_ES2_");
 
 /// a - b, rounded by RoundMode, with flags. A NaN among the operands is the result, the first one, made
 /// quiet.
-KASTARRI_RESULT qv_f16 scalarfp_SUB_H(const qv_f16& a, const qv_f16& b)
+KASTARRI_API qv_f16 scalarfp_SUB_H(const qv_f16& a, const qv_f16& b)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_SUB_HRKN12qv_f16_space7qv_f16_ES2_");
 
 /// a - b, rounded by RoundMode, with flags. A NaN among the operands is the result, the first one, made
 /// quiet.
-KASTARRI_RESULT rkfloat scalarfp_SUB_S(const rkfloat& a, const rkfloat& b)
+KASTARRI_API rkfloat scalarfp_SUB_S(const rkfloat& a, const rkfloat& b)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_SUB_SRKN13rkfloat_space8rkfloat_ES2_");
 
 /// a * b, rounded by RoundMode, with flags. A NaN among the operands is the result, the first one, made
 /// quiet.
-KASTARRI_RESULT qv_f16 scalarfp_MUL_H(const qv_f16& a, const qv_f16& b)
+KASTARRI_API qv_f16 scalarfp_MUL_H(const qv_f16& a, const qv_f16& b)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MUL_HRKN12qv_f16_space7qv_f16_ES2_");
 
 /// a * b, rounded by RoundMode, with flags. A NaN among the operands is the result, the first one, made
 /// quiet.
-KASTARRI_RESULT rkfloat scalarfp_MUL_S(const rkfloat& a, const rkfloat& b)
+KASTARRI_API rkfloat scalarfp_MUL_S(const rkfloat& a, const rkfloat& b)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MUL_SRKN13rkfloat_space8rkfloat_ES2_");
 
 /// acc = acc + a * b, rounded once, by RoundMode. Of several NaNs, a goes before b, b before acc.
@@ -97,66 +97,66 @@ KASTARRI_API void scalarfp_MSUBN_S(rkfloat& acc, const rkfloat& a, const rkfloat
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MSUBN_SRN13rkfloat_space8rkfloat_ERKS0_S3_");
 
 /// a with its sign cleared: bits only, NaNs too.
-KASTARRI_RESULT qv_f16 scalarfp_ABS_H(const qv_f16& a)
+KASTARRI_API qv_f16 scalarfp_ABS_H(const qv_f16& a)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ABS_HRKN12qv_f16_space7qv_f16_E");
 
 /// a with its sign cleared: bits only, NaNs too.
-KASTARRI_RESULT rkfloat scalarfp_ABS_S(const rkfloat& a)
+KASTARRI_API rkfloat scalarfp_ABS_S(const rkfloat& a)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ABS_SRKN13rkfloat_space8rkfloat_E");
 
 /// a with its sign turned: bits only, NaNs too.
-KASTARRI_RESULT qv_f16 scalarfp_NEG_H(const qv_f16& a)
+KASTARRI_API qv_f16 scalarfp_NEG_H(const qv_f16& a)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_NEG_HRKN12qv_f16_space7qv_f16_E");
 
 /// a with its sign turned: bits only, NaNs too.
-KASTARRI_RESULT rkfloat scalarfp_NEG_S(const rkfloat& a)
+KASTARRI_API rkfloat scalarfp_NEG_S(const rkfloat& a)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_NEG_SRKN13rkfloat_space8rkfloat_E");
 
 /// the smaller of a and b; -0 is below +0, a NaN is the result.
-KASTARRI_RESULT qv_f16 scalarfp_MIN_H(const qv_f16& a, const qv_f16& b)
+KASTARRI_API qv_f16 scalarfp_MIN_H(const qv_f16& a, const qv_f16& b)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MIN_HRKN12qv_f16_space7qv_f16_ES2_");
 
 /// the smaller of a and b; -0 is below +0, a NaN is the result.
-KASTARRI_RESULT rkfloat scalarfp_MIN_S(const rkfloat& a, const rkfloat& b)
+KASTARRI_API rkfloat scalarfp_MIN_S(const rkfloat& a, const rkfloat& b)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MIN_SRKN13rkfloat_space8rkfloat_ES2_");
 
 /// the larger of a and b; -0 is below +0, a NaN is the result.
-KASTARRI_RESULT qv_f16 scalarfp_MAX_H(const qv_f16& a, const qv_f16& b)
+KASTARRI_API qv_f16 scalarfp_MAX_H(const qv_f16& a, const qv_f16& b)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MAX_HRKN12qv_f16_space7qv_f16_ES2_");
 
 /// the larger of a and b; -0 is below +0, a NaN is the result.
-KASTARRI_RESULT rkfloat scalarfp_MAX_S(const rkfloat& a, const rkfloat& b)
+KASTARRI_API rkfloat scalarfp_MAX_S(const rkfloat& a, const rkfloat& b)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MAX_SRKN13rkfloat_space8rkfloat_ES2_");
 
 /// the smaller of a and b; -0 is below +0, a number wins over a NaN.
-KASTARRI_RESULT qv_f16 scalarfp_MINNUM_H(const qv_f16& a, const qv_f16& b)
+KASTARRI_API qv_f16 scalarfp_MINNUM_H(const qv_f16& a, const qv_f16& b)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MINNUM_HRKN12qv_f16_space7qv_f16_ES2_");
 
 /// the smaller of a and b; -0 is below +0, a number wins over a NaN.
-KASTARRI_RESULT rkfloat scalarfp_MINNUM_S(const rkfloat& a, const rkfloat& b)
+KASTARRI_API rkfloat scalarfp_MINNUM_S(const rkfloat& a, const rkfloat& b)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MINNUM_SRKN13rkfloat_space8rkfloat_ES2_");
 
 /// the larger of a and b; -0 is below +0, a number wins over a NaN.
-KASTARRI_RESULT qv_f16 scalarfp_MAXNUM_H(const qv_f16& a, const qv_f16& b)
+KASTARRI_API qv_f16 scalarfp_MAXNUM_H(const qv_f16& a, const qv_f16& b)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MAXNUM_HRKN12qv_f16_space7qv_f16_ES2_");
 
 /// the larger of a and b; -0 is below +0, a number wins over a NaN.
-KASTARRI_RESULT rkfloat scalarfp_MAXNUM_S(const rkfloat& a, const rkfloat& b)
+KASTARRI_API rkfloat scalarfp_MAXNUM_S(const rkfloat& a, const rkfloat& b)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MAXNUM_SRKN13rkfloat_space8rkfloat_ES2_");
 
 /// one bit for the class: bits 0-4 -infinity, -normal, -subnormal, -0, +0; bits 5-7 +subnormal, +normal,
 /// +infinity; bit 8 signalling NaN, bit 9 quiet NaN.
-KASTARRI_RESULT unsigned scalarfp_CLSFY_H(const qv_f16& a)
+KASTARRI_API unsigned scalarfp_CLSFY_H(const qv_f16& a)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_CLSFY_HRKN12qv_f16_space7qv_f16_E");
 
 /// one bit for the class: bits 0-4 -infinity, -normal, -subnormal, -0, +0; bits 5-7 +subnormal, +normal,
 /// +infinity; bit 8 signalling NaN, bit 9 quiet NaN.
-KASTARRI_RESULT unsigned scalarfp_CLSFY_S(const rkfloat& a)
+KASTARRI_API unsigned scalarfp_CLSFY_S(const rkfloat& a)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_CLSFY_SRKN13rkfloat_space8rkfloat_E");
 
 /// constant number mod 16: 0, 1, 2, 0.5, 3, 4, 0.25, 10, 0.1, pi, pi/2, 1/pi, e, ln 2, log2 e, sqrt 2,
 /// rounded to nearest.
-KASTARRI_RESULT qv_f16 scalarfp_CONST_H(immediate number)
+KASTARRI_API qv_f16 scalarfp_CONST_H(immediate number)
     KASTARRI_BELOW(16, number)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_CONST_Hi");
 KASTARRI_BELOW_BODY(16, number, qv_f16 scalarfp_CONST_H(immediate number),
@@ -164,7 +164,7 @@ KASTARRI_BELOW_BODY(16, number, qv_f16 scalarfp_CONST_H(immediate number),
 
 /// constant number mod 16: 0, 1, 2, 0.5, 3, 4, 0.25, 10, 0.1, pi, pi/2, 1/pi, e, ln 2, log2 e, sqrt 2,
 /// rounded to nearest.
-KASTARRI_RESULT rkfloat scalarfp_CONST_S(immediate number)
+KASTARRI_API rkfloat scalarfp_CONST_S(immediate number)
     KASTARRI_BELOW(16, number)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_CONST_Si");
 KASTARRI_BELOW_BODY(16, number, rkfloat scalarfp_CONST_S(immediate number),
@@ -172,191 +172,191 @@ KASTARRI_BELOW_BODY(16, number, rkfloat scalarfp_CONST_S(immediate number),
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
-KASTARRI_RESULT rkbool scalarfp_OEQ_H(const qv_f16& a, const qv_f16& b)
+KASTARRI_API rkbool scalarfp_OEQ_H(const qv_f16& a, const qv_f16& b)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OEQ_HRKN12qv_f16_space7qv_f16_ES2_");
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
-KASTARRI_RESULT rkbool scalarfp_OEQ_S(const rkfloat& a, const rkfloat& b)
+KASTARRI_API rkbool scalarfp_OEQ_S(const rkfloat& a, const rkfloat& b)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OEQ_SRKN13rkfloat_space8rkfloat_ES2_");
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
-KASTARRI_RESULT vbool1 scalarfp_OEQA_H(const qv_f16& a, const qv_f16& b)
+KASTARRI_API vbool1 scalarfp_OEQA_H(const qv_f16& a, const qv_f16& b)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OEQA_HRKN12qv_f16_space7qv_f16_ES2_");
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
-KASTARRI_RESULT rkbool scalarfp_OLT_H(const qv_f16& a, const qv_f16& b)
+KASTARRI_API rkbool scalarfp_OLT_H(const qv_f16& a, const qv_f16& b)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OLT_HRKN12qv_f16_space7qv_f16_ES2_");
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
-KASTARRI_RESULT rkbool scalarfp_OLT_S(const rkfloat& a, const rkfloat& b)
+KASTARRI_API rkbool scalarfp_OLT_S(const rkfloat& a, const rkfloat& b)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OLT_SRKN13rkfloat_space8rkfloat_ES2_");
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
-KASTARRI_RESULT vbool1 scalarfp_OLTA_H(const qv_f16& a, const qv_f16& b)
+KASTARRI_API vbool1 scalarfp_OLTA_H(const qv_f16& a, const qv_f16& b)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OLTA_HRKN12qv_f16_space7qv_f16_ES2_");
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
-KASTARRI_RESULT rkbool scalarfp_OLE_H(const qv_f16& a, const qv_f16& b)
+KASTARRI_API rkbool scalarfp_OLE_H(const qv_f16& a, const qv_f16& b)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OLE_HRKN12qv_f16_space7qv_f16_ES2_");
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
-KASTARRI_RESULT rkbool scalarfp_OLE_S(const rkfloat& a, const rkfloat& b)
+KASTARRI_API rkbool scalarfp_OLE_S(const rkfloat& a, const rkfloat& b)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OLE_SRKN13rkfloat_space8rkfloat_ES2_");
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
-KASTARRI_RESULT vbool1 scalarfp_OLEA_H(const qv_f16& a, const qv_f16& b)
+KASTARRI_API vbool1 scalarfp_OLEA_H(const qv_f16& a, const qv_f16& b)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OLEA_HRKN12qv_f16_space7qv_f16_ES2_");
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
-KASTARRI_RESULT rkbool scalarfp_OGT_H(const qv_f16& a, const qv_f16& b)
+KASTARRI_API rkbool scalarfp_OGT_H(const qv_f16& a, const qv_f16& b)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OGT_HRKN12qv_f16_space7qv_f16_ES2_");
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
-KASTARRI_RESULT rkbool scalarfp_OGT_S(const rkfloat& a, const rkfloat& b)
+KASTARRI_API rkbool scalarfp_OGT_S(const rkfloat& a, const rkfloat& b)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OGT_SRKN13rkfloat_space8rkfloat_ES2_");
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
-KASTARRI_RESULT vbool1 scalarfp_OGTA_H(const qv_f16& a, const qv_f16& b)
+KASTARRI_API vbool1 scalarfp_OGTA_H(const qv_f16& a, const qv_f16& b)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OGTA_HRKN12qv_f16_space7qv_f16_ES2_");
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
-KASTARRI_RESULT rkbool scalarfp_OGE_H(const qv_f16& a, const qv_f16& b)
+KASTARRI_API rkbool scalarfp_OGE_H(const qv_f16& a, const qv_f16& b)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OGE_HRKN12qv_f16_space7qv_f16_ES2_");
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
-KASTARRI_RESULT rkbool scalarfp_OGE_S(const rkfloat& a, const rkfloat& b)
+KASTARRI_API rkbool scalarfp_OGE_S(const rkfloat& a, const rkfloat& b)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OGE_SRKN13rkfloat_space8rkfloat_ES2_");
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
-KASTARRI_RESULT vbool1 scalarfp_OGEA_H(const qv_f16& a, const qv_f16& b)
+KASTARRI_API vbool1 scalarfp_OGEA_H(const qv_f16& a, const qv_f16& b)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OGEA_HRKN12qv_f16_space7qv_f16_ES2_");
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
-KASTARRI_RESULT rkbool scalarfp_UEQ_H(const qv_f16& a, const qv_f16& b)
+KASTARRI_API rkbool scalarfp_UEQ_H(const qv_f16& a, const qv_f16& b)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UEQ_HRKN12qv_f16_space7qv_f16_ES2_");
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
-KASTARRI_RESULT rkbool scalarfp_UEQ_S(const rkfloat& a, const rkfloat& b)
+KASTARRI_API rkbool scalarfp_UEQ_S(const rkfloat& a, const rkfloat& b)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UEQ_SRKN13rkfloat_space8rkfloat_ES2_");
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
-KASTARRI_RESULT rkbool scalarfp_ULT_H(const qv_f16& a, const qv_f16& b)
+KASTARRI_API rkbool scalarfp_ULT_H(const qv_f16& a, const qv_f16& b)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULT_HRKN12qv_f16_space7qv_f16_ES2_");
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
-KASTARRI_RESULT rkbool scalarfp_ULT_S(const rkfloat& a, const rkfloat& b)
+KASTARRI_API rkbool scalarfp_ULT_S(const rkfloat& a, const rkfloat& b)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULT_SRKN13rkfloat_space8rkfloat_ES2_");
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
-KASTARRI_RESULT rkbool scalarfp_ULE_H(const qv_f16& a, const qv_f16& b)
+KASTARRI_API rkbool scalarfp_ULE_H(const qv_f16& a, const qv_f16& b)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULE_HRKN12qv_f16_space7qv_f16_ES2_");
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
-KASTARRI_RESULT rkbool scalarfp_ULE_S(const rkfloat& a, const rkfloat& b)
+KASTARRI_API rkbool scalarfp_ULE_S(const rkfloat& a, const rkfloat& b)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULE_SRKN13rkfloat_space8rkfloat_ES2_");
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
-KASTARRI_RESULT rkbool scalarfp_UN_H(const qv_f16& a, const qv_f16& b)
+KASTARRI_API rkbool scalarfp_UN_H(const qv_f16& a, const qv_f16& b)
     __asm__("_Z52cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UN_HRKN12qv_f16_space7qv_f16_ES2_");
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
-KASTARRI_RESULT rkbool scalarfp_UN_S(const rkfloat& a, const rkfloat& b)
+KASTARRI_API rkbool scalarfp_UN_S(const rkfloat& a, const rkfloat& b)
     __asm__("_Z52cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UN_SRKN13rkfloat_space8rkfloat_ES2_");
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
-KASTARRI_RESULT rkbool scalarfp_ULEQ_H(const qv_f16& a, const qv_f16& b)
+KASTARRI_API rkbool scalarfp_ULEQ_H(const qv_f16& a, const qv_f16& b)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULEQ_HRKN12qv_f16_space7qv_f16_ES2_");
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
-KASTARRI_RESULT rkbool scalarfp_ULEQ_S(const rkfloat& a, const rkfloat& b)
+KASTARRI_API rkbool scalarfp_ULEQ_S(const rkfloat& a, const rkfloat& b)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULEQ_SRKN13rkfloat_space8rkfloat_ES2_");
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
-KASTARRI_RESULT rkbool scalarfp_ULTQ_H(const qv_f16& a, const qv_f16& b)
+KASTARRI_API rkbool scalarfp_ULTQ_H(const qv_f16& a, const qv_f16& b)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULTQ_HRKN12qv_f16_space7qv_f16_ES2_");
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
-KASTARRI_RESULT rkbool scalarfp_ULTQ_S(const rkfloat& a, const rkfloat& b)
+KASTARRI_API rkbool scalarfp_ULTQ_S(const rkfloat& a, const rkfloat& b)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULTQ_SRKN13rkfloat_space8rkfloat_ES2_");
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
-KASTARRI_RESULT rkbool scalarfp_UNEQ_H(const qv_f16& a, const qv_f16& b)
+KASTARRI_API rkbool scalarfp_UNEQ_H(const qv_f16& a, const qv_f16& b)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UNEQ_HRKN12qv_f16_space7qv_f16_ES2_");
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
-KASTARRI_RESULT rkbool scalarfp_UNEQ_S(const rkfloat& a, const rkfloat& b)
+KASTARRI_API rkbool scalarfp_UNEQ_S(const rkfloat& a, const rkfloat& b)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UNEQ_SRKN13rkfloat_space8rkfloat_ES2_");
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
-KASTARRI_RESULT vbool1 scalarfp_UNEQA_H(const qv_f16& a, const qv_f16& b)
+KASTARRI_API vbool1 scalarfp_UNEQA_H(const qv_f16& a, const qv_f16& b)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UNEQA_HRKN12qv_f16_space7qv_f16_ES2_");
 
 /// x / 2^(scale mod 32), rounded by RoundMode, with flags.
-KASTARRI_RESULT qv_f16 scalarfp_FLOAT_H(int value, immediate scale)
+KASTARRI_API qv_f16 scalarfp_FLOAT_H(int value, immediate scale)
     KASTARRI_BELOW(32, scale)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_FLOAT_Hii");
 KASTARRI_BELOW_BODY(32, scale, qv_f16 scalarfp_FLOAT_H(int value, immediate scale),
                     cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_FLOAT_H(value, scale))
 
 /// x / 2^(scale mod 32), rounded by RoundMode, with flags.
-KASTARRI_RESULT rkfloat scalarfp_FLOAT_S(int value, immediate scale)
+KASTARRI_API rkfloat scalarfp_FLOAT_S(int value, immediate scale)
     KASTARRI_BELOW(32, scale)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_FLOAT_Sii");
 KASTARRI_BELOW_BODY(32, scale, rkfloat scalarfp_FLOAT_S(int value, immediate scale),
                     cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_FLOAT_S(value, scale))
 
 /// x / 2^(scale mod 32), rounded by RoundMode, with flags.
-KASTARRI_RESULT qv_f16 scalarfp_UFLOAT_H(unsigned int value, immediate scale)
+KASTARRI_API qv_f16 scalarfp_UFLOAT_H(unsigned int value, immediate scale)
     KASTARRI_BELOW(32, scale)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UFLOAT_Hji");
 KASTARRI_BELOW_BODY(32, scale, qv_f16 scalarfp_UFLOAT_H(unsigned int value, immediate scale),
                     cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UFLOAT_H(value, scale))
 
 /// x / 2^(scale mod 32), rounded by RoundMode, with flags.
-KASTARRI_RESULT rkfloat scalarfp_UFLOAT_S(unsigned int value, immediate scale)
+KASTARRI_API rkfloat scalarfp_UFLOAT_S(unsigned int value, immediate scale)
     KASTARRI_BELOW(32, scale)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UFLOAT_Sji");
 KASTARRI_BELOW_BODY(32, scale, rkfloat scalarfp_UFLOAT_S(unsigned int value, immediate scale),
                     cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UFLOAT_S(value, scale))
 
 /// x / 2^(scale mod 16), rounded by RoundMode, with flags.
-KASTARRI_RESULT qv_f16 scalarfp_FLOAT16_H(const qv_int16& a, immediate scale)
+KASTARRI_API qv_f16 scalarfp_FLOAT16_H(const qv_int16& a, immediate scale)
     KASTARRI_BELOW(16, scale)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_FLOAT16_HRKN14qv_int16_space9qv_int16_Ei");
 KASTARRI_BELOW_BODY(16, scale, qv_f16 scalarfp_FLOAT16_H(const qv_int16& a, immediate scale),
                     cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_FLOAT16_H(a, scale))
 
 /// x / 2^(scale mod 16), rounded by RoundMode, with flags.
-KASTARRI_RESULT qv_f16 scalarfp_UFLOAT16_H(const qv_int16U& a, immediate scale)
+KASTARRI_API qv_f16 scalarfp_UFLOAT16_H(const qv_int16U& a, immediate scale)
     KASTARRI_BELOW(16, scale)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UFLOAT16_HRKN15qv_int16U_space10qv_int16U_Ei");
 KASTARRI_BELOW_BODY(16, scale, qv_f16 scalarfp_UFLOAT16_H(const qv_int16U& a, immediate scale),
@@ -364,7 +364,7 @@ KASTARRI_BELOW_BODY(16, scale, qv_f16 scalarfp_UFLOAT16_H(const qv_int16U& a, im
 
 /// a * 2^(scale mod 32) truncated; the bound of the integer where that is out of range, the upper one for a
 /// NaN. Inexact when a fraction is dropped, invalid when out of range.
-KASTARRI_RESULT int scalarfp_TRUNC_H(const qv_f16& a, immediate scale)
+KASTARRI_API int scalarfp_TRUNC_H(const qv_f16& a, immediate scale)
     KASTARRI_BELOW(32, scale)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_TRUNC_HRKN12qv_f16_space7qv_f16_Ei");
 KASTARRI_BELOW_BODY(32, scale, int scalarfp_TRUNC_H(const qv_f16& a, immediate scale),
@@ -372,7 +372,7 @@ KASTARRI_BELOW_BODY(32, scale, int scalarfp_TRUNC_H(const qv_f16& a, immediate s
 
 /// a * 2^(scale mod 32) truncated; the bound of the integer where that is out of range, the upper one for a
 /// NaN. Inexact when a fraction is dropped, invalid when out of range.
-KASTARRI_RESULT int scalarfp_TRUNC_S(const rkfloat& a, immediate scale)
+KASTARRI_API int scalarfp_TRUNC_S(const rkfloat& a, immediate scale)
     KASTARRI_BELOW(32, scale)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_TRUNC_SRKN13rkfloat_space8rkfloat_Ei");
 KASTARRI_BELOW_BODY(32, scale, int scalarfp_TRUNC_S(const rkfloat& a, immediate scale),
@@ -380,7 +380,7 @@ KASTARRI_BELOW_BODY(32, scale, int scalarfp_TRUNC_S(const rkfloat& a, immediate 
 
 /// a * 2^(scale mod 32) truncated; the bound of the integer where that is out of range, the upper one for a
 /// NaN. Inexact when a fraction is dropped, invalid when out of range.
-KASTARRI_RESULT unsigned int scalarfp_UTRUNC_H(const qv_f16& a, immediate scale)
+KASTARRI_API unsigned int scalarfp_UTRUNC_H(const qv_f16& a, immediate scale)
     KASTARRI_BELOW(32, scale)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UTRUNC_HRKN12qv_f16_space7qv_f16_Ei");
 KASTARRI_BELOW_BODY(32, scale, unsigned int scalarfp_UTRUNC_H(const qv_f16& a, immediate scale),
@@ -388,21 +388,21 @@ KASTARRI_BELOW_BODY(32, scale, unsigned int scalarfp_UTRUNC_H(const qv_f16& a, i
 
 /// a * 2^(scale mod 32) truncated; the bound of the integer where that is out of range, the upper one for a
 /// NaN. Inexact when a fraction is dropped, invalid when out of range.
-KASTARRI_RESULT unsigned int scalarfp_UTRUNC_S(const rkfloat& a, immediate scale)
+KASTARRI_API unsigned int scalarfp_UTRUNC_S(const rkfloat& a, immediate scale)
     KASTARRI_BELOW(32, scale)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UTRUNC_SRKN13rkfloat_space8rkfloat_Ei");
 KASTARRI_BELOW_BODY(32, scale, unsigned int scalarfp_UTRUNC_S(const rkfloat& a, immediate scale),
                     cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UTRUNC_S(a, scale))
 
 /// a * 2^(scale mod 16) truncated to 16 bits, otherwise as TRUNC.
-KASTARRI_RESULT qv_int16 scalarfp_TRUNC16_H(const qv_f16& a, immediate scale)
+KASTARRI_API qv_int16 scalarfp_TRUNC16_H(const qv_f16& a, immediate scale)
     KASTARRI_BELOW(16, scale)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_TRUNC16_HRKN12qv_f16_space7qv_f16_Ei");
 KASTARRI_BELOW_BODY(16, scale, qv_int16 scalarfp_TRUNC16_H(const qv_f16& a, immediate scale),
                     cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_TRUNC16_H(a, scale))
 
 /// a * 2^(scale mod 16) truncated to 16 bits, otherwise as UTRUNC.
-KASTARRI_RESULT qv_int16U scalarfp_UTRUNC16_H(const qv_f16& a, immediate scale)
+KASTARRI_API qv_int16U scalarfp_UTRUNC16_H(const qv_f16& a, immediate scale)
     KASTARRI_BELOW(16, scale)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UTRUNC16_HRKN12qv_f16_space7qv_f16_Ei");
 KASTARRI_BELOW_BODY(16, scale, qv_int16U scalarfp_UTRUNC16_H(const qv_f16& a, immediate scale),
@@ -410,82 +410,82 @@ KASTARRI_BELOW_BODY(16, scale, qv_int16U scalarfp_UTRUNC16_H(const qv_f16& a, im
 
 /// a rounded to the nearest integer, ties away from zero. A zero has the sign of a; a NaN is made quiet, a
 /// signalling one is invalid.
-KASTARRI_RESULT qv_f16 scalarfp_FIROUND_H(const qv_f16& a)
+KASTARRI_API qv_f16 scalarfp_FIROUND_H(const qv_f16& a)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_FIROUND_HRKN12qv_f16_space7qv_f16_E");
 
 /// a rounded to the nearest integer, ties away from zero. A zero has the sign of a; a NaN is made quiet, a
 /// signalling one is invalid.
-KASTARRI_RESULT rkfloat scalarfp_FIROUND_S(const rkfloat& a)
+KASTARRI_API rkfloat scalarfp_FIROUND_S(const rkfloat& a)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_FIROUND_SRKN13rkfloat_space8rkfloat_E");
 
 /// a rounded up to an integer. A zero has the sign of a; a NaN is made quiet, a signalling one is invalid.
-KASTARRI_RESULT qv_f16 scalarfp_FICEIL_H(const qv_f16& a)
+KASTARRI_API qv_f16 scalarfp_FICEIL_H(const qv_f16& a)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_FICEIL_HRKN12qv_f16_space7qv_f16_E");
 
 /// a rounded up to an integer. A zero has the sign of a; a NaN is made quiet, a signalling one is invalid.
-KASTARRI_RESULT rkfloat scalarfp_FICEIL_S(const rkfloat& a)
+KASTARRI_API rkfloat scalarfp_FICEIL_S(const rkfloat& a)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_FICEIL_SRKN13rkfloat_space8rkfloat_E");
 
 /// a rounded down to an integer. A zero has the sign of a; a NaN is made quiet, a signalling one is invalid.
-KASTARRI_RESULT qv_f16 scalarfp_FIFLOOR_H(const qv_f16& a)
+KASTARRI_API qv_f16 scalarfp_FIFLOOR_H(const qv_f16& a)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_FIFLOOR_HRKN12qv_f16_space7qv_f16_E");
 
 /// a rounded down to an integer. A zero has the sign of a; a NaN is made quiet, a signalling one is invalid.
-KASTARRI_RESULT rkfloat scalarfp_FIFLOOR_S(const rkfloat& a)
+KASTARRI_API rkfloat scalarfp_FIFLOOR_S(const rkfloat& a)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_FIFLOOR_SRKN13rkfloat_space8rkfloat_E");
 
 /// a rounded toward zero to an integer. A zero has the sign of a; a NaN is made quiet, a signalling one is
 /// invalid.
-KASTARRI_RESULT qv_f16 scalarfp_FITRUNC_H(const qv_f16& a)
+KASTARRI_API qv_f16 scalarfp_FITRUNC_H(const qv_f16& a)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_FITRUNC_HRKN12qv_f16_space7qv_f16_E");
 
 /// a rounded toward zero to an integer. A zero has the sign of a; a NaN is made quiet, a signalling one is
 /// invalid.
-KASTARRI_RESULT rkfloat scalarfp_FITRUNC_S(const rkfloat& a)
+KASTARRI_API rkfloat scalarfp_FITRUNC_S(const rkfloat& a)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_FITRUNC_SRKN13rkfloat_space8rkfloat_E");
 
 /// a rounded to an integer by RoundMode; raises inexact, which the like do not. A zero has the sign of a; a
 /// NaN is made quiet, a signalling one is invalid.
-KASTARRI_RESULT qv_f16 scalarfp_FIRINT_H(const qv_f16& a)
+KASTARRI_API qv_f16 scalarfp_FIRINT_H(const qv_f16& a)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_FIRINT_HRKN12qv_f16_space7qv_f16_E");
 
 /// a rounded to an integer by RoundMode; raises inexact, which the like do not. A zero has the sign of a; a
 /// NaN is made quiet, a signalling one is invalid.
-KASTARRI_RESULT rkfloat scalarfp_FIRINT_S(const rkfloat& a)
+KASTARRI_API rkfloat scalarfp_FIRINT_S(const rkfloat& a)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_FIRINT_SRKN13rkfloat_space8rkfloat_E");
 
 /// of a = +-m * 2^e, 1 <= m < 2: +-m; a zero, infinity or NaN as it is.
-KASTARRI_RESULT qv_f16 scalarfp_NEXP0_H(const qv_f16& a)
+KASTARRI_API qv_f16 scalarfp_NEXP0_H(const qv_f16& a)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_NEXP0_HRKN12qv_f16_space7qv_f16_E");
 
 /// of a = +-m * 2^e, 1 <= m < 2: +-m; a zero, infinity or NaN as it is.
-KASTARRI_RESULT rkfloat scalarfp_NEXP0_S(const rkfloat& a)
+KASTARRI_API rkfloat scalarfp_NEXP0_S(const rkfloat& a)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_NEXP0_SRKN13rkfloat_space8rkfloat_E");
 
 /// of a = +-m * 2^e, 1 <= m < 2: +-m or, for an odd e, +-2m; a zero, infinity or NaN as it is.
-KASTARRI_RESULT qv_f16 scalarfp_NEXP01_H(const qv_f16& a)
+KASTARRI_API qv_f16 scalarfp_NEXP01_H(const qv_f16& a)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_NEXP01_HRKN12qv_f16_space7qv_f16_E");
 
 /// of a = +-m * 2^e, 1 <= m < 2: +-m or, for an odd e, +-2m; a zero, infinity or NaN as it is.
-KASTARRI_RESULT rkfloat scalarfp_NEXP01_S(const rkfloat& a)
+KASTARRI_API rkfloat scalarfp_NEXP01_S(const rkfloat& a)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_NEXP01_SRKN13rkfloat_space8rkfloat_E");
 
 /// 2 to the power: e of a less e of b, clamped to the exponents of normal numbers. The e of a zero, infinity
 /// or NaN is 0.
-KASTARRI_RESULT qv_f16 scalarfp_MKDADJ_H(const qv_f16& a, const qv_f16& b)
+KASTARRI_API qv_f16 scalarfp_MKDADJ_H(const qv_f16& a, const qv_f16& b)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MKDADJ_HRKN12qv_f16_space7qv_f16_ES2_");
 
 /// 2 to the power: e of a less e of b, clamped to the exponents of normal numbers. The e of a zero, infinity
 /// or NaN is 0.
-KASTARRI_RESULT rkfloat scalarfp_MKDADJ_S(const rkfloat& a, const rkfloat& b)
+KASTARRI_API rkfloat scalarfp_MKDADJ_S(const rkfloat& a, const rkfloat& b)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MKDADJ_SRKN13rkfloat_space8rkfloat_ES2_");
 
 /// 2 to the power: half the e of a, rounded down. The e of a zero, infinity or NaN is 0.
-KASTARRI_RESULT qv_f16 scalarfp_MKSADJ_H(const qv_f16& a)
+KASTARRI_API qv_f16 scalarfp_MKSADJ_H(const qv_f16& a)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MKSADJ_HRKN12qv_f16_space7qv_f16_E");
 
 /// 2 to the power: half the e of a, rounded down. The e of a zero, infinity or NaN is 0.
-KASTARRI_RESULT rkfloat scalarfp_MKSADJ_S(const rkfloat& a)
+KASTARRI_API rkfloat scalarfp_MKSADJ_S(const rkfloat& a)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MKSADJ_SRKN13rkfloat_space8rkfloat_E");
 
 /// r = r * 2^(e of a): toward zero and without flags; r stays when either is zero, infinite or a NaN.
@@ -505,11 +505,11 @@ KASTARRI_API void scalarfp_ADDEXPM_S(rkfloat& r, const rkfloat& a)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ADDEXPM_SRN13rkfloat_space8rkfloat_ERKS0_");
 
 /// a.
-KASTARRI_RESULT qv_f16 scalarfp_MOV_H(const qv_f16& a)
+KASTARRI_API qv_f16 scalarfp_MOV_H(const qv_f16& a)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOV_HRKN12qv_f16_space7qv_f16_E");
 
 /// a.
-KASTARRI_RESULT rkfloat scalarfp_MOV_S(const rkfloat& a)
+KASTARRI_API rkfloat scalarfp_MOV_S(const rkfloat& a)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOV_SRKN13rkfloat_space8rkfloat_E");
 
 /// r = a where the boolean is true, else as it was.
@@ -561,19 +561,19 @@ KASTARRI_API void scalarfp_MOVLTZ_S(rkfloat& r, const rkfloat& a, int condition)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVLTZ_SRN13rkfloat_space8rkfloat_ERKS0_i");
 
 /// the bits of a, in the low 16.
-KASTARRI_RESULT unsigned scalarfp_RFR_H(const qv_f16& a)
+KASTARRI_API unsigned scalarfp_RFR_H(const qv_f16& a)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_RFR_HRKN12qv_f16_space7qv_f16_E");
 
 /// the bits of a.
-KASTARRI_RESULT unsigned scalarfp_RFR_S(const rkfloat& a)
+KASTARRI_API unsigned scalarfp_RFR_S(const rkfloat& a)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_RFR_SRKN13rkfloat_space8rkfloat_E");
 
 /// the number whose bits are the low 16.
-KASTARRI_RESULT qv_f16 scalarfp_WFR_H(unsigned bits)
+KASTARRI_API qv_f16 scalarfp_WFR_H(unsigned bits)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_WFR_Hj");
 
 /// the number of the bits.
-KASTARRI_RESULT rkfloat scalarfp_WFR_S(unsigned bits)
+KASTARRI_API rkfloat scalarfp_WFR_S(unsigned bits)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_WFR_Sj");
 
 /* Floating-point arithmetic on vectors of halves (NXF16) and singles (N_2XF32) and on one lane (F16, F32).
@@ -581,19 +581,19 @@ KASTARRI_RESULT rkfloat scalarfp_WFR_S(unsigned bits)
    Table: src/float/arithmetic.def */
 
 /// lane i = a[i] + b[i], rounded by RoundMode, with flags. The first NaN operand is the result, made quiet.
-KASTARRI_RESULT qv_vecNxf16 ZRA_ADDNXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
+KASTARRI_API qv_vecNxf16 ZRA_ADDNXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
     __asm__("_Z52cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDNXF16RKN17qv_vecNxf16_space12qv_vecNxf16_ES2_");
 
 /// lane i = a[i] + b[i], rounded by RoundMode, with flags. The first NaN operand is the result, made quiet.
-KASTARRI_RESULT qv_vecN_2xf32 ZRA_ADDN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
+KASTARRI_API qv_vecN_2xf32 ZRA_ADDN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDN_2XF32RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_ES2_");
 
 /// lane i = a[i] + b[i], rounded by RoundMode, with flags. The first NaN operand is the result, made quiet.
-KASTARRI_RESULT qv_f16 ZRA_ADDF16(const qv_f16& a, const qv_f16& b)
+KASTARRI_API qv_f16 ZRA_ADDF16(const qv_f16& a, const qv_f16& b)
     __asm__("_Z50cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDF16RKN12qv_f16_space7qv_f16_ES2_");
 
 /// lane i = a[i] + b[i], rounded by RoundMode, with flags. The first NaN operand is the result, made quiet.
-KASTARRI_RESULT rkfloat ZRA_ADDF32(const rkfloat& a, const rkfloat& b)
+KASTARRI_API rkfloat ZRA_ADDF32(const rkfloat& a, const rkfloat& b)
     __asm__("_Z50cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDF32RKN13rkfloat_space8rkfloat_ES2_");
 
 /// lane i = a[i] + b[i], rounded by RoundMode, with flags. The first NaN operand is the result, made quiet.
@@ -618,19 +618,19 @@ KASTARRI_API void ZRA_ADDF32T(rkfloat& r, const rkfloat& a, const rkfloat& b, co
     __asm__("_Z51cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDF32TRN13rkfloat_space8rkfloat_ERKS0_S3_RKN12vbool1_space7vbool1_E");
 
 /// lane i = a[i] - b[i], otherwise as ADD.
-KASTARRI_RESULT qv_vecNxf16 ZRA_SUBNXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
+KASTARRI_API qv_vecNxf16 ZRA_SUBNXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
     __asm__("_Z52cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBNXF16RKN17qv_vecNxf16_space12qv_vecNxf16_ES2_");
 
 /// lane i = a[i] - b[i], otherwise as ADD.
-KASTARRI_RESULT qv_vecN_2xf32 ZRA_SUBN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
+KASTARRI_API qv_vecN_2xf32 ZRA_SUBN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBN_2XF32RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_ES2_");
 
 /// lane i = a[i] - b[i], otherwise as ADD.
-KASTARRI_RESULT qv_f16 ZRA_SUBF16(const qv_f16& a, const qv_f16& b)
+KASTARRI_API qv_f16 ZRA_SUBF16(const qv_f16& a, const qv_f16& b)
     __asm__("_Z50cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBF16RKN12qv_f16_space7qv_f16_ES2_");
 
 /// lane i = a[i] - b[i], otherwise as ADD.
-KASTARRI_RESULT rkfloat ZRA_SUBF32(const rkfloat& a, const rkfloat& b)
+KASTARRI_API rkfloat ZRA_SUBF32(const rkfloat& a, const rkfloat& b)
     __asm__("_Z50cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBF32RKN13rkfloat_space8rkfloat_ES2_");
 
 /// lane i = a[i] - b[i], otherwise as ADD. Where predicate bit i is 0, r keeps lane i and raises no flag.
@@ -651,19 +651,19 @@ KASTARRI_API void ZRA_SUBF32T(rkfloat& r, const rkfloat& a, const rkfloat& b, co
     __asm__("_Z51cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBF32TRN13rkfloat_space8rkfloat_ERKS0_S3_RKN12vbool1_space7vbool1_E");
 
 /// lane i = a[i] * b[i], otherwise as ADD.
-KASTARRI_RESULT qv_vecNxf16 ZRA_MULNXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
+KASTARRI_API qv_vecNxf16 ZRA_MULNXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
     __asm__("_Z52cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULNXF16RKN17qv_vecNxf16_space12qv_vecNxf16_ES2_");
 
 /// lane i = a[i] * b[i], otherwise as ADD.
-KASTARRI_RESULT qv_vecN_2xf32 ZRA_MULN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
+KASTARRI_API qv_vecN_2xf32 ZRA_MULN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULN_2XF32RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_ES2_");
 
 /// lane i = a[i] * b[i], otherwise as ADD.
-KASTARRI_RESULT qv_f16 ZRA_MULF16(const qv_f16& a, const qv_f16& b)
+KASTARRI_API qv_f16 ZRA_MULF16(const qv_f16& a, const qv_f16& b)
     __asm__("_Z50cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULF16RKN12qv_f16_space7qv_f16_ES2_");
 
 /// lane i = a[i] * b[i], otherwise as ADD.
-KASTARRI_RESULT rkfloat ZRA_MULF32(const rkfloat& a, const rkfloat& b)
+KASTARRI_API rkfloat ZRA_MULF32(const rkfloat& a, const rkfloat& b)
     __asm__("_Z50cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULF32RKN13rkfloat_space8rkfloat_ES2_");
 
 /// lane i = a[i] * b[i], otherwise as ADD. Where predicate bit i is 0, r keeps lane i and raises no flag.
@@ -764,19 +764,19 @@ KASTARRI_API void ZRA_MULSF32T(rkfloat& acc, const rkfloat& a, const rkfloat& b,
     __asm__("_Z52cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSF32TRN13rkfloat_space8rkfloat_ERKS0_S3_RKN12vbool1_space7vbool1_E");
 
 /// lane i = a[i] without its sign: bits only, NaNs too.
-KASTARRI_RESULT qv_vecNxf16 ZRA_ABSNXF16(const qv_vecNxf16& a)
+KASTARRI_API qv_vecNxf16 ZRA_ABSNXF16(const qv_vecNxf16& a)
     __asm__("_Z52cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSNXF16RKN17qv_vecNxf16_space12qv_vecNxf16_E");
 
 /// lane i = a[i] without its sign: bits only, NaNs too.
-KASTARRI_RESULT qv_vecN_2xf32 ZRA_ABSN_2XF32(const qv_vecN_2xf32& a)
+KASTARRI_API qv_vecN_2xf32 ZRA_ABSN_2XF32(const qv_vecN_2xf32& a)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSN_2XF32RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_E");
 
 /// lane i = a[i] without its sign: bits only, NaNs too.
-KASTARRI_RESULT qv_f16 ZRA_ABSF16(const qv_f16& a)
+KASTARRI_API qv_f16 ZRA_ABSF16(const qv_f16& a)
     __asm__("_Z50cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSF16RKN12qv_f16_space7qv_f16_E");
 
 /// lane i = a[i] without its sign: bits only, NaNs too.
-KASTARRI_RESULT rkfloat ZRA_ABSF32(const rkfloat& a)
+KASTARRI_API rkfloat ZRA_ABSF32(const rkfloat& a)
     __asm__("_Z50cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSF32RKN13rkfloat_space8rkfloat_E");
 
 /// lane i = a[i] without its sign: bits only, NaNs too. Where predicate bit i is 0, r keeps lane i and raises
@@ -800,19 +800,19 @@ KASTARRI_API void ZRA_ABSF32T(rkfloat& r, const rkfloat& a, const vbool1& p)
     __asm__("_Z51cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSF32TRN13rkfloat_space8rkfloat_ERKS0_RKN12vbool1_space7vbool1_E");
 
 /// lane i = a[i] with its sign turned: bits only, NaNs too.
-KASTARRI_RESULT qv_vecNxf16 ZRA_NEGNXF16(const qv_vecNxf16& a)
+KASTARRI_API qv_vecNxf16 ZRA_NEGNXF16(const qv_vecNxf16& a)
     __asm__("_Z52cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGNXF16RKN17qv_vecNxf16_space12qv_vecNxf16_E");
 
 /// lane i = a[i] with its sign turned: bits only, NaNs too.
-KASTARRI_RESULT qv_vecN_2xf32 ZRA_NEGN_2XF32(const qv_vecN_2xf32& a)
+KASTARRI_API qv_vecN_2xf32 ZRA_NEGN_2XF32(const qv_vecN_2xf32& a)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGN_2XF32RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_E");
 
 /// lane i = a[i] with its sign turned: bits only, NaNs too.
-KASTARRI_RESULT qv_f16 ZRA_NEGF16(const qv_f16& a)
+KASTARRI_API qv_f16 ZRA_NEGF16(const qv_f16& a)
     __asm__("_Z50cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGF16RKN12qv_f16_space7qv_f16_E");
 
 /// lane i = a[i] with its sign turned: bits only, NaNs too.
-KASTARRI_RESULT rkfloat ZRA_NEGF32(const rkfloat& a)
+KASTARRI_API rkfloat ZRA_NEGF32(const rkfloat& a)
     __asm__("_Z50cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGF32RKN13rkfloat_space8rkfloat_E");
 
 /// lane i = a[i] with its sign turned: bits only, NaNs too. Where predicate bit i is 0, r keeps lane i and
@@ -836,19 +836,19 @@ KASTARRI_API void ZRA_NEGF32T(rkfloat& r, const rkfloat& a, const vbool1& p)
     __asm__("_Z51cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGF32TRN13rkfloat_space8rkfloat_ERKS0_RKN12vbool1_space7vbool1_E");
 
 /// lane i = the smaller of a[i] and b[i]; -0 is below +0, a NaN is the result.
-KASTARRI_RESULT qv_vecNxf16 ZRA_MINNXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
+KASTARRI_API qv_vecNxf16 ZRA_MINNXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
     __asm__("_Z52cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNXF16RKN17qv_vecNxf16_space12qv_vecNxf16_ES2_");
 
 /// lane i = the smaller of a[i] and b[i]; -0 is below +0, a NaN is the result.
-KASTARRI_RESULT qv_vecN_2xf32 ZRA_MINN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
+KASTARRI_API qv_vecN_2xf32 ZRA_MINN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINN_2XF32RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_ES2_");
 
 /// lane i = the smaller of a[i] and b[i]; -0 is below +0, a NaN is the result.
-KASTARRI_RESULT qv_f16 ZRA_MINF16(const qv_f16& a, const qv_f16& b)
+KASTARRI_API qv_f16 ZRA_MINF16(const qv_f16& a, const qv_f16& b)
     __asm__("_Z50cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINF16RKN12qv_f16_space7qv_f16_ES2_");
 
 /// lane i = the smaller of a[i] and b[i]; -0 is below +0, a NaN is the result.
-KASTARRI_RESULT rkfloat ZRA_MINF32(const rkfloat& a, const rkfloat& b)
+KASTARRI_API rkfloat ZRA_MINF32(const rkfloat& a, const rkfloat& b)
     __asm__("_Z50cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINF32RKN13rkfloat_space8rkfloat_ES2_");
 
 /// lane i = the smaller of a[i] and b[i]; -0 is below +0, a NaN is the result. Where predicate bit i is 0, r
@@ -873,19 +873,19 @@ KASTARRI_API void ZRA_MINF32T(rkfloat& r, const rkfloat& a, const rkfloat& b, co
     __asm__("_Z51cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINF32TRN13rkfloat_space8rkfloat_ERKS0_S3_RKN12vbool1_space7vbool1_E");
 
 /// lane i = the larger of a[i] and b[i]; -0 is below +0, a NaN is the result.
-KASTARRI_RESULT qv_vecNxf16 ZRA_MAXNXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
+KASTARRI_API qv_vecNxf16 ZRA_MAXNXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
     __asm__("_Z52cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNXF16RKN17qv_vecNxf16_space12qv_vecNxf16_ES2_");
 
 /// lane i = the larger of a[i] and b[i]; -0 is below +0, a NaN is the result.
-KASTARRI_RESULT qv_vecN_2xf32 ZRA_MAXN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
+KASTARRI_API qv_vecN_2xf32 ZRA_MAXN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXN_2XF32RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_ES2_");
 
 /// lane i = the larger of a[i] and b[i]; -0 is below +0, a NaN is the result.
-KASTARRI_RESULT qv_f16 ZRA_MAXF16(const qv_f16& a, const qv_f16& b)
+KASTARRI_API qv_f16 ZRA_MAXF16(const qv_f16& a, const qv_f16& b)
     __asm__("_Z50cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXF16RKN12qv_f16_space7qv_f16_ES2_");
 
 /// lane i = the larger of a[i] and b[i]; -0 is below +0, a NaN is the result.
-KASTARRI_RESULT rkfloat ZRA_MAXF32(const rkfloat& a, const rkfloat& b)
+KASTARRI_API rkfloat ZRA_MAXF32(const rkfloat& a, const rkfloat& b)
     __asm__("_Z50cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXF32RKN13rkfloat_space8rkfloat_ES2_");
 
 /// lane i = the larger of a[i] and b[i]; -0 is below +0, a NaN is the result. Where predicate bit i is 0, r
@@ -910,19 +910,19 @@ KASTARRI_API void ZRA_MAXF32T(rkfloat& r, const rkfloat& a, const rkfloat& b, co
     __asm__("_Z51cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXF32TRN13rkfloat_space8rkfloat_ERKS0_S3_RKN12vbool1_space7vbool1_E");
 
 /// lane i = the smaller of a[i] and b[i]; -0 is below +0, a number wins over a NaN.
-KASTARRI_RESULT qv_vecNxf16 ZRA_MINNUMNXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
+KASTARRI_API qv_vecNxf16 ZRA_MINNUMNXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMNXF16RKN17qv_vecNxf16_space12qv_vecNxf16_ES2_");
 
 /// lane i = the smaller of a[i] and b[i]; -0 is below +0, a number wins over a NaN.
-KASTARRI_RESULT qv_vecN_2xf32 ZRA_MINNUMN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
+KASTARRI_API qv_vecN_2xf32 ZRA_MINNUMN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMN_2XF32RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_ES2_");
 
 /// lane i = the smaller of a[i] and b[i]; -0 is below +0, a number wins over a NaN.
-KASTARRI_RESULT qv_f16 ZRA_MINNUMF16(const qv_f16& a, const qv_f16& b)
+KASTARRI_API qv_f16 ZRA_MINNUMF16(const qv_f16& a, const qv_f16& b)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMF16RKN12qv_f16_space7qv_f16_ES2_");
 
 /// lane i = the smaller of a[i] and b[i]; -0 is below +0, a number wins over a NaN.
-KASTARRI_RESULT rkfloat ZRA_MINNUMF32(const rkfloat& a, const rkfloat& b)
+KASTARRI_API rkfloat ZRA_MINNUMF32(const rkfloat& a, const rkfloat& b)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMF32RKN13rkfloat_space8rkfloat_ES2_");
 
 /// lane i = the smaller of a[i] and b[i]; -0 is below +0, a number wins over a NaN. Where predicate bit i is
@@ -948,19 +948,19 @@ KASTARRI_API void ZRA_MINNUMF32T(rkfloat& r, const rkfloat& a, const rkfloat& b,
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMF32TRN13rkfloat_space8rkfloat_ERKS0_S3_RKN12vbool1_space7vbool1_E");
 
 /// lane i = the larger of a[i] and b[i]; -0 is below +0, a number wins over a NaN.
-KASTARRI_RESULT qv_vecNxf16 ZRA_MAXNUMNXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
+KASTARRI_API qv_vecNxf16 ZRA_MAXNUMNXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMNXF16RKN17qv_vecNxf16_space12qv_vecNxf16_ES2_");
 
 /// lane i = the larger of a[i] and b[i]; -0 is below +0, a number wins over a NaN.
-KASTARRI_RESULT qv_vecN_2xf32 ZRA_MAXNUMN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
+KASTARRI_API qv_vecN_2xf32 ZRA_MAXNUMN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMN_2XF32RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_ES2_");
 
 /// lane i = the larger of a[i] and b[i]; -0 is below +0, a number wins over a NaN.
-KASTARRI_RESULT qv_f16 ZRA_MAXNUMF16(const qv_f16& a, const qv_f16& b)
+KASTARRI_API qv_f16 ZRA_MAXNUMF16(const qv_f16& a, const qv_f16& b)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMF16RKN12qv_f16_space7qv_f16_ES2_");
 
 /// lane i = the larger of a[i] and b[i]; -0 is below +0, a number wins over a NaN.
-KASTARRI_RESULT rkfloat ZRA_MAXNUMF32(const rkfloat& a, const rkfloat& b)
+KASTARRI_API rkfloat ZRA_MAXNUMF32(const rkfloat& a, const rkfloat& b)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMF32RKN13rkfloat_space8rkfloat_ES2_");
 
 /// lane i = the larger of a[i] and b[i]; -0 is below +0, a number wins over a NaN. Where predicate bit i is
@@ -987,27 +987,27 @@ KASTARRI_API void ZRA_MAXNUMF32T(rkfloat& r, const rkfloat& a, const rkfloat& b,
 
 /// one bit for the class of a[i]: bits 0-4 -infinity, -normal, -subnormal, -0, +0; bits 5-7 +subnormal,
 /// +normal, +infinity; bit 8 signalling NaN, bit 9 quiet NaN.
-KASTARRI_RESULT qv_vecNx16U ZRA_CLSFYNXF16(const qv_vecNxf16& acc)
+KASTARRI_API qv_vecNx16U ZRA_CLSFYNXF16(const qv_vecNxf16& acc)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CLSFYNXF16RKN17qv_vecNxf16_space12qv_vecNxf16_E");
 
 /// one bit for the class of a[i]: bits 0-4 -infinity, -normal, -subnormal, -0, +0; bits 5-7 +subnormal,
 /// +normal, +infinity; bit 8 signalling NaN, bit 9 quiet NaN.
-KASTARRI_RESULT qv_vecN_2x32Uv ZRA_CLSFYN_2XF32(const qv_vecN_2xf32& acc)
+KASTARRI_API qv_vecN_2x32Uv ZRA_CLSFYN_2XF32(const qv_vecN_2xf32& acc)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CLSFYN_2XF32RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_E");
 
 /// one bit for the class of a[i]: bits 0-4 -infinity, -normal, -subnormal, -0, +0; bits 5-7 +subnormal,
 /// +normal, +infinity; bit 8 signalling NaN, bit 9 quiet NaN.
-KASTARRI_RESULT qv_int16U ZRA_CLSFYF16(const qv_f16& acc)
+KASTARRI_API qv_int16U ZRA_CLSFYF16(const qv_f16& acc)
     __asm__("_Z52cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CLSFYF16RKN12qv_f16_space7qv_f16_E");
 
 /// one bit for the class of a[i]: bits 0-4 -infinity, -normal, -subnormal, -0, +0; bits 5-7 +subnormal,
 /// +normal, +infinity; bit 8 signalling NaN, bit 9 quiet NaN.
-KASTARRI_RESULT qv_int32Uv ZRA_CLSFYF32(const rkfloat& acc)
+KASTARRI_API qv_int32Uv ZRA_CLSFYF32(const rkfloat& acc)
     __asm__("_Z52cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CLSFYF32RKN13rkfloat_space8rkfloat_E");
 
 /// every lane = constant number mod 16: 0, 1, 2, 0.5, 3, 4, 0.25, 10, 0.1, pi, pi/2, 1/pi, e, ln 2, log2 e,
 /// sqrt 2, rounded to nearest.
-KASTARRI_RESULT qv_vecNxf16 ZRA_CONSTNXF16(immediate number)
+KASTARRI_API qv_vecNxf16 ZRA_CONSTNXF16(immediate number)
     KASTARRI_BELOW(16, number)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CONSTNXF16i");
 KASTARRI_BELOW_BODY(16, number, qv_vecNxf16 ZRA_CONSTNXF16(immediate number),
@@ -1015,7 +1015,7 @@ KASTARRI_BELOW_BODY(16, number, qv_vecNxf16 ZRA_CONSTNXF16(immediate number),
 
 /// every lane = constant number mod 16: 0, 1, 2, 0.5, 3, 4, 0.25, 10, 0.1, pi, pi/2, 1/pi, e, ln 2, log2 e,
 /// sqrt 2, rounded to nearest.
-KASTARRI_RESULT qv_vecN_2xf32 ZRA_CONSTN_2XF32(immediate number)
+KASTARRI_API qv_vecN_2xf32 ZRA_CONSTN_2XF32(immediate number)
     KASTARRI_BELOW(16, number)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CONSTN_2XF32i");
 KASTARRI_BELOW_BODY(16, number, qv_vecN_2xf32 ZRA_CONSTN_2XF32(immediate number),
@@ -1023,7 +1023,7 @@ KASTARRI_BELOW_BODY(16, number, qv_vecN_2xf32 ZRA_CONSTN_2XF32(immediate number)
 
 /// every lane = constant number mod 16: 0, 1, 2, 0.5, 3, 4, 0.25, 10, 0.1, pi, pi/2, 1/pi, e, ln 2, log2 e,
 /// sqrt 2, rounded to nearest.
-KASTARRI_RESULT qv_f16 ZRA_CONSTF16(immediate number)
+KASTARRI_API qv_f16 ZRA_CONSTF16(immediate number)
     KASTARRI_BELOW(16, number)
     __asm__("_Z52cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CONSTF16i");
 KASTARRI_BELOW_BODY(16, number, qv_f16 ZRA_CONSTF16(immediate number),
@@ -1031,7 +1031,7 @@ KASTARRI_BELOW_BODY(16, number, qv_f16 ZRA_CONSTF16(immediate number),
 
 /// every lane = constant number mod 16: 0, 1, 2, 0.5, 3, 4, 0.25, 10, 0.1, pi, pi/2, 1/pi, e, ln 2, log2 e,
 /// sqrt 2, rounded to nearest.
-KASTARRI_RESULT rkfloat ZRA_CONSTF32(immediate number)
+KASTARRI_API rkfloat ZRA_CONSTF32(immediate number)
     KASTARRI_BELOW(16, number)
     __asm__("_Z52cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CONSTF32i");
 KASTARRI_BELOW_BODY(16, number, rkfloat ZRA_CONSTF32(immediate number),
@@ -1039,90 +1039,90 @@ KASTARRI_BELOW_BODY(16, number, rkfloat ZRA_CONSTF32(immediate number),
 
 /// lane i = a[i] rounded to the nearest integer, ties away from zero. A zero has the sign of a[i]; a NaN is
 /// made quiet, a signalling one is invalid.
-KASTARRI_RESULT qv_vecNxf16 ZRA_FIROUNDNXF16(const qv_vecNxf16& a)
+KASTARRI_API qv_vecNxf16 ZRA_FIROUNDNXF16(const qv_vecNxf16& a)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FIROUNDNXF16RKN17qv_vecNxf16_space12qv_vecNxf16_E");
 
 /// lane i = a[i] rounded to the nearest integer, ties away from zero. A zero has the sign of a[i]; a NaN is
 /// made quiet, a signalling one is invalid.
-KASTARRI_RESULT qv_vecN_2xf32 ZRA_FIROUNDN_2XF32(const qv_vecN_2xf32& a)
+KASTARRI_API qv_vecN_2xf32 ZRA_FIROUNDN_2XF32(const qv_vecN_2xf32& a)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FIROUNDN_2XF32RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_E");
 
 /// lane i = a[i] rounded to the nearest integer, ties away from zero. A zero has the sign of a[i]; a NaN is
 /// made quiet, a signalling one is invalid.
-KASTARRI_RESULT qv_f16 ZRA_FIROUNDF16(const qv_f16& a)
+KASTARRI_API qv_f16 ZRA_FIROUNDF16(const qv_f16& a)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FIROUNDF16RKN12qv_f16_space7qv_f16_E");
 
 /// lane i = a[i] rounded to the nearest integer, ties away from zero. A zero has the sign of a[i]; a NaN is
 /// made quiet, a signalling one is invalid.
-KASTARRI_RESULT rkfloat ZRA_FIROUNDF32(const rkfloat& a)
+KASTARRI_API rkfloat ZRA_FIROUNDF32(const rkfloat& a)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FIROUNDF32RKN13rkfloat_space8rkfloat_E");
 
 /// lane i = a[i] rounded up to an integer, otherwise as FIROUND.
-KASTARRI_RESULT qv_vecNxf16 ZRA_FICEILNXF16(const qv_vecNxf16& a)
+KASTARRI_API qv_vecNxf16 ZRA_FICEILNXF16(const qv_vecNxf16& a)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FICEILNXF16RKN17qv_vecNxf16_space12qv_vecNxf16_E");
 
 /// lane i = a[i] rounded up to an integer, otherwise as FIROUND.
-KASTARRI_RESULT qv_vecN_2xf32 ZRA_FICEILN_2XF32(const qv_vecN_2xf32& a)
+KASTARRI_API qv_vecN_2xf32 ZRA_FICEILN_2XF32(const qv_vecN_2xf32& a)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FICEILN_2XF32RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_E");
 
 /// lane i = a[i] rounded up to an integer, otherwise as FIROUND.
-KASTARRI_RESULT qv_f16 ZRA_FICEILF16(const qv_f16& a)
+KASTARRI_API qv_f16 ZRA_FICEILF16(const qv_f16& a)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FICEILF16RKN12qv_f16_space7qv_f16_E");
 
 /// lane i = a[i] rounded up to an integer, otherwise as FIROUND.
-KASTARRI_RESULT rkfloat ZRA_FICEILF32(const rkfloat& a)
+KASTARRI_API rkfloat ZRA_FICEILF32(const rkfloat& a)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FICEILF32RKN13rkfloat_space8rkfloat_E");
 
 /// lane i = a[i] rounded down to an integer, otherwise as FIROUND.
-KASTARRI_RESULT qv_vecNxf16 ZRA_FIFLOORNXF16(const qv_vecNxf16& a)
+KASTARRI_API qv_vecNxf16 ZRA_FIFLOORNXF16(const qv_vecNxf16& a)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FIFLOORNXF16RKN17qv_vecNxf16_space12qv_vecNxf16_E");
 
 /// lane i = a[i] rounded down to an integer, otherwise as FIROUND.
-KASTARRI_RESULT qv_vecN_2xf32 ZRA_FIFLOORN_2XF32(const qv_vecN_2xf32& a)
+KASTARRI_API qv_vecN_2xf32 ZRA_FIFLOORN_2XF32(const qv_vecN_2xf32& a)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FIFLOORN_2XF32RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_E");
 
 /// lane i = a[i] rounded down to an integer, otherwise as FIROUND.
-KASTARRI_RESULT qv_f16 ZRA_FIFLOORF16(const qv_f16& a)
+KASTARRI_API qv_f16 ZRA_FIFLOORF16(const qv_f16& a)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FIFLOORF16RKN12qv_f16_space7qv_f16_E");
 
 /// lane i = a[i] rounded down to an integer, otherwise as FIROUND.
-KASTARRI_RESULT rkfloat ZRA_FIFLOORF32(const rkfloat& a)
+KASTARRI_API rkfloat ZRA_FIFLOORF32(const rkfloat& a)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FIFLOORF32RKN13rkfloat_space8rkfloat_E");
 
 /// lane i = a[i] rounded toward zero to an integer, otherwise as FIROUND.
-KASTARRI_RESULT qv_vecNxf16 ZRA_FITRUNCNXF16(const qv_vecNxf16& a)
+KASTARRI_API qv_vecNxf16 ZRA_FITRUNCNXF16(const qv_vecNxf16& a)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FITRUNCNXF16RKN17qv_vecNxf16_space12qv_vecNxf16_E");
 
 /// lane i = a[i] rounded toward zero to an integer, otherwise as FIROUND.
-KASTARRI_RESULT qv_vecN_2xf32 ZRA_FITRUNCN_2XF32(const qv_vecN_2xf32& a)
+KASTARRI_API qv_vecN_2xf32 ZRA_FITRUNCN_2XF32(const qv_vecN_2xf32& a)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FITRUNCN_2XF32RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_E");
 
 /// lane i = a[i] rounded toward zero to an integer, otherwise as FIROUND.
-KASTARRI_RESULT qv_f16 ZRA_FITRUNCF16(const qv_f16& a)
+KASTARRI_API qv_f16 ZRA_FITRUNCF16(const qv_f16& a)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FITRUNCF16RKN12qv_f16_space7qv_f16_E");
 
 /// lane i = a[i] rounded toward zero to an integer, otherwise as FIROUND.
-KASTARRI_RESULT rkfloat ZRA_FITRUNCF32(const rkfloat& a)
+KASTARRI_API rkfloat ZRA_FITRUNCF32(const rkfloat& a)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FITRUNCF32RKN13rkfloat_space8rkfloat_E");
 
 /// lane i = a[i] rounded to an integer by RoundMode, otherwise as FIROUND; raises inexact, which the others
 /// do not.
-KASTARRI_RESULT qv_vecNxf16 ZRA_FIRINTNXF16(const qv_vecNxf16& a)
+KASTARRI_API qv_vecNxf16 ZRA_FIRINTNXF16(const qv_vecNxf16& a)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FIRINTNXF16RKN17qv_vecNxf16_space12qv_vecNxf16_E");
 
 /// lane i = a[i] rounded to an integer by RoundMode, otherwise as FIROUND; raises inexact, which the others
 /// do not.
-KASTARRI_RESULT qv_vecN_2xf32 ZRA_FIRINTN_2XF32(const qv_vecN_2xf32& a)
+KASTARRI_API qv_vecN_2xf32 ZRA_FIRINTN_2XF32(const qv_vecN_2xf32& a)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FIRINTN_2XF32RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_E");
 
 /// lane i = a[i] rounded to an integer by RoundMode, otherwise as FIROUND; raises inexact, which the others
 /// do not.
-KASTARRI_RESULT qv_f16 ZRA_FIRINTF16(const qv_f16& a)
+KASTARRI_API qv_f16 ZRA_FIRINTF16(const qv_f16& a)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FIRINTF16RKN12qv_f16_space7qv_f16_E");
 
 /// lane i = a[i] rounded to an integer by RoundMode, otherwise as FIROUND; raises inexact, which the others
 /// do not.
-KASTARRI_RESULT rkfloat ZRA_FIRINTF32(const rkfloat& a)
+KASTARRI_API rkfloat ZRA_FIRINTF32(const rkfloat& a)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FIRINTF32RKN13rkfloat_space8rkfloat_E");
 
 /* Floating-point comparisons: bit i of the predicate is the relation between lanes i. O.. is false and U..
@@ -1130,223 +1130,223 @@ KASTARRI_RESULT rkfloat ZRA_FIRINTF32(const rkfloat& a)
    Table: src/float/compare.def */
 
 /// bit i = 1 when a[i] == b[i]; 0 for a NaN, a signalling one is invalid. -0 equals +0.
-KASTARRI_RESULT vboolN ZRA_OEQNXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
+KASTARRI_API vboolN ZRA_OEQNXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
     __asm__("_Z52cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OEQNXF16RKN17qv_vecNxf16_space12qv_vecNxf16_ES2_");
 
 /// bit i = 1 when a[i] == b[i]; 0 for a NaN, a signalling one is invalid. -0 equals +0.
-KASTARRI_RESULT vboolN_2 ZRA_OEQN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
+KASTARRI_API vboolN_2 ZRA_OEQN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OEQN_2XF32RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_ES2_");
 
 /// bit i = 1 when a[i] == b[i]; 0 for a NaN, a signalling one is invalid. -0 equals +0.
-KASTARRI_RESULT vbool1 ZRA_OEQF16(const qv_f16& a, const qv_f16& b)
+KASTARRI_API vbool1 ZRA_OEQF16(const qv_f16& a, const qv_f16& b)
     __asm__("_Z50cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OEQF16RKN12qv_f16_space7qv_f16_ES2_");
 
 /// bit i = 1 when a[i] == b[i]; 0 for a NaN, a signalling one is invalid. -0 equals +0.
-KASTARRI_RESULT vbool1 ZRA_OEQF32(const rkfloat& a, const rkfloat& b)
+KASTARRI_API vbool1 ZRA_OEQF32(const rkfloat& a, const rkfloat& b)
     __asm__("_Z50cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OEQF32RKN13rkfloat_space8rkfloat_ES2_");
 
 /// bit i = 1 when a[i] < b[i]; 0 for a NaN, which is invalid.
-KASTARRI_RESULT vboolN ZRA_OLTNXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
+KASTARRI_API vboolN ZRA_OLTNXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
     __asm__("_Z52cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLTNXF16RKN17qv_vecNxf16_space12qv_vecNxf16_ES2_");
 
 /// bit i = 1 when a[i] < b[i]; 0 for a NaN, which is invalid.
-KASTARRI_RESULT vboolN_2 ZRA_OLTN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
+KASTARRI_API vboolN_2 ZRA_OLTN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLTN_2XF32RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_ES2_");
 
 /// bit i = 1 when a[i] < b[i]; 0 for a NaN, which is invalid.
-KASTARRI_RESULT vbool1 ZRA_OLTF16(const qv_f16& a, const qv_f16& b)
+KASTARRI_API vbool1 ZRA_OLTF16(const qv_f16& a, const qv_f16& b)
     __asm__("_Z50cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLTF16RKN12qv_f16_space7qv_f16_ES2_");
 
 /// bit i = 1 when a[i] < b[i]; 0 for a NaN, which is invalid.
-KASTARRI_RESULT vbool1 ZRA_OLTF32(const rkfloat& a, const rkfloat& b)
+KASTARRI_API vbool1 ZRA_OLTF32(const rkfloat& a, const rkfloat& b)
     __asm__("_Z50cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLTF32RKN13rkfloat_space8rkfloat_ES2_");
 
 /// bit i = 1 when a[i] <= b[i]; 0 for a NaN, which is invalid.
-KASTARRI_RESULT vboolN ZRA_OLENXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
+KASTARRI_API vboolN ZRA_OLENXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
     __asm__("_Z52cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLENXF16RKN17qv_vecNxf16_space12qv_vecNxf16_ES2_");
 
 /// bit i = 1 when a[i] <= b[i]; 0 for a NaN, which is invalid.
-KASTARRI_RESULT vboolN_2 ZRA_OLEN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
+KASTARRI_API vboolN_2 ZRA_OLEN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLEN_2XF32RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_ES2_");
 
 /// bit i = 1 when a[i] <= b[i]; 0 for a NaN, which is invalid.
-KASTARRI_RESULT vbool1 ZRA_OLEF16(const qv_f16& a, const qv_f16& b)
+KASTARRI_API vbool1 ZRA_OLEF16(const qv_f16& a, const qv_f16& b)
     __asm__("_Z50cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLEF16RKN12qv_f16_space7qv_f16_ES2_");
 
 /// bit i = 1 when a[i] <= b[i]; 0 for a NaN, which is invalid.
-KASTARRI_RESULT vbool1 ZRA_OLEF32(const rkfloat& a, const rkfloat& b)
+KASTARRI_API vbool1 ZRA_OLEF32(const rkfloat& a, const rkfloat& b)
     __asm__("_Z50cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLEF32RKN13rkfloat_space8rkfloat_ES2_");
 
 /// bit i = 1 when a[i] > b[i]; 0 for a NaN, which is invalid.
-KASTARRI_RESULT vboolN ZRA_OGTNXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
+KASTARRI_API vboolN ZRA_OGTNXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
     __asm__("_Z52cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGTNXF16RKN17qv_vecNxf16_space12qv_vecNxf16_ES2_");
 
 /// bit i = 1 when a[i] > b[i]; 0 for a NaN, which is invalid.
-KASTARRI_RESULT vboolN_2 ZRA_OGTN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
+KASTARRI_API vboolN_2 ZRA_OGTN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGTN_2XF32RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_ES2_");
 
 /// bit i = 1 when a[i] > b[i]; 0 for a NaN, which is invalid.
-KASTARRI_RESULT vbool1 ZRA_OGTF16(const qv_f16& a, const qv_f16& b)
+KASTARRI_API vbool1 ZRA_OGTF16(const qv_f16& a, const qv_f16& b)
     __asm__("_Z50cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGTF16RKN12qv_f16_space7qv_f16_ES2_");
 
 /// bit i = 1 when a[i] > b[i]; 0 for a NaN, which is invalid.
-KASTARRI_RESULT vbool1 ZRA_OGTF32(const rkfloat& a, const rkfloat& b)
+KASTARRI_API vbool1 ZRA_OGTF32(const rkfloat& a, const rkfloat& b)
     __asm__("_Z50cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGTF32RKN13rkfloat_space8rkfloat_ES2_");
 
 /// bit i = 1 when a[i] >= b[i]; 0 for a NaN, which is invalid.
-KASTARRI_RESULT vboolN ZRA_OGENXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
+KASTARRI_API vboolN ZRA_OGENXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
     __asm__("_Z52cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGENXF16RKN17qv_vecNxf16_space12qv_vecNxf16_ES2_");
 
 /// bit i = 1 when a[i] >= b[i]; 0 for a NaN, which is invalid.
-KASTARRI_RESULT vboolN_2 ZRA_OGEN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
+KASTARRI_API vboolN_2 ZRA_OGEN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGEN_2XF32RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_ES2_");
 
 /// bit i = 1 when a[i] >= b[i]; 0 for a NaN, which is invalid.
-KASTARRI_RESULT vbool1 ZRA_OGEF16(const qv_f16& a, const qv_f16& b)
+KASTARRI_API vbool1 ZRA_OGEF16(const qv_f16& a, const qv_f16& b)
     __asm__("_Z50cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGEF16RKN12qv_f16_space7qv_f16_ES2_");
 
 /// bit i = 1 when a[i] >= b[i]; 0 for a NaN, which is invalid.
-KASTARRI_RESULT vbool1 ZRA_OGEF32(const rkfloat& a, const rkfloat& b)
+KASTARRI_API vbool1 ZRA_OGEF32(const rkfloat& a, const rkfloat& b)
     __asm__("_Z50cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGEF32RKN13rkfloat_space8rkfloat_ES2_");
 
 /// bit i = 1 when a[i] == b[i] or either is a NaN, a signalling one is invalid. -0 equals +0.
-KASTARRI_RESULT vboolN ZRA_UEQNXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
+KASTARRI_API vboolN ZRA_UEQNXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
     __asm__("_Z52cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UEQNXF16RKN17qv_vecNxf16_space12qv_vecNxf16_ES2_");
 
 /// bit i = 1 when a[i] == b[i] or either is a NaN, a signalling one is invalid. -0 equals +0.
-KASTARRI_RESULT vboolN_2 ZRA_UEQN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
+KASTARRI_API vboolN_2 ZRA_UEQN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UEQN_2XF32RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_ES2_");
 
 /// bit i = 1 when a[i] == b[i] or either is a NaN, a signalling one is invalid. -0 equals +0.
-KASTARRI_RESULT vbool1 ZRA_UEQF16(const qv_f16& a, const qv_f16& b)
+KASTARRI_API vbool1 ZRA_UEQF16(const qv_f16& a, const qv_f16& b)
     __asm__("_Z50cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UEQF16RKN12qv_f16_space7qv_f16_ES2_");
 
 /// bit i = 1 when a[i] == b[i] or either is a NaN, a signalling one is invalid. -0 equals +0.
-KASTARRI_RESULT vbool1 ZRA_UEQF32(const rkfloat& a, const rkfloat& b)
+KASTARRI_API vbool1 ZRA_UEQF32(const rkfloat& a, const rkfloat& b)
     __asm__("_Z50cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UEQF32RKN13rkfloat_space8rkfloat_ES2_");
 
 /// bit i = 1 when a[i] < b[i] or either is a NaN, which is invalid.
-KASTARRI_RESULT vboolN ZRA_ULTNXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
+KASTARRI_API vboolN ZRA_ULTNXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
     __asm__("_Z52cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTNXF16RKN17qv_vecNxf16_space12qv_vecNxf16_ES2_");
 
 /// bit i = 1 when a[i] < b[i] or either is a NaN, which is invalid.
-KASTARRI_RESULT vboolN_2 ZRA_ULTN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
+KASTARRI_API vboolN_2 ZRA_ULTN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTN_2XF32RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_ES2_");
 
 /// bit i = 1 when a[i] < b[i] or either is a NaN, which is invalid.
-KASTARRI_RESULT vbool1 ZRA_ULTF16(const qv_f16& a, const qv_f16& b)
+KASTARRI_API vbool1 ZRA_ULTF16(const qv_f16& a, const qv_f16& b)
     __asm__("_Z50cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTF16RKN12qv_f16_space7qv_f16_ES2_");
 
 /// bit i = 1 when a[i] < b[i] or either is a NaN, which is invalid.
-KASTARRI_RESULT vbool1 ZRA_ULTF32(const rkfloat& a, const rkfloat& b)
+KASTARRI_API vbool1 ZRA_ULTF32(const rkfloat& a, const rkfloat& b)
     __asm__("_Z50cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTF32RKN13rkfloat_space8rkfloat_ES2_");
 
 /// bit i = 1 when a[i] <= b[i] or either is a NaN, which is invalid.
-KASTARRI_RESULT vboolN ZRA_ULENXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
+KASTARRI_API vboolN ZRA_ULENXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
     __asm__("_Z52cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULENXF16RKN17qv_vecNxf16_space12qv_vecNxf16_ES2_");
 
 /// bit i = 1 when a[i] <= b[i] or either is a NaN, which is invalid.
-KASTARRI_RESULT vboolN_2 ZRA_ULEN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
+KASTARRI_API vboolN_2 ZRA_ULEN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULEN_2XF32RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_ES2_");
 
 /// bit i = 1 when a[i] <= b[i] or either is a NaN, which is invalid.
-KASTARRI_RESULT vbool1 ZRA_ULEF16(const qv_f16& a, const qv_f16& b)
+KASTARRI_API vbool1 ZRA_ULEF16(const qv_f16& a, const qv_f16& b)
     __asm__("_Z50cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULEF16RKN12qv_f16_space7qv_f16_ES2_");
 
 /// bit i = 1 when a[i] <= b[i] or either is a NaN, which is invalid.
-KASTARRI_RESULT vbool1 ZRA_ULEF32(const rkfloat& a, const rkfloat& b)
+KASTARRI_API vbool1 ZRA_ULEF32(const rkfloat& a, const rkfloat& b)
     __asm__("_Z50cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULEF32RKN13rkfloat_space8rkfloat_ES2_");
 
 /// bit i = 1 when a[i] or b[i] is a NaN, a signalling one is invalid.
-KASTARRI_RESULT vboolN ZRA_UNNXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
+KASTARRI_API vboolN ZRA_UNNXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
     __asm__("_Z51cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNNXF16RKN17qv_vecNxf16_space12qv_vecNxf16_ES2_");
 
 /// bit i = 1 when a[i] or b[i] is a NaN, a signalling one is invalid.
-KASTARRI_RESULT vboolN_2 ZRA_UNN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
+KASTARRI_API vboolN_2 ZRA_UNN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNN_2XF32RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_ES2_");
 
 /// bit i = 1 when a[i] or b[i] is a NaN, a signalling one is invalid.
-KASTARRI_RESULT vbool1 ZRA_UNF16(const qv_f16& a, const qv_f16& b)
+KASTARRI_API vbool1 ZRA_UNF16(const qv_f16& a, const qv_f16& b)
     __asm__("_Z49cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNF16RKN12qv_f16_space7qv_f16_ES2_");
 
 /// bit i = 1 when a[i] or b[i] is a NaN, a signalling one is invalid.
-KASTARRI_RESULT vbool1 ZRA_UNF32(const rkfloat& a, const rkfloat& b)
+KASTARRI_API vbool1 ZRA_UNF32(const rkfloat& a, const rkfloat& b)
     __asm__("_Z49cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNF32RKN13rkfloat_space8rkfloat_ES2_");
 
 /// bit i = 1 when a[i] <= b[i] or either is a NaN, a signalling one is invalid.
-KASTARRI_RESULT vboolN ZRA_ULEQNXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
+KASTARRI_API vboolN ZRA_ULEQNXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULEQNXF16RKN17qv_vecNxf16_space12qv_vecNxf16_ES2_");
 
 /// bit i = 1 when a[i] <= b[i] or either is a NaN, a signalling one is invalid.
-KASTARRI_RESULT vboolN_2 ZRA_ULEQN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
+KASTARRI_API vboolN_2 ZRA_ULEQN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULEQN_2XF32RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_ES2_");
 
 /// bit i = 1 when a[i] <= b[i] or either is a NaN, a signalling one is invalid.
-KASTARRI_RESULT vbool1 ZRA_ULEQF16(const qv_f16& a, const qv_f16& b)
+KASTARRI_API vbool1 ZRA_ULEQF16(const qv_f16& a, const qv_f16& b)
     __asm__("_Z51cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULEQF16RKN12qv_f16_space7qv_f16_ES2_");
 
 /// bit i = 1 when a[i] <= b[i] or either is a NaN, a signalling one is invalid.
-KASTARRI_RESULT vbool1 ZRA_ULEQF32(const rkfloat& a, const rkfloat& b)
+KASTARRI_API vbool1 ZRA_ULEQF32(const rkfloat& a, const rkfloat& b)
     __asm__("_Z51cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULEQF32RKN13rkfloat_space8rkfloat_ES2_");
 
 /// bit i = 1 when a[i] < b[i] or either is a NaN, a signalling one is invalid.
-KASTARRI_RESULT vboolN ZRA_ULTQNXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
+KASTARRI_API vboolN ZRA_ULTQNXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTQNXF16RKN17qv_vecNxf16_space12qv_vecNxf16_ES2_");
 
 /// bit i = 1 when a[i] < b[i] or either is a NaN, a signalling one is invalid.
-KASTARRI_RESULT vboolN_2 ZRA_ULTQN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
+KASTARRI_API vboolN_2 ZRA_ULTQN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTQN_2XF32RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_ES2_");
 
 /// bit i = 1 when a[i] < b[i] or either is a NaN, a signalling one is invalid.
-KASTARRI_RESULT vbool1 ZRA_ULTQF16(const qv_f16& a, const qv_f16& b)
+KASTARRI_API vbool1 ZRA_ULTQF16(const qv_f16& a, const qv_f16& b)
     __asm__("_Z51cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTQF16RKN12qv_f16_space7qv_f16_ES2_");
 
 /// bit i = 1 when a[i] < b[i] or either is a NaN, a signalling one is invalid.
-KASTARRI_RESULT vbool1 ZRA_ULTQF32(const rkfloat& a, const rkfloat& b)
+KASTARRI_API vbool1 ZRA_ULTQF32(const rkfloat& a, const rkfloat& b)
     __asm__("_Z51cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTQF32RKN13rkfloat_space8rkfloat_ES2_");
 
 /// bit i = 1 when a[i] != b[i] or either is a NaN, a signalling one is invalid. -0 equals +0.
-KASTARRI_RESULT vboolN ZRA_UNEQNXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
+KASTARRI_API vboolN ZRA_UNEQNXF16(const qv_vecNxf16& a, const qv_vecNxf16& b)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNEQNXF16RKN17qv_vecNxf16_space12qv_vecNxf16_ES2_");
 
 /// bit i = 1 when a[i] != b[i] or either is a NaN, a signalling one is invalid. -0 equals +0.
-KASTARRI_RESULT vboolN_2 ZRA_UNEQN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
+KASTARRI_API vboolN_2 ZRA_UNEQN_2XF32(const qv_vecN_2xf32& a, const qv_vecN_2xf32& b)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNEQN_2XF32RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_ES2_");
 
 /// bit i = 1 when a[i] != b[i] or either is a NaN, a signalling one is invalid. -0 equals +0.
-KASTARRI_RESULT vbool1 ZRA_UNEQF16(const qv_f16& a, const qv_f16& b)
+KASTARRI_API vbool1 ZRA_UNEQF16(const qv_f16& a, const qv_f16& b)
     __asm__("_Z51cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNEQF16RKN12qv_f16_space7qv_f16_ES2_");
 
 /// bit i = 1 when a[i] != b[i] or either is a NaN, a signalling one is invalid. -0 equals +0.
-KASTARRI_RESULT vbool1 ZRA_UNEQF32(const rkfloat& a, const rkfloat& b)
+KASTARRI_API vbool1 ZRA_UNEQF32(const rkfloat& a, const rkfloat& b)
     __asm__("_Z51cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNEQF32RKN13rkfloat_space8rkfloat_ES2_");
 
 /* Conversions between integers and floating point, with a scale, and between the formats.
    Table: src/float/scaled.def */
 
 /// lane i = a[i] / 2^(scale mod 32), rounded by RoundMode, with flags.
-KASTARRI_RESULT qv_vecN_2xf32 ZRA_FLOATN_2X32(const qv_vecN_2x32v& a, immediate scale)
+KASTARRI_API qv_vecN_2xf32 ZRA_FLOATN_2X32(const qv_vecN_2x32v& a, immediate scale)
     KASTARRI_BELOW(32, scale)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FLOATN_2X32RKN19qv_vecN_2x32v_space14qv_vecN_2x32v_Ei");
 KASTARRI_BELOW_BODY(32, scale, qv_vecN_2xf32 ZRA_FLOATN_2X32(const qv_vecN_2x32v& a, immediate scale),
                     cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FLOATN_2X32(a, scale))
 
 /// lane i = a[i] / 2^(scale mod 32), rounded by RoundMode, with flags.
-KASTARRI_RESULT qv_vecN_2xf32 ZRA_UFLOATN_2X32(const qv_vecN_2x32Uv& a, immediate scale)
+KASTARRI_API qv_vecN_2xf32 ZRA_UFLOATN_2X32(const qv_vecN_2x32Uv& a, immediate scale)
     KASTARRI_BELOW(32, scale)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UFLOATN_2X32RKN20qv_vecN_2x32Uv_space15qv_vecN_2x32Uv_Ei");
 KASTARRI_BELOW_BODY(32, scale, qv_vecN_2xf32 ZRA_UFLOATN_2X32(const qv_vecN_2x32Uv& a, immediate scale),
                     cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UFLOATN_2X32(a, scale))
 
 /// lane i = a[i] / 2^(scale mod 16), rounded by RoundMode, with flags.
-KASTARRI_RESULT qv_vecNxf16 ZRA_FLOATNX16(const qv_vecNx16& a, immediate scale)
+KASTARRI_API qv_vecNxf16 ZRA_FLOATNX16(const qv_vecNx16& a, immediate scale)
     KASTARRI_BELOW(16, scale)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FLOATNX16RKN16qv_vecNx16_space11qv_vecNx16_Ei");
 KASTARRI_BELOW_BODY(16, scale, qv_vecNxf16 ZRA_FLOATNX16(const qv_vecNx16& a, immediate scale),
                     cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FLOATNX16(a, scale))
 
 /// lane i = a[i] / 2^(scale mod 16), rounded by RoundMode, with flags.
-KASTARRI_RESULT qv_vecNxf16 ZRA_UFLOATNX16(const qv_vecNx16U& a, immediate scale)
+KASTARRI_API qv_vecNxf16 ZRA_UFLOATNX16(const qv_vecNx16U& a, immediate scale)
     KASTARRI_BELOW(16, scale)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UFLOATNX16RKN17qv_vecNx16U_space12qv_vecNx16U_Ei");
 KASTARRI_BELOW_BODY(16, scale, qv_vecNxf16 ZRA_UFLOATNX16(const qv_vecNx16U& a, immediate scale),
@@ -1354,7 +1354,7 @@ KASTARRI_BELOW_BODY(16, scale, qv_vecNxf16 ZRA_UFLOATNX16(const qv_vecNx16U& a, 
 
 /// lane i = a[i] * 2^(scale mod 32) truncated; the bound of the integer where that is out of range, the upper
 /// one for a NaN. Inexact when a fraction is dropped, invalid when out of range.
-KASTARRI_RESULT qv_vecN_2x32v ZRA_TRUNCN_2XF32(const qv_vecN_2xf32& a, immediate scale)
+KASTARRI_API qv_vecN_2x32v ZRA_TRUNCN_2XF32(const qv_vecN_2xf32& a, immediate scale)
     KASTARRI_BELOW(32, scale)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_TRUNCN_2XF32RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_Ei");
 KASTARRI_BELOW_BODY(32, scale, qv_vecN_2x32v ZRA_TRUNCN_2XF32(const qv_vecN_2xf32& a, immediate scale),
@@ -1362,21 +1362,21 @@ KASTARRI_BELOW_BODY(32, scale, qv_vecN_2x32v ZRA_TRUNCN_2XF32(const qv_vecN_2xf3
 
 /// lane i = a[i] * 2^(scale mod 32) truncated; the bound of the integer where that is out of range, the upper
 /// one for a NaN. Inexact when a fraction is dropped, invalid when out of range.
-KASTARRI_RESULT qv_vecN_2x32Uv ZRA_UTRUNCN_2XF32(const qv_vecN_2xf32& a, immediate scale)
+KASTARRI_API qv_vecN_2x32Uv ZRA_UTRUNCN_2XF32(const qv_vecN_2xf32& a, immediate scale)
     KASTARRI_BELOW(32, scale)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UTRUNCN_2XF32RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_Ei");
 KASTARRI_BELOW_BODY(32, scale, qv_vecN_2x32Uv ZRA_UTRUNCN_2XF32(const qv_vecN_2xf32& a, immediate scale),
                     cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UTRUNCN_2XF32(a, scale))
 
 /// lane i = a[i] * 2^(scale mod 16) truncated to 16 bits, otherwise as TRUNCN_2XF32.
-KASTARRI_RESULT qv_vecNx16 ZRA_TRUNCNXF16(const qv_vecNxf16& a, immediate scale)
+KASTARRI_API qv_vecNx16 ZRA_TRUNCNXF16(const qv_vecNxf16& a, immediate scale)
     KASTARRI_BELOW(16, scale)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_TRUNCNXF16RKN17qv_vecNxf16_space12qv_vecNxf16_Ei");
 KASTARRI_BELOW_BODY(16, scale, qv_vecNx16 ZRA_TRUNCNXF16(const qv_vecNxf16& a, immediate scale),
                     cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_TRUNCNXF16(a, scale))
 
 /// lane i = a[i] * 2^(scale mod 16) truncated to 16 bits, otherwise as TRUNCN_2XF32.
-KASTARRI_RESULT qv_vecNx16U ZRA_UTRUNCNXF16(const qv_vecNxf16& a, immediate scale)
+KASTARRI_API qv_vecNx16U ZRA_UTRUNCNXF16(const qv_vecNxf16& a, immediate scale)
     KASTARRI_BELOW(16, scale)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UTRUNCNXF16RKN17qv_vecNxf16_space12qv_vecNxf16_Ei");
 KASTARRI_BELOW_BODY(16, scale, qv_vecNx16U ZRA_UTRUNCNXF16(const qv_vecNxf16& a, immediate scale),
@@ -1384,28 +1384,28 @@ KASTARRI_BELOW_BODY(16, scale, qv_vecNx16U ZRA_UTRUNCNXF16(const qv_vecNxf16& a,
 
 /// a in the other format, rounded by RoundMode, with flags. A NaN is made quiet and keeps the top of its
 /// fraction.
-KASTARRI_RESULT qv_f16 ZRA_CVTF16F32(const rkfloat& acc)
+KASTARRI_API qv_f16 ZRA_CVTF16F32(const rkfloat& acc)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CVTF16F32RKN13rkfloat_space8rkfloat_E");
 
 /// a in the other format, rounded by RoundMode, with flags. A NaN is made quiet and keeps the top of its
 /// fraction.
-KASTARRI_RESULT rkfloat ZRA_CVTF32F16(const qv_f16& acc)
+KASTARRI_API rkfloat ZRA_CVTF32F16(const qv_f16& acc)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CVTF32F16RKN12qv_f16_space7qv_f16_E");
 
 /// lane i = half lane 2i of a in single precision.
-KASTARRI_RESULT qv_vecN_2xf32 ZRA_CVTF32NXF16_0(const qv_vecNxf16& acc)
+KASTARRI_API qv_vecN_2xf32 ZRA_CVTF32NXF16_0(const qv_vecNxf16& acc)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CVTF32NXF16_0RKN17qv_vecNxf16_space12qv_vecNxf16_E");
 
 /// lane i = half lane 2i + 1 of a in single precision.
-KASTARRI_RESULT qv_vecN_2xf32 ZRA_CVTF32NXF16_1(const qv_vecNxf16& acc)
+KASTARRI_API qv_vecN_2xf32 ZRA_CVTF32NXF16_1(const qv_vecNxf16& acc)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CVTF32NXF16_1RKN17qv_vecNxf16_space12qv_vecNxf16_E");
 
 /// half lane 2i = a[i] rounded by RoundMode, with flags; the other halves 0.
-KASTARRI_RESULT qv_vecNxf16 ZRA_CVTF16N_2XF32_0(const qv_vecN_2xf32& acc)
+KASTARRI_API qv_vecNxf16 ZRA_CVTF16N_2XF32_0(const qv_vecN_2xf32& acc)
     __asm__("_Z59cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CVTF16N_2XF32_0RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_E");
 
 /// half lane 2i + 1 = a[i] rounded by RoundMode, with flags; the other halves 0.
-KASTARRI_RESULT qv_vecNxf16 ZRA_CVTF16N_2XF32_1(const qv_vecN_2xf32& acc)
+KASTARRI_API qv_vecNxf16 ZRA_CVTF16N_2XF32_1(const qv_vecN_2xf32& acc)
     __asm__("_Z59cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CVTF16N_2XF32_1RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_E");
 
 /* Loads and stores of singles that are halves in memory, at any byte address.
@@ -1413,12 +1413,12 @@ KASTARRI_RESULT qv_vecNxf16 ZRA_CVTF16N_2XF32_1(const qv_vecN_2xf32& acc)
 
 /// loads: lane i = the half in memory in single precision; a signalling NaN becomes quiet and is invalid. The
 /// address is base + offset bytes.
-KASTARRI_RESULT qv_vecN_2xf32 ZRA_LVN_2XF16_I(const qv_vecN_2xf16* base, int offset)
+KASTARRI_API qv_vecN_2xf32 ZRA_LVN_2XF16_I(const qv_vecN_2xf16* base, int offset)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16_IPKN19qv_vecN_2xf16_space14qv_vecN_2xf16_Ei");
 
 /// loads: lane i = the half in memory in single precision; a signalling NaN becomes quiet and is invalid. The
 /// address is base + offset bytes.
-KASTARRI_RESULT qv_vecN_2xf32 ZRA_LVN_2XF16_X(const qv_vecN_2xf16* base, int offset)
+KASTARRI_API qv_vecN_2xf32 ZRA_LVN_2XF16_X(const qv_vecN_2xf16* base, int offset)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16_XPKN19qv_vecN_2xf16_space14qv_vecN_2xf16_Ei");
 
 /// loads: lane i = the half in memory in single precision; a signalling NaN becomes quiet and is invalid. The
@@ -1433,12 +1433,12 @@ KASTARRI_API void ZRA_LVN_2XF16_XP(qv_vecN_2xf32& r, const qv_vecN_2xf16** point
 
 /// loads: lane i = the half in memory in single precision where predicate bit i is 1, else 0 and no flag; all
 /// 32 bytes are read. The address is base + offset bytes.
-KASTARRI_RESULT qv_vecN_2xf32 ZRA_LVN_2XF16T_I(const qv_vecN_2xf16* base, int offset, const vboolN_2& p)
+KASTARRI_API qv_vecN_2xf32 ZRA_LVN_2XF16T_I(const qv_vecN_2xf16* base, int offset, const vboolN_2& p)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16T_IPKN19qv_vecN_2xf16_space14qv_vecN_2xf16_EiRKN14vboolN_2_space9vboolN_2_E");
 
 /// loads: lane i = the half in memory in single precision where predicate bit i is 1, else 0 and no flag; all
 /// 32 bytes are read. The address is base + offset bytes.
-KASTARRI_RESULT qv_vecN_2xf32 ZRA_LVN_2XF16T_X(const qv_vecN_2xf16* base, int offset, const vboolN_2& p)
+KASTARRI_API qv_vecN_2xf32 ZRA_LVN_2XF16T_X(const qv_vecN_2xf16* base, int offset, const vboolN_2& p)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16T_XPKN19qv_vecN_2xf16_space14qv_vecN_2xf16_EiRKN14vboolN_2_space9vboolN_2_E");
 
 /// loads: lane i = the half in memory in single precision where predicate bit i is 1, else 0 and no flag; all

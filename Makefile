@@ -29,11 +29,13 @@ WIDTH =
 MULTIARCH = i386-linux-gnu
 LIBDIR ?= lib
 SUMMARY = docs/performance.md
+CYCLES = bench/cycles.csv
 else ifeq ($(BITS),64)
 WIDTH = -64
 MULTIARCH = x86_64-linux-gnu
 LIBDIR ?= lib/$(MULTIARCH)
 SUMMARY = build/summary-64.md
+CYCLES = build/cycles-64.csv
 else
 $(error BITS is $(BITS); known are 32 and 64)
 endif
@@ -71,7 +73,8 @@ bench:
 	$(CMAKE_BUILD) test$(WIDTH) --target all kernel_modules
 	cmake --preset clang$(WIDTH) -DKASTARRI_BUILD_BENCH=ON
 	$(CMAKE_BUILD) clang$(WIDTH) --target kernel_modules
-	tools/performance.py build/test$(WIDTH) --clang build/clang$(WIDTH) --summary $(SUMMARY) --table build/performance$(WIDTH).md
+	tools/performance.py build/test$(WIDTH) --clang build/clang$(WIDTH) --summary $(SUMMARY) --table build/performance$(WIDTH).md \
+	  --cycles $(CYCLES)
 
 bench-kernels:
 	tools/packages.sh build test$(WIDTH)

@@ -47,8 +47,9 @@ def declaration(row, name, ending=()):
     if len(lines[0]) > 109:
         lines = [f"{mark} {result}", f"{name}({parameters})"]
     if len(lines[-1]) > 109:
-        lines[1:] = wrap(f"{name}({parameters})", 105)
-        lines[2:] = ["    " + line for line in lines[2:]]
+        whole = parameters.replace(" ", "\0").replace(",\0", ", ")  # lines break between parameters
+        first, *others = wrap(f"{name}({whole})", 105)
+        lines[1:] = [line.replace("\0", " ") for line in [first, *("    " + line for line in others)]]
     lines += ["    " + line for line in ending]
     return lines[:-1] + [lines[-1] + ";"]
 

@@ -13,8 +13,8 @@
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8*
-    base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
@@ -27,8 +27,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_move(const cstub_Km_ZNB_Orbis
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -37,8 +37,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_storeip(const cstub_Km_ZNB_Or
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8*
-    base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
@@ -47,8 +47,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_storex(const cstub_Km_ZNB_Orb
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -57,13 +57,13 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_storexp(const cstub_Km_ZNB_Or
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U*
-    base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U&
-    v, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U* base, int offset);
 
 /// a copy of the whole register.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
@@ -76,18 +76,18 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_loadip(cstub_Km_ZNB_Orbis_R5
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U&
-    v, cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U** pointer, int increment);
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U*
-    base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U&
-    v, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U* base, int offset);
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -96,13 +96,13 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_loadxp(cstub_Km_ZNB_Orbis_R5
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U&
-    v, cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U** pointer, int increment);
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16*
-    base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
@@ -115,8 +115,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_move(const cstub_Km_ZNB_Orbis
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -125,8 +125,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_storeip(const cstub_Km_ZNB_Or
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16*
-    base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
@@ -135,8 +135,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_storex(const cstub_Km_ZNB_Orb
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -145,13 +145,13 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_storexp(const cstub_Km_ZNB_Or
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U*
-    base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U&
-    v, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U* base, int offset);
 
 /// a copy of the whole register.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
@@ -164,18 +164,18 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_loadip(cstub_Km_ZNB_Orbis_R5
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U&
-    v, cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U** pointer, int increment);
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U*
-    base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U&
-    v, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U* base, int offset);
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -184,24 +184,22 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_loadxp(cstub_Km_ZNB_Orbis_R5
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U&
-    v, cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U** pointer, int increment);
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_loadi(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_storei(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base, int offset);
 
 /// a copy of the whole register.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -210,20 +208,18 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_loadip(cstub_Km_ZNB_Orbis_
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_storeip(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v, cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v** pointer, int
-    increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v** pointer, int increment);
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_loadx(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_storex(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base, int offset);
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -232,68 +228,62 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_loadxp(cstub_Km_ZNB_Orbis_
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_storexp(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v, cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v** pointer, int
-    increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v** pointer, int increment);
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_loadi(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_storei(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base, int offset);
 
 /// a copy of the whole register.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_move(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv&
-    r, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_storeip(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v, cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv** pointer, int
-    increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv** pointer, int increment);
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_loadx(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_storex(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base, int offset);
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv&
-    r, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_storexp(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v, cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv** pointer, int
-    increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv** pointer, int increment);
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64*
-    base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64&
-    v, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64* base, int offset);
 
 /// a copy of the whole register.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
@@ -306,19 +296,18 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_loadip(cstub_Km_ZNB_Orbis_R
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_storeip(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& v, cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64** pointer, int
-    increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64** pointer, int increment);
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64*
-    base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64&
-    v, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64* base, int offset);
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -327,25 +316,22 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_loadxp(cstub_Km_ZNB_Orbis_R
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_storexp(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& v, cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64** pointer, int
-    increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64** pointer, int increment);
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_loadi(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_storei(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& v, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128* base, int offset);
 
 /// a copy of the whole register.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& from);
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -354,20 +340,18 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_loadip(cstub_Km_ZNB_Orbis_
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_storeip(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& v, cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128** pointer, int
-    increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128** pointer, int increment);
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_loadx(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_storex(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& v, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128* base, int offset);
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -376,68 +360,62 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_loadxp(cstub_Km_ZNB_Orbis_
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_storexp(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& v, cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128** pointer, int
-    increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128** pointer, int increment);
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_loadi(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_storei(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& v, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256* base, int offset);
 
 /// a copy of the whole register.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_move(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& from);
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256&
-    r, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_storeip(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& v, cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256** pointer, int
-    increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256** pointer, int increment);
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_loadx(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_storex(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& v, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256* base, int offset);
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256&
-    r, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_storexp(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& v, cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256** pointer, int
-    increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256** pointer, int increment);
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16*
-    base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16&
-    v, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16* base, int offset);
 
 /// a copy of the whole register.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
@@ -450,18 +428,18 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_loadip(cstub_Km_ZNB_Orbis_R5
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16&
-    v, cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16** pointer, int increment);
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16*
-    base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16&
-    v, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16* base, int offset);
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -470,24 +448,22 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_loadxp(cstub_Km_ZNB_Orbis_R5
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16&
-    v, cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16** pointer, int increment);
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_loadi(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_storei(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base, int offset);
 
 /// a copy of the whole register.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -496,20 +472,18 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_loadip(cstub_Km_ZNB_Orbis_
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_storeip(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v, cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32** pointer, int
-    increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32** pointer, int increment);
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_loadx(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_storex(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base, int offset);
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -518,9 +492,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_loadxp(cstub_Km_ZNB_Orbis_
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_storexp(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v, cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32** pointer, int
-    increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32** pointer, int increment);
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8
@@ -538,8 +511,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_move(const cstub_Km_ZNB_Orbis_
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -558,8 +531,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_storex(const cstub_Km_ZNB_Orbi
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -568,8 +541,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_storexp(const cstub_Km_ZNB_Orb
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U*
-    base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
@@ -582,8 +555,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_move(const cstub_Km_ZNB_Orbis
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -592,8 +565,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_storeip(const cstub_Km_ZNB_Or
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U*
-    base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
@@ -602,8 +575,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_storex(const cstub_Km_ZNB_Orb
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -612,13 +585,13 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_storexp(const cstub_Km_ZNB_Or
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16*
-    base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16&
-    v, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base, int offset);
 
 /// a copy of the whole register.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16
@@ -631,19 +604,18 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_loadip(cstub_Km_ZNB_Orbis_R
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_storeip(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& v, cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16** pointer, int
-    increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16** pointer, int increment);
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16*
-    base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16&
-    v, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base, int offset);
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -652,25 +624,22 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_loadxp(cstub_Km_ZNB_Orbis_R
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_storexp(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& v, cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16** pointer, int
-    increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16** pointer, int increment);
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_loadi(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_storei(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& v, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base, int offset);
 
 /// a copy of the whole register.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& from);
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -679,20 +648,18 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_loadip(cstub_Km_ZNB_Orbis_
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_storeip(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& v, cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U** pointer, int
-    increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U** pointer, int increment);
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_loadx(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_storex(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& v, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base, int offset);
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -701,25 +668,22 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_loadxp(cstub_Km_ZNB_Orbis_
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_storexp(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& v, cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U** pointer, int
-    increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U** pointer, int increment);
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_loadi(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_storei(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& v, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base, int offset);
 
 /// a copy of the whole register.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& from);
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -728,20 +692,18 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_loadip(cstub_Km_ZNB_Orbis_
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_storeip(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& v, cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer, int
-    increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer, int increment);
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_loadx(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_storex(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& v, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base, int offset);
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -750,19 +712,18 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_loadxp(cstub_Km_ZNB_Orbis_
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_storexp(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& v, cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer, int
-    increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer, int increment);
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& v, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base, int offset);
 
 /// a copy of the whole register.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
@@ -770,8 +731,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_move(const cstub_Km_ZNB_Orbis_R5
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_int8& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_int8& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -780,18 +741,18 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_storeip(const cstub_Km_ZNB_Orbis
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& v, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base, int offset);
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_int8& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_int8& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -814,8 +775,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_move(const cstub_Km_ZNB_Orbis_R
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -834,8 +795,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_storex(const cstub_Km_ZNB_Orbis
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -858,8 +819,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_move(const cstub_Km_ZNB_Orbis_R
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -878,8 +839,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_storex(const cstub_Km_ZNB_Orbis
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -902,8 +863,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_move(const cstub_Km_ZNB_Orbis_
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -922,8 +883,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_storex(const cstub_Km_ZNB_Orbi
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -932,13 +893,13 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_storexp(const cstub_Km_ZNB_Orb
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& v, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base, int offset);
 
 /// a copy of the whole register.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_f16
@@ -946,8 +907,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_move(const cstub_Km_ZNB_Orbis_R5_
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -956,18 +917,18 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_storeip(const cstub_Km_ZNB_Orbis_
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& v, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base, int offset);
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -976,13 +937,13 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_storexp(const cstub_Km_ZNB_Orbis_
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_loadi(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_loadi(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_storei(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& v, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_storei(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base, int offset);
 
 /// a copy of the whole register.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkfloat
@@ -990,8 +951,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_move(const cstub_Km_ZNB_Orbis_R5
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_loadip(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_loadip(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -1000,18 +961,18 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_storeip(const cstub_Km_ZNB_Orbis
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_loadx(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_loadx(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_storex(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& v, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_storex(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base, int offset);
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_loadxp(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_loadxp(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -1034,8 +995,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_move(const cstub_Km_ZNB_Orbis_
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -1054,8 +1015,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_storex(const cstub_Km_ZNB_Orbi
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -1064,8 +1025,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_storexp(const cstub_Km_ZNB_Orb
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv*
-    base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
@@ -1078,8 +1039,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_move(const cstub_Km_ZNB_Orbis
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -1088,8 +1049,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_storeip(const cstub_Km_ZNB_Or
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv*
-    base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
@@ -1098,8 +1059,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_storex(const cstub_Km_ZNB_Orb
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -1122,8 +1083,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_move(const cstub_Km_ZNB_Orbis_R
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_int64& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int64** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_int64& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -1142,8 +1103,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_storex(const cstub_Km_ZNB_Orbis
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_int64& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int64** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_int64& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -1166,8 +1127,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int128_move(const cstub_Km_ZNB_Orbis_
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int128_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_int128& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int128** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int128_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_int128& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int128** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -1186,8 +1147,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int128_storex(const cstub_Km_ZNB_Orbi
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int128_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_int128& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int128** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int128_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_int128& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int128** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -1210,8 +1171,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int256_move(const cstub_Km_ZNB_Orbis_
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int256_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_int256& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int256** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int256_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_int256& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int256** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -1230,8 +1191,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int256_storex(const cstub_Km_ZNB_Orbi
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int256_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_int256& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int256** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int256_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_int256& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int256** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -1240,13 +1201,13 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int256_storexp(const cstub_Km_ZNB_Orb
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_valign
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_valign_loadi(const cstub_Km_ZNB_Orbis_R5_64k_valign* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_valign_loadi(const cstub_Km_ZNB_Orbis_R5_64k_valign* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_valign_storei(const cstub_Km_ZNB_Orbis_R5_64k_valign& v, const
-    cstub_Km_ZNB_Orbis_R5_64k_valign* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_valign_storei(const cstub_Km_ZNB_Orbis_R5_64k_valign& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_valign* base, int offset);
 
 /// a copy of the whole register.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_valign
@@ -1254,8 +1215,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_valign_move(const cstub_Km_ZNB_Orbis_R5_
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_valign_loadip(cstub_Km_ZNB_Orbis_R5_64k_valign& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_valign** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_valign_loadip(cstub_Km_ZNB_Orbis_R5_64k_valign& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_valign** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -1264,13 +1225,13 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_valign_storeip(const cstub_Km_ZNB_Orbis_
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vboolN_loadi(const cstub_Km_ZNB_Orbis_R5_64k_vboolN* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vboolN_loadi(const cstub_Km_ZNB_Orbis_R5_64k_vboolN* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vboolN_storei(const cstub_Km_ZNB_Orbis_R5_64k_vboolN& v, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vboolN_storei(const cstub_Km_ZNB_Orbis_R5_64k_vboolN& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN* base, int offset);
 
 /// a copy of the whole register.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
@@ -1278,8 +1239,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vboolN_move(const cstub_Km_ZNB_Orbis_R5_
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vboolN_loadip(cstub_Km_ZNB_Orbis_R5_64k_vboolN& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vboolN_loadip(cstub_Km_ZNB_Orbis_R5_64k_vboolN& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -1288,13 +1249,13 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vboolN_storeip(const cstub_Km_ZNB_Orbis_
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool2N_loadi(const cstub_Km_ZNB_Orbis_R5_64k_vbool2N* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool2N_loadi(const cstub_Km_ZNB_Orbis_R5_64k_vbool2N* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool2N_storei(const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& v, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool2N* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool2N_storei(const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N* base, int offset);
 
 /// a copy of the whole register.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
@@ -1302,8 +1263,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool2N_move(const cstub_Km_ZNB_Orbis_R5
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool2N_loadip(cstub_Km_ZNB_Orbis_R5_64k_vbool2N& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool2N** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool2N_loadip(cstub_Km_ZNB_Orbis_R5_64k_vbool2N& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -1326,8 +1287,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vboolN_2_move(const cstub_Km_ZNB_Orbis_R
 
 /// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vboolN_2_loadip(cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN_2** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vboolN_2_loadip(cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2** pointer, int increment);
 
 /// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
@@ -1336,13 +1297,13 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vboolN_2_storeip(const cstub_Km_ZNB_Orbi
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24*
-    base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24&
-    v, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24* base, int offset);
 
 /// a copy of the whole register.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
@@ -1350,8 +1311,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_move(const cstub_Km_ZNB_Orbi
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48*
-    base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
@@ -1364,29 +1325,27 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_move(const cstub_Km_ZNB_Orbis
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x64w_loadi(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x64w_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x64w_storei(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& v, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x64w_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w* base, int offset);
 
 /// a copy of the whole register.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x64w_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x64w_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& from);
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16w_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w*
-    base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16w_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16w_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w&
-    v, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16w_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w* base, int offset);
 
 /// a copy of the whole register.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w
@@ -1394,24 +1353,22 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16w_move(const cstub_Km_ZNB_Orb
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16Uw_loadi(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16Uw_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16Uw_storei(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw& v, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16Uw_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw* base, int offset);
 
 /// a copy of the whole register.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16Uw_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16Uw_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw& from);
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32*
-    base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
@@ -1424,13 +1381,13 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32_move(const cstub_Km_ZNB_Orbis
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32U_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U*
-    base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32U_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32U_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U&
-    v, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32U_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U* base, int offset);
 
 /// a copy of the whole register.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U
@@ -1438,13 +1395,13 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32U_move(const cstub_Km_ZNB_Orbi
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill*
-    base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill&
-    v, const cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill* base, int offset);
 
 /// a copy of the whole register.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill
@@ -1452,13 +1409,13 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_move(const cstub_Km_ZNB_Orb
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_gsr_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_gsr* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_gsr_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_gsr* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_gsr_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_gsr& v, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_gsr* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_gsr_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_gsr& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_gsr* base, int offset);
 
 /// a copy of the whole register.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
@@ -1466,13 +1423,13 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_gsr_move(const cstub_Km_ZNB_Orbis_R5_
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_loadi(const cstub_Km_ZNB_Orbis_R5_64k_vbool1* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_loadi(const cstub_Km_ZNB_Orbis_R5_64k_vbool1* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_storei(const cstub_Km_ZNB_Orbis_R5_64k_vbool1& v, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_storei(const cstub_Km_ZNB_Orbis_R5_64k_vbool1& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1* base, int offset);
 
 /// a copy of the whole register.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
@@ -1494,8 +1451,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int24_move(const cstub_Km_ZNB_Orbis_R
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32pr_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr*
-    base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32pr_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
@@ -1522,8 +1479,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int48_move(const cstub_Km_ZNB_Orbis_R
 
 /// loads the whole register. The address is base + offset bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int64pr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64pr_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_int64pr*
-    base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64pr_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_int64pr* base,
+    int offset);
 
 /// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
@@ -1558,8 +1515,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_qv_vec2Nx8(signed char value);
 
 /// lane 0 of the source.
 KASTARRI_RESULT signed char
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& from);
 
 /// every lane = the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
@@ -1567,8 +1523,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_qv_vec2Nx8(unsigned char valu
 
 /// lane 0 of the source.
 KASTARRI_RESULT unsigned char
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& from);
 
 /// every lane = the source, its low 8 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
@@ -1576,8 +1531,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_vec2Nx8(short value);
 
 /// lane 0 of the source, sign-extended.
 KASTARRI_RESULT short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& from);
 
 /// every lane = the source, its low 8 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
@@ -1585,8 +1539,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_vec2Nx8(unsigned short va
 
 /// lane 0 of the source, sign-extended.
 KASTARRI_RESULT unsigned short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_uint16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& from);
 
 /// every lane = the source, its low 8 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
@@ -1594,8 +1547,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vec2Nx8(int value);
 
 /// lane 0 of the source, sign-extended.
 KASTARRI_RESULT int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& from);
 
 /// every lane = the source, its low 8 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
@@ -1603,18 +1555,15 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vec2Nx8(unsigned int valu
 
 /// lane 0 of the source, sign-extended.
 KASTARRI_RESULT unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_uint32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& from);
 
 /// lane i = lane i of the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_qv_vec2Nx8(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_qv_vec2Nx8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& from);
 
 /// every lane = the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_vec2Nx8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_vec2Nx8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& from);
 
 /// every lane = the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
@@ -1622,8 +1571,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_qv_vec2Nx8U(signed char value)
 
 /// lane 0 of the source.
 KASTARRI_RESULT signed char
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_int8(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& from);
 
 /// every lane = the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
@@ -1631,8 +1579,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_qv_vec2Nx8U(unsigned char val
 
 /// lane 0 of the source.
 KASTARRI_RESULT unsigned char
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_uint8(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& from);
 
 /// every lane = the source, its low 8 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
@@ -1640,8 +1587,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_vec2Nx8U(short value);
 
 /// lane 0 of the source, zero-extended.
 KASTARRI_RESULT short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_int16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& from);
 
 /// every lane = the source, its low 8 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
@@ -1649,8 +1595,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_vec2Nx8U(unsigned short v
 
 /// lane 0 of the source, zero-extended.
 KASTARRI_RESULT unsigned short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_uint16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& from);
 
 /// every lane = the source, its low 8 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
@@ -1658,8 +1603,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vec2Nx8U(int value);
 
 /// lane 0 of the source, zero-extended.
 KASTARRI_RESULT int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_int32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& from);
 
 /// every lane = the source, its low 8 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
@@ -1667,23 +1611,19 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vec2Nx8U(unsigned int val
 
 /// lane 0 of the source, zero-extended.
 KASTARRI_RESULT unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_uint32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& from);
 
 /// lane i = lane i of the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_qv_vec2Nx8U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_qv_vec2Nx8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& from);
 
 /// lane i = lane i of the source, its low 8 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_vec2Nx8U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_vec2Nx8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& from);
 
 /// every lane = the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_vec2Nx8U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_vec2Nx8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& from);
 
 /// every lane = the source, sign-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
@@ -1691,8 +1631,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_qv_vecNx16(signed char value);
 
 /// lane 0 of the source, its low 8 bits.
 KASTARRI_RESULT signed char
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
 
 /// every lane = the source, zero-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
@@ -1700,8 +1639,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_qv_vecNx16(unsigned char valu
 
 /// lane 0 of the source, its low 8 bits.
 KASTARRI_RESULT unsigned char
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
 
 /// every lane = the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
@@ -1709,8 +1647,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_vecNx16(short value);
 
 /// lane 0 of the source.
 KASTARRI_RESULT short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
 
 /// every lane = the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
@@ -1718,8 +1655,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_vecNx16(unsigned short va
 
 /// lane 0 of the source.
 KASTARRI_RESULT unsigned short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_uint16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
 
 /// every lane = the source, its low 16 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
@@ -1727,8 +1663,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vecNx16(int value);
 
 /// lane 0 of the source, sign-extended.
 KASTARRI_RESULT int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
 
 /// every lane = the source, its low 16 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
@@ -1736,28 +1671,23 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vecNx16(unsigned int valu
 
 /// lane 0 of the source, sign-extended.
 KASTARRI_RESULT unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_uint32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
 
 /// lane i = lane i of the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_vecNx16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_vecNx16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
 
 /// lane i = lane i of the source, sign-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_qv_vecNx16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_qv_vecNx16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& from);
 
 /// lane i = lane i of the source, zero-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_qv_vecNx16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_qv_vecNx16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& from);
 
 /// every lane = the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_vecNx16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_vecNx16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& from);
 
 /// every lane = the source, sign-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
@@ -1765,8 +1695,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_qv_vecNx16U(signed char value)
 
 /// lane 0 of the source, its low 8 bits.
 KASTARRI_RESULT signed char
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_int8(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
 
 /// every lane = the source, zero-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
@@ -1774,8 +1703,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_qv_vecNx16U(unsigned char val
 
 /// lane 0 of the source, its low 8 bits.
 KASTARRI_RESULT unsigned char
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_uint8(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
 
 /// every lane = the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
@@ -1783,8 +1711,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_vecNx16U(short value);
 
 /// lane 0 of the source.
 KASTARRI_RESULT short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_int16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
 
 /// every lane = the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
@@ -1792,8 +1719,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_vecNx16U(unsigned short v
 
 /// lane 0 of the source.
 KASTARRI_RESULT unsigned short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_uint16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
 
 /// every lane = the source, its low 16 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
@@ -1801,8 +1727,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vecNx16U(int value);
 
 /// lane 0 of the source, zero-extended.
 KASTARRI_RESULT int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_int32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
 
 /// every lane = the source, its low 16 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
@@ -1810,33 +1735,27 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vecNx16U(unsigned int val
 
 /// lane 0 of the source, zero-extended.
 KASTARRI_RESULT unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_uint32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
 
 /// lane i = lane i of the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNx16U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNx16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
 
 /// lane i = lane i of the source, sign-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_qv_vecNx16U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_qv_vecNx16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& from);
 
 /// lane i = lane i of the source, zero-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_qv_vecNx16U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_qv_vecNx16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& from);
 
 /// lane i = lane i of the source, its low 16 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_vecNx16U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_vecNx16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& from);
 
 /// every lane = the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_vecNx16U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_vecNx16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& from);
 
 /// every lane = the source, sign-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
@@ -1844,8 +1763,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_qv_vecN_2x32v(signed char valu
 
 /// lane 0 of the source, its low 8 bits.
 KASTARRI_RESULT signed char
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_int8(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
 
 /// every lane = the source, zero-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
@@ -1853,8 +1771,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_qv_vecN_2x32v(unsigned char v
 
 /// lane 0 of the source, its low 8 bits.
 KASTARRI_RESULT unsigned char
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_uint8(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
 
 /// every lane = the source, sign-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
@@ -1862,8 +1779,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_vecN_2x32v(short value);
 
 /// lane 0 of the source, its low 16 bits.
 KASTARRI_RESULT short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_int16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
 
 /// every lane = the source, zero-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
@@ -1871,8 +1787,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_vecN_2x32v(unsigned short
 
 /// lane 0 of the source, its low 16 bits.
 KASTARRI_RESULT unsigned short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_uint16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
 
 /// every lane = the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
@@ -1880,8 +1795,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vecN_2x32v(int value);
 
 /// lane 0 of the source.
 KASTARRI_RESULT int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_int32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
 
 /// every lane = the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
@@ -1889,28 +1803,23 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vecN_2x32v(unsigned int v
 
 /// lane 0 of the source.
 KASTARRI_RESULT unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_uint32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
 
 /// lane i = lane i of the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_vecN_2x32v(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_vecN_2x32v(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
 
 /// lane i = lane i of the source, sign-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_qv_vecN_2x32v(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_qv_vecN_2x32v(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& from);
 
 /// lane i = lane i of the source, zero-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_qv_vecN_2x32v(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_qv_vecN_2x32v(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& from);
 
 /// every lane = the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_vecN_2x32v(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_vecN_2x32v(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& from);
 
 /// every lane = the source, sign-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
@@ -1918,8 +1827,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_qv_vecN_2x32Uv(signed char val
 
 /// lane 0 of the source, its low 8 bits.
 KASTARRI_RESULT signed char
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_int8(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
 
 /// every lane = the source, zero-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
@@ -1927,8 +1835,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_qv_vecN_2x32Uv(unsigned char 
 
 /// lane 0 of the source, its low 8 bits.
 KASTARRI_RESULT unsigned char
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_uint8(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
 
 /// every lane = the source, sign-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
@@ -1936,8 +1843,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_vecN_2x32Uv(short value);
 
 /// lane 0 of the source, its low 16 bits.
 KASTARRI_RESULT short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_int16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
 
 /// every lane = the source, zero-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
@@ -1945,8 +1851,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_vecN_2x32Uv(unsigned shor
 
 /// lane 0 of the source, its low 16 bits.
 KASTARRI_RESULT unsigned short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_uint16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
 
 /// every lane = the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
@@ -1954,8 +1859,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vecN_2x32Uv(int value);
 
 /// lane 0 of the source.
 KASTARRI_RESULT int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_int32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
 
 /// every lane = the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
@@ -1963,33 +1867,27 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vecN_2x32Uv(unsigned int 
 
 /// lane 0 of the source.
 KASTARRI_RESULT unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_uint32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
 
 /// lane i = lane i of the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2x32Uv(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2x32Uv(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
 
 /// lane i = lane i of the source, sign-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_qv_vecN_2x32Uv(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_qv_vecN_2x32Uv(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& from);
 
 /// lane i = lane i of the source, zero-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_qv_vecN_2x32Uv(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_qv_vecN_2x32Uv(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& from);
 
 /// lane i = lane i of the source, its low 32 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x64w_rtor_qv_vecN_2x32Uv(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x64w_rtor_qv_vecN_2x32Uv(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& from);
 
 /// every lane = the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_vecN_2x32Uv(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_vecN_2x32Uv(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& from);
 
 /// every lane = the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
@@ -1997,13 +1895,11 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int64_rtor_qv_vecN_4x64(long long value)
 
 /// lane 0 of the source.
 KASTARRI_RESULT long long
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_rtor_int64(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_rtor_int64(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& from);
 
 /// every lane = the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_rtor_qv_vecN_4x64(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int64& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_rtor_qv_vecN_4x64(const cstub_Km_ZNB_Orbis_R5_64k_qv_int64& from);
 
 /// every lane = the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
@@ -2015,13 +1911,11 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_float_rtor_qv_vecN_2xf32(float value);
 
 /// lane 0 of the source.
 KASTARRI_RESULT float
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_float(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_float(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
 
 /// every lane = the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_rtor_qv_vecN_2xf32(const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_rtor_qv_vecN_2xf32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& from);
 
 /// every lane = the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8
@@ -2045,13 +1939,11 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vecNx8(unsigned int value
 
 /// lane 0 of the source, sign-extended.
 KASTARRI_RESULT unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& from);
 
 /// lane i = lane i of the source, its low 8 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNx8(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNx8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
 
 /// every lane = the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U
@@ -2059,8 +1951,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_qv_vecNx8U(unsigned char valu
 
 /// lane 0 of the source.
 KASTARRI_RESULT unsigned char
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& from);
 
 /// every lane = the source, its low 8 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U
@@ -2068,8 +1959,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vecNx8U(int value);
 
 /// lane 0 of the source, zero-extended.
 KASTARRI_RESULT int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& from);
 
 /// every lane = the source, its low 8 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U
@@ -2077,23 +1967,19 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vecNx8U(unsigned int valu
 
 /// lane 0 of the source, zero-extended.
 KASTARRI_RESULT unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_uint32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& from);
 
 /// lane i = lane i of the source, its low 8 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNx8U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNx8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
 
 /// lane i = lane i of the source, its low 8 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_vecNx8U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_vecNx8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
 
 /// every lane = the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_vecNx8U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_vecNx8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& from);
 
 /// every lane = the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16
@@ -2101,8 +1987,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_vecN_2x16(short value);
 
 /// lane 0 of the source.
 KASTARRI_RESULT short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_int16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& from);
 
 /// every lane = the source, its low 16 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16
@@ -2110,8 +1995,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vecN_2x16(int value);
 
 /// lane 0 of the source, sign-extended.
 KASTARRI_RESULT int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_int32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& from);
 
 /// every lane = the source, its low 16 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16
@@ -2119,13 +2003,11 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vecN_2x16(unsigned int va
 
 /// lane 0 of the source, sign-extended.
 KASTARRI_RESULT unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_uint32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& from);
 
 /// lane i = lane i of the source, its low 16 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2x16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2x16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
 
 /// every lane = the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U
@@ -2133,8 +2015,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_vecN_2x16U(unsigned short
 
 /// lane 0 of the source.
 KASTARRI_RESULT unsigned short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_uint16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& from);
 
 /// every lane = the source, its low 16 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U
@@ -2142,8 +2023,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vecN_2x16U(int value);
 
 /// lane 0 of the source, zero-extended.
 KASTARRI_RESULT int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_int32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& from);
 
 /// every lane = the source, its low 16 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U
@@ -2151,28 +2031,23 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vecN_2x16U(unsigned int v
 
 /// lane 0 of the source, zero-extended.
 KASTARRI_RESULT unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_uint32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& from);
 
 /// lane i = lane i of the source, its low 16 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2x16U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2x16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
 
 /// lane i = lane i of the source, its low 16 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_vecN_2x16U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_vecN_2x16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
 
 /// every lane = the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_vecN_2x16U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_vecN_2x16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& from);
 
 /// every lane = the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_vecN_2xf16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_vecN_2xf16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& from);
 
 /// every lane = the source, sign-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
@@ -2180,8 +2055,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_vec2Nx24(short value);
 
 /// lane 0 of the source, its low 16 bits.
 KASTARRI_RESULT short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_int16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& from);
 
 /// every lane = the source, zero-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
@@ -2189,8 +2063,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_vec2Nx24(unsigned short v
 
 /// lane 0 of the source, its low 16 bits.
 KASTARRI_RESULT unsigned short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_uint16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& from);
 
 /// every lane = the source, its low 24 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
@@ -2198,8 +2071,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vec2Nx24(int value);
 
 /// lane 0 of the source, sign-extended.
 KASTARRI_RESULT int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_int32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& from);
 
 /// every lane = the source, its low 24 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
@@ -2207,23 +2079,19 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vec2Nx24(unsigned int val
 
 /// lane 0 of the source, sign-extended.
 KASTARRI_RESULT unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_uint32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& from);
 
 /// lane i = lane i of the source, sign-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16w_rtor_qv_vec2Nx24(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16w_rtor_qv_vec2Nx24(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w& from);
 
 /// lane i = lane i of the source, zero-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16Uw_rtor_qv_vec2Nx24(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16Uw_rtor_qv_vec2Nx24(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw& from);
 
 /// lane i = bits 24 i to 24 i + 23 of the source, sign-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_rtor_qv_vec2Nx24(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_rtor_qv_vec2Nx24(const cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill& from);
 
 /// every lane = the source, sign-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
@@ -2231,8 +2099,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vecNx48(int value);
 
 /// lane 0 of the source, its low 32 bits.
 KASTARRI_RESULT int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& from);
 
 /// every lane = the source, zero-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
@@ -2240,53 +2107,43 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vecNx48(unsigned int valu
 
 /// lane 0 of the source, its low 32 bits.
 KASTARRI_RESULT unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_uint32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& from);
 
 /// lane i = lane i of the source, sign-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32_rtor_qv_vecNx48(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32_rtor_qv_vecNx48(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32& from);
 
 /// lane i = lane i of the source, zero-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32U_rtor_qv_vecNx48(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32U_rtor_qv_vecNx48(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U& from);
 
 /// lane i = bits 48 i to 48 i + 47 of the source, sign-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_rtor_qv_vecNx48(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_rtor_qv_vecNx48(const cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill& from);
 
 /// lane i = lane i of the source, its low 16 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_vec2Nx16w(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_vec2Nx16w(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& from);
 
 /// lane i = lane i of the source, its low 16 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_vec2Nx16Uw(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_vec2Nx16Uw(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& from);
 
 /// lane i = lane i of the source, its low 32 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_vecNx32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_vecNx32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& from);
 
 /// lane i = lane i of the source, its low 32 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_vecNx32U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_vecNx32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& from);
 
 /// lane i of the source in bits 24 i to 24 i + 23, without gaps.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_wvecspill(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_wvecspill(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& from);
 
 /// lane i of the source in bits 48 i to 48 i + 47, without gaps.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_wvecspill(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_wvecspill(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& from);
 
 /// every bit = the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
@@ -2502,18 +2359,15 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_uint32(const cstub_Km_ZNB_O
 
 /// lane 0 of the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_qv_int8(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_qv_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& from);
 
 /// lane 0 of the source, its low 8 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_int8(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
 
 /// lane 0 of the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_qv_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_qv_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& from);
 
 /// the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
@@ -2557,18 +2411,15 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_uint32(const cstub_Km_ZNB_
 
 /// lane 0 of the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_qv_int8U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_qv_int8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& from);
 
 /// lane 0 of the source, its low 8 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_int8U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_int8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
 
 /// lane 0 of the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_qv_int8U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_qv_int8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& from);
 
 /// the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
@@ -2576,8 +2427,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_int8U(const cstub_Km_ZNB
 
 /// the source, its low 8 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_int8U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_int8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& from);
 
 /// the source, sign-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
@@ -2629,18 +2479,15 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_uint32(const cstub_Km_ZNB_
 
 /// lane 0 of the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_int16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
 
 /// lane 0 of the source, its low 16 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_int16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
 
 /// lane 0 of the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_qv_int16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_qv_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& from);
 
 /// the source, sign-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
@@ -2648,13 +2495,11 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_int16(const cstub_Km_ZNB
 
 /// the source, zero-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& from);
 
 /// the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_int16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& from);
 
 /// the source, sign-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
@@ -2686,8 +2531,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_int16U(unsigned short val
 
 /// the source.
 KASTARRI_RESULT unsigned short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& from);
 
 /// the source, its low 16 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
@@ -2703,48 +2547,39 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_int16U(unsigned int value
 
 /// the source, zero-extended.
 KASTARRI_RESULT unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& from);
 
 /// lane 0 of the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_int16U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_int16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
 
 /// lane 0 of the source, its low 16 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_int16U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_int16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
 
 /// lane 0 of the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_qv_int16U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_qv_int16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& from);
 
 /// the source, zero-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& from);
 
 /// the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_int16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_int16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& from);
 
 /// the source, its low 16 bits.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int48_rtor_qv_int16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int48&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int48_rtor_qv_int16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int48& from);
 
 /// lane 0 of the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_f16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_f16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
 
 /// lane 0 of the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_rtor_qv_f16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_rtor_qv_f16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& from);
 
 /// the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkfloat
@@ -2756,8 +2591,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_rtor_float(const cstub_Km_ZNB_Or
 
 /// lane 0 of the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_rkfloat(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_rkfloat(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
 
 /// the source, sign-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int24
@@ -2805,18 +2639,15 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_int32v(unsigned int value
 
 /// the source.
 KASTARRI_RESULT unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& from);
 
 /// lane 0 of the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_int32v(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_int32v(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
 
 /// the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_int32v(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_int32v(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& from);
 
 /// the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
@@ -2824,8 +2655,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_int32Uv(int value);
 
 /// the source.
 KASTARRI_RESULT int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& from);
 
 /// the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
@@ -2833,18 +2663,15 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_int32Uv(unsigned int valu
 
 /// the source.
 KASTARRI_RESULT unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_uint32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& from);
 
 /// lane 0 of the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_int32Uv(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_int32Uv(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
 
 /// the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_int32Uv(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_int32Uv(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& from);
 
 /// the source, sign-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
@@ -2852,8 +2679,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_qv_int32pr(signed char value);
 
 /// the source, its low 8 bits.
 KASTARRI_RESULT signed char
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32pr_rtor_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32pr_rtor_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& from);
 
 /// the source, zero-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
@@ -2861,8 +2687,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_qv_int32pr(unsigned char valu
 
 /// the source, its low 8 bits.
 KASTARRI_RESULT unsigned char
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32pr_rtor_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32pr_rtor_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& from);
 
 /// the source, sign-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
@@ -2870,8 +2695,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_int32pr(short value);
 
 /// the source, its low 16 bits.
 KASTARRI_RESULT short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32pr_rtor_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32pr_rtor_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& from);
 
 /// the source, zero-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
@@ -2879,8 +2703,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_int32pr(unsigned short va
 
 /// the source, its low 16 bits.
 KASTARRI_RESULT unsigned short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32pr_rtor_uint16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32pr_rtor_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& from);
 
 /// the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
@@ -2888,8 +2711,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_int32pr(int value);
 
 /// the source.
 KASTARRI_RESULT int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32pr_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32pr_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& from);
 
 /// the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
@@ -2897,38 +2719,31 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_int32pr(unsigned int valu
 
 /// the source.
 KASTARRI_RESULT unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32pr_rtor_uint32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32pr_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& from);
 
 /// the source, sign-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_int32pr(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_int32pr(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& from);
 
 /// the source, zero-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int32pr(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int32pr(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& from);
 
 /// the source, sign-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_int32pr(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_int32pr(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& from);
 
 /// the source, zero-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_int32pr(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_int32pr(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& from);
 
 /// the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_int32pr(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_int32pr(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& from);
 
 /// the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_int32pr(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_int32pr(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& from);
 
 /// the source, sign-extended.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int48
@@ -2964,18 +2779,15 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_rtor_int64(const cstub_Km_ZNB_O
 
 /// lane 0 of the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int64
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_rtor_qv_int64(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_rtor_qv_int64(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& from);
 
 /// lane 0 of the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int128
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_rtor_qv_int128(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_rtor_qv_int128(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& from);
 
 /// lane 0 of the source.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int256
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_rtor_qv_int256(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_rtor_qv_int256(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& from);
 
 /* Conversions between registers and memory of another type. A host scalar lies at the address with the bits
    below its size ignored; a register type at the address as it is.
@@ -2987,8 +2799,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_mtor_qv_vec2Nx8(const signed char* 
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_mtor_qv_vec2Nx8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8*
-    base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_mtor_qv_vec2Nx8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
@@ -2996,8 +2808,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_mtor_qv_vec2Nx8U(const unsigned ch
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_mtor_qv_vec2Nx8U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_mtor_qv_vec2Nx8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers; the
 /// address is rounded down to its size.
@@ -3010,18 +2822,18 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_mtor_qv_vecNx16(const signed char* 
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_mtor_qv_vecNx16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_mtor_qv_vecNx16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_mtor_qv_vecNx16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_mtor_qv_vecNx16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_mtor_qv_vecNx16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_mtor_qv_vecNx16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers; the
 /// address is rounded down to its size.
@@ -3034,18 +2846,18 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_mtor_qv_vecNx16U(const unsigned ch
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_mtor_qv_vecNx16U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_mtor_qv_vecNx16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_mtor_qv_vecNx16U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_mtor_qv_vecNx16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_mtor_qv_vecNx16U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_mtor_qv_vecNx16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers; the
 /// address is rounded down to its size.
@@ -3064,18 +2876,18 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_mtor_qv_vecN_2x32v(const unsigned
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_mtor_qv_vecN_2x32v(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_mtor_qv_vecN_2x32v(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_mtor_qv_vecN_2x32v(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_mtor_qv_vecN_2x32v(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_mtor_qv_vecN_2x32v(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_mtor_qv_vecN_2x32v(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers; the
 /// address is rounded down to its size.
@@ -3098,18 +2910,18 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_mtor_qv_vecN_2x32Uv(const unsigned
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_mtor_qv_vecN_2x32Uv(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_mtor_qv_vecN_2x32Uv(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_mtor_qv_vecN_2x32Uv(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_mtor_qv_vecN_2x32Uv(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_mtor_qv_vecN_2x32Uv(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_mtor_qv_vecN_2x32Uv(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
@@ -3117,18 +2929,18 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int64_mtor_qv_vecN_4x64(const long long*
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_mtor_qv_vecN_4x64(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int64* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_mtor_qv_vecN_4x64(const cstub_Km_ZNB_Orbis_R5_64k_qv_int64* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_mtor_qv_vecNxf16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16*
-    base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_mtor_qv_vecNxf16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_mtor_qv_vecN_2xf32(const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_mtor_qv_vecN_2xf32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8
@@ -3150,33 +2962,33 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_mtor_qv_vecN_2x16U(const unsigned
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16w_mtor_qv_vec2Nx24(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16w_mtor_qv_vec2Nx24(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16Uw_mtor_qv_vec2Nx24(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16Uw_mtor_qv_vec2Nx24(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_mtor_qv_vec2Nx24(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_mtor_qv_vec2Nx24(const cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32_mtor_qv_vecNx48(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32_mtor_qv_vecNx48(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32U_mtor_qv_vecNx48(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32U_mtor_qv_vecNx48(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_mtor_qv_vecNx48(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_mtor_qv_vecNx48(const cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
@@ -3184,13 +2996,13 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_mtor_qv_int8(const signed char* bas
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_mtor_qv_int8(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_mtor_qv_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_mtor_qv_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8*
-    base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_mtor_qv_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
@@ -3198,13 +3010,13 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_mtor_qv_int8U(const unsigned char*
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_mtor_qv_int8U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_mtor_qv_int8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_mtor_qv_int8U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_mtor_qv_int8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers; the
 /// address is rounded down to its size.
@@ -3213,23 +3025,23 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_mtor_qv_int16(const short* base, i
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_mtor_qv_int16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_mtor_qv_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_mtor_qv_int16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_mtor_qv_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_mtor_qv_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8*
-    base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_mtor_qv_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_mtor_qv_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U*
-    base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_mtor_qv_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers; the
 /// address is rounded down to its size.
@@ -3238,33 +3050,33 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_mtor_qv_int16U(const unsigned sho
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_mtor_qv_int16U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_mtor_qv_int16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_mtor_qv_int16U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_mtor_qv_int16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_mtor_qv_int16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U*
-    base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_mtor_qv_int16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_mtor_qv_f16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_mtor_qv_f16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_mtor_qv_f16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_mtor_qv_f16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_mtor_rkfloat(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_mtor_rkfloat(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers; the
 /// address is rounded down to its size.
@@ -3283,8 +3095,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_mtor_qv_int32v(const unsigned int
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_mtor_qv_int32v(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_mtor_qv_int32v(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers; the
 /// address is rounded down to its size.
@@ -3298,8 +3110,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_mtor_qv_int32Uv(const unsigned in
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_mtor_qv_int32Uv(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_mtor_qv_int32Uv(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int48
@@ -3311,306 +3123,284 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int64_mtor_qv_int64(const long long* bas
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int64
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_mtor_qv_int64(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_mtor_qv_int64(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int128
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_mtor_qv_int128(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_mtor_qv_int128(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128* base,
+    int offset);
 
 /// loads the register from what is in memory at base + offset bytes, converted as between registers.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int256
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_mtor_qv_int256(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_mtor_qv_int256(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256* base,
+    int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtom_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8&
-    value, const signed char* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtom_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& value,
+    const signed char* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtom_qv_int8(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& value, const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtom_qv_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtom_uint8(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& value, const unsigned char* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtom_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& value,
+    const unsigned char* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtom_qv_int8U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& value, const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtom_qv_int8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated; the
 /// address is rounded down to its size.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtom_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16&
-    value, const short* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtom_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& value,
+    const short* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtom_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16&
-    value, const signed char* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtom_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& value,
+    const signed char* base, int offset);
 
 /// the register's value to memory at base + offset bytes: all lanes; where it is narrower, saturated.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtom_qv_vecNx8(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& value, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtom_qv_vecNx8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base, int offset);
 
 /// the register's value to memory at base + offset bytes: all lanes; where it is narrower, the low bits.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtom_qv_vecNx8U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& value, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtom_qv_vecNx8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtom_qv_int8(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& value, const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtom_qv_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtom_qv_int16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& value, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtom_qv_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits; the
 /// address is rounded down to its size.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtom_uint16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& value, const unsigned short* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtom_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& value,
+    const unsigned short* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtom_uint8(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& value, const unsigned char* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtom_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& value,
+    const unsigned char* base, int offset);
 
 /// the register's value to memory at base + offset bytes: all lanes; where it is narrower, the low bits.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtom_qv_vecNx8U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& value, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtom_qv_vecNx8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtom_qv_int8U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& value, const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtom_qv_int8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtom_qv_int16U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& value, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtom_qv_int16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated; the
 /// address is rounded down to its size.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtom_int16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& value, const short* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtom_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& value,
+    const short* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated; the
 /// address is rounded down to its size.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtom_int32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& value, const int* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtom_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& value,
+    const int* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits; the
 /// address is rounded down to its size.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtom_uint32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& value, const unsigned int* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtom_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& value,
+    const unsigned int* base, int offset);
 
 /// the register's value to memory at base + offset bytes: all lanes; where it is narrower, saturated.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtom_qv_vecN_2x16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& value, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtom_qv_vecN_2x16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base, int offset);
 
 /// the register's value to memory at base + offset bytes: all lanes; where it is narrower, the low bits.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtom_qv_vecN_2x16U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& value, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtom_qv_vecN_2x16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtom_qv_int16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& value, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtom_qv_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtom_qv_int32v(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& value, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtom_qv_int32v(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated; the
 /// address is rounded down to its size.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtom_int32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& value, const int* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtom_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& value,
+    const int* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits; the
 /// address is rounded down to its size.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtom_uint16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& value, const unsigned short* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtom_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& value,
+    const unsigned short* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits; the
 /// address is rounded down to its size.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtom_uint32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& value, const unsigned int* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtom_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& value,
+    const unsigned int* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtom_uint8(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& value, const unsigned char* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtom_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& value,
+    const unsigned char* base, int offset);
 
 /// the register's value to memory at base + offset bytes: all lanes; where it is narrower, the low bits.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtom_qv_vecN_2x16U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& value, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtom_qv_vecN_2x16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtom_qv_int16U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& value, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtom_qv_int16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtom_qv_int32Uv(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& value, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtom_qv_int32Uv(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_rtom_int64(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& value, const long long* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_rtom_int64(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& value,
+    const long long* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_rtom_qv_int64(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& value, const cstub_Km_ZNB_Orbis_R5_64k_qv_int64* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_rtom_qv_int64(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_rtom_qv_int128(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& value, const cstub_Km_ZNB_Orbis_R5_64k_qv_int128* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_rtom_qv_int128(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int128* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_rtom_qv_int256(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& value, const cstub_Km_ZNB_Orbis_R5_64k_qv_int256* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_rtom_qv_int256(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int256* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtom_qv_f16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& value, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtom_qv_f16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtom_rkfloat(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& value, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtom_rkfloat(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtom_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8&
-    value, const signed char* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtom_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& value,
+    const signed char* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtom_qv_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8&
-    value, const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtom_qv_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtom_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U&
-    value, const unsigned char* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtom_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& value,
+    const unsigned char* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtom_qv_int8U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& value, const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtom_qv_int8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated; the
 /// address is rounded down to its size.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtom_int16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& value, const short* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtom_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& value,
+    const short* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtom_qv_int16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& value, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtom_qv_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits; the
 /// address is rounded down to its size.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtom_uint16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& value, const unsigned short* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtom_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& value,
+    const unsigned short* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtom_qv_int16U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& value, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtom_qv_int16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_rtom_qv_f16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& value, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_rtom_qv_f16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated; the
 /// address is rounded down to its size.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtom_int32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& value, const int* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtom_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& value,
+    const int* base, int offset);
 
 /// the register's value to memory at base + offset bytes: all lanes; the low bits.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtom_qv_vec2Nx16w(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& value, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtom_qv_vec2Nx16w(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w* base, int offset);
 
 /// the register's value to memory at base + offset bytes: all lanes; the low bits.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtom_qv_vec2Nx16Uw(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& value, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtom_qv_vec2Nx16Uw(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw* base, int offset);
 
 /// the register's value to memory at base + offset bytes: all lanes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtom_qv_wvecspill(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& value, const cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtom_qv_wvecspill(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill* base, int offset);
 
 /// the register's value to memory at base + offset bytes: all lanes; the low bits.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtom_qv_vecNx32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& value, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtom_qv_vecNx32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32* base, int offset);
 
 /// the register's value to memory at base + offset bytes: all lanes; where it is narrower, the low bits.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtom_qv_vecNx32U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& value, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtom_qv_vecNx32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U* base, int offset);
 
 /// the register's value to memory at base + offset bytes: all lanes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtom_qv_wvecspill(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& value, const cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill* base, int
-    offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtom_qv_wvecspill(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
 KASTARRI_API void
@@ -3619,70 +3409,70 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtom_int8(const cstub_Km_ZNB_Orb
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtom_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U&
-    value, const unsigned char* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtom_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& value,
+    const unsigned char* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated; the
 /// address is rounded down to its size.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtom_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16&
-    value, const short* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtom_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& value,
+    const short* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtom_qv_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16&
-    value, const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtom_qv_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits; the
 /// address is rounded down to its size.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtom_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U&
-    value, const unsigned short* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtom_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& value,
+    const unsigned short* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtom_qv_int8U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& value, const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtom_qv_int8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated; the
 /// address is rounded down to its size.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int24_rtom_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int24&
-    value, const int* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int24_rtom_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int24& value,
+    const int* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated; the
 /// address is rounded down to its size.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtom_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v&
-    value, const int* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtom_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& value,
+    const int* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits; the
 /// address is rounded down to its size.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtom_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v&
-    value, const unsigned int* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtom_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& value,
+    const unsigned int* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated; the
 /// address is rounded down to its size.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtom_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv&
-    value, const int* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtom_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& value,
+    const int* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits; the
 /// address is rounded down to its size.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtom_uint32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& value, const unsigned int* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtom_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& value,
+    const unsigned int* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int48_rtom_int64(const cstub_Km_ZNB_Orbis_R5_64k_qv_int48&
-    value, const long long* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int48_rtom_int64(const cstub_Km_ZNB_Orbis_R5_64k_qv_int48& value,
+    const long long* base, int offset);
 
 /// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_rtom_int64(const cstub_Km_ZNB_Orbis_R5_64k_qv_int64&
-    value, const long long* base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_rtom_int64(const cstub_Km_ZNB_Orbis_R5_64k_qv_int64& value,
+    const long long* base, int offset);
 
 /* Conversions between integer and floating-point registers, and between half and single precision: value to
    value, where the other conversions move bits (the row kinds are those of src/frame/conversions.def).
@@ -3690,23 +3480,19 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_rtom_int64(const cstub_Km_ZNB_O
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_vecNx16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_vecNx16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_vecNx16U(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_vecNx16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2x32v(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2x32v(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2x32Uv(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2x32Uv(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
@@ -3714,8 +3500,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_vecNxf16(short value);
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
 KASTARRI_API short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_int16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
@@ -3723,8 +3508,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_vecNxf16(unsigned short v
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
 KASTARRI_API unsigned short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_uint16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
@@ -3732,8 +3516,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vecNxf16(int value);
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
 KASTARRI_API int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_int32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
@@ -3741,8 +3524,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vecNxf16(unsigned int val
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
 KASTARRI_API unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_uint32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
@@ -3750,23 +3532,19 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_float_rtor_qv_vecNxf16(float value);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API float
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_float(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_float(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNxf16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNxf16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_vecNxf16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_vecNxf16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_rtor_qv_vecNxf16(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_rtor_qv_vecNxf16(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
@@ -3774,8 +3552,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vecN_2xf32(int value);
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
 KASTARRI_API int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_int32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
@@ -3783,28 +3560,23 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vecN_2xf32(unsigned int v
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
 KASTARRI_API unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_uint32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2xf32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2xf32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_vecN_2xf32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_vecN_2xf32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_rtor_qv_vecN_2xf32(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_rtor_qv_vecN_2xf32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2xf16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2xf16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
 
 /// the source's value truncated toward zero and saturated to the target, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
@@ -3876,8 +3648,7 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_f16(const cstub_Km_ZNB_
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_f16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_f16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
@@ -3885,18 +3656,15 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_rtor_qv_f16(const cstub_Km_ZNB_O
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_f16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v&
-    from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_f16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_f16(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_f16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_rkfloat(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_rkfloat(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
 
 /// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat

@@ -28,82 +28,82 @@ KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_WUR_FSR(unsign
 /// a + b, rounded by RoundMode, with flags. A NaN among the operands is the result, the first one, made
 /// quiet.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ADD_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ADD_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// a + b, rounded by RoundMode, with flags. A NaN among the operands is the result, the first one, made
 /// quiet.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ADD_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ADD_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// a - b, rounded by RoundMode, with flags. A NaN among the operands is the result, the first one, made
 /// quiet.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_SUB_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_SUB_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// a - b, rounded by RoundMode, with flags. A NaN among the operands is the result, the first one, made
 /// quiet.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_SUB_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_SUB_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// a * b, rounded by RoundMode, with flags. A NaN among the operands is the result, the first one, made
 /// quiet.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MUL_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MUL_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// a * b, rounded by RoundMode, with flags. A NaN among the operands is the result, the first one, made
 /// quiet.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MUL_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MUL_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// acc = acc + a * b, rounded once, by RoundMode. Of several NaNs, a goes before b, b before acc.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MADD_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MADD_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// acc = acc + a * b, rounded once, by RoundMode. Of several NaNs, a goes before b, b before acc.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MADD_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MADD_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// acc = acc - a * b, rounded once, by RoundMode. Of several NaNs, a goes before b, b before acc.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MSUB_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MSUB_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// acc = acc - a * b, rounded once, by RoundMode. Of several NaNs, a goes before b, b before acc.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MSUB_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MSUB_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// acc = acc + a * b, rounded once, to nearest whatever RoundMode says. Of several NaNs, a goes before b, b
 /// before acc.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MADDN_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MADDN_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// acc = acc + a * b, rounded once, to nearest whatever RoundMode says. Of several NaNs, a goes before b, b
 /// before acc.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MADDN_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MADDN_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// acc = acc - a * b, rounded once, to nearest whatever RoundMode says. Of several NaNs, a goes before b, b
 /// before acc.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MSUBN_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MSUBN_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// acc = acc - a * b, rounded once, to nearest whatever RoundMode says. Of several NaNs, a goes before b, b
 /// before acc.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MSUBN_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MSUBN_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// a with its sign cleared: bits only, NaNs too.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
@@ -123,28 +123,28 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_NEG_S(const cstub_Km_ZNB_Orbis_R
 
 /// the smaller of a and b; -0 is below +0, a NaN is the result.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MIN_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MIN_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// the smaller of a and b; -0 is below +0, a NaN is the result.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MIN_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MIN_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// the larger of a and b; -0 is below +0, a NaN is the result.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MAX_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MAX_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// the larger of a and b; -0 is below +0, a NaN is the result.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MAX_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MAX_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// the smaller of a and b; -0 is below +0, a number wins over a NaN.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MINNUM_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MINNUM_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// the smaller of a and b; -0 is below +0, a number wins over a NaN.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
@@ -153,8 +153,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MINNUM_S(const cstub_Km_ZNB_Orbi
 
 /// the larger of a and b; -0 is below +0, a number wins over a NaN.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MAXNUM_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MAXNUM_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// the larger of a and b; -0 is below +0, a number wins over a NaN.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
@@ -184,182 +184,182 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_CONST_S(immediate number);
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OEQ_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OEQ_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OEQ_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OEQ_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OEQA_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OEQA_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OLT_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OLT_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OLT_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OLT_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OLTA_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OLTA_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OLE_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OLE_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OLE_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OLE_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OLEA_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OLEA_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OGT_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OGT_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OGT_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OGT_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OGTA_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OGTA_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OGE_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OGE_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OGE_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OGE_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OGEA_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OGEA_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UEQ_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UEQ_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UEQ_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UEQ_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULT_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULT_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULT_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULT_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULE_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULE_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULE_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULE_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UN_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UN_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UN_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UN_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULEQ_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULEQ_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULEQ_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULEQ_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULTQ_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULTQ_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULTQ_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULTQ_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UNEQ_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UNEQ_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UNEQ_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UNEQ_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
 /// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UNEQA_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UNEQA_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// x / 2^(scale mod 32), rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
@@ -486,8 +486,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_NEXP01_S(const cstub_Km_ZNB_Orbi
 /// 2 to the power: e of a less e of b, clamped to the exponents of normal numbers. The e of a zero, infinity
 /// or NaN is 0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MKDADJ_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MKDADJ_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// 2 to the power: e of a less e of b, clamped to the exponents of normal numbers. The e of a zero, infinity
 /// or NaN is 0.
@@ -505,23 +505,23 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MKSADJ_S(const cstub_Km_ZNB_Orbi
 
 /// r = r * 2^(e of a): toward zero and without flags; r stays when either is zero, infinite or a NaN.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ADDEXP_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ADDEXP_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a);
 
 /// r = r * 2^(e of a): toward zero and without flags; r stays when either is zero, infinite or a NaN.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ADDEXP_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ADDEXP_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a);
 
 /// r = r * 2^(e of a): rounded by RoundMode with flags; r stays when either is zero, infinite or a NaN.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ADDEXPM_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ADDEXPM_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a);
 
 /// r = r * 2^(e of a): rounded by RoundMode with flags; r stays when either is zero, infinite or a NaN.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ADDEXPM_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ADDEXPM_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a);
 
 /// a.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
@@ -533,63 +533,63 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOV_S(const cstub_Km_ZNB_Orbis_R
 
 /// r = a where the boolean is true, else as it was.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVT_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVT_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
 
 /// r = a where the boolean is true, else as it was.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVT_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVT_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
 
 /// r = a where the boolean is false, else as it was.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVF_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVF_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
 
 /// r = a where the boolean is false, else as it was.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVF_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVF_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
 
 /// r = a where the integer is 0, else as it was.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVEQZ_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, int condition);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVEQZ_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, int condition);
 
 /// r = a where the integer is 0, else as it was.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVEQZ_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, int condition);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVEQZ_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, int condition);
 
 /// r = a where the integer is not 0, else as it was.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVNEZ_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, int condition);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVNEZ_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, int condition);
 
 /// r = a where the integer is not 0, else as it was.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVNEZ_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, int condition);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVNEZ_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, int condition);
 
 /// r = a where the integer is at least 0, else as it was.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVGEZ_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, int condition);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVGEZ_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, int condition);
 
 /// r = a where the integer is at least 0, else as it was.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVGEZ_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, int condition);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVGEZ_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, int condition);
 
 /// r = a where the integer is below 0, else as it was.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVLTZ_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, int condition);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVLTZ_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, int condition);
 
 /// r = a where the integer is below 0, else as it was.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVLTZ_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, int condition);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVLTZ_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, int condition);
 
 /// the bits of a, in the low 16.
 KASTARRI_API unsigned
@@ -623,41 +623,41 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDN_2XF32(const cstub_Km_ZNB_Orbis_
 
 /// lane i = a[i] + b[i], rounded by RoundMode, with flags. The first NaN operand is the result, made quiet.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// lane i = a[i] + b[i], rounded by RoundMode, with flags. The first NaN operand is the result, made quiet.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// lane i = a[i] + b[i], rounded by RoundMode, with flags. The first NaN operand is the result, made quiet.
 /// Where predicate bit i is 0, r keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDNXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDNXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// lane i = a[i] + b[i], rounded by RoundMode, with flags. The first NaN operand is the result, made quiet.
 /// Where predicate bit i is 0, r keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDN_2XF32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDN_2XF32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// lane i = a[i] + b[i], rounded by RoundMode, with flags. The first NaN operand is the result, made quiet.
 /// Where predicate bit i is 0, r keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = a[i] + b[i], rounded by RoundMode, with flags. The first NaN operand is the result, made quiet.
 /// Where predicate bit i is 0, r keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDF32T(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDF32T(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = a[i] - b[i], otherwise as ADD.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
@@ -671,37 +671,37 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBN_2XF32(const cstub_Km_ZNB_Orbis_
 
 /// lane i = a[i] - b[i], otherwise as ADD.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// lane i = a[i] - b[i], otherwise as ADD.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// lane i = a[i] - b[i], otherwise as ADD. Where predicate bit i is 0, r keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBNXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBNXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// lane i = a[i] - b[i], otherwise as ADD. Where predicate bit i is 0, r keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBN_2XF32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBN_2XF32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// lane i = a[i] - b[i], otherwise as ADD. Where predicate bit i is 0, r keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = a[i] - b[i], otherwise as ADD. Where predicate bit i is 0, r keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBF32T(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBF32T(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = a[i] * b[i], otherwise as ADD.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
@@ -715,43 +715,43 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULN_2XF32(const cstub_Km_ZNB_Orbis_
 
 /// lane i = a[i] * b[i], otherwise as ADD.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// lane i = a[i] * b[i], otherwise as ADD.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// lane i = a[i] * b[i], otherwise as ADD. Where predicate bit i is 0, r keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULNXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULNXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// lane i = a[i] * b[i], otherwise as ADD. Where predicate bit i is 0, r keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULN_2XF32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULN_2XF32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// lane i = a[i] * b[i], otherwise as ADD. Where predicate bit i is 0, r keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = a[i] * b[i], otherwise as ADD. Where predicate bit i is 0, r keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULF32T(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULF32T(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i of acc = acc[i] + a[i] * b[i], rounded once, by RoundMode, with flags. Of several NaNs, a[i] goes
 /// before b[i], b[i] before acc[i].
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANXF16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANXF16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b);
 
 /// lane i of acc = acc[i] + a[i] * b[i], rounded once, by RoundMode, with flags. Of several NaNs, a[i] goes
 /// before b[i], b[i] before acc[i].
@@ -762,47 +762,47 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAN_2XF32(cstub_Km_ZNB_Orbis_R5_64
 /// lane i of acc = acc[i] + a[i] * b[i], rounded once, by RoundMode, with flags. Of several NaNs, a[i] goes
 /// before b[i], b[i] before acc[i].
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAF16(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAF16(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// lane i of acc = acc[i] + a[i] * b[i], rounded once, by RoundMode, with flags. Of several NaNs, a[i] goes
 /// before b[i], b[i] before acc[i].
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAF32(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAF32(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// lane i of acc = acc[i] + a[i] * b[i], rounded once, by RoundMode, with flags. Of several NaNs, a[i] goes
 /// before b[i], b[i] before acc[i]. Where predicate bit i is 0, acc keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// lane i of acc = acc[i] + a[i] * b[i], rounded once, by RoundMode, with flags. Of several NaNs, a[i] goes
 /// before b[i], b[i] before acc[i]. Where predicate bit i is 0, acc keeps lane i and raises no flag.
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAN_2XF32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// lane i of acc = acc[i] + a[i] * b[i], rounded once, by RoundMode, with flags. Of several NaNs, a[i] goes
 /// before b[i], b[i] before acc[i]. Where predicate bit i is 0, acc keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i of acc = acc[i] + a[i] * b[i], rounded once, by RoundMode, with flags. Of several NaNs, a[i] goes
 /// before b[i], b[i] before acc[i]. Where predicate bit i is 0, acc keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAF32T(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAF32T(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i of acc = acc[i] - a[i] * b[i], otherwise as MULA.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSNXF16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSNXF16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b);
 
 /// lane i of acc = acc[i] - a[i] * b[i], otherwise as MULA.
 KASTARRI_API void
@@ -811,41 +811,41 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSN_2XF32(cstub_Km_ZNB_Orbis_R5_64
 
 /// lane i of acc = acc[i] - a[i] * b[i], otherwise as MULA.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSF16(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSF16(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// lane i of acc = acc[i] - a[i] * b[i], otherwise as MULA.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSF32(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSF32(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// lane i of acc = acc[i] - a[i] * b[i], otherwise as MULA. Where predicate bit i is 0, acc keeps lane i and
 /// raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSNXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSNXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// lane i of acc = acc[i] - a[i] * b[i], otherwise as MULA. Where predicate bit i is 0, acc keeps lane i and
 /// raises no flag.
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSN_2XF32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// lane i of acc = acc[i] - a[i] * b[i], otherwise as MULA. Where predicate bit i is 0, acc keeps lane i and
 /// raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i of acc = acc[i] - a[i] * b[i], otherwise as MULA. Where predicate bit i is 0, acc keeps lane i and
 /// raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSF32T(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSF32T(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = a[i] without its sign: bits only, NaNs too.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
@@ -866,26 +866,26 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSF32(const cstub_Km_ZNB_Orbis_R5_6
 /// lane i = a[i] without its sign: bits only, NaNs too. Where predicate bit i is 0, r keeps lane i and raises
 /// no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSNXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSNXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// lane i = a[i] without its sign: bits only, NaNs too. Where predicate bit i is 0, r keeps lane i and raises
 /// no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSN_2XF32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSN_2XF32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// lane i = a[i] without its sign: bits only, NaNs too. Where predicate bit i is 0, r keeps lane i and raises
 /// no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = a[i] without its sign: bits only, NaNs too. Where predicate bit i is 0, r keeps lane i and raises
 /// no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSF32T(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSF32T(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = a[i] with its sign turned: bits only, NaNs too.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
@@ -906,26 +906,26 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGF32(const cstub_Km_ZNB_Orbis_R5_6
 /// lane i = a[i] with its sign turned: bits only, NaNs too. Where predicate bit i is 0, r keeps lane i and
 /// raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGNXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGNXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// lane i = a[i] with its sign turned: bits only, NaNs too. Where predicate bit i is 0, r keeps lane i and
 /// raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGN_2XF32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGN_2XF32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// lane i = a[i] with its sign turned: bits only, NaNs too. Where predicate bit i is 0, r keeps lane i and
 /// raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = a[i] with its sign turned: bits only, NaNs too. Where predicate bit i is 0, r keeps lane i and
 /// raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGF32T(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGF32T(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = the smaller of a[i] and b[i]; -0 is below +0, a NaN is the result.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
@@ -939,41 +939,41 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINN_2XF32(const cstub_Km_ZNB_Orbis_
 
 /// lane i = the smaller of a[i] and b[i]; -0 is below +0, a NaN is the result.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// lane i = the smaller of a[i] and b[i]; -0 is below +0, a NaN is the result.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// lane i = the smaller of a[i] and b[i]; -0 is below +0, a NaN is the result. Where predicate bit i is 0, r
 /// keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// lane i = the smaller of a[i] and b[i]; -0 is below +0, a NaN is the result. Where predicate bit i is 0, r
 /// keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINN_2XF32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINN_2XF32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// lane i = the smaller of a[i] and b[i]; -0 is below +0, a NaN is the result. Where predicate bit i is 0, r
 /// keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = the smaller of a[i] and b[i]; -0 is below +0, a NaN is the result. Where predicate bit i is 0, r
 /// keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINF32T(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINF32T(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = the larger of a[i] and b[i]; -0 is below +0, a NaN is the result.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
@@ -987,41 +987,41 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXN_2XF32(const cstub_Km_ZNB_Orbis_
 
 /// lane i = the larger of a[i] and b[i]; -0 is below +0, a NaN is the result.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// lane i = the larger of a[i] and b[i]; -0 is below +0, a NaN is the result.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// lane i = the larger of a[i] and b[i]; -0 is below +0, a NaN is the result. Where predicate bit i is 0, r
 /// keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// lane i = the larger of a[i] and b[i]; -0 is below +0, a NaN is the result. Where predicate bit i is 0, r
 /// keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXN_2XF32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXN_2XF32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// lane i = the larger of a[i] and b[i]; -0 is below +0, a NaN is the result. Where predicate bit i is 0, r
 /// keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = the larger of a[i] and b[i]; -0 is below +0, a NaN is the result. Where predicate bit i is 0, r
 /// keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXF32T(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXF32T(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = the smaller of a[i] and b[i]; -0 is below +0, a number wins over a NaN.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
@@ -1030,46 +1030,46 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMNXF16(const cstub_Km_ZNB_Orbis
 
 /// lane i = the smaller of a[i] and b[i]; -0 is below +0, a number wins over a NaN.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32&
-    a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b);
 
 /// lane i = the smaller of a[i] and b[i]; -0 is below +0, a number wins over a NaN.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// lane i = the smaller of a[i] and b[i]; -0 is below +0, a number wins over a NaN.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// lane i = the smaller of a[i] and b[i]; -0 is below +0, a number wins over a NaN. Where predicate bit i is
 /// 0, r keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMNXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMNXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// lane i = the smaller of a[i] and b[i]; -0 is below +0, a number wins over a NaN. Where predicate bit i is
 /// 0, r keeps lane i and raises no flag.
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMN_2XF32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// lane i = the smaller of a[i] and b[i]; -0 is below +0, a number wins over a NaN. Where predicate bit i is
 /// 0, r keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = the smaller of a[i] and b[i]; -0 is below +0, a number wins over a NaN. Where predicate bit i is
 /// 0, r keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMF32T(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMF32T(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = the larger of a[i] and b[i]; -0 is below +0, a number wins over a NaN.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
@@ -1078,46 +1078,46 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMNXF16(const cstub_Km_ZNB_Orbis
 
 /// lane i = the larger of a[i] and b[i]; -0 is below +0, a number wins over a NaN.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32&
-    a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b);
 
 /// lane i = the larger of a[i] and b[i]; -0 is below +0, a number wins over a NaN.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// lane i = the larger of a[i] and b[i]; -0 is below +0, a number wins over a NaN.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// lane i = the larger of a[i] and b[i]; -0 is below +0, a number wins over a NaN. Where predicate bit i is
 /// 0, r keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMNXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMNXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// lane i = the larger of a[i] and b[i]; -0 is below +0, a number wins over a NaN. Where predicate bit i is
 /// 0, r keeps lane i and raises no flag.
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMN_2XF32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// lane i = the larger of a[i] and b[i]; -0 is below +0, a number wins over a NaN. Where predicate bit i is
 /// 0, r keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = the larger of a[i] and b[i]; -0 is below +0, a number wins over a NaN. Where predicate bit i is
 /// 0, r keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMF32T(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMF32T(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// one bit for the class of a[i]: bits 0-4 -infinity, -normal, -subnormal, -0, +0; bits 5-7 +subnormal,
 /// +normal, +infinity; bit 8 signalling NaN, bit 9 quiet NaN.
@@ -1263,13 +1263,13 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OEQN_2XF32(const cstub_Km_ZNB_Orbis_
 
 /// bit i = 1 when a[i] == b[i]; 0 for a NaN, a signalling one is invalid. -0 equals +0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OEQF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OEQF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// bit i = 1 when a[i] == b[i]; 0 for a NaN, a signalling one is invalid. -0 equals +0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OEQF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OEQF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// bit i = 1 when a[i] < b[i]; 0 for a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
@@ -1283,13 +1283,13 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLTN_2XF32(const cstub_Km_ZNB_Orbis_
 
 /// bit i = 1 when a[i] < b[i]; 0 for a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLTF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLTF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// bit i = 1 when a[i] < b[i]; 0 for a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLTF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLTF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// bit i = 1 when a[i] <= b[i]; 0 for a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
@@ -1303,13 +1303,13 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLEN_2XF32(const cstub_Km_ZNB_Orbis_
 
 /// bit i = 1 when a[i] <= b[i]; 0 for a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLEF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLEF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// bit i = 1 when a[i] <= b[i]; 0 for a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLEF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLEF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// bit i = 1 when a[i] > b[i]; 0 for a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
@@ -1323,13 +1323,13 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGTN_2XF32(const cstub_Km_ZNB_Orbis_
 
 /// bit i = 1 when a[i] > b[i]; 0 for a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGTF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGTF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// bit i = 1 when a[i] > b[i]; 0 for a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGTF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGTF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// bit i = 1 when a[i] >= b[i]; 0 for a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
@@ -1343,13 +1343,13 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGEN_2XF32(const cstub_Km_ZNB_Orbis_
 
 /// bit i = 1 when a[i] >= b[i]; 0 for a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGEF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGEF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// bit i = 1 when a[i] >= b[i]; 0 for a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGEF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGEF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// bit i = 1 when a[i] == b[i] or either is a NaN, a signalling one is invalid. -0 equals +0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
@@ -1363,13 +1363,13 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UEQN_2XF32(const cstub_Km_ZNB_Orbis_
 
 /// bit i = 1 when a[i] == b[i] or either is a NaN, a signalling one is invalid. -0 equals +0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UEQF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UEQF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// bit i = 1 when a[i] == b[i] or either is a NaN, a signalling one is invalid. -0 equals +0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UEQF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UEQF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// bit i = 1 when a[i] < b[i] or either is a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
@@ -1383,13 +1383,13 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTN_2XF32(const cstub_Km_ZNB_Orbis_
 
 /// bit i = 1 when a[i] < b[i] or either is a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// bit i = 1 when a[i] < b[i] or either is a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// bit i = 1 when a[i] <= b[i] or either is a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
@@ -1403,18 +1403,18 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULEN_2XF32(const cstub_Km_ZNB_Orbis_
 
 /// bit i = 1 when a[i] <= b[i] or either is a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULEF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULEF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// bit i = 1 when a[i] <= b[i] or either is a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULEF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULEF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// bit i = 1 when a[i] or b[i] is a NaN, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b);
 
 /// bit i = 1 when a[i] or b[i] is a NaN, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
@@ -1423,13 +1423,13 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNN_2XF32(const cstub_Km_ZNB_Orbis_R
 
 /// bit i = 1 when a[i] or b[i] is a NaN, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// bit i = 1 when a[i] or b[i] is a NaN, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// bit i = 1 when a[i] <= b[i] or either is a NaN, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
@@ -1443,13 +1443,13 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULEQN_2XF32(const cstub_Km_ZNB_Orbis
 
 /// bit i = 1 when a[i] <= b[i] or either is a NaN, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULEQF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULEQF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// bit i = 1 when a[i] <= b[i] or either is a NaN, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULEQF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULEQF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// bit i = 1 when a[i] < b[i] or either is a NaN, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
@@ -1463,13 +1463,13 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTQN_2XF32(const cstub_Km_ZNB_Orbis
 
 /// bit i = 1 when a[i] < b[i] or either is a NaN, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTQF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTQF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// bit i = 1 when a[i] < b[i] or either is a NaN, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTQF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTQF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// bit i = 1 when a[i] != b[i] or either is a NaN, a signalling one is invalid. -0 equals +0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
@@ -1483,13 +1483,13 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNEQN_2XF32(const cstub_Km_ZNB_Orbis
 
 /// bit i = 1 when a[i] != b[i] or either is a NaN, a signalling one is invalid. -0 equals +0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNEQF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNEQF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// bit i = 1 when a[i] != b[i] or either is a NaN, a signalling one is invalid. -0 equals +0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNEQF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNEQF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /* Conversions between integers and floating point, with a scale, and between the formats.
    Table: src/float/scaled.def */
@@ -1501,8 +1501,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FLOATN_2X32(const cstub_Km_ZNB_Orbis
 
 /// lane i = a[i] / 2^(scale mod 32), rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UFLOATN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv&
-    a, immediate scale);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UFLOATN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+    immediate scale);
 
 /// lane i = a[i] / 2^(scale mod 16), rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
@@ -1517,14 +1517,14 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UFLOATNX16(const cstub_Km_ZNB_Orbis_
 /// lane i = a[i] * 2^(scale mod 32) truncated; the bound of the integer where that is out of range, the upper
 /// one for a NaN. Inexact when a fraction is dropped, invalid when out of range.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_TRUNCN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32&
-    a, immediate scale);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_TRUNCN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
+    immediate scale);
 
 /// lane i = a[i] * 2^(scale mod 32) truncated; the bound of the integer where that is out of range, the upper
 /// one for a NaN. Inexact when a fraction is dropped, invalid when out of range.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UTRUNCN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32&
-    a, immediate scale);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UTRUNCN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
+    immediate scale);
 
 /// lane i = a[i] * 2^(scale mod 16) truncated to 16 bits, otherwise as TRUNCN_2XF32.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
@@ -1556,13 +1556,11 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CVTF32NXF16_1(const cstub_Km_ZNB_Orb
 
 /// half lane 2i = a[i] rounded by RoundMode, with flags; the other halves 0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CVTF16N_2XF32_0(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& acc);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CVTF16N_2XF32_0(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& acc);
 
 /// half lane 2i + 1 = a[i] rounded by RoundMode, with flags; the other halves 0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CVTF16N_2XF32_1(const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& acc);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CVTF16N_2XF32_1(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& acc);
 
 /* Loads and stores of singles that are halves in memory, at any byte address.
    Table: src/float/memory.def */
@@ -1570,14 +1568,14 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CVTF16N_2XF32_1(const
 /// loads: lane i = the half in memory in single precision; a signalling NaN becomes quiet and is invalid. The
 /// address is base + offset bytes.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16*
-    base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base,
+    int offset);
 
 /// loads: lane i = the half in memory in single precision; a signalling NaN becomes quiet and is invalid. The
 /// address is base + offset bytes.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16*
-    base, int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base,
+    int offset);
 
 /// loads: lane i = the half in memory in single precision; a signalling NaN becomes quiet and is invalid. The
 /// address is the pointer, which then moves by increment bytes.
@@ -1594,28 +1592,28 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16_XP(cstub_Km_ZNB_Orbis_R5_6
 /// loads: lane i = the half in memory in single precision where predicate bit i is 1, else 0 and no flag; all
 /// 32 bytes are read. The address is base + offset bytes.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16T_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16*
-    base, int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16T_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base,
+    int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// loads: lane i = the half in memory in single precision where predicate bit i is 1, else 0 and no flag; all
 /// 32 bytes are read. The address is base + offset bytes.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16T_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16*
-    base, int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16T_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base,
+    int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// loads: lane i = the half in memory in single precision where predicate bit i is 1, else 0 and no flag; all
 /// 32 bytes are read. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16T_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer, int increment, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer, int increment,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// loads: lane i = the half in memory in single precision where predicate bit i is 1, else 0 and no flag; all
 /// 32 bytes are read. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16T_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer, int increment, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer, int increment,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// writes the lanes as halves, rounded by RoundMode, with flags. The address is base + offset bytes.
 KASTARRI_API void
@@ -1630,45 +1628,45 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF16_X(const cstub_Km_ZNB_Orbis
 /// writes the lanes as halves, rounded by RoundMode, with flags. The address is the pointer, which then moves
 /// by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF16_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32&
-    v, cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF16_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer, int increment);
 
 /// writes the lanes as halves, rounded by RoundMode, with flags. The address is the pointer, which then moves
 /// by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF16_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32&
-    v, cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer, int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF16_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer, int increment);
 
 /// writes the lanes whose predicate bit is 1 as halves, rounded by RoundMode, with their flags alone, and
 /// leaves the others in memory as they are; memory is not touched when every bit is 0. The address is base +
 /// offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF16T_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32&
-    v, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base, int offset, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF16T_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base, int offset,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// writes the lanes whose predicate bit is 1 as halves, rounded by RoundMode, with their flags alone, and
 /// leaves the others in memory as they are; memory is not touched when every bit is 0. The address is base +
 /// offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF16T_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32&
-    v, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base, int offset, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF16T_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base, int offset,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// writes the lanes whose predicate bit is 1 as halves, rounded by RoundMode, with their flags alone, and
 /// leaves the others in memory as they are; memory is not touched when every bit is 0. The address is the
 /// pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF16T_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32&
-    v, cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer, int increment, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF16T_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer, int increment,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// writes the lanes whose predicate bit is 1 as halves, rounded by RoundMode, with their flags alone, and
 /// leaves the others in memory as they are; memory is not touched when every bit is 0. The address is the
 /// pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF16T_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32&
-    v, cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer, int increment, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF16T_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer, int increment,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 #endif

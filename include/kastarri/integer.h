@@ -11,74 +11,74 @@
 
 /// lane i = a[i] + b[i], modulo 2^8.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
 
 /// lane i = a[i] + b[i], modulo 2^8.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
 
 /// lane i = a[i] + b[i], modulo 2^8. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD8T(cstub_Km_ZNB_Orbis_R5_64k_qv_int8& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD8T(cstub_Km_ZNB_Orbis_R5_64k_qv_int8& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = a[i] + b[i], modulo 2^8. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD8UT(cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD8UT(cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = a[i] + b[i], modulo 2^16.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
 
 /// lane i = a[i] + b[i], modulo 2^16.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
 
 /// lane i = a[i] + b[i], modulo 2^16. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD16T(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD16T(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = a[i] + b[i], modulo 2^16. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD16UT(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD16UT(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = a[i] + b[i], modulo 2^32.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
 
 /// lane i = a[i] + b[i], modulo 2^32.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
 
 /// lane i = a[i] + b[i], modulo 2^32. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD32T(cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD32T(cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = a[i] + b[i], modulo 2^32. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD32UT(cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD32UT(cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = a[i] + b[i], modulo 2^8.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
 
 /// lane i = a[i] + b[i], modulo 2^8.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
@@ -87,20 +87,20 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD2NX8U(const cstub_Km_ZNB_Orbis_R5
 
 /// lane i = a[i] + b[i], modulo 2^8. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD2NX8T(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD2NX8T(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
 
 /// lane i = a[i] + b[i], modulo 2^8. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD2NX8UT(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD2NX8UT(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
 
 /// lane i = a[i] + b[i], modulo 2^16.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
 /// lane i = a[i] + b[i], modulo 2^16.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
@@ -109,15 +109,15 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDNX16U(const cstub_Km_ZNB_Orbis_R5
 
 /// lane i = a[i] + b[i], modulo 2^16. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDNX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDNX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// lane i = a[i] + b[i], modulo 2^16. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDNX16UT(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDNX16UT(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// lane i = a[i] + b[i], modulo 2^32.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
@@ -131,9 +131,9 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDN_2X32U(const cstub_Km_ZNB_Orbis_
 
 /// lane i = a[i] + b[i], modulo 2^32. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDN_2X32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDN_2X32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// lane i = a[i] + b[i], modulo 2^32. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
@@ -143,74 +143,74 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDN_2X32UT(cstub_Km_ZNB_Orbis_R5_64
 
 /// lane i = a[i] - b[i], modulo 2^8.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
 
 /// lane i = a[i] - b[i], modulo 2^8.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
 
 /// lane i = a[i] - b[i], modulo 2^8. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB8T(cstub_Km_ZNB_Orbis_R5_64k_qv_int8& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB8T(cstub_Km_ZNB_Orbis_R5_64k_qv_int8& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = a[i] - b[i], modulo 2^8. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB8UT(cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB8UT(cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = a[i] - b[i], modulo 2^16.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
 
 /// lane i = a[i] - b[i], modulo 2^16.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
 
 /// lane i = a[i] - b[i], modulo 2^16. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB16T(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB16T(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = a[i] - b[i], modulo 2^16. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB16UT(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB16UT(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = a[i] - b[i], modulo 2^32.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
 
 /// lane i = a[i] - b[i], modulo 2^32.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
 
 /// lane i = a[i] - b[i], modulo 2^32. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB32T(cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB32T(cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = a[i] - b[i], modulo 2^32. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB32UT(cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB32UT(cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = a[i] - b[i], modulo 2^8.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
 
 /// lane i = a[i] - b[i], modulo 2^8.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
@@ -219,20 +219,20 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB2NX8U(const cstub_Km_ZNB_Orbis_R5
 
 /// lane i = a[i] - b[i], modulo 2^8. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB2NX8T(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB2NX8T(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
 
 /// lane i = a[i] - b[i], modulo 2^8. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB2NX8UT(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB2NX8UT(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
 
 /// lane i = a[i] - b[i], modulo 2^16.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
 /// lane i = a[i] - b[i], modulo 2^16.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
@@ -241,15 +241,15 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBNX16U(const cstub_Km_ZNB_Orbis_R5
 
 /// lane i = a[i] - b[i], modulo 2^16. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBNX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBNX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// lane i = a[i] - b[i], modulo 2^16. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBNX16UT(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBNX16UT(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// lane i = a[i] - b[i], modulo 2^32.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
@@ -263,9 +263,9 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBN_2X32U(const cstub_Km_ZNB_Orbis_
 
 /// lane i = a[i] - b[i], modulo 2^32. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBN_2X32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBN_2X32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// lane i = a[i] - b[i], modulo 2^32. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
@@ -292,14 +292,14 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEG16U(const cstub_Km_ZNB_Orbis_R5_6
 /// lane i = -a[i], modulo 2^16: the most negative value is its own negative. Where predicate bit i is 0, r
 /// keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEG16T(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEG16T(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = -a[i], modulo 2^16: the most negative value is its own negative. Where predicate bit i is 0, r
 /// keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEG16UT(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEG16UT(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = -a[i], modulo 2^32: the most negative value is its own negative.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
@@ -328,14 +328,14 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGNX16U(const cstub_Km_ZNB_Orbis_R5
 /// lane i = -a[i], modulo 2^16: the most negative value is its own negative. Where predicate bit i is 0, r
 /// keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGNX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGNX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// lane i = -a[i], modulo 2^16: the most negative value is its own negative. Where predicate bit i is 0, r
 /// keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGNX16UT(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGNX16UT(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// lane i = -a[i], modulo 2^32: the most negative value is its own negative.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
@@ -347,47 +347,47 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGN_2X32U(const cstub_Km_ZNB_Orbis_
 
 /// lane i = a[i] + b[i], clamped to the signed range of the lane.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDS16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDS16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
 
 /// lane i = a[i] + b[i], clamped to the signed range of the lane. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDS16T(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDS16T(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = a[i] + b[i], clamped to the signed range of the lane.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDSNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDSNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
 /// lane i = a[i] + b[i], clamped to the signed range of the lane. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDSNX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDSNX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// lane i = a[i] - b[i], clamped to the signed range of the lane.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBS16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBS16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
 
 /// lane i = a[i] - b[i], clamped to the signed range of the lane. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBS16T(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBS16T(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = a[i] - b[i], clamped to the signed range of the lane.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBSNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBSNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
 /// lane i = a[i] - b[i], clamped to the signed range of the lane. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBSNX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBSNX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// lane i = -a[i], clamped to the signed range of the lane: the most negative value gives the largest one.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
@@ -396,8 +396,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGS16(const cstub_Km_ZNB_Orbis_R5_6
 /// lane i = -a[i], clamped to the signed range of the lane: the most negative value gives the largest one.
 /// Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGS16T(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGS16T(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = -a[i], clamped to the signed range of the lane: the most negative value gives the largest one.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
@@ -406,8 +406,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGSNX16(const cstub_Km_ZNB_Orbis_R5
 /// lane i = -a[i], clamped to the signed range of the lane: the most negative value gives the largest one.
 /// Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGSNX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGSNX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// lane i = |a[i]|, modulo 2^8: the most negative value stays as it is.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
@@ -449,13 +449,13 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSNX16(const cstub_Km_ZNB_Orbis_R5
 
 /// lane i = |a[i] - b[i]| of signed a[i] and b[i], exact as an unsigned lane.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSUB8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSUB8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
 
 /// lane i = |a[i] - b[i]| of signed a[i] and b[i], exact as an unsigned lane.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSUB16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSUB16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
 
 /// lane i = |a[i] - b[i]| of signed a[i] and b[i], exact as an unsigned lane.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
@@ -469,8 +469,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSUBNX16(const cstub_Km_ZNB_Orbis_
 
 /// lane i = |a[i] - b[i]| of unsigned a[i] and b[i].
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSUBU8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSUBU8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
 
 /// lane i = |a[i] - b[i]| of unsigned a[i] and b[i].
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
@@ -499,8 +499,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSUBUNX16U(const cstub_Km_ZNB_Orbi
 
 /// lane i = |a[i] - b[i]| of signed a[i] and b[i], clamped to the signed range of the lane.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSSUB16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSSUB16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
 
 /// lane i = |a[i] - b[i]| of signed a[i] and b[i], clamped to the signed range of the lane.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
@@ -512,40 +512,40 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSSUBNX16(const cstub_Km_ZNB_Orbis
 
 /// lane i = the smaller of a[i] and b[i], compared as signed.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MIN8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MIN8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
 
 /// lane i = the smaller of a[i] and b[i], compared as signed.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MIN16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MIN16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
 
 /// lane i = the smaller of a[i] and b[i], compared as signed. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MIN16T(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MIN16T(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = the smaller of a[i] and b[i], compared as signed.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MIN32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MIN32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
 
 /// lane i = the smaller of a[i] and b[i], compared as signed.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MIN2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MIN2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
 
 /// lane i = the smaller of a[i] and b[i], compared as signed.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
 /// lane i = the smaller of a[i] and b[i], compared as signed. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// lane i = the smaller of a[i] and b[i], compared as signed.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
@@ -554,40 +554,40 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINN_2X32(const cstub_Km_ZNB_Orbis_R
 
 /// lane i = the larger of a[i] and b[i], compared as signed.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
 
 /// lane i = the larger of a[i] and b[i], compared as signed.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
 
 /// lane i = the larger of a[i] and b[i], compared as signed. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = the larger of a[i] and b[i], compared as signed.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAX32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAX32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
 
 /// lane i = the larger of a[i] and b[i], compared as signed.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAX2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAX2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
 
 /// lane i = the larger of a[i] and b[i], compared as signed.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
 /// lane i = the larger of a[i] and b[i], compared as signed. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// lane i = the larger of a[i] and b[i], compared as signed.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
@@ -596,29 +596,29 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXN_2X32(const cstub_Km_ZNB_Orbis_R
 
 /// lane i = the smaller of a[i] and b[i], compared as unsigned.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINU8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINU8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
 
 /// lane i = the smaller of a[i] and b[i], compared as unsigned.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINU16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINU16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
 
 /// lane i = the smaller of a[i] and b[i], compared as unsigned. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINU16UT(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINU16UT(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = the smaller of a[i] and b[i], compared as unsigned.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINU32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINU32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
 
 /// lane i = the smaller of a[i] and b[i], compared as unsigned.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINU2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINU2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
 
 /// lane i = the smaller of a[i] and b[i], compared as unsigned.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
@@ -627,8 +627,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINU2NX8U(const cstub_Km_ZNB_Orbis_R
 
 /// lane i = the smaller of a[i] and b[i], compared as unsigned.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINUNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINUNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
 /// lane i = the smaller of a[i] and b[i], compared as unsigned.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
@@ -637,15 +637,15 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINUNX16U(const cstub_Km_ZNB_Orbis_R
 
 /// lane i = the smaller of a[i] and b[i], compared as unsigned. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINUNX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINUNX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// lane i = the smaller of a[i] and b[i], compared as unsigned. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINUNX16UT(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINUNX16UT(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// lane i = the smaller of a[i] and b[i], compared as unsigned.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
@@ -654,34 +654,34 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINUN_2X32(const cstub_Km_ZNB_Orbis_
 
 /// lane i = the smaller of a[i] and b[i], compared as unsigned.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINUN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv&
-    a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINUN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
 
 /// lane i = the larger of a[i] and b[i], compared as unsigned.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXU8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXU8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
 
 /// lane i = the larger of a[i] and b[i], compared as unsigned.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXU16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXU16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
 
 /// lane i = the larger of a[i] and b[i], compared as unsigned. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXU16UT(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXU16UT(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i = the larger of a[i] and b[i], compared as unsigned.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXU32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXU32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
 
 /// lane i = the larger of a[i] and b[i], compared as unsigned.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXU2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXU2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
 
 /// lane i = the larger of a[i] and b[i], compared as unsigned.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
@@ -690,8 +690,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXU2NX8U(const cstub_Km_ZNB_Orbis_R
 
 /// lane i = the larger of a[i] and b[i], compared as unsigned.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXUNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXUNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
 /// lane i = the larger of a[i] and b[i], compared as unsigned.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
@@ -700,15 +700,15 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXUNX16U(const cstub_Km_ZNB_Orbis_R
 
 /// lane i = the larger of a[i] and b[i], compared as unsigned. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXUNX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXUNX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// lane i = the larger of a[i] and b[i], compared as unsigned. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXUNX16UT(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXUNX16UT(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// lane i = the larger of a[i] and b[i], compared as unsigned.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
@@ -717,43 +717,43 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXUN_2X32(const cstub_Km_ZNB_Orbis_
 
 /// lane i = the larger of a[i] and b[i], compared as unsigned.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXUN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv&
-    a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXUN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
 
 /// lane i = floor((a[i] + b[i]) / 2) of signed a[i] and b[i], never overflowing.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVG8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVG8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
 
 /// lane i = floor((a[i] + b[i]) / 2) of signed a[i] and b[i], never overflowing.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVG16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVG16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
 
 /// lane i = floor((a[i] + b[i]) / 2) of signed a[i] and b[i], never overflowing.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVG2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVG2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
 
 /// lane i = floor((a[i] + b[i]) / 2) of signed a[i] and b[i], never overflowing.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
 /// lane i = floor((a[i] + b[i]) / 2) of unsigned a[i] and b[i], never overflowing.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGU8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGU8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
 
 /// lane i = floor((a[i] + b[i]) / 2) of unsigned a[i] and b[i], never overflowing.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGU16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGU16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
 
 /// lane i = floor((a[i] + b[i]) / 2) of unsigned a[i] and b[i], never overflowing.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGU2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGU2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
 
 /// lane i = floor((a[i] + b[i]) / 2) of unsigned a[i] and b[i], never overflowing.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
@@ -762,8 +762,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGU2NX8U(const cstub_Km_ZNB_Orbis_R
 
 /// lane i = floor((a[i] + b[i]) / 2) of unsigned a[i] and b[i], never overflowing.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGUNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGUNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
 /// lane i = floor((a[i] + b[i]) / 2) of unsigned a[i] and b[i], never overflowing.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
@@ -772,33 +772,33 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGUNX16U(const cstub_Km_ZNB_Orbis_R
 
 /// lane i = floor((a[i] + b[i] + 1) / 2) of signed a[i] and b[i], never overflowing: halves round up.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGR8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGR8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
 
 /// lane i = floor((a[i] + b[i] + 1) / 2) of signed a[i] and b[i], never overflowing: halves round up.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGR16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGR16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
 
 /// lane i = floor((a[i] + b[i] + 1) / 2) of signed a[i] and b[i], never overflowing: halves round up.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGR2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGR2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
 
 /// lane i = floor((a[i] + b[i] + 1) / 2) of signed a[i] and b[i], never overflowing: halves round up.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGRNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGRNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
 /// lane i = floor((a[i] + b[i] + 1) / 2) of unsigned a[i] and b[i], never overflowing: halves round up.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGRU8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGRU8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
 
 /// lane i = floor((a[i] + b[i] + 1) / 2) of unsigned a[i] and b[i], never overflowing: halves round up.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGRU16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGRU16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
 
 /// lane i = floor((a[i] + b[i] + 1) / 2) of unsigned a[i] and b[i], never overflowing: halves round up.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
@@ -825,43 +825,43 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGRUNX16U(const cstub_Km_ZNB_Orbis_
 
 /// the bits that are 1 in both a and b.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
 
 /// the bits that are 1 in both a and b.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
 
 /// the bits that are 1 in both a and b.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
 
 /// the bits that are 1 in both a and b.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
 
 /// the bits that are 1 in both a and b.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
 
 /// the bits that are 1 in both a and b.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
 
 /// the bits that are 1 in both a and b.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int64
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND64(const cstub_Km_ZNB_Orbis_R5_64k_qv_int64& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int64& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND64(const cstub_Km_ZNB_Orbis_R5_64k_qv_int64& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64& b);
 
 /// the bits that are 1 in both a and b.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
 
 /// the bits that are 1 in both a and b.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
@@ -870,8 +870,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND2NX8U(const cstub_Km_ZNB_Orbis_R5
 
 /// the bits that are 1 in both a and b.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
 /// the bits that are 1 in both a and b.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
@@ -895,58 +895,58 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDN_4X64(const cstub_Km_ZNB_Orbis_R
 
 /// the bits that are 1 in a or b.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
 
 /// the bits that are 1 in a or b.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
 
 /// the bits that are 1 in a or b.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
 
 /// the bits that are 1 in a or b.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
 
 /// the bits that are 1 in a or b.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
 
 /// the bits that are 1 in a or b.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
 
 /// the bits that are 1 in a or b.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int64
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR64(const cstub_Km_ZNB_Orbis_R5_64k_qv_int64& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int64& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR64(const cstub_Km_ZNB_Orbis_R5_64k_qv_int64& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64& b);
 
 /// the bits that are 1 in a or b.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
 
 /// the bits that are 1 in a or b.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
 
 /// the bits that are 1 in a or b.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
 /// the bits that are 1 in a or b.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
 
 /// the bits that are 1 in a or b.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
@@ -965,43 +965,43 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORN_4X64(const cstub_Km_ZNB_Orbis_R5
 
 /// the bits in which a and b differ.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
 
 /// the bits in which a and b differ.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
 
 /// the bits in which a and b differ.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
 
 /// the bits in which a and b differ.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
 
 /// the bits in which a and b differ.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
 
 /// the bits in which a and b differ.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
 
 /// the bits in which a and b differ.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int64
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR64(const cstub_Km_ZNB_Orbis_R5_64k_qv_int64& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int64& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR64(const cstub_Km_ZNB_Orbis_R5_64k_qv_int64& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64& b);
 
 /// the bits in which a and b differ.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
 
 /// the bits in which a and b differ.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
@@ -1010,8 +1010,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR2NX8U(const cstub_Km_ZNB_Orbis_R5
 
 /// the bits in which a and b differ.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
 /// the bits in which a and b differ.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
@@ -1084,32 +1084,32 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NOTN_4X64(const cstub_Km_ZNB_Orbis_R
 /// lane i = a[i] shifted left by b[i], zeros shifted in; right by -b[i] when b[i] is negative; 0 when |b[i]|
 /// >= 16.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLL16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLL16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
 
 /// lane i = a[i] shifted left by b[i], zeros shifted in; right by -b[i] when b[i] is negative; 0 when |b[i]|
 /// >= 16.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLL16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLL16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
 
 /// lane i = a[i] shifted left by b[i], zeros shifted in; right by -b[i] when b[i] is negative; 0 when |b[i]|
 /// >= 32.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLL32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLL32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
 
 /// lane i = a[i] shifted left by b[i], zeros shifted in; right by -b[i] when b[i] is negative; 0 when |b[i]|
 /// >= 32.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLL32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLL32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
 
 /// lane i = a[i] shifted left by b[i], zeros shifted in; right by -b[i] when b[i] is negative; 0 when |b[i]|
 /// >= 16.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
 /// lane i = a[i] shifted left by b[i], zeros shifted in; right by -b[i] when b[i] is negative; 0 when |b[i]|
 /// >= 16.
@@ -1132,32 +1132,32 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLN_2X32U(const cstub_Km_ZNB_Orbis_
 /// lane i = a[i] shifted right by b[i], zeros shifted in; left by -b[i] when b[i] is negative; 0 when |b[i]|
 /// >= 16.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRL16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRL16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
 
 /// lane i = a[i] shifted right by b[i], zeros shifted in; left by -b[i] when b[i] is negative; 0 when |b[i]|
 /// >= 16.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRL16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRL16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
 
 /// lane i = a[i] shifted right by b[i], zeros shifted in; left by -b[i] when b[i] is negative; 0 when |b[i]|
 /// >= 32.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRL32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRL32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
 
 /// lane i = a[i] shifted right by b[i], zeros shifted in; left by -b[i] when b[i] is negative; 0 when |b[i]|
 /// >= 32.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRL32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRL32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
 
 /// lane i = a[i] shifted right by b[i], zeros shifted in; left by -b[i] when b[i] is negative; 0 when |b[i]|
 /// >= 16.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
 /// lane i = a[i] shifted right by b[i], zeros shifted in; left by -b[i] when b[i] is negative; 0 when |b[i]|
 /// >= 16.
@@ -1180,20 +1180,20 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLN_2X32U(const cstub_Km_ZNB_Orbis_
 /// lane i = a[i] shifted right by b[i], copies of the sign shifted in, all sign when b[i] >= 16; left by
 /// -b[i] when b[i] is negative, 0 when b[i] <= -16.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRA16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRA16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
 
 /// lane i = a[i] shifted right by b[i], copies of the sign shifted in, all sign when b[i] >= 32; left by
 /// -b[i] when b[i] is negative, 0 when b[i] <= -32.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRA32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRA32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
 
 /// lane i = a[i] shifted right by b[i], copies of the sign shifted in, all sign when b[i] >= 16; left by
 /// -b[i] when b[i] is negative, 0 when b[i] <= -16.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRANX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRANX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
 /// lane i = a[i] shifted right by b[i], copies of the sign shifted in, all sign when b[i] >= 32; left by
 /// -b[i] when b[i] is negative, 0 when b[i] <= -32.
@@ -1204,20 +1204,20 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRAN_2X32(const cstub_Km_ZNB_Orbis_R
 /// lane i = a[i] * 2^b[i], clamped to the signed range of the lane; when b[i] is negative a[i] shifted right
 /// by -b[i], copies of the sign shifted in.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLS16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLS16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
 
 /// lane i = a[i] * 2^b[i], clamped to the signed range of the lane; when b[i] is negative a[i] shifted right
 /// by -b[i], copies of the sign shifted in.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLS32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLS32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
 
 /// lane i = a[i] * 2^b[i], clamped to the signed range of the lane; when b[i] is negative a[i] shifted right
 /// by -b[i], copies of the sign shifted in.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLSNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLSNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
 /// lane i = a[i] * 2^b[i], clamped to the signed range of the lane; when b[i] is negative a[i] shifted right
 /// by -b[i], copies of the sign shifted in.
@@ -1281,8 +1281,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLIN_2X32(const cstub_Km_ZNB_Orbis_
 
 /// lane i = a[i] shifted left by the immediate modulo 32, zeros shifted in.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLIN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv&
-    a, immediate i);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLIN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+    immediate i);
 
 /// lane i = a[i] shifted right by the immediate modulo 8, zeros shifted in.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
@@ -1337,8 +1337,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLIN_2X32(const cstub_Km_ZNB_Orbis_
 
 /// lane i = a[i] shifted right by the immediate modulo 32, zeros shifted in.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLIN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv&
-    a, immediate i);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLIN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+    immediate i);
 
 /// lane i = a[i] shifted right by the immediate modulo 8, copies of the sign shifted in (of the unsigned
 /// types too).
@@ -1407,28 +1407,28 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLSIN_2X32(const cstub_Km_ZNB_Orbis_
 
 /// lane i = a[i] rotated right by b[i] modulo 16.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTR16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTR16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
 
 /// lane i = a[i] rotated right by b[i] modulo 16.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTR16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTR16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
 
 /// lane i = a[i] rotated right by b[i] modulo 32.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTR32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTR32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
 
 /// lane i = a[i] rotated right by b[i] modulo 32.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTR32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTR32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
 
 /// lane i = a[i] rotated right by b[i] modulo 16.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
 /// lane i = a[i] rotated right by b[i] modulo 16.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
@@ -1442,8 +1442,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRN_2X32(const cstub_Km_ZNB_Orbis_
 
 /// lane i = a[i] rotated right by b[i] modulo 32.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv&
-    a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
 
 /// lane i = a[i] rotated right by the immediate modulo 8.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
@@ -1499,8 +1499,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRIN_2X32(const cstub_Km_ZNB_Orbis
 
 /// lane i = a[i] rotated right by the immediate modulo 32.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRIN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv&
-    a, immediate i);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRIN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+    immediate i);
 
 /// lane i = the number of copies of the sign bit below it in a[i]: 16 - 1 for 0 and -1.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
@@ -1557,13 +1557,13 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REP2NX8U(const cstub_Km_ZNB_Orbis_R5
 
 /// every lane = lane number (immediate modulo 64) of a. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REP2NX8T(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, immediate i, const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REP2NX8T(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, immediate i, const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
 
 /// every lane = lane number (immediate modulo 64) of a. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REP2NX8UT(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a, immediate i, const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REP2NX8UT(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a, immediate i, const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
 
 /// every lane = lane number (immediate modulo 32) of a.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
@@ -1577,13 +1577,13 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REPNX16U(const cstub_Km_ZNB_Orbis_R5
 
 /// every lane = lane number (immediate modulo 32) of a. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REPNX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, immediate i, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REPNX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, immediate i, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// every lane = lane number (immediate modulo 32) of a. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REPNX16UT(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, immediate i, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REPNX16UT(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, immediate i, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// every lane = lane number (immediate modulo 16) of a.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
@@ -1597,14 +1597,15 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REPN_2X32U(const cstub_Km_ZNB_Orbis_
 
 /// every lane = lane number (immediate modulo 16) of a. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REPN_2X32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a, immediate i, const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REPN_2X32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a, immediate i,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// every lane = lane number (immediate modulo 16) of a. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REPN_2X32UT(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a, immediate i, const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2&
-    p);
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a, immediate i,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// lane number (immediate modulo 64) of a.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
@@ -1673,53 +1674,53 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ZERON_2X64W();
 
 /// bit i = 1 when a[i] == b[i], else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQ8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQ8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
 
 /// bit i = 1 when a[i] == b[i], else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQ8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQ8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
 
 /// bit i = 1 when a[i] == b[i], else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQ16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQ16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
 
 /// bit i = 1 when a[i] == b[i], else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQ16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQ16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
 
 /// bit i = 1 when a[i] == b[i], else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQ32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQ32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
 
 /// bit i = 1 when a[i] == b[i], else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQ32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQ32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
 
 /// bit i = 1 when a[i] == b[i], else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQ2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQ2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
 
 /// bit i = 1 when a[i] == b[i], else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQ2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQ2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
 
 /// bit i = 1 when a[i] == b[i], else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
 /// bit i = 1 when a[i] == b[i], else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
 
 /// bit i = 1 when a[i] == b[i], else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
@@ -1733,38 +1734,38 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQN_2X32U(const cstub_Km_ZNB_Orbis_R
 
 /// bit i = 1 when a[i] != b[i], else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQ8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQ8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
 
 /// bit i = 1 when a[i] != b[i], else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQ8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQ8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
 
 /// bit i = 1 when a[i] != b[i], else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQ16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQ16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
 
 /// bit i = 1 when a[i] != b[i], else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQ16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQ16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
 
 /// bit i = 1 when a[i] != b[i], else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQ32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQ32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
 
 /// bit i = 1 when a[i] != b[i], else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQ32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQ32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
 
 /// bit i = 1 when a[i] != b[i], else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQ2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQ2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
 
 /// bit i = 1 when a[i] != b[i], else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
@@ -1773,8 +1774,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQ2NX8U(const cstub_Km_ZNB_Orbis_R5
 
 /// bit i = 1 when a[i] != b[i], else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
 /// bit i = 1 when a[i] != b[i], else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
@@ -1793,28 +1794,28 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQN_2X32U(const cstub_Km_ZNB_Orbis_
 
 /// bit i = 1 when a[i] < b[i], compared as signed, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LT8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LT8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
 
 /// bit i = 1 when a[i] < b[i], compared as signed, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LT16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LT16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
 
 /// bit i = 1 when a[i] < b[i], compared as signed, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LT32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LT32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
 
 /// bit i = 1 when a[i] < b[i], compared as signed, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LT2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LT2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
 
 /// bit i = 1 when a[i] < b[i], compared as signed, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
 /// bit i = 1 when a[i] < b[i], compared as signed, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
@@ -1823,28 +1824,28 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTN_2X32(const cstub_Km_ZNB_Orbis_R5
 
 /// bit i = 1 when a[i] <= b[i], compared as signed, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LE8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LE8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
 
 /// bit i = 1 when a[i] <= b[i], compared as signed, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LE16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LE16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
 
 /// bit i = 1 when a[i] <= b[i], compared as signed, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LE32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LE32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
 
 /// bit i = 1 when a[i] <= b[i], compared as signed, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LE2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LE2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
 
 /// bit i = 1 when a[i] <= b[i], compared as signed, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LENX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LENX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
 /// bit i = 1 when a[i] <= b[i], compared as signed, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
@@ -1853,28 +1854,28 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEN_2X32(const cstub_Km_ZNB_Orbis_R5
 
 /// bit i = 1 when a[i] > b[i], compared as signed, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GT8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GT8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
 
 /// bit i = 1 when a[i] > b[i], compared as signed, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GT16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GT16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
 
 /// bit i = 1 when a[i] > b[i], compared as signed, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GT32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GT32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
 
 /// bit i = 1 when a[i] > b[i], compared as signed, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GT2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GT2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
 
 /// bit i = 1 when a[i] > b[i], compared as signed, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GTNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GTNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
 /// bit i = 1 when a[i] > b[i], compared as signed, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
@@ -1883,28 +1884,28 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GTN_2X32(const cstub_Km_ZNB_Orbis_R5
 
 /// bit i = 1 when a[i] >= b[i], compared as signed, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GE8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GE8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
 
 /// bit i = 1 when a[i] >= b[i], compared as signed, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GE16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GE16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
 
 /// bit i = 1 when a[i] >= b[i], compared as signed, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GE32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GE32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
 
 /// bit i = 1 when a[i] >= b[i], compared as signed, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GE2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GE2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
 
 /// bit i = 1 when a[i] >= b[i], compared as signed, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GENX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GENX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
 /// bit i = 1 when a[i] >= b[i], compared as signed, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
@@ -1913,23 +1914,23 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GEN_2X32(const cstub_Km_ZNB_Orbis_R5
 
 /// bit i = 1 when a[i] < b[i], compared as unsigned, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTU8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTU8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
 
 /// bit i = 1 when a[i] < b[i], compared as unsigned, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTU16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTU16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
 
 /// bit i = 1 when a[i] < b[i], compared as unsigned, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTU32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTU32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
 
 /// bit i = 1 when a[i] < b[i], compared as unsigned, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTU2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTU2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
 
 /// bit i = 1 when a[i] < b[i], compared as unsigned, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
@@ -1938,8 +1939,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTU2NX8U(const cstub_Km_ZNB_Orbis_R5
 
 /// bit i = 1 when a[i] < b[i], compared as unsigned, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTUNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTUNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
 /// bit i = 1 when a[i] < b[i], compared as unsigned, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
@@ -1958,23 +1959,23 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTUN_2X32U(const cstub_Km_ZNB_Orbis_
 
 /// bit i = 1 when a[i] <= b[i], compared as unsigned, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEU8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEU8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
 
 /// bit i = 1 when a[i] <= b[i], compared as unsigned, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEU16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEU16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
 
 /// bit i = 1 when a[i] <= b[i], compared as unsigned, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEU32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEU32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
 
 /// bit i = 1 when a[i] <= b[i], compared as unsigned, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEU2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEU2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
 
 /// bit i = 1 when a[i] <= b[i], compared as unsigned, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
@@ -1983,8 +1984,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEU2NX8U(const cstub_Km_ZNB_Orbis_R5
 
 /// bit i = 1 when a[i] <= b[i], compared as unsigned, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEUNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEUNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
 /// bit i = 1 when a[i] <= b[i], compared as unsigned, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
@@ -2003,18 +2004,18 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEUN_2X32U(const cstub_Km_ZNB_Orbis_
 
 /// bit i = 1 when a[i] > b[i], compared as unsigned, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GTU8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GTU8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
 
 /// bit i = 1 when a[i] > b[i], compared as unsigned, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GTU16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GTU16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
 
 /// bit i = 1 when a[i] > b[i], compared as unsigned, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GTU32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GTU32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
 
 /// bit i = 1 when a[i] > b[i], compared as unsigned, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
@@ -2033,18 +2034,18 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GTUN_2X32U(const cstub_Km_ZNB_Orbis_
 
 /// bit i = 1 when a[i] >= b[i], compared as unsigned, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GEU8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GEU8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
 
 /// bit i = 1 when a[i] >= b[i], compared as unsigned, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GEU16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GEU16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
 
 /// bit i = 1 when a[i] >= b[i], compared as unsigned, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GEU32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GEU32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
 
 /// bit i = 1 when a[i] >= b[i], compared as unsigned, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
@@ -2066,128 +2067,128 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GEUN_2X32U(const cstub_Km_ZNB_Orbis_
 
 /// bit i = a[i] and b[i].
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDB(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDB(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
 
 /// bit i = a[i] and b[i].
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDB1(const cstub_Km_ZNB_Orbis_R5_64k_vbool1& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDB1(const cstub_Km_ZNB_Orbis_R5_64k_vbool1& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& b);
 
 /// bit i = a[i] and b[i].
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDB2N(const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool2N& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDB2N(const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& b);
 
 /// bit i = a[i] and b[i].
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDBN(const cstub_Km_ZNB_Orbis_R5_64k_vboolN& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDBN(const cstub_Km_ZNB_Orbis_R5_64k_vboolN& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& b);
 
 /// bit i = a[i] and b[i].
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDBN_2(const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDBN_2(const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& b);
 
 /// bit i = a[i] or b[i].
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORB(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORB(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
 
 /// bit i = a[i] or b[i].
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORB1(const cstub_Km_ZNB_Orbis_R5_64k_vbool1& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORB1(const cstub_Km_ZNB_Orbis_R5_64k_vbool1& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& b);
 
 /// bit i = a[i] or b[i].
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORB2N(const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool2N& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORB2N(const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& b);
 
 /// bit i = a[i] or b[i].
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORBN(const cstub_Km_ZNB_Orbis_R5_64k_vboolN& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORBN(const cstub_Km_ZNB_Orbis_R5_64k_vboolN& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& b);
 
 /// bit i = a[i] or b[i].
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORBN_2(const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORBN_2(const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& b);
 
 /// bit i = 1 when a[i] and b[i] differ.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORB(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORB(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
 
 /// bit i = 1 when a[i] and b[i] differ.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORB1(const cstub_Km_ZNB_Orbis_R5_64k_vbool1& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORB1(const cstub_Km_ZNB_Orbis_R5_64k_vbool1& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& b);
 
 /// bit i = 1 when a[i] and b[i] differ.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORB2N(const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool2N& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORB2N(const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& b);
 
 /// bit i = 1 when a[i] and b[i] differ.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORBN(const cstub_Km_ZNB_Orbis_R5_64k_vboolN& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORBN(const cstub_Km_ZNB_Orbis_R5_64k_vboolN& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& b);
 
 /// bit i = 1 when a[i] and b[i] differ.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORBN_2(const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORBN_2(const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& b);
 
 /// bit i = a[i] and not b[i].
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDNOTB(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDNOTB(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
 
 /// bit i = a[i] and not b[i].
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDNOTB1(const cstub_Km_ZNB_Orbis_R5_64k_vbool1& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDNOTB1(const cstub_Km_ZNB_Orbis_R5_64k_vbool1& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& b);
 
 /// bit i = a[i] and not b[i].
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDNOTB2N(const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool2N& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDNOTB2N(const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& b);
 
 /// bit i = a[i] and not b[i].
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDNOTBN(const cstub_Km_ZNB_Orbis_R5_64k_vboolN& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDNOTBN(const cstub_Km_ZNB_Orbis_R5_64k_vboolN& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& b);
 
 /// bit i = a[i] and not b[i].
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDNOTBN_2(const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDNOTBN_2(const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& b);
 
 /// bit i = a[i] or not b[i].
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORNOTB(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORNOTB(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
 
 /// bit i = a[i] or not b[i].
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORNOTB1(const cstub_Km_ZNB_Orbis_R5_64k_vbool1& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool1& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORNOTB1(const cstub_Km_ZNB_Orbis_R5_64k_vbool1& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& b);
 
 /// bit i = a[i] or not b[i].
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORNOTB2N(const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool2N& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORNOTB2N(const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& b);
 
 /// bit i = a[i] or not b[i].
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORNOTBN(const cstub_Km_ZNB_Orbis_R5_64k_vboolN& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORNOTBN(const cstub_Km_ZNB_Orbis_R5_64k_vboolN& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& b);
 
 /// bit i = a[i] or not b[i].
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORNOTBN_2(const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORNOTBN_2(const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& b);
 
 /// bit i = not a[i].
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
@@ -2317,8 +2318,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADDN_2X32T(const cstub_Km_ZNB_Orbis
 
 /// the sum of the lanes whose predicate bit is 1, modulo 2^32.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADDN_2X32UT(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv&
-    a, const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADDN_2X32UT(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// the sum of all signed lanes, clamped once to the signed range of a lane.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
@@ -2407,8 +2408,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXUNX16T(const cstub_Km_ZNB_Orbis_
 
 /// the largest unsigned lane of those whose predicate bit is 1; without any, 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXUN_2X32T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv&
-    a, const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXUN_2X32T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// the smallest unsigned lane.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
@@ -2434,8 +2435,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINUNX16T(const cstub_Km_ZNB_Orbis_
 
 /// the smallest unsigned lane of those whose predicate bit is 1; without any, the highest number of a lane.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINUN_2X32T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv&
-    a, const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINUN_2X32T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// the exclusive or of all lanes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
@@ -2488,8 +2489,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORN_2X32T(const cstub_Km_ZNB_Orbis
 
 /// the exclusive or of the lanes whose predicate bit is 1; without any, 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORN_2X32UT(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv&
-    a, const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORN_2X32UT(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// the bits that are 1 in any lane.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
@@ -2517,8 +2518,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORN_2X32U(const cstub_Km_ZNB_Orbis_
 
 /// the bits that are 1 in any lane whose predicate bit is 1; without any such lane, 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROR2NX8T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROR2NX8T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
 
 /// the bits that are 1 in any lane whose predicate bit is 1; without any such lane, 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
@@ -2527,8 +2528,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROR2NX8UT(const cstub_Km_ZNB_Orbis_R
 
 /// the bits that are 1 in any lane whose predicate bit is 1; without any such lane, 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORNX16T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORNX16T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// the bits that are 1 in any lane whose predicate bit is 1; without any such lane, 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
@@ -2542,8 +2543,8 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORN_2X32T(const cstub_Km_ZNB_Orbis_
 
 /// the bits that are 1 in any lane whose predicate bit is 1; without any such lane, 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORN_2X32UT(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv&
-    a, const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORN_2X32UT(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// the bits that are 1 in every lane.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
@@ -2596,127 +2597,127 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDN_2X32T(const cstub_Km_ZNB_Orbis
 
 /// the bits that are 1 in every lane whose predicate bit is 1; without any such lane, all ones.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDN_2X32UT(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv&
-    a, const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDN_2X32UT(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// acc = the larger of acc and the largest lane of a, all signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXA2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_int8& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXA2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_int8& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
 
 /// acc = the larger of acc and the largest lane of a, all signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXANX16(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXANX16(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
 
 /// acc = the larger of acc and the largest lane of a, all signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXAN_2X32(cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXAN_2X32(cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
 
 /// acc = the smaller of acc and the smallest lane of a, all signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINA2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_int8& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINA2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_int8& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
 
 /// acc = the smaller of acc and the smallest lane of a, all signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINANX16(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINANX16(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
 
 /// acc = the smaller of acc and the smallest lane of a, all signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINAN_2X32(cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINAN_2X32(cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
 
 /// acc = the exclusive or of acc and all lanes of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORA2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_int8& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORA2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_int8& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
 
 /// acc = the exclusive or of acc and all lanes of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORA2NX8U(cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORA2NX8U(cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a);
 
 /// acc = the exclusive or of acc and all lanes of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORANX16(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORANX16(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
 
 /// acc = the exclusive or of acc and all lanes of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORANX16U(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORANX16U(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
 
 /// acc = the exclusive or of acc and all lanes of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORAN_2X32(cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORAN_2X32(cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
 
 /// acc = the exclusive or of acc and all lanes of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORAN_2X32U(cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORAN_2X32U(cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
 
 /// acc = the bits that are 1 in acc or any lane of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORA2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_int8& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORA2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_int8& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
 
 /// acc = the bits that are 1 in acc or any lane of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORA2NX8U(cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORA2NX8U(cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a);
 
 /// acc = the bits that are 1 in acc or any lane of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORANX16(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORANX16(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
 
 /// acc = the bits that are 1 in acc or any lane of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORANX16U(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORANX16U(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
 
 /// acc = the bits that are 1 in acc or any lane of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORAN_2X32(cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORAN_2X32(cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
 
 /// acc = the bits that are 1 in acc or any lane of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORAN_2X32U(cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORAN_2X32U(cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
 
 /// acc = the bits that are 1 in acc and every lane of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDA2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_int8& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDA2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_int8& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
 
 /// acc = the bits that are 1 in acc and every lane of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDA2NX8U(cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDA2NX8U(cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a);
 
 /// acc = the bits that are 1 in acc and every lane of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDANX16(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDANX16(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
 
 /// acc = the bits that are 1 in acc and every lane of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDANX16U(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDANX16U(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
 
 /// acc = the bits that are 1 in acc and every lane of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDAN_2X32(cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDAN_2X32(cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
 
 /// acc = the bits that are 1 in acc and every lane of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDAN_2X32U(cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& acc, const
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDAN_2X32U(cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
 
 #endif

@@ -218,28 +218,28 @@ KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_MOVGEZ(int& r, int v, i
 
 /// the bitwise and of the two bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_ANDB(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_ANDB(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
 
 /// the bitwise or of the two bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_ORB(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_ORB(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
 
 /// the bitwise exclusive or of the two bytes.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_XORB(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_XORB(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
 
 /// the bitwise and of the byte a and 1 when b is 0, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_ANDBC(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_ANDBC(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
 
 /// the bitwise or of the byte a and 1 when b is 0, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_ORBC(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_ORBC(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
 
 /// 1 when all 4 bits are 1 and no other bit of the byte is, else 0.
 KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
@@ -259,13 +259,13 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_ANY8(const cstub_Km_ZNB_Orbis_R5_64k_
 
 /// r = v when the byte b is not 0; else r stays.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_MOVT(unsigned& r, unsigned v, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_MOVT(unsigned& r, unsigned v,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
 
 /// r = v when the byte b is 0; else r stays.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_MOVF(unsigned& r, unsigned v, const
-    cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_MOVF(unsigned& r, unsigned v,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
 
 /// nothing.
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_NOP();

@@ -914,106 +914,106 @@ KASTARRI_API void ZRA_SVN_2X16U_IP(const qv_vecN_2x32Uv& v, qv_vecN_2x16U** poin
 KASTARRI_API void ZRA_SVN_2X16U_XP(const qv_vecN_2x32Uv& v, qv_vecN_2x16U** pointer, int increment)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16U_XPRKN20qv_vecN_2x32Uv_space15qv_vecN_2x32Uv_EPPN19qv_vecN_2x16U_space14qv_vecN_2x16U_Ei");
 
-/// the same for the lanes whose predicate bit is 1; the others stay in memory as they are. Memory is not
-/// touched when every bit is 0, else all 32 bytes may be read and written back. The address is base + offset
-/// bytes.
+/// writes 32 bytes at the address: lane i saturated to half its width where its predicate bit is 1; the
+/// others stay in memory as they are. Memory is not touched when every bit is 0, else all 32 bytes may be
+/// read and written back. The address is base + offset bytes.
 KASTARRI_API void ZRA_SVNX8ST_I(const qv_vecNx16& v, const qv_vecNx8* base, int offset, const vboolN& p)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8ST_IRKN16qv_vecNx16_space11qv_vecNx16_EPKN15qv_vecNx8_space10qv_vecNx8_EiRKN12vboolN_space7vboolN_E");
 
-/// the same for the lanes whose predicate bit is 1; the others stay in memory as they are. Memory is not
-/// touched when every bit is 0, else all 32 bytes may be read and written back. The address is base + offset
-/// bytes.
+/// writes 32 bytes at the address: lane i saturated to half its width where its predicate bit is 1; the
+/// others stay in memory as they are. Memory is not touched when every bit is 0, else all 32 bytes may be
+/// read and written back. The address is base + offset bytes.
 KASTARRI_API void ZRA_SVNX8ST_X(const qv_vecNx16& v, const qv_vecNx8* base, int offset, const vboolN& p)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8ST_XRKN16qv_vecNx16_space11qv_vecNx16_EPKN15qv_vecNx8_space10qv_vecNx8_EiRKN12vboolN_space7vboolN_E");
 
-/// the same for the lanes whose predicate bit is 1; the others stay in memory as they are. Memory is not
-/// touched when every bit is 0, else all 32 bytes may be read and written back. The address is the pointer,
-/// which then moves by increment bytes.
+/// writes 32 bytes at the address: lane i saturated to half its width where its predicate bit is 1; the
+/// others stay in memory as they are. Memory is not touched when every bit is 0, else all 32 bytes may be
+/// read and written back. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void ZRA_SVNX8ST_IP(const qv_vecNx16& v, qv_vecNx8** pointer, int increment, const vboolN& p)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8ST_IPRKN16qv_vecNx16_space11qv_vecNx16_EPPN15qv_vecNx8_space10qv_vecNx8_EiRKN12vboolN_space7vboolN_E");
 
-/// the same for the lanes whose predicate bit is 1; the others stay in memory as they are. Memory is not
-/// touched when every bit is 0, else all 32 bytes may be read and written back. The address is the pointer,
-/// which then moves by increment bytes.
+/// writes 32 bytes at the address: lane i saturated to half its width where its predicate bit is 1; the
+/// others stay in memory as they are. Memory is not touched when every bit is 0, else all 32 bytes may be
+/// read and written back. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void ZRA_SVNX8ST_XP(const qv_vecNx16& v, qv_vecNx8** pointer, int increment, const vboolN& p)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8ST_XPRKN16qv_vecNx16_space11qv_vecNx16_EPPN15qv_vecNx8_space10qv_vecNx8_EiRKN12vboolN_space7vboolN_E");
 
-/// the same for the lanes whose predicate bit is 1; the others stay in memory as they are. Memory is not
-/// touched when every bit is 0, else all 32 bytes may be read and written back. The address is base + offset
-/// bytes.
+/// writes 32 bytes at the address: the low half of lane i where its predicate bit is 1; the others stay in
+/// memory as they are. Memory is not touched when every bit is 0, else all 32 bytes may be read and written
+/// back. The address is base + offset bytes.
 KASTARRI_API void ZRA_SVNX8UT_I(const qv_vecNx16U& v, const qv_vecNx8U* base, int offset, const vboolN& p)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8UT_IRKN17qv_vecNx16U_space12qv_vecNx16U_EPKN16qv_vecNx8U_space11qv_vecNx8U_EiRKN12vboolN_space7vboolN_E");
 
-/// the same for the lanes whose predicate bit is 1; the others stay in memory as they are. Memory is not
-/// touched when every bit is 0, else all 32 bytes may be read and written back. The address is base + offset
-/// bytes.
+/// writes 32 bytes at the address: the low half of lane i where its predicate bit is 1; the others stay in
+/// memory as they are. Memory is not touched when every bit is 0, else all 32 bytes may be read and written
+/// back. The address is base + offset bytes.
 KASTARRI_API void ZRA_SVNX8UT_X(const qv_vecNx16U& v, const qv_vecNx8U* base, int offset, const vboolN& p)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8UT_XRKN17qv_vecNx16U_space12qv_vecNx16U_EPKN16qv_vecNx8U_space11qv_vecNx8U_EiRKN12vboolN_space7vboolN_E");
 
-/// the same for the lanes whose predicate bit is 1; the others stay in memory as they are. Memory is not
-/// touched when every bit is 0, else all 32 bytes may be read and written back. The address is the pointer,
-/// which then moves by increment bytes.
+/// writes 32 bytes at the address: the low half of lane i where its predicate bit is 1; the others stay in
+/// memory as they are. Memory is not touched when every bit is 0, else all 32 bytes may be read and written
+/// back. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void ZRA_SVNX8UT_IP(const qv_vecNx16U& v, qv_vecNx8U** pointer, int increment, const vboolN& p)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8UT_IPRKN17qv_vecNx16U_space12qv_vecNx16U_EPPN16qv_vecNx8U_space11qv_vecNx8U_EiRKN12vboolN_space7vboolN_E");
 
-/// the same for the lanes whose predicate bit is 1; the others stay in memory as they are. Memory is not
-/// touched when every bit is 0, else all 32 bytes may be read and written back. The address is the pointer,
-/// which then moves by increment bytes.
+/// writes 32 bytes at the address: the low half of lane i where its predicate bit is 1; the others stay in
+/// memory as they are. Memory is not touched when every bit is 0, else all 32 bytes may be read and written
+/// back. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void ZRA_SVNX8UT_XP(const qv_vecNx16U& v, qv_vecNx8U** pointer, int increment, const vboolN& p)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8UT_XPRKN17qv_vecNx16U_space12qv_vecNx16U_EPPN16qv_vecNx8U_space11qv_vecNx8U_EiRKN12vboolN_space7vboolN_E");
 
-/// the same for the lanes whose predicate bit is 1; the others stay in memory as they are. Memory is not
-/// touched when every bit is 0, else all 32 bytes may be read and written back. The address is base + offset
-/// bytes.
+/// writes 32 bytes at the address: lane i saturated to half its width where its predicate bit is 1; the
+/// others stay in memory as they are. Memory is not touched when every bit is 0, else all 32 bytes may be
+/// read and written back. The address is base + offset bytes.
 KASTARRI_API void
 ZRA_SVN_2X16ST_I(const qv_vecN_2x32v& v, const qv_vecN_2x16* base, int offset, const vboolN_2& p)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16ST_IRKN19qv_vecN_2x32v_space14qv_vecN_2x32v_EPKN18qv_vecN_2x16_space13qv_vecN_2x16_EiRKN14vboolN_2_space9vboolN_2_E");
 
-/// the same for the lanes whose predicate bit is 1; the others stay in memory as they are. Memory is not
-/// touched when every bit is 0, else all 32 bytes may be read and written back. The address is base + offset
-/// bytes.
+/// writes 32 bytes at the address: lane i saturated to half its width where its predicate bit is 1; the
+/// others stay in memory as they are. Memory is not touched when every bit is 0, else all 32 bytes may be
+/// read and written back. The address is base + offset bytes.
 KASTARRI_API void
 ZRA_SVN_2X16ST_X(const qv_vecN_2x32v& v, const qv_vecN_2x16* base, int offset, const vboolN_2& p)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16ST_XRKN19qv_vecN_2x32v_space14qv_vecN_2x32v_EPKN18qv_vecN_2x16_space13qv_vecN_2x16_EiRKN14vboolN_2_space9vboolN_2_E");
 
-/// the same for the lanes whose predicate bit is 1; the others stay in memory as they are. Memory is not
-/// touched when every bit is 0, else all 32 bytes may be read and written back. The address is the pointer,
-/// which then moves by increment bytes.
+/// writes 32 bytes at the address: lane i saturated to half its width where its predicate bit is 1; the
+/// others stay in memory as they are. Memory is not touched when every bit is 0, else all 32 bytes may be
+/// read and written back. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
 ZRA_SVN_2X16ST_IP(const qv_vecN_2x32v& v, qv_vecN_2x16** pointer, int increment, const vboolN_2& p)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16ST_IPRKN19qv_vecN_2x32v_space14qv_vecN_2x32v_EPPN18qv_vecN_2x16_space13qv_vecN_2x16_EiRKN14vboolN_2_space9vboolN_2_E");
 
-/// the same for the lanes whose predicate bit is 1; the others stay in memory as they are. Memory is not
-/// touched when every bit is 0, else all 32 bytes may be read and written back. The address is the pointer,
-/// which then moves by increment bytes.
+/// writes 32 bytes at the address: lane i saturated to half its width where its predicate bit is 1; the
+/// others stay in memory as they are. Memory is not touched when every bit is 0, else all 32 bytes may be
+/// read and written back. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
 ZRA_SVN_2X16ST_XP(const qv_vecN_2x32v& v, qv_vecN_2x16** pointer, int increment, const vboolN_2& p)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16ST_XPRKN19qv_vecN_2x32v_space14qv_vecN_2x32v_EPPN18qv_vecN_2x16_space13qv_vecN_2x16_EiRKN14vboolN_2_space9vboolN_2_E");
 
-/// the same for the lanes whose predicate bit is 1; the others stay in memory as they are. Memory is not
-/// touched when every bit is 0, else all 32 bytes may be read and written back. The address is base + offset
-/// bytes.
+/// writes 32 bytes at the address: the low half of lane i where its predicate bit is 1; the others stay in
+/// memory as they are. Memory is not touched when every bit is 0, else all 32 bytes may be read and written
+/// back. The address is base + offset bytes.
 KASTARRI_API void
 ZRA_SVN_2X16UT_I(const qv_vecN_2x32Uv& v, const qv_vecN_2x16U* base, int offset, const vboolN_2& p)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16UT_IRKN20qv_vecN_2x32Uv_space15qv_vecN_2x32Uv_EPKN19qv_vecN_2x16U_space14qv_vecN_2x16U_EiRKN14vboolN_2_space9vboolN_2_E");
 
-/// the same for the lanes whose predicate bit is 1; the others stay in memory as they are. Memory is not
-/// touched when every bit is 0, else all 32 bytes may be read and written back. The address is base + offset
-/// bytes.
+/// writes 32 bytes at the address: the low half of lane i where its predicate bit is 1; the others stay in
+/// memory as they are. Memory is not touched when every bit is 0, else all 32 bytes may be read and written
+/// back. The address is base + offset bytes.
 KASTARRI_API void
 ZRA_SVN_2X16UT_X(const qv_vecN_2x32Uv& v, const qv_vecN_2x16U* base, int offset, const vboolN_2& p)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16UT_XRKN20qv_vecN_2x32Uv_space15qv_vecN_2x32Uv_EPKN19qv_vecN_2x16U_space14qv_vecN_2x16U_EiRKN14vboolN_2_space9vboolN_2_E");
 
-/// the same for the lanes whose predicate bit is 1; the others stay in memory as they are. Memory is not
-/// touched when every bit is 0, else all 32 bytes may be read and written back. The address is the pointer,
-/// which then moves by increment bytes.
+/// writes 32 bytes at the address: the low half of lane i where its predicate bit is 1; the others stay in
+/// memory as they are. Memory is not touched when every bit is 0, else all 32 bytes may be read and written
+/// back. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
 ZRA_SVN_2X16UT_IP(const qv_vecN_2x32Uv& v, qv_vecN_2x16U** pointer, int increment, const vboolN_2& p)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16UT_IPRKN20qv_vecN_2x32Uv_space15qv_vecN_2x32Uv_EPPN19qv_vecN_2x16U_space14qv_vecN_2x16U_EiRKN14vboolN_2_space9vboolN_2_E");
 
-/// the same for the lanes whose predicate bit is 1; the others stay in memory as they are. Memory is not
-/// touched when every bit is 0, else all 32 bytes may be read and written back. The address is the pointer,
-/// which then moves by increment bytes.
+/// writes 32 bytes at the address: the low half of lane i where its predicate bit is 1; the others stay in
+/// memory as they are. Memory is not touched when every bit is 0, else all 32 bytes may be read and written
+/// back. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
 ZRA_SVN_2X16UT_XP(const qv_vecN_2x32Uv& v, qv_vecN_2x16U** pointer, int increment, const vboolN_2& p)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16UT_XPRKN20qv_vecN_2x32Uv_space15qv_vecN_2x32Uv_EPPN19qv_vecN_2x16U_space14qv_vecN_2x16U_EiRKN14vboolN_2_space9vboolN_2_E");
@@ -2160,43 +2160,44 @@ KASTARRI_API void
 ZRA_SCATTERN_2XF32(const qv_vecN_2xf32& v, const rkfloat* base, const qv_vecN_2x32Uv& offsets)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERN_2XF32RKN19qv_vecN_2xf32_space14qv_vecN_2xf32_EPKN13rkfloat_space8rkfloat_ERKN20qv_vecN_2x32Uv_space15qv_vecN_2x32Uv_E");
 
-/// the same for the elements whose predicate bit is 1; for the others memory is not touched.
+/// writes lane i's low byte at base + offset i bytes where its predicate bit is 1, else memory is not
+/// touched. The byte after each element is read too.
 KASTARRI_API void
-ZRA_SCATTERNX8UT(const qv_vecNx16U& v, const unsigned char* base, const qv_vecNx16U& offsets, const
-    vboolN& p)
+ZRA_SCATTERNX8UT(const qv_vecNx16U& v, const unsigned char* base, const qv_vecNx16U& offsets,
+    const vboolN& p)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERNX8UTRKN17qv_vecNx16U_space12qv_vecNx16U_EPKhS2_RKN12vboolN_space7vboolN_E");
 
-/// the same for the elements whose predicate bit is 1; for the others memory is not touched.
+/// writes lane i at base + offset i bytes where its predicate bit is 1, else memory is not touched.
 KASTARRI_API void
 ZRA_SCATTERNX16T(const qv_vecNx16& v, const short* base, const qv_vecNx16U& offsets, const vboolN& p)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERNX16TRKN16qv_vecNx16_space11qv_vecNx16_EPKsRKN17qv_vecNx16U_space12qv_vecNx16U_ERKN12vboolN_space7vboolN_E");
 
-/// the same for the elements whose predicate bit is 1; for the others memory is not touched.
+/// writes lane i at base + offset i bytes where its predicate bit is 1, else memory is not touched.
 KASTARRI_API void
-ZRA_SCATTERNX16UT(const qv_vecNx16U& v, const unsigned short* base, const qv_vecNx16U& offsets, const
-    vboolN& p)
+ZRA_SCATTERNX16UT(const qv_vecNx16U& v, const unsigned short* base, const qv_vecNx16U& offsets,
+    const vboolN& p)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERNX16UTRKN17qv_vecNx16U_space12qv_vecNx16U_EPKtS2_RKN12vboolN_space7vboolN_E");
 
-/// the same for the elements whose predicate bit is 1; for the others memory is not touched.
+/// writes lane i at base + offset i bytes where its predicate bit is 1, else memory is not touched.
 KASTARRI_API void
 ZRA_SCATTERNXF16T(const qv_vecNxf16& v, const qv_f16* base, const qv_vecNx16U& offsets, const vboolN& p)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERNXF16TRKN17qv_vecNxf16_space12qv_vecNxf16_EPKN12qv_f16_space7qv_f16_ERKN17qv_vecNx16U_space12qv_vecNx16U_ERKN12vboolN_space7vboolN_E");
 
-/// the same for the elements whose predicate bit is 1; for the others memory is not touched.
+/// writes lane i at base + offset i bytes where its predicate bit is 1, else memory is not touched.
 KASTARRI_API void
 ZRA_SCATTERN_2X32T(const qv_vecN_2x32v& v, const int* base, const qv_vecN_2x32Uv& offsets, const vboolN_2& p)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERN_2X32TRKN19qv_vecN_2x32v_space14qv_vecN_2x32v_EPKiRKN20qv_vecN_2x32Uv_space15qv_vecN_2x32Uv_ERKN14vboolN_2_space9vboolN_2_E");
 
-/// the same for the elements whose predicate bit is 1; for the others memory is not touched.
+/// writes lane i at base + offset i bytes where its predicate bit is 1, else memory is not touched.
 KASTARRI_API void
 ZRA_SCATTERN_2X32UT(const qv_vecN_2x32Uv& v, const unsigned int* base, const qv_vecN_2x32Uv& offsets,
     const vboolN_2& p)
     __asm__("_Z59cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERN_2X32UTRKN20qv_vecN_2x32Uv_space15qv_vecN_2x32Uv_EPKjS2_RKN14vboolN_2_space9vboolN_2_E");
 
-/// the same for the elements whose predicate bit is 1; for the others memory is not touched.
+/// writes lane i at base + offset i bytes where its predicate bit is 1, else memory is not touched.
 KASTARRI_API void
-ZRA_SCATTERN_2XF32T(const qv_vecN_2xf32& v, const rkfloat* base, const qv_vecN_2x32Uv& offsets, const
-    vboolN_2& p)
+ZRA_SCATTERN_2XF32T(const qv_vecN_2xf32& v, const rkfloat* base, const qv_vecN_2x32Uv& offsets,
+    const vboolN_2& p)
     __asm__("_Z59cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERN_2XF32TRKN19qv_vecN_2xf32_space14qv_vecN_2xf32_EPKN13rkfloat_space8rkfloat_ERKN20qv_vecN_2x32Uv_space15qv_vecN_2x32Uv_ERKN14vboolN_2_space9vboolN_2_E");
 
 /// writes lane i at base + offset i bytes for i below 32. The byte after an element is read too.
@@ -2220,29 +2221,29 @@ ZRA_SCATTER2NX8U_H(const qv_vec2Nx8U& v, const unsigned char* base, const qv_vec
 /// writes lane i at base + offset i bytes for i below 32, where the lane's predicate bit is 1. The byte after
 /// an element is read too.
 KASTARRI_API void
-ZRA_SCATTER2NX8T_L(const qv_vec2Nx8& v, const signed char* base, const qv_vecNx16U& offsets, const
-    vbool2N& p)
+ZRA_SCATTER2NX8T_L(const qv_vec2Nx8& v, const signed char* base, const qv_vecNx16U& offsets,
+    const vbool2N& p)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTER2NX8T_LRKN16qv_vec2Nx8_space11qv_vec2Nx8_EPKaRKN17qv_vecNx16U_space12qv_vecNx16U_ERKN13vbool2N_space8vbool2N_E");
 
 /// writes lane 32 + i at base + offset i bytes for i below 32, where the lane's predicate bit is 1. The byte
 /// after an element is read too.
 KASTARRI_API void
-ZRA_SCATTER2NX8T_H(const qv_vec2Nx8& v, const signed char* base, const qv_vecNx16U& offsets, const
-    vbool2N& p)
+ZRA_SCATTER2NX8T_H(const qv_vec2Nx8& v, const signed char* base, const qv_vecNx16U& offsets,
+    const vbool2N& p)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTER2NX8T_HRKN16qv_vec2Nx8_space11qv_vec2Nx8_EPKaRKN17qv_vecNx16U_space12qv_vecNx16U_ERKN13vbool2N_space8vbool2N_E");
 
 /// writes lane i at base + offset i bytes for i below 32, where the lane's predicate bit is 1. The byte after
 /// an element is read too.
 KASTARRI_API void
-ZRA_SCATTER2NX8UT_L(const qv_vec2Nx8U& v, const unsigned char* base, const qv_vecNx16U& offsets, const
-    vbool2N& p)
+ZRA_SCATTER2NX8UT_L(const qv_vec2Nx8U& v, const unsigned char* base, const qv_vecNx16U& offsets,
+    const vbool2N& p)
     __asm__("_Z59cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTER2NX8UT_LRKN17qv_vec2Nx8U_space12qv_vec2Nx8U_EPKhRKN17qv_vecNx16U_space12qv_vecNx16U_ERKN13vbool2N_space8vbool2N_E");
 
 /// writes lane 32 + i at base + offset i bytes for i below 32, where the lane's predicate bit is 1. The byte
 /// after an element is read too.
 KASTARRI_API void
-ZRA_SCATTER2NX8UT_H(const qv_vec2Nx8U& v, const unsigned char* base, const qv_vecNx16U& offsets, const
-    vbool2N& p)
+ZRA_SCATTER2NX8UT_H(const qv_vec2Nx8U& v, const unsigned char* base, const qv_vecNx16U& offsets,
+    const vbool2N& p)
     __asm__("_Z59cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTER2NX8UT_HRKN17qv_vec2Nx8U_space12qv_vec2Nx8U_EPKhRKN17qv_vecNx16U_space12qv_vecNx16U_ERKN13vbool2N_space8vbool2N_E");
 
 /// adds 1, wrapping, to the element at base + offset i bytes for every i: n to an element that n lanes

@@ -269,78 +269,78 @@ ZRA_MULUSPNX16(const qv_vecNx16U& a, const qv_vecNx16& b, const qv_vecNx16U& c, 
 
 /// lane i of acc = acc[i] + (a[i] * b[i] + c[i] * d[i]), modulo 2^24; the factors are signed.
 KASTARRI_API void
-ZRA_MULPA2NX8(qv_vec2Nx24& acc, const qv_vec2Nx8& a, const qv_vec2Nx8& b, const qv_vec2Nx8& c, const
-    qv_vec2Nx8& d)
+ZRA_MULPA2NX8(qv_vec2Nx24& acc, const qv_vec2Nx8& a, const qv_vec2Nx8& b, const qv_vec2Nx8& c,
+    const qv_vec2Nx8& d)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPA2NX8RN17qv_vec2Nx24_space12qv_vec2Nx24_ERKN16qv_vec2Nx8_space11qv_vec2Nx8_ES5_S5_S5_");
 
 /// lane i of acc = acc[i] + (a[i] * b[i] + c[i] * d[i]), modulo 2^24; both factors are unsigned.
 KASTARRI_API void
-ZRA_MULUUPA2NX8(qv_vec2Nx24& acc, const qv_vec2Nx8U& a, const qv_vec2Nx8U& b, const qv_vec2Nx8U& c, const
-    qv_vec2Nx8U& d)
+ZRA_MULUUPA2NX8(qv_vec2Nx24& acc, const qv_vec2Nx8U& a, const qv_vec2Nx8U& b, const qv_vec2Nx8U& c,
+    const qv_vec2Nx8U& d)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUPA2NX8RN17qv_vec2Nx24_space12qv_vec2Nx24_ERKN17qv_vec2Nx8U_space12qv_vec2Nx8U_ES5_S5_S5_");
 
 /// lane i of acc = acc[i] + (a[i] * b[i] + c[i] * d[i]), modulo 2^24; the first factor is unsigned, the
 /// second signed.
 KASTARRI_API void
-ZRA_MULUSPA2NX8(qv_vec2Nx24& acc, const qv_vec2Nx8U& a, const qv_vec2Nx8& b, const qv_vec2Nx8U& c, const
-    qv_vec2Nx8& d)
+ZRA_MULUSPA2NX8(qv_vec2Nx24& acc, const qv_vec2Nx8U& a, const qv_vec2Nx8& b, const qv_vec2Nx8U& c,
+    const qv_vec2Nx8& d)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPA2NX8RN17qv_vec2Nx24_space12qv_vec2Nx24_ERKN17qv_vec2Nx8U_space12qv_vec2Nx8U_ERKN16qv_vec2Nx8_space11qv_vec2Nx8_ES5_S9_");
 
 /// lane i of acc = acc[i] + (a[i] * b[i] + c[i] * d[i]), modulo 2^48; the factors are signed.
 KASTARRI_API void
-ZRA_MULPANX16(qv_vecNx48& acc, const qv_vecNx16& a, const qv_vecNx16& b, const qv_vecNx16& c, const
-    qv_vecNx16& d)
+ZRA_MULPANX16(qv_vecNx48& acc, const qv_vecNx16& a, const qv_vecNx16& b, const qv_vecNx16& c,
+    const qv_vecNx16& d)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPANX16RN16qv_vecNx48_space11qv_vecNx48_ERKN16qv_vecNx16_space11qv_vecNx16_ES5_S5_S5_");
 
 /// lane i of acc = acc[i] + (a[i] * b[i] + c[i] * d[i]), modulo 2^48; both factors are unsigned.
 KASTARRI_API void
-ZRA_MULUUPANX16(qv_vecNx48& acc, const qv_vecNx16U& a, const qv_vecNx16U& b, const qv_vecNx16U& c, const
-    qv_vecNx16U& d)
+ZRA_MULUUPANX16(qv_vecNx48& acc, const qv_vecNx16U& a, const qv_vecNx16U& b, const qv_vecNx16U& c,
+    const qv_vecNx16U& d)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUPANX16RN16qv_vecNx48_space11qv_vecNx48_ERKN17qv_vecNx16U_space12qv_vecNx16U_ES5_S5_S5_");
 
 /// lane i of acc = acc[i] + (a[i] * b[i] + c[i] * d[i]), modulo 2^48; the first factor is unsigned, the
 /// second signed.
 KASTARRI_API void
-ZRA_MULUSPANX16(qv_vecNx48& acc, const qv_vecNx16U& a, const qv_vecNx16& b, const qv_vecNx16U& c, const
-    qv_vecNx16& d)
+ZRA_MULUSPANX16(qv_vecNx48& acc, const qv_vecNx16U& a, const qv_vecNx16& b, const qv_vecNx16U& c,
+    const qv_vecNx16& d)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPANX16RN16qv_vecNx48_space11qv_vecNx48_ERKN17qv_vecNx16U_space12qv_vecNx16U_ERKN16qv_vecNx16_space11qv_vecNx16_ES5_S9_");
 
 /// lane i of acc = acc[i] - (a[i] * b[i] + c[i] * d[i]), modulo 2^24; the factors are signed.
 KASTARRI_API void
-ZRA_MULPS2NX8(qv_vec2Nx24& acc, const qv_vec2Nx8& a, const qv_vec2Nx8& b, const qv_vec2Nx8& c, const
-    qv_vec2Nx8& d)
+ZRA_MULPS2NX8(qv_vec2Nx24& acc, const qv_vec2Nx8& a, const qv_vec2Nx8& b, const qv_vec2Nx8& c,
+    const qv_vec2Nx8& d)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPS2NX8RN17qv_vec2Nx24_space12qv_vec2Nx24_ERKN16qv_vec2Nx8_space11qv_vec2Nx8_ES5_S5_S5_");
 
 /// lane i of acc = acc[i] - (a[i] * b[i] + c[i] * d[i]), modulo 2^24; both factors are unsigned.
 KASTARRI_API void
-ZRA_MULUUPS2NX8(qv_vec2Nx24& acc, const qv_vec2Nx8U& a, const qv_vec2Nx8U& b, const qv_vec2Nx8U& c, const
-    qv_vec2Nx8U& d)
+ZRA_MULUUPS2NX8(qv_vec2Nx24& acc, const qv_vec2Nx8U& a, const qv_vec2Nx8U& b, const qv_vec2Nx8U& c,
+    const qv_vec2Nx8U& d)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUPS2NX8RN17qv_vec2Nx24_space12qv_vec2Nx24_ERKN17qv_vec2Nx8U_space12qv_vec2Nx8U_ES5_S5_S5_");
 
 /// lane i of acc = acc[i] - (a[i] * b[i] + c[i] * d[i]), modulo 2^24; the first factor is unsigned, the
 /// second signed.
 KASTARRI_API void
-ZRA_MULUSPS2NX8(qv_vec2Nx24& acc, const qv_vec2Nx8U& a, const qv_vec2Nx8& b, const qv_vec2Nx8U& c, const
-    qv_vec2Nx8& d)
+ZRA_MULUSPS2NX8(qv_vec2Nx24& acc, const qv_vec2Nx8U& a, const qv_vec2Nx8& b, const qv_vec2Nx8U& c,
+    const qv_vec2Nx8& d)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPS2NX8RN17qv_vec2Nx24_space12qv_vec2Nx24_ERKN17qv_vec2Nx8U_space12qv_vec2Nx8U_ERKN16qv_vec2Nx8_space11qv_vec2Nx8_ES5_S9_");
 
 /// lane i of acc = acc[i] - (a[i] * b[i] + c[i] * d[i]), modulo 2^48; the factors are signed.
 KASTARRI_API void
-ZRA_MULPSNX16(qv_vecNx48& acc, const qv_vecNx16& a, const qv_vecNx16& b, const qv_vecNx16& c, const
-    qv_vecNx16& d)
+ZRA_MULPSNX16(qv_vecNx48& acc, const qv_vecNx16& a, const qv_vecNx16& b, const qv_vecNx16& c,
+    const qv_vecNx16& d)
     __asm__("_Z53cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPSNX16RN16qv_vecNx48_space11qv_vecNx48_ERKN16qv_vecNx16_space11qv_vecNx16_ES5_S5_S5_");
 
 /// lane i of acc = acc[i] - (a[i] * b[i] + c[i] * d[i]), modulo 2^48; both factors are unsigned.
 KASTARRI_API void
-ZRA_MULUUPSNX16(qv_vecNx48& acc, const qv_vecNx16U& a, const qv_vecNx16U& b, const qv_vecNx16U& c, const
-    qv_vecNx16U& d)
+ZRA_MULUUPSNX16(qv_vecNx48& acc, const qv_vecNx16U& a, const qv_vecNx16U& b, const qv_vecNx16U& c,
+    const qv_vecNx16U& d)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUPSNX16RN16qv_vecNx48_space11qv_vecNx48_ERKN17qv_vecNx16U_space12qv_vecNx16U_ES5_S5_S5_");
 
 /// lane i of acc = acc[i] - (a[i] * b[i] + c[i] * d[i]), modulo 2^48; the first factor is unsigned, the
 /// second signed.
 KASTARRI_API void
-ZRA_MULUSPSNX16(qv_vecNx48& acc, const qv_vecNx16U& a, const qv_vecNx16& b, const qv_vecNx16U& c, const
-    qv_vecNx16& d)
+ZRA_MULUSPSNX16(qv_vecNx48& acc, const qv_vecNx16U& a, const qv_vecNx16& b, const qv_vecNx16U& c,
+    const qv_vecNx16& d)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPSNX16RN16qv_vecNx48_space11qv_vecNx48_ERKN17qv_vecNx16U_space12qv_vecNx16U_ERKN16qv_vecNx16_space11qv_vecNx16_ES5_S9_");
 
 /// lane i = a[i] * b[i] - c[i] * d[i], exact; the factors are signed.
@@ -375,8 +375,8 @@ ZRA_MULUSPDNX16(const qv_vecNx16U& a, const qv_vecNx16& b, const qv_vecNx16U& c,
 
 /// lane i of acc = acc[i] + (a[i] * b[i] - c[i] * d[i]), modulo 2^24; the factors are signed.
 KASTARRI_API void
-ZRA_MULPDA2NX8(qv_vec2Nx24& acc, const qv_vec2Nx8& a, const qv_vec2Nx8& b, const qv_vec2Nx8& c, const
-    qv_vec2Nx8& d)
+ZRA_MULPDA2NX8(qv_vec2Nx24& acc, const qv_vec2Nx8& a, const qv_vec2Nx8& b, const qv_vec2Nx8& c,
+    const qv_vec2Nx8& d)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPDA2NX8RN17qv_vec2Nx24_space12qv_vec2Nx24_ERKN16qv_vec2Nx8_space11qv_vec2Nx8_ES5_S5_S5_");
 
 /// lane i of acc = acc[i] + (a[i] * b[i] - c[i] * d[i]), modulo 2^24; both factors are unsigned.
@@ -388,27 +388,27 @@ ZRA_MULUUPDA2NX8(qv_vec2Nx24& acc, const qv_vec2Nx8U& a, const qv_vec2Nx8U& b, c
 /// lane i of acc = acc[i] + (a[i] * b[i] - c[i] * d[i]), modulo 2^24; the first factor is unsigned, the
 /// second signed.
 KASTARRI_API void
-ZRA_MULUSPDA2NX8(qv_vec2Nx24& acc, const qv_vec2Nx8U& a, const qv_vec2Nx8& b, const qv_vec2Nx8U& c, const
-    qv_vec2Nx8& d)
+ZRA_MULUSPDA2NX8(qv_vec2Nx24& acc, const qv_vec2Nx8U& a, const qv_vec2Nx8& b, const qv_vec2Nx8U& c,
+    const qv_vec2Nx8& d)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPDA2NX8RN17qv_vec2Nx24_space12qv_vec2Nx24_ERKN17qv_vec2Nx8U_space12qv_vec2Nx8U_ERKN16qv_vec2Nx8_space11qv_vec2Nx8_ES5_S9_");
 
 /// lane i of acc = acc[i] + (a[i] * b[i] - c[i] * d[i]), modulo 2^48; the factors are signed.
 KASTARRI_API void
-ZRA_MULPDANX16(qv_vecNx48& acc, const qv_vecNx16& a, const qv_vecNx16& b, const qv_vecNx16& c, const
-    qv_vecNx16& d)
+ZRA_MULPDANX16(qv_vecNx48& acc, const qv_vecNx16& a, const qv_vecNx16& b, const qv_vecNx16& c,
+    const qv_vecNx16& d)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPDANX16RN16qv_vecNx48_space11qv_vecNx48_ERKN16qv_vecNx16_space11qv_vecNx16_ES5_S5_S5_");
 
 /// lane i of acc = acc[i] + (a[i] * b[i] - c[i] * d[i]), modulo 2^48; both factors are unsigned.
 KASTARRI_API void
-ZRA_MULUUPDANX16(qv_vecNx48& acc, const qv_vecNx16U& a, const qv_vecNx16U& b, const qv_vecNx16U& c, const
-    qv_vecNx16U& d)
+ZRA_MULUUPDANX16(qv_vecNx48& acc, const qv_vecNx16U& a, const qv_vecNx16U& b, const qv_vecNx16U& c,
+    const qv_vecNx16U& d)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUPDANX16RN16qv_vecNx48_space11qv_vecNx48_ERKN17qv_vecNx16U_space12qv_vecNx16U_ES5_S5_S5_");
 
 /// lane i of acc = acc[i] + (a[i] * b[i] - c[i] * d[i]), modulo 2^48; the first factor is unsigned, the
 /// second signed.
 KASTARRI_API void
-ZRA_MULUSPDANX16(qv_vecNx48& acc, const qv_vecNx16U& a, const qv_vecNx16& b, const qv_vecNx16U& c, const
-    qv_vecNx16& d)
+ZRA_MULUSPDANX16(qv_vecNx48& acc, const qv_vecNx16U& a, const qv_vecNx16& b, const qv_vecNx16U& c,
+    const qv_vecNx16& d)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPDANX16RN16qv_vecNx48_space11qv_vecNx48_ERKN17qv_vecNx16U_space12qv_vecNx16U_ERKN16qv_vecNx16_space11qv_vecNx16_ES5_S9_");
 
 /* Sums of two squares, in PD forms the first less the second.
@@ -685,8 +685,8 @@ ZRA_MULSUPAN16XR16(qv_vecNx48& acc, const qv_vecNx16U& a, const qv_vecNx16U& b, 
 /// lane i = a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the bytes of s from the highest, exact;
 /// vectors and coefficients are signed.
 KASTARRI_RESULT qv_vec2Nx24
-ZRA_MULQ2N8XR8(const qv_vec2Nx8 &a, const qv_vec2Nx8 &b, const qv_vec2Nx8 &c, const qv_vec2Nx8 &d, const
-    qv_int32pr& s)
+ZRA_MULQ2N8XR8(const qv_vec2Nx8 &a, const qv_vec2Nx8 &b, const qv_vec2Nx8 &c, const qv_vec2Nx8 &d,
+    const qv_int32pr& s)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQ2N8XR8RKN16qv_vec2Nx8_space11qv_vec2Nx8_ES2_S2_S2_RKN16qv_int32pr_space11qv_int32pr_E");
 
 /// lane i = a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the bytes of s from the highest, exact;
@@ -713,8 +713,8 @@ ZRA_MULSUQ2N8XR8(const qv_vec2Nx8U &a, const qv_vec2Nx8U &b, const qv_vec2Nx8U &
 /// added to acc, modulo 2^24: lane i = a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the bytes of s
 /// from the highest; vectors and coefficients are signed.
 KASTARRI_API void
-ZRA_MULQA2N8XR8(qv_vec2Nx24& acc, const qv_vec2Nx8 &a, const qv_vec2Nx8 &b, const qv_vec2Nx8 &c, const
-    qv_vec2Nx8 &d, const qv_int32pr& s)
+ZRA_MULQA2N8XR8(qv_vec2Nx24& acc, const qv_vec2Nx8 &a, const qv_vec2Nx8 &b, const qv_vec2Nx8 &c,
+    const qv_vec2Nx8 &d, const qv_int32pr& s)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQA2N8XR8RN17qv_vec2Nx24_space12qv_vec2Nx24_ERKN16qv_vec2Nx8_space11qv_vec2Nx8_ES5_S5_S5_RKN16qv_int32pr_space11qv_int32pr_E");
 
 /// added to acc, modulo 2^24: lane i = a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the bytes of s
@@ -741,8 +741,8 @@ ZRA_MULSUQA2N8XR8(qv_vec2Nx24& acc, const qv_vec2Nx8U &a, const qv_vec2Nx8U &b, 
 /// even lanes i = a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the bytes of s from the highest,
 /// odd lanes the same with t, exact; vectors and coefficients are signed.
 KASTARRI_RESULT qv_vec2Nx24
-ZRA_MULQ2N8DXR8(const qv_vec2Nx8 &a, const qv_vec2Nx8 &b, const qv_vec2Nx8 &c, const qv_vec2Nx8 &d, const
-    qv_int32pr& s, const qv_int32pr& t)
+ZRA_MULQ2N8DXR8(const qv_vec2Nx8 &a, const qv_vec2Nx8 &b, const qv_vec2Nx8 &c, const qv_vec2Nx8 &d,
+    const qv_int32pr& s, const qv_int32pr& t)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQ2N8DXR8RKN16qv_vec2Nx8_space11qv_vec2Nx8_ES2_S2_S2_RKN16qv_int32pr_space11qv_int32pr_ES6_");
 
 /// even lanes i = a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the bytes of s from the highest,
@@ -769,8 +769,8 @@ ZRA_MULSUQ2N8DXR8(const qv_vec2Nx8U &a, const qv_vec2Nx8U &b, const qv_vec2Nx8U 
 /// added to acc, modulo 2^24: even lanes i = a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the
 /// bytes of s from the highest, odd lanes the same with t; vectors and coefficients are signed.
 KASTARRI_API void
-ZRA_MULQA2N8DXR8(qv_vec2Nx24& acc, const qv_vec2Nx8 &a, const qv_vec2Nx8 &b, const qv_vec2Nx8 &c, const
-    qv_vec2Nx8 &d, const qv_int32pr& s, const qv_int32pr& t)
+ZRA_MULQA2N8DXR8(qv_vec2Nx24& acc, const qv_vec2Nx8 &a, const qv_vec2Nx8 &b, const qv_vec2Nx8 &c,
+    const qv_vec2Nx8 &d, const qv_int32pr& s, const qv_int32pr& t)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQA2N8DXR8RN17qv_vec2Nx24_space12qv_vec2Nx24_ERKN16qv_vec2Nx8_space11qv_vec2Nx8_ES5_S5_S5_RKN16qv_int32pr_space11qv_int32pr_ES9_");
 
 /// added to acc, modulo 2^24: even lanes i = a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the
@@ -797,8 +797,8 @@ ZRA_MULSUQA2N8DXR8(qv_vec2Nx24& acc, const qv_vec2Nx8U &a, const qv_vec2Nx8U &b,
 /// lanes i with i mod 4 = 0: a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the bytes of s from the
 /// highest; with i mod 4 = 1, 2, 3 the same with t, u, v, exact; vectors and coefficients are signed.
 KASTARRI_RESULT qv_vec2Nx24
-ZRA_MULQ2N8QXR8(const qv_vec2Nx8 &a, const qv_vec2Nx8 &b, const qv_vec2Nx8 &c, const qv_vec2Nx8 &d, const
-    qv_int32pr& s, const qv_int32pr& t, const qv_int32pr& u, const qv_int32pr& v)
+ZRA_MULQ2N8QXR8(const qv_vec2Nx8 &a, const qv_vec2Nx8 &b, const qv_vec2Nx8 &c, const qv_vec2Nx8 &d,
+    const qv_int32pr& s, const qv_int32pr& t, const qv_int32pr& u, const qv_int32pr& v)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQ2N8QXR8RKN16qv_vec2Nx8_space11qv_vec2Nx8_ES2_S2_S2_RKN16qv_int32pr_space11qv_int32pr_ES6_S6_S6_");
 
 /// lanes i with i mod 4 = 0: a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the bytes of s from the
@@ -826,8 +826,8 @@ ZRA_MULSUQ2N8QXR8(const qv_vec2Nx8U &a, const qv_vec2Nx8U &b, const qv_vec2Nx8U 
 /// s0 the bytes of s from the highest; with i mod 4 = 1, 2, 3 the same with t, u, v; vectors and coefficients
 /// are signed.
 KASTARRI_API void
-ZRA_MULQA2N8QXR8(qv_vec2Nx24& acc, const qv_vec2Nx8 &a, const qv_vec2Nx8 &b, const qv_vec2Nx8 &c, const
-    qv_vec2Nx8 &d, const qv_int32pr& s, const qv_int32pr& t, const qv_int32pr& u, const qv_int32pr& v)
+ZRA_MULQA2N8QXR8(qv_vec2Nx24& acc, const qv_vec2Nx8 &a, const qv_vec2Nx8 &b, const qv_vec2Nx8 &c,
+    const qv_vec2Nx8 &d, const qv_int32pr& s, const qv_int32pr& t, const qv_int32pr& u, const qv_int32pr& v)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQA2N8QXR8RN17qv_vec2Nx24_space12qv_vec2Nx24_ERKN16qv_vec2Nx8_space11qv_vec2Nx8_ES5_S5_S5_RKN16qv_int32pr_space11qv_int32pr_ES9_S9_S9_");
 
 /// added to acc, modulo 2^24: lanes i with i mod 4 = 0: a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to
@@ -857,8 +857,8 @@ ZRA_MULSUQA2N8QXR8(qv_vec2Nx24& acc, const qv_vec2Nx8U &a, const qv_vec2Nx8U &b,
 /// lane i = a[i] * s1 + b[i] * s0 + c[i] * s1 + d[i] * s0, s1 the high and s0 the low half of s, exact;
 /// vectors and coefficients are signed.
 KASTARRI_RESULT qv_vecNx48
-ZRA_MULQN16XR16(const qv_vecNx16 &a, const qv_vecNx16 &b, const qv_vecNx16 &c, const qv_vecNx16 &d, const
-    qv_int32pr& s)
+ZRA_MULQN16XR16(const qv_vecNx16 &a, const qv_vecNx16 &b, const qv_vecNx16 &c, const qv_vecNx16 &d,
+    const qv_int32pr& s)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQN16XR16RKN16qv_vecNx16_space11qv_vecNx16_ES2_S2_S2_RKN16qv_int32pr_space11qv_int32pr_E");
 
 /// lane i = a[i] * s1 + b[i] * s0 + c[i] * s1 + d[i] * s0, s1 the high and s0 the low half of s, exact;
@@ -885,8 +885,8 @@ ZRA_MULSUQN16XR16(const qv_vecNx16U &a, const qv_vecNx16U &b, const qv_vecNx16U 
 /// added to acc, modulo 2^48: lane i = a[i] * s1 + b[i] * s0 + c[i] * s1 + d[i] * s0, s1 the high and s0 the
 /// low half of s; vectors and coefficients are signed.
 KASTARRI_API void
-ZRA_MULQAN16XR16(qv_vecNx48& acc, const qv_vecNx16 &a, const qv_vecNx16 &b, const qv_vecNx16 &c, const
-    qv_vecNx16 &d, const qv_int32pr& s)
+ZRA_MULQAN16XR16(qv_vecNx48& acc, const qv_vecNx16 &a, const qv_vecNx16 &b, const qv_vecNx16 &c,
+    const qv_vecNx16 &d, const qv_int32pr& s)
     __asm__("_Z56cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQAN16XR16RN16qv_vecNx48_space11qv_vecNx48_ERKN16qv_vecNx16_space11qv_vecNx16_ES5_S5_S5_RKN16qv_int32pr_space11qv_int32pr_E");
 
 /// added to acc, modulo 2^48: lane i = a[i] * s1 + b[i] * s0 + c[i] * s1 + d[i] * s0, s1 the high and s0 the
@@ -920,29 +920,29 @@ ZRA_MULQN16DXR16(const qv_vecNx16 &a, const qv_vecNx16 &b, const qv_vecNx16 &c, 
 /// even lanes i = a[i] * s1 + b[i] * s0 + c[i] * s1 + d[i] * s0, s1 the high and s0 the low half of s, odd
 /// lanes the same with t, exact; vectors and coefficients are unsigned.
 KASTARRI_RESULT qv_vecNx48
-ZRA_MULUUQN16DXR16(const qv_vecNx16U &a, const qv_vecNx16U &b, const qv_vecNx16U &c, const qv_vecNx16U
-    &d, const qv_int32pr& s, const qv_int32pr& t)
+ZRA_MULUUQN16DXR16(const qv_vecNx16U &a, const qv_vecNx16U &b, const qv_vecNx16U &c,
+    const qv_vecNx16U &d, const qv_int32pr& s, const qv_int32pr& t)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUQN16DXR16RKN17qv_vecNx16U_space12qv_vecNx16U_ES2_S2_S2_RKN16qv_int32pr_space11qv_int32pr_ES6_");
 
 /// even lanes i = a[i] * s1 + b[i] * s0 + c[i] * s1 + d[i] * s0, s1 the high and s0 the low half of s, odd
 /// lanes the same with t, exact; vectors are unsigned, coefficients signed.
 KASTARRI_RESULT qv_vecNx48
-ZRA_MULUSQN16DXR16(const qv_vecNx16U &a, const qv_vecNx16U &b, const qv_vecNx16U &c, const qv_vecNx16U
-    &d, const qv_int32pr& s, const qv_int32pr& t)
+ZRA_MULUSQN16DXR16(const qv_vecNx16U &a, const qv_vecNx16U &b, const qv_vecNx16U &c,
+    const qv_vecNx16U &d, const qv_int32pr& s, const qv_int32pr& t)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSQN16DXR16RKN17qv_vecNx16U_space12qv_vecNx16U_ES2_S2_S2_RKN16qv_int32pr_space11qv_int32pr_ES6_");
 
 /// even lanes i = a[i] * s1 + b[i] * s0 + c[i] * s1 + d[i] * s0, s1 the high and s0 the low half of s, odd
 /// lanes the same with t, exact; vectors are signed, coefficients unsigned.
 KASTARRI_RESULT qv_vecNx48
-ZRA_MULSUQN16DXR16(const qv_vecNx16U &a, const qv_vecNx16U &b, const qv_vecNx16U &c, const qv_vecNx16U
-    &d, const qv_int32pr& s, const qv_int32pr& t)
+ZRA_MULSUQN16DXR16(const qv_vecNx16U &a, const qv_vecNx16U &b, const qv_vecNx16U &c,
+    const qv_vecNx16U &d, const qv_int32pr& s, const qv_int32pr& t)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUQN16DXR16RKN17qv_vecNx16U_space12qv_vecNx16U_ES2_S2_S2_RKN16qv_int32pr_space11qv_int32pr_ES6_");
 
 /// added to acc, modulo 2^48: even lanes i = a[i] * s1 + b[i] * s0 + c[i] * s1 + d[i] * s0, s1 the high and
 /// s0 the low half of s, odd lanes the same with t; vectors and coefficients are signed.
 KASTARRI_API void
-ZRA_MULQAN16DXR16(qv_vecNx48& acc, const qv_vecNx16 &a, const qv_vecNx16 &b, const qv_vecNx16 &c, const
-    qv_vecNx16 &d, const qv_int32pr& s, const qv_int32pr& t)
+ZRA_MULQAN16DXR16(qv_vecNx48& acc, const qv_vecNx16 &a, const qv_vecNx16 &b, const qv_vecNx16 &c,
+    const qv_vecNx16 &d, const qv_int32pr& s, const qv_int32pr& t)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQAN16DXR16RN16qv_vecNx48_space11qv_vecNx48_ERKN16qv_vecNx16_space11qv_vecNx16_ES5_S5_S5_RKN16qv_int32pr_space11qv_int32pr_ES9_");
 
 /// added to acc, modulo 2^48: even lanes i = a[i] * s1 + b[i] * s0 + c[i] * s1 + d[i] * s0, s1 the high and
@@ -969,15 +969,15 @@ ZRA_MULSUQAN16DXR16(qv_vecNx48& acc, const qv_vecNx16U &a, const qv_vecNx16U &b,
 /// lane i = a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the bytes of s from the highest, exact;
 /// vectors and coefficients are signed.
 KASTARRI_RESULT qv_vecNx48
-ZRA_MULQN16XR8(const qv_vecNx16 &a, const qv_vecNx16 &b, const qv_vecNx16 &c, const qv_vecNx16 &d, const
-    qv_int32pr& s)
+ZRA_MULQN16XR8(const qv_vecNx16 &a, const qv_vecNx16 &b, const qv_vecNx16 &c, const qv_vecNx16 &d,
+    const qv_int32pr& s)
     __asm__("_Z54cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQN16XR8RKN16qv_vecNx16_space11qv_vecNx16_ES2_S2_S2_RKN16qv_int32pr_space11qv_int32pr_E");
 
 /// added to acc, modulo 2^48: lane i = a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the bytes of s
 /// from the highest; vectors and coefficients are signed.
 KASTARRI_API void
-ZRA_MULQAN16XR8(qv_vecNx48& acc, const qv_vecNx16 &a, const qv_vecNx16 &b, const qv_vecNx16 &c, const
-    qv_vecNx16 &d, const qv_int32pr& s)
+ZRA_MULQAN16XR8(qv_vecNx48& acc, const qv_vecNx16 &a, const qv_vecNx16 &b, const qv_vecNx16 &c,
+    const qv_vecNx16 &d, const qv_int32pr& s)
     __asm__("_Z55cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQAN16XR8RN16qv_vecNx48_space11qv_vecNx48_ERKN16qv_vecNx16_space11qv_vecNx16_ES5_S5_S5_RKN16qv_int32pr_space11qv_int32pr_E");
 
 /* Four neighbouring lanes times coefficients, and two channels that alternate.
@@ -1088,15 +1088,15 @@ ZRA_MULPI2NR8X16(const qv_vecNx16 &a, const qv_vecNx16 &b, const qv_vecNx16 &c, 
 /// lane 2k = a[k] * s1 + c[k] * s0, lane 2k + 1 = b[k] * s1 + d[k] * s0, s1 and s0 the lower bytes of s,
 /// modulo 2^24; vectors are unsigned, coefficients signed.
 KASTARRI_RESULT qv_vec2Nx24
-ZRA_MULUSPI2NR8X16(const qv_vecNx16U &a, const qv_vecNx16U &b, const qv_vecNx16U &c, const qv_vecNx16U
-    &d, const qv_int32pr& s)
+ZRA_MULUSPI2NR8X16(const qv_vecNx16U &a, const qv_vecNx16U &b, const qv_vecNx16U &c,
+    const qv_vecNx16U &d, const qv_int32pr& s)
     __asm__("_Z58cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPI2NR8X16RKN17qv_vecNx16U_space12qv_vecNx16U_ES2_S2_S2_RKN16qv_int32pr_space11qv_int32pr_E");
 
 /// added to acc, modulo 2^24: lane 2k = a[k] * s1 + c[k] * s0, lane 2k + 1 = b[k] * s1 + d[k] * s0, s1 and s0
 /// the lower bytes of s; vectors and coefficients are signed.
 KASTARRI_API void
-ZRA_MULPAI2NR8X16(qv_vec2Nx24& acc, const qv_vecNx16 &a, const qv_vecNx16 &b, const qv_vecNx16 &c, const
-    qv_vecNx16 &d, const qv_int32pr& s)
+ZRA_MULPAI2NR8X16(qv_vec2Nx24& acc, const qv_vecNx16 &a, const qv_vecNx16 &b, const qv_vecNx16 &c,
+    const qv_vecNx16 &d, const qv_int32pr& s)
     __asm__("_Z57cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPAI2NR8X16RN17qv_vec2Nx24_space12qv_vec2Nx24_ERKN16qv_vecNx16_space11qv_vecNx16_ES5_S5_S5_RKN16qv_int32pr_space11qv_int32pr_E");
 
 /// added to acc, modulo 2^24: lane 2k = a[k] * s1 + c[k] * s0, lane 2k + 1 = b[k] * s1 + d[k] * s0, s1 and s0

@@ -34,7 +34,7 @@ else ifeq ($(BITS),64)
 WIDTH = -64
 MULTIARCH = x86_64-linux-gnu
 LIBDIR ?= lib/$(MULTIARCH)
-SUMMARY = build/summary-64.md
+SUMMARY = docs/performance-64.md
 CYCLES = build/cycles-64.csv
 else
 $(error BITS is $(BITS); known are 32 and 64)

@@ -83,6 +83,12 @@ def limit_of(name, target, limits):
     return None
 
 
+def width(build):
+    """Bits of the programs of a build directory: 32 or 64."""
+    with open(os.path.join(build, "CMakeCache.txt"), encoding="utf-8") as cache:
+        return int(re.search(r"^KASTARRI_BITS:\w+=(\d+)$", cache.read(), re.M)[1])
+
+
 def processor():
     """Its name, with family and model, as many have the same name."""
     with open("/proc/cpuinfo", encoding="utf-8") as file:
@@ -145,12 +151,12 @@ def slowest_lines(families, cycles, limits):
 class Measured:
     """Cycles by target and name, and what the documents say of where they come from."""
 
-    def __init__(self, times, processor_name):
+    def __init__(self, times, processor_name, bits):
         def known_as(name):
             symbol, slash, variant = name.partition("/")
             return (generate_headers.short_name(symbol) if symbol.startswith("rk_") else symbol) + slash + variant
 
-        self.processor = processor_name
+        self.processor, self.bits = processor_name, bits
         self.cycle = {t: found.pop(CYCLES) / 3000 for t, found in times.items()}
         self.copies = {t: found[BASELINE] / self.cycle[t] for t, found in times.items()}
         self.cycles = {t: {known_as(n): v / self.cycle[t] for n, v in found.items()} for t, found in times.items()}
@@ -163,7 +169,7 @@ class Measured:
 
     def introduction(self, what):
         copies = ", ".join(f"{cycles:.1f} ({target})" for target, cycles in self.copies.items())
-        return ["# Performance", "",
+        return [f"# Performance of {self.bits}-bit programs", "",
                 f"{what}, operands in memory, in cycles. Medians.", "",
                 f"Measured on: {self.processor}, where a call that copies one register (64 bytes) took",
                 f"{copies} cycles. A cycle, {min(self.cycle.values()):.2f} ns, is a third of what an integer multiplication takes in a",
@@ -183,15 +189,24 @@ def kernel_lines(build, clang_build):
     yield ""
 
 
+OTHER_WIDTH = {
+    32: ["`make bench` measures it on your machine, writes this page anew and every intrinsic to `build/performance.md`.",
+         "[performance-64.md](performance-64.md) has the figures of 64-bit programs."],
+    64: ["`make bench BITS=64` measures it on your machine, writes this page anew and every intrinsic to `build/performance-64.md`.",
+         "What costs much, and why, is the same as in 32-bit programs: [performance.md](performance.md)."],
+}
+
+
 def summary(measured, limits, kernels_of):
-    """What stands in the repository: whole kernels, the families, their slowest, and why."""
+    """What stands in the repository: whole kernels, the families, their slowest, and, once for both widths, why."""
     cycles = measured.cycles
-    lines = measured.introduction("What a call costs")
-    lines += ["`make bench` measures it on your machine, writes this page anew and every intrinsic to `build/performance.md`.", ""]
+    lines = [*measured.introduction("What a call costs"), *OTHER_WIDTH[measured.bits], ""]
     lines += kernel_lines(*kernels_of)
     lines += ["## Families", "", "The median of each family's intrinsics.", "", *family_lines(measured.families, cycles), "",
               "The slowest of each family, and how many are above the limits that `bench/limits.txt` sets.", "",
               *slowest_lines(measured.families, cycles, limits), ""]
+    if measured.bits == 64:
+        return "\n".join(lines)
     with open(os.path.join(ROOT, "bench", "notes.md"), encoding="utf-8") as notes:
         return "\n".join(lines) + "\n" + notes.read()
 
@@ -214,7 +229,7 @@ def full_table(measured, limits):
 def cycles_of_all(measured):
     """A table for programs: intrinsic, and cycles by target."""
     names = [name for names in measured.families.values() for name in names]
-    return "\n".join([f"# Cycles of a call, operands in memory. Measured on: {measured.processor}",
+    return "\n".join([f"# Cycles of a call in {measured.bits}-bit programs, operands in memory. Measured on: {measured.processor}",
                       ",".join(["intrinsic", *measured.cycles]),
                       *(",".join([name, *(f"{found[name]:.1f}" for found in measured.cycles.values())]) for name in names), ""])
 
@@ -241,7 +256,7 @@ def main():
         found = run(arguments.build, target, arguments.filter, arguments.repetitions, arguments.seconds)
         if found:
             times[target] = found
-    measured, (limited, limits) = Measured(times, processor()), read_limits()
+    measured, (limited, limits) = Measured(times, processor(), width(arguments.build)), read_limits()
     if limited != measured.processor:
         print(f"the limits are of another processor: {limited}", file=sys.stderr)
     if arguments.summary:

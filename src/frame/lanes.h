@@ -50,6 +50,10 @@ class Write {
     lanes_[i] = canonical<L>(value);
   }
 
+  auto writer() const {
+    return [to = lanes_](int i, auto value) { to[i] = canonical<L>(value); };
+  }
+
   void* image() const { return lanes_; }
 
  private:
@@ -69,16 +73,32 @@ class Predicated {
 
   template <class V>
   void put(int i, V value) const {
-    using C = typename L::container;
-    if constexpr (Clear)
-      lanes_[i] = static_cast<C>(canonical<L>(value) & static_cast<C>(enabled_.lane[i]));
-    else
-      lanes_[i] = enabled_.lane[i] ? canonical<L>(value) : C{lanes_[i]};
+    writer()(i, value);
+  }
+
+  // For loops: beside the mask, an array, the pointer would be taken for something that a store of lanes may change.
+  auto writer() const {
+    return [to = lanes_, enabled = enabled_.lane](int i, auto value) {
+      using C = typename L::container;
+      const C given = canonical<L>(value), mask = static_cast<C>(enabled[i]);
+      if constexpr (Clear) {
+        to[i] = static_cast<C>(given & mask);
+      } else if constexpr (L::count == 1) {
+        if (mask) to[i] = given;
+      } else {
+        const C kept = to[i];
+        to[i] = static_cast<C>(kept ^ ((kept ^ given) & mask));
+      }
+    };
   }
 
  private:
+  // Bits come to lanes of a whole register quickest, even where the result has half of one.
+  static constexpr int bits = 8 * sizeof(typename L::container);
+  static constexpr int mask_bits = bits * L::count == 256 ? 2 * bits : bits;
+
   in_memory<typename L::container>* lanes_;
-  LaneMask<8 * sizeof(typename L::container), L::count> enabled_;
+  LaneMask<mask_bits, L::count> enabled_;
 };
 
 // What an entry hands to a semantic function as its output: plain units, or units under a predicate.
@@ -111,8 +131,9 @@ inline Predicated<L, Clear> result(UnitsUnder<Unit, PredicateUnit, Clear> out) {
 // result lane i = rule(operand lanes i ...), for i = 0 .. Count - 1.
 template <int Count, class Out, class Rule, class... Operands>
 inline void lanes(const Out& out, Rule rule, const Operands&... operands) {
+  const auto put = out.writer();
   KASTARRI_LANES_INDEPENDENT
-  for (int i = 0; i < Count; ++i) out.put(i, rule(operands[i]...));
+  for (int i = 0; i < Count; ++i) put(i, rule(operands[i]...));
 }
 
 // Bit i of the result = rule(operand lanes i ...): comparisons. The lanes are LaneBits wide.

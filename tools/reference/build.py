@@ -76,11 +76,11 @@ def example_data(example, initial, entry, text):
 
 
 def read_cycles():
-    """The processor that they were measured on, the targets, and their cycles by intrinsic."""
+    """What they are and where they were measured, the targets, and their cycles by intrinsic."""
     with open(os.path.join(os.path.dirname(os.path.dirname(HERE)), "bench", "cycles.csv"), encoding="utf-8") as file:
-        processor = file.readline().partition("Measured on: ")[2].strip()
+        about = file.readline().strip("# \n")
         (_, *targets), *rows = csv.reader(file)
-    return processor, targets, {name: cycles for name, *cycles in rows}
+    return about, targets, {name: cycles for name, *cycles in rows}
 
 
 def entry_data(entry, examples, cycles, text):
@@ -106,12 +106,12 @@ def page_data(examples, version):
     text = Texts()
     all_choices = choices.read_choices()
     found = entries.read_entries(all_choices)
-    processor, targets, cycles = read_cycles()
+    about_cycles, targets, cycles = read_cycles()
     rows = [entry_data(entry, examples, cycles, text) for entry in found]
     tables = {text(table): generate_headers.about_table(table) for table in dict.fromkeys(entry.row.table for entry in found)}
     return {"version": version, "prefix": generate_headers.PREFIX, "families": list(generate_headers.FAMILIES.items()),
             "choices": [choice.text for choice in all_choices], "topics": [topic_data(topic) for topic in not_built.TOPICS],
-            "tables": tables, "processor": processor, "targets": targets,
+            "tables": tables, "cycles": about_cycles, "targets": targets,
             "types": {name: [type.shape, type.units * type.unit_bits // 8, type.meaning]
                       for name, type in generate_headers.read_types().items()},
             "texts": text.all(), "entries": rows}

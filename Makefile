@@ -6,7 +6,8 @@
 #   make try           build for one target; test and time one intrinsic (NAME=ADDSNX16)
 #   make mutants       plant faults in all rows and in some rules, and list those that no test finds (MUTANTS=40, SEED=1,
 #                      ONLY= a regular expression of tables and sources)
-#   make bench         time every intrinsic and write docs/performance.md, a summary, and build/performance.md
+#   make bench         time every intrinsic and write docs/performance.md, a summary, build/performance.md and
+#                      bench/costs.csv
 #   make bench-kernels time whole kernels: scalar C, loops that compilers vectorise, calls, inlined
 #   make docs          write build/docs/reference.html, all intrinsics on one page
 #   make picture       take docs/pictures/reference.png of that page
@@ -29,13 +30,13 @@ WIDTH =
 MULTIARCH = i386-linux-gnu
 LIBDIR ?= lib
 SUMMARY = docs/performance.md
-CYCLES = bench/cycles.csv
+COSTS = bench/costs.csv
 else ifeq ($(BITS),64)
 WIDTH = -64
 MULTIARCH = x86_64-linux-gnu
 LIBDIR ?= lib/$(MULTIARCH)
 SUMMARY = docs/performance-64.md
-CYCLES = build/cycles-64.csv
+COSTS = build/costs-64.csv
 else
 $(error BITS is $(BITS); known are 32 and 64)
 endif
@@ -73,8 +74,7 @@ bench:
 	$(CMAKE_BUILD) test$(WIDTH) --target all kernel_modules
 	cmake --preset clang$(WIDTH) -DKASTARRI_BUILD_BENCH=ON
 	$(CMAKE_BUILD) clang$(WIDTH) --target kernel_modules
-	tools/performance.py build/test$(WIDTH) --clang build/clang$(WIDTH) --summary $(SUMMARY) --table build/performance$(WIDTH).md \
-	  --cycles $(CYCLES)
+	tools/performance.py build/test$(WIDTH) --clang build/clang$(WIDTH) --summary $(SUMMARY) --table build/performance$(WIDTH).md --costs $(COSTS)
 
 bench-kernels:
 	tools/packages.sh build test$(WIDTH)

@@ -1,12 +1,12 @@
 #!/usr/bin/env python3
 """Time every intrinsic on every target that this processor runs; write a summary and the table of them all.
 
-    tools/performance.py BUILD [--clang BUILD] [--summary FILE] [--table FILE] [--cycles FILE] [--filter REGEX] [--repetitions N] [--seconds S]
+    tools/performance.py BUILD [--clang BUILD] [--summary FILE] [--table FILE] [--costs FILE] [--filter REGEX]
+                         [--repetitions N] [--seconds S]
 
 BUILD is a build directory with the benchmarks in it. Every figure is in cycles, which a chain of multiplications of
 the same run tells: medians of the repetitions. bench/limits.txt says how much an intrinsic may cost on the processor
-that it names; what is above is printed, and marked in the table. The summary has whole kernels, too (kernels.py); the reference page
-shows the cycles.
+that it names; what is above is printed, and marked in the table. The summary has whole kernels, too (kernels.py).
 """
 
 import argparse
@@ -226,12 +226,12 @@ def full_table(measured, limits):
     return "\n".join(lines)
 
 
-def cycles_of_all(measured):
-    """A table for programs: intrinsic, and cycles by target."""
-    names = [name for names in measured.families.values() for name in names]
-    return "\n".join([f"# Cycles of a call in {measured.bits}-bit programs, operands in memory. Measured on: {measured.processor}",
-                      ",".join(["intrinsic", *measured.cycles]),
-                      *(",".join([name, *(f"{found[name]:.1f}" for found in measured.cycles.values())]) for name in names), ""])
+def costs(measured):
+    """Cycles for programs to read: a line with the processor, then name and cycles on each target."""
+    yield f"# cycles a call costs, operands in memory, measured on: {measured.processor}"
+    yield ",".join(["name", *measured.cycles])
+    for name in (name for names in measured.families.values() for name in names):
+        yield ",".join([name, *(f"{found[name]:.1f}" for found in measured.cycles.values())])
 
 
 def write(path, text):
@@ -246,7 +246,7 @@ def main():
     parser.add_argument("--clang", help="a build directory of clang, for kernels that it inlines")
     parser.add_argument("--summary", help="where the summary goes")
     parser.add_argument("--table", help="where the table of every intrinsic goes; without it, to the standard output")
-    parser.add_argument("--cycles", help="where the cycles of every intrinsic go, as comma-separated values")
+    parser.add_argument("--costs", help="where the costs go for programs to read, as name and cycles on each target")
     parser.add_argument("--filter", default=".")
     parser.add_argument("--repetitions", type=int, default=5)
     parser.add_argument("--seconds", type=float, default=0.005, help="the least time of one repetition")
@@ -261,8 +261,8 @@ def main():
         print(f"the limits are of another processor: {limited}", file=sys.stderr)
     if arguments.summary:
         write(arguments.summary, summary(measured, limits, (arguments.build, arguments.clang)))
-    if arguments.cycles:
-        write(arguments.cycles, cycles_of_all(measured))
+    if arguments.costs:
+        write(arguments.costs, "".join(line + "\n" for line in costs(measured)))
     if arguments.table:
         write(arguments.table, full_table(measured, limits))
     else:

@@ -209,8 +209,8 @@ class Facts(unittest.TestCase):
         self.assertGreater(computed, 200)
 
     def test_cycles_are_of_intrinsics(self):
-        about, targets, cycles = build.read_cycles()
-        self.assertRegex(about, "^Cycles .* Measured on: .*model")
+        about, targets, cycles = build.read_costs()
+        self.assertRegex(about, "^cycles a call costs, .*measured on: .*model")
         self.assertLessEqual(set(cycles), {e.short for e in ENTRIES})
         self.assertEqual({len(row) for row in cycles.values()}, {len(targets)})
         # An accumulator takes longer than a move, a scatter than a store, whatever the processor.

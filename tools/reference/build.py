@@ -3,7 +3,7 @@
 
     tools/reference/build.py EXAMPLES OUTPUT [--version VERSION]
 
-EXAMPLES is what kastarri_examples prints. All else comes from the tables of rows, docs/choices.md and bench/cycles.csv.
+EXAMPLES is what kastarri_examples prints. All else comes from the tables of rows, docs/choices.md and bench/costs.csv.
 """
 
 import argparse
@@ -75,9 +75,9 @@ def example_data(example, initial, entry, text):
                                  for table in (given, got)]
 
 
-def read_cycles():
+def read_costs():
     """What they are and where they were measured, the targets, and their cycles by intrinsic."""
-    with open(os.path.join(os.path.dirname(os.path.dirname(HERE)), "bench", "cycles.csv"), encoding="utf-8") as file:
+    with open(os.path.join(os.path.dirname(os.path.dirname(HERE)), "bench", "costs.csv"), encoding="utf-8") as file:
         about = file.readline().strip("# \n")
         (_, *targets), *rows = csv.reader(file)
     return about, targets, {name: cycles for name, *cycles in rows}
@@ -106,7 +106,7 @@ def page_data(examples, version):
     text = Texts()
     all_choices = choices.read_choices()
     found = entries.read_entries(all_choices)
-    about_cycles, targets, cycles = read_cycles()
+    about_cycles, targets, cycles = read_costs()
     rows = [entry_data(entry, examples, cycles, text) for entry in found]
     tables = {text(table): generate_headers.about_table(table) for table in dict.fromkeys(entry.row.table for entry in found)}
     return {"version": version, "prefix": generate_headers.PREFIX, "families": list(generate_headers.FAMILIES.items()),

@@ -97,7 +97,7 @@ function cost(entry) {
   const row = (tag, texts) => element('tr', null, texts.map((text) => element(tag, tag === 'th' ? {scope: 'col'} : null, text)));
   return section('Cost', element('table', {class: 'cost'}, element('thead', null, row('th', data.targets)),
     element('tbody', null, row('td', entry.cycles.split(' ')))),
-  element('p', {class: 'aside'}, sentence(data.cycles)));
+  element('p', {class: 'aside'}, sentence(data.cycles[0].toUpperCase() + data.cycles.slice(1))));
 }
 
 function laneRow(kind, [name, values], columns, before) {

@@ -14,7 +14,7 @@ configure_file(${PROJECT_SOURCE_DIR}/bench/costs.csv ${KASTARRI_BUILT_DATA}/cost
 set(tools ${PROJECT_SOURCE_DIR}/tools)
 add_custom_command(OUTPUT ${files}/intrinsics.inc ${files}/intrinsics.csv
   COMMAND Python3::Interpreter ${tools}/list_intrinsics.py $<TARGET_FILE:kastarri> ${files}
-  DEPENDS kastarri ${tools}/list_intrinsics.py ${tools}/generate_headers.py
+  DEPENDS kastarri ${tools}/list_intrinsics.py ${tools}/generate_headers.py ${tools}/read_tables.py
   COMMENT "Listing the intrinsics for kastarri-profile" VERBATIM)
 
 set(source ${PROJECT_SOURCE_DIR}/src/profile)

@@ -20,9 +20,9 @@ add_custom_command(OUTPUT ${KASTARRI_REFERENCE}
   COMMAND kastarri_examples > worked_examples.json
   COMMAND Python3::Interpreter ${KASTARRI_REFERENCE_TOOLS}/build.py worked_examples.json ${KASTARRI_REFERENCE}
     --version ${PROJECT_VERSION}
-  DEPENDS kastarri_examples ${sources} ${PROJECT_SOURCE_DIR}/tools/generate_headers.py
+  DEPENDS kastarri_examples ${sources} ${PROJECT_SOURCE_DIR}/tools/generate_headers.py ${PROJECT_SOURCE_DIR}/tools/read_tables.py
     ${PROJECT_SOURCE_DIR}/tools/not_built.py ${PROJECT_SOURCE_DIR}/tools/rules.py
-    ${PROJECT_SOURCE_DIR}/docs/choices.md
+    ${PROJECT_SOURCE_DIR}/docs/choices.md ${PROJECT_SOURCE_DIR}/bench/costs.csv
   COMMENT "Writing the reference of all intrinsics"
   VERBATIM)
 add_custom_target(reference ALL DEPENDS ${KASTARRI_REFERENCE})

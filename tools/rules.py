@@ -4,12 +4,12 @@ A sentence of the tables serves all rows below it, signed and unsigned, loads in
 apart are replaced by what holds for the one, and what its shape says is added: that lanes are loaded, where the address
 is, that the pointer moves, what becomes of disabled lanes.
 
-    rules.own(row, types)    the rule of a row of generate_headers
+    rules.own(row, types)    the rule of a row of read_tables
 """
 
 import re
 
-import generate_headers
+import read_tables
 
 SIGNS = [(r"^MULUU", "both factors are unsigned"), (r"^MULUS", "the first factor is unsigned, the second signed"),
          ("", "the factors are signed")]
@@ -154,12 +154,13 @@ def of_its_form(text, name):
 
 def register_types(row, types):
     """The register types of a prototype, the result first."""
-    return [types[name] for name in re.findall(rf"{generate_headers.PREFIX}(\w+)", row.prototype) if name in types]
+    return [types[name] for name in re.findall(rf"{read_tables.PREFIX}(\w+)", row.prototype) if name in types]
 
 
 def in_numbers(text, row, types):
-    """w, the bits of a lane, and the accumulator's width as numbers."""
+    """w, the bits of a lane, the number of lanes and the accumulator's width as numbers."""
     registers = register_types(row, types)
+    text = text.replace("the number of lanes", str(max((t.lanes[2] for t in registers), default=0)))
     lanes = next((t.lanes[1] for t in registers if t.lanes[0] in "iuf"), None)
     if lanes:
         text = re.sub(r"\bw\b(?! \+)", str(lanes), text)
@@ -177,28 +178,29 @@ def float_conversion(text, name):
 
 
 def conversion(text, row, types):
-    """A conversion between integers, register to register: by the number and width of the lanes."""
+    """A conversion between registers of bits: by the number and width of the lanes."""
     if not text.startswith("the register's lanes from the source"):
         return text
-    source, target = re.search(r"(\w+?)_rtor_(\w+)", generate_headers.short_name(row.name)).groups()
+    source, target = re.search(r"(\w+?)_rtor_(\w+)", read_tables.short_name(row.name)).groups()
     (from_kind, from_bits, from_lanes), (to_kind, to_bits, to_lanes) = (lanes_of(name, types) for name in (source, target))
-    if not (from_kind in "iu" and to_kind in "iu") and not (from_kind == to_kind == "f" and from_bits == to_bits):
-        return text
+    if not from_bits:  # packed lanes have no width of their own
+        return f"lane i = bits {to_bits} i to {to_bits} i + {to_bits - 1} of the source, sign-extended"
+    if not to_bits:
+        return f"lane i of the source in bits {from_bits} i to {from_bits} i + {from_bits - 1}, without gaps"
     which = ("lane i = lane i of the source" if from_lanes == to_lanes > 1 else "the source" if to_lanes == 1 == from_lanes
-             else "every lane = the source" if from_lanes == 1 else "lane 0 of the source" if to_lanes == 1 else None)
-    if not which:
-        return text
+             else f"every {'bit' if to_kind == 'b' else 'lane'} = the source" if from_lanes == 1 else "lane 0 of the source")
     if to_bits < from_bits:
-        return f"{which}, its low {to_bits} bits"
+        return f"{which}, its low {to_bits} bits" if to_bits > 1 else f"{which}, its lowest bit"
     return which + ("" if to_bits == from_bits else ", sign-extended" if from_kind == "i" else ", zero-extended")
 
 
 def lanes_of(name, types):
     """Kind, bits and number of the lanes of a register type or of a host scalar."""
     if name in types:
-        return types[name].lanes if re.match(r"[iufwb]\d+x", types[name].layout) else ("w", 0, 0)
+        kind, bits, lanes = re.fullmatch(r"([iufwb])(\d+)x(\d+)|.*", types[name].layout).groups(default="0")
+        return kind, int(bits), int(lanes)
     match = re.fullmatch(r"(u?)int(\d+)", name)
-    return ("u" if match[1] else "i", int(match[2]), 1) if match else ("f", 32, 1) if name == "float" else ("w", 0, 0)
+    return ("u" if match[1] else "i", int(match[2]), 1) if match else ("f", 32, 1) if name == "float" else ("u", 1, 1)
 
 
 def loading(text, shape):
@@ -218,7 +220,7 @@ def address(row):
 
 def disabled(row, text):
     """What becomes of the lanes whose predicate bit is 0, where the sentence does not say it."""
-    if not generate_headers.keeps_lanes(row) or "predicate bit" in text:
+    if not read_tables.keeps_lanes(row) or "predicate bit" in text:
         return None
     written = re.search(r"& ?(\w+)", row.prototype)[1]
     flags = " and raises no flag" if row.table.startswith("float/") else ""
@@ -227,7 +229,7 @@ def disabled(row, text):
 
 def own(row, types, sentence=None):
     """The rule of a row; or another sentence of its table as it holds for this row."""
-    name = re.sub(r"^ZRA_", "", generate_headers.short_name(row.name))
+    name = re.sub(r"^ZRA_", "", read_tables.short_name(row.name))
     text = in_numbers(of_its_form(sentence or row.doc, name), row, types)
     text = conversion(float_conversion(text, name), row, types)
     if sentence:

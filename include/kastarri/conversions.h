@@ -11,2823 +11,3670 @@
    no rounding of the address and no test of it. A post-increment copy uses the pointer as it stands.
    Table: src/frame/moves.def */
 
-/// a copy of the whole register: _loadi and _loadx from base + offset bytes, _storei and _storex to it;
-/// _loadip, _loadxp, _storeip, _storexp at the pointer, which then moves by the increment in bytes; _move of
-/// a register.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8* base,
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& from);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_loadip(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_storeip(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_loadx(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_storex(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8* base, int offset);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_loadxp(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_storexp(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& from);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_loadip(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_storeip(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_loadx(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_storex(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U* base, int offset);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_loadxp(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_storexp(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_loadip(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_storeip(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_loadx(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_storex(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16* base, int offset);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_loadxp(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_storexp(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_loadip(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_storeip(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_loadx(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_storex(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U* base, int offset);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_loadxp(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_storexp(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base, int offset);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base,
     int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_move(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_loadip(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_storeip(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_loadx(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_storex(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base, int offset);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_loadxp(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_storexp(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_move(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_loadip(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_storeip(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_loadx(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_storex(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_loadxp(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_storexp(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& from);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_loadip(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_storeip(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_loadx(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_storex(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64* base, int offset);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_loadxp(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& from);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_storexp(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128* base, int offset);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256* base,
     int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_move(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& from);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_loadip(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& from);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_storeip(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_loadx(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_storex(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256* base, int offset);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_loadxp(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_storexp(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_move(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& from);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_loadip(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_storeip(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_loadx(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_storex(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_loadxp(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_storexp(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_loadip(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_storeip(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_loadx(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_storex(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16* base, int offset);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_loadxp(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_storexp(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base, int offset);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base,
     int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_move(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_loadip(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_storeip(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_loadx(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_storex(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_loadxp(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_storexp(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& from);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_loadip(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_storeip(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_loadx(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_storex(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base, int offset);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_loadxp(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_storexp(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& from);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_loadip(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_storeip(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_loadx(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_storex(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base, int offset);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_loadxp(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_storexp(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& from);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_loadip(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_storeip(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_loadx(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_storex(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base, int offset);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_loadxp(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& from);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_storexp(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base, int offset);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base,
     int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_move(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& from);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_loadip(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& from);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_storeip(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_loadx(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_storex(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base, int offset);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_loadxp(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_storexp(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_move(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& from);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_loadip(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_storeip(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_loadx(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_storex(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_loadxp(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_storexp(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& from);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_loadip(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_int8& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_storeip(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_loadx(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int8** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_storex(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base, int offset);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_int8& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int8** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_loadxp(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_storexp(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& from);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_loadip(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_storeip(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_loadx(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_storex(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U* base, int offset);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_loadxp(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_storexp(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& from);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_loadip(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_storeip(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_loadx(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int16** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_storex(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16* base, int offset);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int16** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_loadxp(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_storexp(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& from);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_loadip(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_storeip(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_loadx(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_storex(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U* base, int offset);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_f16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_loadxp(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_storexp(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& from);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_loadip(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_storeip(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_loadx(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_f16** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_f16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_storex(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base, int offset);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_f16** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkfloat
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_loadi(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_loadxp(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_storexp(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_storei(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_move(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& from);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_loadip(
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_loadip(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_storeip(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& v,
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_loadx(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_storeip(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& v,
+    cstub_Km_ZNB_Orbis_R5_64k_rkfloat** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkfloat
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_loadx(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_storex(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_storex(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base, int offset);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_loadxp(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_storexp(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& v,
+    cstub_Km_ZNB_Orbis_R5_64k_rkfloat** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_loadxp(
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_storexp(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& v,
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& from);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_loadip(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_storeip(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_loadx(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_storex(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v* base, int offset);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_loadxp(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_storexp(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& from);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_loadip(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_storeip(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_loadx(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_storex(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv* base, int offset);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int64
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_int64* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_loadxp(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_storexp(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int64
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int64
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_int64& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int64
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_int64& from);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_loadip(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int64& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_int64& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_storeip(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int64** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int64
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_loadx(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_int64& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int64** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int64
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_int64* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_storex(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_int64& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64* base, int offset);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_int64& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_int64& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int64** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int128
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int128_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_int128* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_loadxp(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int64& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_storexp(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int64** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int128
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int128_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int128* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int128_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int128& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int128* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int128
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int128_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_int128& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int128* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int128
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int128_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_int128& from);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int128_loadip(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int128& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int128** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int128_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_int128& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int128** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int128_storeip(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int128& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int128** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int128
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int128_loadx(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int128* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int128_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_int128& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int128** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int128
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int128_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_int128* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int128_storex(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int128& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int128* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int128_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_int128& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int128* base, int offset);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int128_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_int128& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int128** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int128_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_int128& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int128** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int256
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int256_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_int256* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int128_loadxp(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int128& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int128** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int128_storexp(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int128& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int128** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int256
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int256_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int256* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int256_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int256& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int256* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int256
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int256_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_int256& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int256* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int256
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int256_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_int256& from);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int256_loadip(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int256& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int256** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int256_loadip(cstub_Km_ZNB_Orbis_R5_64k_qv_int256& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int256** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int256_storeip(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int256& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int256** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int256
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int256_loadx(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int256* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int256_storeip(const cstub_Km_ZNB_Orbis_R5_64k_qv_int256& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int256** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int256
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int256_loadx(const cstub_Km_ZNB_Orbis_R5_64k_qv_int256* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int256_storex(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int256& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int256* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int256_storex(const cstub_Km_ZNB_Orbis_R5_64k_qv_int256& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int256* base, int offset);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int256_loadxp(cstub_Km_ZNB_Orbis_R5_64k_qv_int256& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int256** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int256_storexp(const cstub_Km_ZNB_Orbis_R5_64k_qv_int256& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int256** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_valign
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_valign_loadi(const cstub_Km_ZNB_Orbis_R5_64k_valign* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int256_loadxp(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int256& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int256** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int256_storexp(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int256& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int256** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_valign
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_valign_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_valign* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_valign_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_valign& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_valign* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_valign
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_valign_storei(const cstub_Km_ZNB_Orbis_R5_64k_valign& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_valign* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_valign
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_valign_move(const cstub_Km_ZNB_Orbis_R5_64k_valign& from);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_valign_loadip(
-    cstub_Km_ZNB_Orbis_R5_64k_valign& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_valign** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_valign_loadip(cstub_Km_ZNB_Orbis_R5_64k_valign& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_valign** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_valign_storeip(
-    const cstub_Km_ZNB_Orbis_R5_64k_valign& v,
-    cstub_Km_ZNB_Orbis_R5_64k_valign** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vboolN_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_valign_storeip(const cstub_Km_ZNB_Orbis_R5_64k_valign& v,
+    cstub_Km_ZNB_Orbis_R5_64k_valign** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vboolN_loadi(const cstub_Km_ZNB_Orbis_R5_64k_vboolN* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vboolN_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vboolN_storei(const cstub_Km_ZNB_Orbis_R5_64k_vboolN& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vboolN_move(const cstub_Km_ZNB_Orbis_R5_64k_vboolN& from);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vboolN_loadip(
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vboolN_loadip(cstub_Km_ZNB_Orbis_R5_64k_vboolN& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vboolN_storeip(
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& v,
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool2N_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vboolN_storeip(const cstub_Km_ZNB_Orbis_R5_64k_vboolN& v,
+    cstub_Km_ZNB_Orbis_R5_64k_vboolN** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool2N_loadi(const cstub_Km_ZNB_Orbis_R5_64k_vbool2N* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool2N_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool2N
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool2N_storei(const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool2N_move(const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& from);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool2N_loadip(
-    cstub_Km_ZNB_Orbis_R5_64k_vbool2N& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool2N_loadip(cstub_Km_ZNB_Orbis_R5_64k_vbool2N& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool2N_storeip(
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& v,
-    cstub_Km_ZNB_Orbis_R5_64k_vbool2N** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vboolN_2_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool2N_storeip(const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& v,
+    cstub_Km_ZNB_Orbis_R5_64k_vbool2N** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vboolN_2_loadi(const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vboolN_2_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vboolN_2_storei(const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vboolN_2_move(const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& from);
+
+/// loads the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vboolN_2_loadip(
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vboolN_2_loadip(cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2** pointer, int increment);
+
+/// writes the whole register. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vboolN_2_storeip(
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& v,
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN_2** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vboolN_2_storeip(const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& v,
+    cstub_Km_ZNB_Orbis_R5_64k_vboolN_2** pointer, int increment);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48* base,
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x64w_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w* base,
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x64w_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x64w_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x64w_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x64w_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& from);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16w_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w* base,
     int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x64w_move(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16w_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w* base,
-    int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16w_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16w_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16w_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16Uw_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw* base,
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16Uw_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16Uw_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16Uw_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16Uw_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw& from);
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32* base,
     int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16Uw_move(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32* base,
-    int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32U_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U* base,
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32U_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32U_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32U_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32U_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill* base,
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_gsr_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_gsr* base,
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_gsr_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_gsr* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_gsr_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_gsr& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_gsr* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_gsr_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_gsr& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_gsr* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_gsr_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_gsr& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool1* base,
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_loadi(const cstub_Km_ZNB_Orbis_R5_64k_vbool1* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool1* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_storei(const cstub_Km_ZNB_Orbis_R5_64k_vbool1& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_move(const cstub_Km_ZNB_Orbis_R5_64k_vbool1& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int24_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int24* base,
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int24_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_int24* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int24_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int24& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int24* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int24_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_int24& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int24* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int24
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int24_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_int24& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32pr_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr* base,
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32pr_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32pr_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32pr_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32pr_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int48_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int48* base,
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int48_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_int48* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int48_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int48& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int48* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int48_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_int48& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int48* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int48
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int48_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_int48& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int64pr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64pr_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64pr* base,
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int64pr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64pr_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_int64pr* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64pr_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64pr& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64pr* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int64pr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64pr_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_int64pr& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64pr* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int64pr
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64pr_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_int64pr& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int64w
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64w_loadi(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64w* base,
+
+/// loads the whole register. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int64w
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64w_loadi(const cstub_Km_ZNB_Orbis_R5_64k_qv_int64w* base,
     int offset);
+
+/// writes the whole register. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64w_storei(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64w& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64w* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int64w
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64w_storei(const cstub_Km_ZNB_Orbis_R5_64k_qv_int64w& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64w* base, int offset);
+
+/// a copy of the whole register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int64w
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64w_move(const cstub_Km_ZNB_Orbis_R5_64k_qv_int64w& from);
 
 /* Which register type is built from what. Each row is an exported conversion, a constructor and an
    assignment of the type built, and, between registers, a conversion operator of the source.
    Table: src/frame/conversions.def */
 
-/// the register's lanes from the source: lane by lane between as many lanes, replicated from one lane, lane 0
-/// of many. A wider lane is extended by the source's signedness, a narrower one keeps the low bits.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+/// every lane = the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_qv_vec2Nx8(signed char value);
-KASTARRI_API signed char
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_int8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+
+/// lane 0 of the source.
+KASTARRI_RESULT signed char
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& from);
+
+/// every lane = the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_qv_vec2Nx8(unsigned char value);
-KASTARRI_API unsigned char
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_uint8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+
+/// lane 0 of the source.
+KASTARRI_RESULT unsigned char
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& from);
+
+/// every lane = the source, its low 8 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_vec2Nx8(short value);
-KASTARRI_API short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_int16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+
+/// lane 0 of the source, sign-extended.
+KASTARRI_RESULT short
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& from);
+
+/// every lane = the source, its low 8 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_vec2Nx8(unsigned short value);
-KASTARRI_API unsigned short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_uint16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+
+/// lane 0 of the source, sign-extended.
+KASTARRI_RESULT unsigned short
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& from);
+
+/// every lane = the source, its low 8 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vec2Nx8(int value);
-KASTARRI_API int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_int32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+
+/// lane 0 of the source, sign-extended.
+KASTARRI_RESULT int
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& from);
+
+/// every lane = the source, its low 8 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vec2Nx8(unsigned int value);
-KASTARRI_API unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_uint32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_qv_vec2Nx8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_vec2Nx8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+
+/// lane 0 of the source, sign-extended.
+KASTARRI_RESULT unsigned int
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& from);
+
+/// lane i = lane i of the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_qv_vec2Nx8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& from);
+
+/// every lane = the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_vec2Nx8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& from);
+
+/// every lane = the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_qv_vec2Nx8U(signed char value);
-KASTARRI_API signed char
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_int8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+
+/// lane 0 of the source.
+KASTARRI_RESULT signed char
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& from);
+
+/// every lane = the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_qv_vec2Nx8U(unsigned char value);
-KASTARRI_API unsigned char
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_uint8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+
+/// lane 0 of the source.
+KASTARRI_RESULT unsigned char
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& from);
+
+/// every lane = the source, its low 8 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_vec2Nx8U(short value);
-KASTARRI_API short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_int16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+
+/// lane 0 of the source, zero-extended.
+KASTARRI_RESULT short
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& from);
+
+/// every lane = the source, its low 8 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_vec2Nx8U(unsigned short value);
-KASTARRI_API unsigned short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_uint16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+
+/// lane 0 of the source, zero-extended.
+KASTARRI_RESULT unsigned short
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& from);
+
+/// every lane = the source, its low 8 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vec2Nx8U(int value);
-KASTARRI_API int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_int32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+
+/// lane 0 of the source, zero-extended.
+KASTARRI_RESULT int
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& from);
+
+/// every lane = the source, its low 8 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vec2Nx8U(unsigned int value);
-KASTARRI_API unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_uint32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_qv_vec2Nx8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_vec2Nx8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_vec2Nx8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+
+/// lane 0 of the source, zero-extended.
+KASTARRI_RESULT unsigned int
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& from);
+
+/// lane i = lane i of the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_qv_vec2Nx8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& from);
+
+/// lane i = lane i of the source, its low 8 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_vec2Nx8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& from);
+
+/// every lane = the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_vec2Nx8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& from);
+
+/// every lane = the source, sign-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_qv_vecNx16(signed char value);
-KASTARRI_API signed char
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_int8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+
+/// lane 0 of the source, its low 8 bits.
+KASTARRI_RESULT signed char
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
+
+/// every lane = the source, zero-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_qv_vecNx16(unsigned char value);
-KASTARRI_API unsigned char
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_uint8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+
+/// lane 0 of the source, its low 8 bits.
+KASTARRI_RESULT unsigned char
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
+
+/// every lane = the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_vecNx16(short value);
-KASTARRI_API short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_int16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+
+/// lane 0 of the source.
+KASTARRI_RESULT short
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
+
+/// every lane = the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_vecNx16(unsigned short value);
-KASTARRI_API unsigned short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_uint16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+
+/// lane 0 of the source.
+KASTARRI_RESULT unsigned short
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
+
+/// every lane = the source, its low 16 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vecNx16(int value);
-KASTARRI_API int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_int32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+
+/// lane 0 of the source, sign-extended.
+KASTARRI_RESULT int
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
+
+/// every lane = the source, its low 16 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vecNx16(unsigned int value);
-KASTARRI_API unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_uint32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_vecNx16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_qv_vecNx16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_qv_vecNx16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_vecNx16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+
+/// lane 0 of the source, sign-extended.
+KASTARRI_RESULT unsigned int
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
+
+/// lane i = lane i of the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_vecNx16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
+
+/// lane i = lane i of the source, sign-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_qv_vecNx16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& from);
+
+/// lane i = lane i of the source, zero-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_qv_vecNx16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& from);
+
+/// every lane = the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_vecNx16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& from);
+
+/// every lane = the source, sign-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_qv_vecNx16U(signed char value);
-KASTARRI_API signed char
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_int8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+
+/// lane 0 of the source, its low 8 bits.
+KASTARRI_RESULT signed char
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
+
+/// every lane = the source, zero-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_qv_vecNx16U(unsigned char value);
-KASTARRI_API unsigned char
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_uint8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+
+/// lane 0 of the source, its low 8 bits.
+KASTARRI_RESULT unsigned char
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
+
+/// every lane = the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_vecNx16U(short value);
-KASTARRI_API short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_int16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+
+/// lane 0 of the source.
+KASTARRI_RESULT short
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
+
+/// every lane = the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_vecNx16U(unsigned short value);
-KASTARRI_API unsigned short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_uint16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+
+/// lane 0 of the source.
+KASTARRI_RESULT unsigned short
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
+
+/// every lane = the source, its low 16 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vecNx16U(int value);
-KASTARRI_API int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_int32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+
+/// lane 0 of the source, zero-extended.
+KASTARRI_RESULT int
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
+
+/// every lane = the source, its low 16 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vecNx16U(unsigned int value);
-KASTARRI_API unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_uint32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNx16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_qv_vecNx16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_qv_vecNx16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_vecNx16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_vecNx16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+
+/// lane 0 of the source, zero-extended.
+KASTARRI_RESULT unsigned int
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
+
+/// lane i = lane i of the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNx16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
+
+/// lane i = lane i of the source, sign-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_qv_vecNx16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& from);
+
+/// lane i = lane i of the source, zero-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_qv_vecNx16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& from);
+
+/// lane i = lane i of the source, its low 16 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_vecNx16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& from);
+
+/// every lane = the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_vecNx16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& from);
+
+/// every lane = the source, sign-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_qv_vecN_2x32v(signed char value);
-KASTARRI_API signed char
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_int8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+
+/// lane 0 of the source, its low 8 bits.
+KASTARRI_RESULT signed char
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
+
+/// every lane = the source, zero-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_qv_vecN_2x32v(unsigned char value);
-KASTARRI_API unsigned char
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_uint8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+
+/// lane 0 of the source, its low 8 bits.
+KASTARRI_RESULT unsigned char
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
+
+/// every lane = the source, sign-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_vecN_2x32v(short value);
-KASTARRI_API short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_int16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+
+/// lane 0 of the source, its low 16 bits.
+KASTARRI_RESULT short
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
+
+/// every lane = the source, zero-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_vecN_2x32v(unsigned short value);
-KASTARRI_API unsigned short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_uint16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+
+/// lane 0 of the source, its low 16 bits.
+KASTARRI_RESULT unsigned short
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
+
+/// every lane = the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vecN_2x32v(int value);
-KASTARRI_API int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_int32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+
+/// lane 0 of the source.
+KASTARRI_RESULT int
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
+
+/// every lane = the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vecN_2x32v(unsigned int value);
-KASTARRI_API unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_uint32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_vecN_2x32v(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_qv_vecN_2x32v(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_qv_vecN_2x32v(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_vecN_2x32v(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+
+/// lane 0 of the source.
+KASTARRI_RESULT unsigned int
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
+
+/// lane i = lane i of the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_vecN_2x32v(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
+
+/// lane i = lane i of the source, sign-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_qv_vecN_2x32v(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& from);
+
+/// lane i = lane i of the source, zero-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_qv_vecN_2x32v(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& from);
+
+/// every lane = the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_vecN_2x32v(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& from);
+
+/// every lane = the source, sign-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_qv_vecN_2x32Uv(signed char value);
-KASTARRI_API signed char
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_int8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+
+/// lane 0 of the source, its low 8 bits.
+KASTARRI_RESULT signed char
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
+
+/// every lane = the source, zero-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_qv_vecN_2x32Uv(unsigned char value);
-KASTARRI_API unsigned char
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_uint8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+
+/// lane 0 of the source, its low 8 bits.
+KASTARRI_RESULT unsigned char
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
+
+/// every lane = the source, sign-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_vecN_2x32Uv(short value);
-KASTARRI_API short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_int16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+
+/// lane 0 of the source, its low 16 bits.
+KASTARRI_RESULT short
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
+
+/// every lane = the source, zero-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_vecN_2x32Uv(unsigned short value);
-KASTARRI_API unsigned short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_uint16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+
+/// lane 0 of the source, its low 16 bits.
+KASTARRI_RESULT unsigned short
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
+
+/// every lane = the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vecN_2x32Uv(int value);
-KASTARRI_API int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_int32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+
+/// lane 0 of the source.
+KASTARRI_RESULT int
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
+
+/// every lane = the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vecN_2x32Uv(unsigned int value);
-KASTARRI_API unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_uint32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2x32Uv(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_qv_vecN_2x32Uv(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_qv_vecN_2x32Uv(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x64w_rtor_qv_vecN_2x32Uv(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_vecN_2x32Uv(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
+
+/// lane 0 of the source.
+KASTARRI_RESULT unsigned int
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
+
+/// lane i = lane i of the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2x32Uv(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
+
+/// lane i = lane i of the source, sign-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_qv_vecN_2x32Uv(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& from);
+
+/// lane i = lane i of the source, zero-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_qv_vecN_2x32Uv(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& from);
+
+/// lane i = lane i of the source, its low 32 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x64w_rtor_qv_vecN_2x32Uv(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& from);
+
+/// every lane = the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_vecN_2x32Uv(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& from);
+
+/// every lane = the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int64_rtor_qv_vecN_4x64(long long value);
-KASTARRI_API long long
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_rtor_int64(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_rtor_qv_vecN_4x64(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
+
+/// lane 0 of the source.
+KASTARRI_RESULT long long
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_rtor_int64(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& from);
+
+/// every lane = the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_rtor_qv_vecN_4x64(const cstub_Km_ZNB_Orbis_R5_64k_qv_int64& from);
+
+/// every lane = the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_vecNxf16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
+
+/// every lane = the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_float_rtor_qv_vecN_2xf32(float value);
-KASTARRI_API float
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_float(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_rtor_qv_vecN_2xf32(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8
+
+/// lane 0 of the source.
+KASTARRI_RESULT float
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_float(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
+
+/// every lane = the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_rtor_qv_vecN_2xf32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& from);
+
+/// every lane = the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_qv_vecNx8(signed char value);
-KASTARRI_API signed char
+
+/// lane 0 of the source.
+KASTARRI_RESULT signed char
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8
+
+/// every lane = the source, its low 8 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vecNx8(int value);
-KASTARRI_API int
+
+/// lane 0 of the source, sign-extended.
+KASTARRI_RESULT int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8
+
+/// every lane = the source, its low 8 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vecNx8(unsigned int value);
-KASTARRI_API unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_uint32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNx8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U
+
+/// lane 0 of the source, sign-extended.
+KASTARRI_RESULT unsigned int
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& from);
+
+/// lane i = lane i of the source, its low 8 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNx8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
+
+/// every lane = the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_qv_vecNx8U(unsigned char value);
-KASTARRI_API unsigned char
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_uint8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U
+
+/// lane 0 of the source.
+KASTARRI_RESULT unsigned char
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& from);
+
+/// every lane = the source, its low 8 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vecNx8U(int value);
-KASTARRI_API int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_int32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U
+
+/// lane 0 of the source, zero-extended.
+KASTARRI_RESULT int
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& from);
+
+/// every lane = the source, its low 8 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vecNx8U(unsigned int value);
-KASTARRI_API unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_uint32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNx8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_vecNx8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_vecNx8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16
+
+/// lane 0 of the source, zero-extended.
+KASTARRI_RESULT unsigned int
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& from);
+
+/// lane i = lane i of the source, its low 8 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNx8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
+
+/// lane i = lane i of the source, its low 8 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_vecNx8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
+
+/// every lane = the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_vecNx8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& from);
+
+/// every lane = the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_vecN_2x16(short value);
-KASTARRI_API short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_int16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16
+
+/// lane 0 of the source.
+KASTARRI_RESULT short
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& from);
+
+/// every lane = the source, its low 16 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vecN_2x16(int value);
-KASTARRI_API int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_int32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16
+
+/// lane 0 of the source, sign-extended.
+KASTARRI_RESULT int
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& from);
+
+/// every lane = the source, its low 16 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vecN_2x16(unsigned int value);
-KASTARRI_API unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_uint32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2x16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U
+
+/// lane 0 of the source, sign-extended.
+KASTARRI_RESULT unsigned int
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& from);
+
+/// lane i = lane i of the source, its low 16 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2x16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
+
+/// every lane = the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_vecN_2x16U(unsigned short value);
-KASTARRI_API unsigned short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_uint16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U
+
+/// lane 0 of the source.
+KASTARRI_RESULT unsigned short
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& from);
+
+/// every lane = the source, its low 16 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vecN_2x16U(int value);
-KASTARRI_API int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_int32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U
+
+/// lane 0 of the source, zero-extended.
+KASTARRI_RESULT int
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& from);
+
+/// every lane = the source, its low 16 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vecN_2x16U(unsigned int value);
-KASTARRI_API unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_uint32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2x16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_vecN_2x16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_vecN_2x16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_vecN_2xf16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+
+/// lane 0 of the source, zero-extended.
+KASTARRI_RESULT unsigned int
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& from);
+
+/// lane i = lane i of the source, its low 16 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2x16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
+
+/// lane i = lane i of the source, its low 16 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_vecN_2x16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
+
+/// every lane = the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_vecN_2x16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& from);
+
+/// every lane = the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_vecN_2xf16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& from);
+
+/// every lane = the source, sign-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_vec2Nx24(short value);
-KASTARRI_API short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_int16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+
+/// lane 0 of the source, its low 16 bits.
+KASTARRI_RESULT short
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& from);
+
+/// every lane = the source, zero-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_vec2Nx24(unsigned short value);
-KASTARRI_API unsigned short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_uint16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+
+/// lane 0 of the source, its low 16 bits.
+KASTARRI_RESULT unsigned short
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& from);
+
+/// every lane = the source, its low 24 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vec2Nx24(int value);
-KASTARRI_API int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_int32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+
+/// lane 0 of the source, sign-extended.
+KASTARRI_RESULT int
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& from);
+
+/// every lane = the source, its low 24 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vec2Nx24(unsigned int value);
-KASTARRI_API unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_uint32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16w_rtor_qv_vec2Nx24(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16Uw_rtor_qv_vec2Nx24(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_rtor_qv_vec2Nx24(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+
+/// lane 0 of the source, sign-extended.
+KASTARRI_RESULT unsigned int
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& from);
+
+/// lane i = lane i of the source, sign-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16w_rtor_qv_vec2Nx24(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w& from);
+
+/// lane i = lane i of the source, zero-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16Uw_rtor_qv_vec2Nx24(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw& from);
+
+/// lane i = bits 24 i to 24 i + 23 of the source, sign-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_rtor_qv_vec2Nx24(const cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill& from);
+
+/// every lane = the source, sign-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vecNx48(int value);
-KASTARRI_API int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_int32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+
+/// lane 0 of the source, its low 32 bits.
+KASTARRI_RESULT int
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& from);
+
+/// every lane = the source, zero-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vecNx48(unsigned int value);
-KASTARRI_API unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_uint32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32_rtor_qv_vecNx48(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32U_rtor_qv_vecNx48(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_rtor_qv_vecNx48(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_vec2Nx16w(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_vec2Nx16Uw(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_vecNx32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_vecNx32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_wvecspill(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_wvecspill(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
+
+/// lane 0 of the source, its low 32 bits.
+KASTARRI_RESULT unsigned int
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& from);
+
+/// lane i = lane i of the source, sign-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32_rtor_qv_vecNx48(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32& from);
+
+/// lane i = lane i of the source, zero-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32U_rtor_qv_vecNx48(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U& from);
+
+/// lane i = bits 48 i to 48 i + 47 of the source, sign-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_rtor_qv_vecNx48(const cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill& from);
+
+/// lane i = lane i of the source, its low 16 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_vec2Nx16w(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& from);
+
+/// lane i = lane i of the source, its low 16 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_vec2Nx16Uw(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& from);
+
+/// lane i = lane i of the source, its low 32 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_vecNx32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& from);
+
+/// lane i = lane i of the source, its low 32 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_vecNx32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& from);
+
+/// lane i of the source in bits 24 i to 24 i + 23, without gaps.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_wvecspill(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& from);
+
+/// lane i of the source in bits 48 i to 48 i + 47, without gaps.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_wvecspill(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& from);
+
+/// every bit = the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_rtor_vboolN(const cstub_Km_ZNB_Orbis_R5_64k_vbool1& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool2N
+
+/// every bit = the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_rtor_vbool2N(const cstub_Km_ZNB_Orbis_R5_64k_vbool1& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
+
+/// every bit = the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_rtor_vboolN_2(const cstub_Km_ZNB_Orbis_R5_64k_vbool1& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
+
+/// the source, its lowest bit.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_vbool1(int value);
-KASTARRI_API int
+
+/// the source, zero-extended.
+KASTARRI_RESULT int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_vbool1& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
+
+/// the source, its lowest bit.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_vbool1(unsigned int value);
-KASTARRI_API unsigned int
+
+/// the source, zero-extended.
+KASTARRI_RESULT unsigned int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_vbool1& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
+
+/// the source, its lowest bit.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_rkbool(char value);
-KASTARRI_API char
+
+/// the source, zero-extended.
+KASTARRI_RESULT char
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_int8(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
+
+/// the source, its lowest bit.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_rkbool(unsigned char value);
-KASTARRI_API unsigned char
+
+/// the source, zero-extended.
+KASTARRI_RESULT unsigned char
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_uint8(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
+
+/// the source, its lowest bit.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_rkbool(short value);
-KASTARRI_API short
+
+/// the source, zero-extended.
+KASTARRI_RESULT short
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_int16(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
+
+/// the source, its lowest bit.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_rkbool(unsigned short value);
-KASTARRI_API unsigned short
+
+/// the source, zero-extended.
+KASTARRI_RESULT unsigned short
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_uint16(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
+
+/// the source, its lowest bit.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_rkbool(int value);
-KASTARRI_API int
+
+/// the source, zero-extended.
+KASTARRI_RESULT int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
+
+/// the source, its lowest bit.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_rkbool(unsigned int value);
-KASTARRI_API unsigned int
+
+/// the source, zero-extended.
+KASTARRI_RESULT unsigned int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
+
+/// the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_bool_rtor_rkbool(bool value);
-KASTARRI_API bool
+
+/// the source.
+KASTARRI_RESULT bool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_bool(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool4
+
+/// the source, its low 4 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool4
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_rkbool4(char value);
-KASTARRI_API char
+
+/// the source, zero-extended.
+KASTARRI_RESULT char
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool4_rtor_int8(const cstub_Km_ZNB_Orbis_R5_64k_rkbool4& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool4
+
+/// the source, its low 4 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool4
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_rkbool4(unsigned char value);
-KASTARRI_API unsigned char
+
+/// the source, zero-extended.
+KASTARRI_RESULT unsigned char
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool4_rtor_uint8(const cstub_Km_ZNB_Orbis_R5_64k_rkbool4& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool4
+
+/// the source, its low 4 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool4
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_rkbool4(short value);
-KASTARRI_API short
+
+/// the source, zero-extended.
+KASTARRI_RESULT short
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool4_rtor_int16(const cstub_Km_ZNB_Orbis_R5_64k_rkbool4& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool4
+
+/// the source, its low 4 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool4
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_rkbool4(unsigned short value);
-KASTARRI_API unsigned short
+
+/// the source, zero-extended.
+KASTARRI_RESULT unsigned short
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool4_rtor_uint16(const cstub_Km_ZNB_Orbis_R5_64k_rkbool4& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool4
+
+/// the source, its low 4 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool4
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_rkbool4(int value);
-KASTARRI_API int
+
+/// the source, zero-extended.
+KASTARRI_RESULT int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool4_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_rkbool4& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool4
+
+/// the source, its low 4 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool4
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_rkbool4(unsigned int value);
-KASTARRI_API unsigned int
+
+/// the source, zero-extended.
+KASTARRI_RESULT unsigned int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool4_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_rkbool4& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool8
+
+/// the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_rkbool8(char value);
-KASTARRI_API char
+
+/// the source.
+KASTARRI_RESULT char
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool8_rtor_int8(const cstub_Km_ZNB_Orbis_R5_64k_rkbool8& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool8
+
+/// the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_rkbool8(unsigned char value);
-KASTARRI_API unsigned char
+
+/// the source.
+KASTARRI_RESULT unsigned char
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool8_rtor_uint8(const cstub_Km_ZNB_Orbis_R5_64k_rkbool8& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool8
+
+/// the source, its low 8 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_rkbool8(short value);
-KASTARRI_API short
+
+/// the source, zero-extended.
+KASTARRI_RESULT short
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool8_rtor_int16(const cstub_Km_ZNB_Orbis_R5_64k_rkbool8& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool8
+
+/// the source, its low 8 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_rkbool8(unsigned short value);
-KASTARRI_API unsigned short
+
+/// the source, zero-extended.
+KASTARRI_RESULT unsigned short
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool8_rtor_uint16(const cstub_Km_ZNB_Orbis_R5_64k_rkbool8& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool8
+
+/// the source, its low 8 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_rkbool8(int value);
-KASTARRI_API int
+
+/// the source, zero-extended.
+KASTARRI_RESULT int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool8_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_rkbool8& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool8
+
+/// the source, its low 8 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_rkbool8(unsigned int value);
-KASTARRI_API unsigned int
+
+/// the source, zero-extended.
+KASTARRI_RESULT unsigned int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool8_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_rkbool8& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+
+/// the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_qv_int8(signed char value);
-KASTARRI_API signed char
+
+/// the source.
+KASTARRI_RESULT signed char
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+
+/// the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_qv_int8(unsigned char value);
-KASTARRI_API unsigned char
+
+/// the source.
+KASTARRI_RESULT unsigned char
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+
+/// the source, its low 8 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_int8(int value);
-KASTARRI_API int
+
+/// the source, sign-extended.
+KASTARRI_RESULT int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+
+/// the source, its low 8 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_int8(unsigned int value);
-KASTARRI_API unsigned int
+
+/// the source, sign-extended.
+KASTARRI_RESULT unsigned int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_qv_int8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_int8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_qv_int8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+
+/// lane 0 of the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_qv_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& from);
+
+/// lane 0 of the source, its low 8 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
+
+/// lane 0 of the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_qv_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& from);
+
+/// the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+
+/// the source, its low 8 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+
+/// the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_qv_int8U(signed char value);
-KASTARRI_API signed char
+
+/// the source.
+KASTARRI_RESULT signed char
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+
+/// the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_qv_int8U(unsigned char value);
-KASTARRI_API unsigned char
+
+/// the source.
+KASTARRI_RESULT unsigned char
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+
+/// the source, its low 8 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_int8U(int value);
-KASTARRI_API int
+
+/// the source, zero-extended.
+KASTARRI_RESULT int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+
+/// the source, its low 8 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_int8U(unsigned int value);
-KASTARRI_API unsigned int
+
+/// the source, zero-extended.
+KASTARRI_RESULT unsigned int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_qv_int8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_int8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_qv_int8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+
+/// lane 0 of the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_qv_int8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& from);
+
+/// lane 0 of the source, its low 8 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_int8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
+
+/// lane 0 of the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_qv_int8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& from);
+
+/// the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_int8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_int8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+
+/// the source, its low 8 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_int8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& from);
+
+/// the source, sign-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_qv_int16(signed char value);
-KASTARRI_API signed char
+
+/// the source, its low 8 bits.
+KASTARRI_RESULT signed char
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+
+/// the source, zero-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_qv_int16(unsigned char value);
-KASTARRI_API unsigned char
+
+/// the source, its low 8 bits.
+KASTARRI_RESULT unsigned char
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+
+/// the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_int16(short value);
-KASTARRI_API short
+
+/// the source.
+KASTARRI_RESULT short
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+
+/// the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_int16(unsigned short value);
-KASTARRI_API unsigned short
+
+/// the source.
+KASTARRI_RESULT unsigned short
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+
+/// the source, its low 16 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_int16(int value);
-KASTARRI_API int
+
+/// the source, sign-extended.
+KASTARRI_RESULT int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+
+/// the source, its low 16 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_int16(unsigned int value);
-KASTARRI_API unsigned int
+
+/// the source, sign-extended.
+KASTARRI_RESULT unsigned int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_int16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_int16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_qv_int16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+
+/// lane 0 of the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
+
+/// lane 0 of the source, its low 16 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
+
+/// lane 0 of the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_qv_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& from);
+
+/// the source, sign-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_int16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+
+/// the source, zero-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& from);
+
+/// the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& from);
+
+/// the source, sign-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_qv_int16U(signed char value);
-KASTARRI_API signed char
+
+/// the source, its low 8 bits.
+KASTARRI_RESULT signed char
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+
+/// the source, zero-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_qv_int16U(unsigned char value);
-KASTARRI_API unsigned char
+
+/// the source, its low 8 bits.
+KASTARRI_RESULT unsigned char
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+
+/// the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_int16U(short value);
-KASTARRI_API short
+
+/// the source.
+KASTARRI_RESULT short
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+
+/// the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_int16U(unsigned short value);
-KASTARRI_API unsigned short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_uint16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+
+/// the source.
+KASTARRI_RESULT unsigned short
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& from);
+
+/// the source, its low 16 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_int16U(int value);
-KASTARRI_API int
+
+/// the source, zero-extended.
+KASTARRI_RESULT int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+
+/// the source, its low 16 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_int16U(unsigned int value);
-KASTARRI_API unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_uint32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_int16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_int16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_qv_int16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_int16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int48_rtor_qv_int16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int48& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_f16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_rtor_qv_f16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
+
+/// the source, zero-extended.
+KASTARRI_RESULT unsigned int
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& from);
+
+/// lane 0 of the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_int16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
+
+/// lane 0 of the source, its low 16 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_int16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
+
+/// lane 0 of the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_qv_int16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& from);
+
+/// the source, zero-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& from);
+
+/// the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_int16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& from);
+
+/// the source, its low 16 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int48_rtor_qv_int16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int48& from);
+
+/// lane 0 of the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_f16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_f16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
+
+/// lane 0 of the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_f16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_rtor_qv_f16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& from);
+
+/// the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_float_rtor_rkfloat(float value);
-KASTARRI_API float
+
+/// the source.
+KASTARRI_RESULT float
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_rtor_float(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_rkfloat(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int24
+
+/// lane 0 of the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkfloat
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_rkfloat(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
+
+/// the source, sign-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int24
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_int24(short value);
-KASTARRI_API short
+
+/// the source, its low 16 bits.
+KASTARRI_RESULT short
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int24_rtor_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int24& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int24
+
+/// the source, zero-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int24
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_int24(unsigned short value);
-KASTARRI_API unsigned short
+
+/// the source, its low 16 bits.
+KASTARRI_RESULT unsigned short
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int24_rtor_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int24& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int24
+
+/// the source, its low 24 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int24
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_int24(int value);
-KASTARRI_API int
+
+/// the source, sign-extended.
+KASTARRI_RESULT int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int24_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int24& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int24
+
+/// the source, its low 24 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int24
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_int24(unsigned int value);
-KASTARRI_API unsigned int
+
+/// the source, sign-extended.
+KASTARRI_RESULT unsigned int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int24_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int24& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+
+/// the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_int32v(int value);
-KASTARRI_API int
+
+/// the source.
+KASTARRI_RESULT int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+
+/// the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_int32v(unsigned int value);
-KASTARRI_API unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_uint32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_int32v(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_int32v(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+
+/// the source.
+KASTARRI_RESULT unsigned int
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& from);
+
+/// lane 0 of the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_int32v(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
+
+/// the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_int32v(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& from);
+
+/// the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_int32Uv(int value);
-KASTARRI_API int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_int32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+
+/// the source.
+KASTARRI_RESULT int
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& from);
+
+/// the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_int32Uv(unsigned int value);
-KASTARRI_API unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_uint32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_int32Uv(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_int32Uv(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
+
+/// the source.
+KASTARRI_RESULT unsigned int
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& from);
+
+/// lane 0 of the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_int32Uv(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
+
+/// the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_int32Uv(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& from);
+
+/// the source, sign-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_qv_int32pr(signed char value);
-KASTARRI_API signed char
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32pr_rtor_int8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
+
+/// the source, its low 8 bits.
+KASTARRI_RESULT signed char
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32pr_rtor_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& from);
+
+/// the source, zero-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_qv_int32pr(unsigned char value);
-KASTARRI_API unsigned char
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32pr_rtor_uint8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
+
+/// the source, its low 8 bits.
+KASTARRI_RESULT unsigned char
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32pr_rtor_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& from);
+
+/// the source, sign-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_int32pr(short value);
-KASTARRI_API short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32pr_rtor_int16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
+
+/// the source, its low 16 bits.
+KASTARRI_RESULT short
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32pr_rtor_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& from);
+
+/// the source, zero-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_int32pr(unsigned short value);
-KASTARRI_API unsigned short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32pr_rtor_uint16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
+
+/// the source, its low 16 bits.
+KASTARRI_RESULT unsigned short
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32pr_rtor_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& from);
+
+/// the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_int32pr(int value);
-KASTARRI_API int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32pr_rtor_int32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
+
+/// the source.
+KASTARRI_RESULT int
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32pr_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& from);
+
+/// the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_int32pr(unsigned int value);
-KASTARRI_API unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32pr_rtor_uint32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_int32pr(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int32pr(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_int32pr(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_int32pr(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_int32pr(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_int32pr(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int48
+
+/// the source.
+KASTARRI_RESULT unsigned int
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32pr_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& from);
+
+/// the source, sign-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_int32pr(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& from);
+
+/// the source, zero-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int32pr(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& from);
+
+/// the source, sign-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_int32pr(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& from);
+
+/// the source, zero-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_int32pr(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& from);
+
+/// the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_int32pr(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& from);
+
+/// the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_int32pr(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& from);
+
+/// the source, sign-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int48
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_int48(int value);
-KASTARRI_API int
+
+/// the source, its low 32 bits.
+KASTARRI_RESULT int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int48_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int48& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int48
+
+/// the source, zero-extended.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int48
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_int48(unsigned int value);
-KASTARRI_API unsigned int
+
+/// the source, its low 32 bits.
+KASTARRI_RESULT unsigned int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int48_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int48& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int48
+
+/// the source, its low 48 bits.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int48
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int64_rtor_qv_int48(long long value);
-KASTARRI_API long long
+
+/// the source, sign-extended.
+KASTARRI_RESULT long long
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int48_rtor_int64(const cstub_Km_ZNB_Orbis_R5_64k_qv_int48& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int64
+
+/// the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int64
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int64_rtor_qv_int64(long long value);
-KASTARRI_API long long
+
+/// the source.
+KASTARRI_RESULT long long
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_rtor_int64(const cstub_Km_ZNB_Orbis_R5_64k_qv_int64& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int64
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_rtor_qv_int64(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int128
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_rtor_qv_int128(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& from);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int256
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_rtor_qv_int256(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& from);
+
+/// lane 0 of the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int64
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_rtor_qv_int64(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& from);
+
+/// lane 0 of the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int128
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_rtor_qv_int128(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& from);
+
+/// lane 0 of the source.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int256
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_rtor_qv_int256(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& from);
 
 /* Conversions between registers and memory of another type. A host scalar lies at the address with the bits
    below its size ignored; a register type at the address as it is.
    Table: src/frame/memory_conversions.def */
 
-/// the register from what is in memory at base + offset bytes, converted as between registers; the address of
-/// a host scalar is rounded down to its size.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_mtor_qv_vec2Nx8(const signed char* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_mtor_qv_vec2Nx8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_mtor_qv_vec2Nx8U(const unsigned char* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_mtor_qv_vec2Nx8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_mtor_qv_vecNx16(const short* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_mtor_qv_vecNx16(const signed char* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_mtor_qv_vecNx16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_mtor_qv_vecNx16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_mtor_qv_vecNx16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_mtor_qv_vecNx16U(const unsigned short* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_mtor_qv_vecNx16U(const unsigned char* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_mtor_qv_vecNx16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_mtor_qv_vecNx16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_mtor_qv_vecNx16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_mtor_qv_vecN_2x32v(const short* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_mtor_qv_vecN_2x32v(const int* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_mtor_qv_vecN_2x32v(const unsigned int* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_mtor_qv_vecN_2x32v(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_mtor_qv_vecN_2x32v(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_mtor_qv_vecN_2x32v(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_mtor_qv_vecN_2x32Uv(const int* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_mtor_qv_vecN_2x32Uv(const unsigned short* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_mtor_qv_vecN_2x32Uv(const unsigned int* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_mtor_qv_vecN_2x32Uv(const unsigned char* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_mtor_qv_vecN_2x32Uv(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_mtor_qv_vecN_2x32Uv(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_mtor_qv_vecN_2x32Uv(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int64_mtor_qv_vecN_4x64(const long long* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_mtor_qv_vecN_4x64(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_mtor_qv_vecNxf16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_mtor_qv_vecN_2xf32(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_mtor_qv_vecNx8(const signed char* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_mtor_qv_vecNx8U(const unsigned char* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_mtor_qv_vecN_2x16(const short* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_mtor_qv_vecN_2x16U(const unsigned short* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16w_mtor_qv_vec2Nx24(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16Uw_mtor_qv_vec2Nx24(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_mtor_qv_vec2Nx24(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32_mtor_qv_vecNx48(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32U_mtor_qv_vecNx48(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_mtor_qv_vecNx48(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_mtor_qv_int8(const signed char* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_mtor_qv_int8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_mtor_qv_int8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_mtor_qv_int8U(const unsigned char* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_mtor_qv_int8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_mtor_qv_int8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_mtor_qv_int16(const short* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_mtor_qv_int16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_mtor_qv_int16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_mtor_qv_int16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_mtor_qv_int16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_mtor_qv_int16U(const unsigned short* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_mtor_qv_int16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_mtor_qv_int16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_mtor_qv_int16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_mtor_qv_f16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_mtor_qv_f16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_mtor_rkfloat(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_mtor_qv_int24(const int* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_mtor_qv_int32v(const int* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_mtor_qv_int32v(const unsigned int* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_mtor_qv_int32v(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_mtor_qv_int32Uv(const int* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_mtor_qv_int32Uv(const unsigned int* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_mtor_qv_int32Uv(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int64_mtor_qv_int48(const long long* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int64
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int64_mtor_qv_int64(const long long* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int64
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_mtor_qv_int64(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int128
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_mtor_qv_int128(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int256
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_mtor_qv_int256(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256* base,
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_mtor_qv_vec2Nx8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base,
     int offset);
 
-/// the register's value to memory at base + offset bytes: lane 0 where memory holds one element, else all
-/// lanes; a narrower signed type in memory saturates, a narrower unsigned one keeps the low bits, and so do
-/// the images of the accumulators; the address of a host scalar is rounded down to its size.
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtom_int8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& value,
-    const signed char* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtom_qv_int8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& value,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtom_uint8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& value,
-    const unsigned char* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtom_qv_int8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& value,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtom_int16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& value,
-    const short* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtom_int8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& value,
-    const signed char* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtom_qv_vecNx8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& value,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtom_qv_vecNx8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& value,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtom_qv_int8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& value,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtom_qv_int16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& value,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtom_uint16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& value,
-    const unsigned short* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtom_uint8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& value,
-    const unsigned char* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtom_qv_vecNx8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& value,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtom_qv_int8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& value,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtom_qv_int16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& value,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtom_int16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& value,
-    const short* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtom_int32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& value,
-    const int* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtom_uint32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& value,
-    const unsigned int* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtom_qv_vecN_2x16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& value,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtom_qv_vecN_2x16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& value,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtom_qv_int16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& value,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtom_qv_int32v(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& value,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtom_int32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& value,
-    const int* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtom_uint16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& value,
-    const unsigned short* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtom_uint32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& value,
-    const unsigned int* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtom_uint8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& value,
-    const unsigned char* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtom_qv_vecN_2x16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& value,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtom_qv_int16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& value,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtom_qv_int32Uv(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& value,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_rtom_int64(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& value,
-    const long long* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_rtom_qv_int64(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& value,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_rtom_qv_int128(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& value,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int128* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_rtom_qv_int256(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& value,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int256* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtom_qv_f16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& value,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtom_rkfloat(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& value,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtom_int8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& value,
-    const signed char* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtom_qv_int8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& value,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtom_uint8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& value,
-    const unsigned char* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtom_qv_int8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& value,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtom_int16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& value,
-    const short* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtom_qv_int16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& value,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtom_uint16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& value,
-    const unsigned short* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtom_qv_int16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& value,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_rtom_qv_f16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& value,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtom_int32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& value,
-    const int* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtom_qv_vec2Nx16w(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& value,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtom_qv_vec2Nx16Uw(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& value,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtom_qv_wvecspill(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& value,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtom_qv_vecNx32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& value,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtom_qv_vecNx32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& value,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtom_qv_wvecspill(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& value,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtom_int8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& value,
-    const signed char* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtom_uint8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& value,
-    const unsigned char* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtom_int16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& value,
-    const short* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtom_qv_int8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& value,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtom_uint16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& value,
-    const unsigned short* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtom_qv_int8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& value,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int24_rtom_int32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int24& value,
-    const int* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtom_int32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& value,
-    const int* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtom_uint32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& value,
-    const unsigned int* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtom_int32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& value,
-    const int* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtom_uint32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& value,
-    const unsigned int* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int48_rtom_int64(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int48& value,
-    const long long* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_rtom_int64(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64& value,
-    const long long* base,
-    int offset);
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_mtor_qv_vec2Nx8U(const unsigned char* base, int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_mtor_qv_vec2Nx8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers; the
+/// address is rounded down to its size.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_mtor_qv_vecNx16(const short* base, int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_mtor_qv_vecNx16(const signed char* base, int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_mtor_qv_vecNx16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_mtor_qv_vecNx16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_mtor_qv_vecNx16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers; the
+/// address is rounded down to its size.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_mtor_qv_vecNx16U(const unsigned short* base, int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_mtor_qv_vecNx16U(const unsigned char* base, int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_mtor_qv_vecNx16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_mtor_qv_vecNx16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_mtor_qv_vecNx16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers; the
+/// address is rounded down to its size.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_mtor_qv_vecN_2x32v(const short* base, int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers; the
+/// address is rounded down to its size.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_mtor_qv_vecN_2x32v(const int* base, int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers; the
+/// address is rounded down to its size.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_mtor_qv_vecN_2x32v(const unsigned int* base, int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_mtor_qv_vecN_2x32v(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_mtor_qv_vecN_2x32v(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_mtor_qv_vecN_2x32v(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers; the
+/// address is rounded down to its size.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_mtor_qv_vecN_2x32Uv(const int* base, int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers; the
+/// address is rounded down to its size.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_mtor_qv_vecN_2x32Uv(const unsigned short* base, int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers; the
+/// address is rounded down to its size.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_mtor_qv_vecN_2x32Uv(const unsigned int* base, int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_mtor_qv_vecN_2x32Uv(const unsigned char* base, int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_mtor_qv_vecN_2x32Uv(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_mtor_qv_vecN_2x32Uv(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_mtor_qv_vecN_2x32Uv(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int64_mtor_qv_vecN_4x64(const long long* base, int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_mtor_qv_vecN_4x64(const cstub_Km_ZNB_Orbis_R5_64k_qv_int64* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_mtor_qv_vecNxf16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_mtor_qv_vecN_2xf32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_mtor_qv_vecNx8(const signed char* base, int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_mtor_qv_vecNx8U(const unsigned char* base, int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers; the
+/// address is rounded down to its size.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_mtor_qv_vecN_2x16(const short* base, int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers; the
+/// address is rounded down to its size.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_mtor_qv_vecN_2x16U(const unsigned short* base, int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16w_mtor_qv_vec2Nx24(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16Uw_mtor_qv_vec2Nx24(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_mtor_qv_vec2Nx24(const cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32_mtor_qv_vecNx48(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32U_mtor_qv_vecNx48(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_mtor_qv_vecNx48(const cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_mtor_qv_int8(const signed char* base, int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_mtor_qv_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_mtor_qv_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_mtor_qv_int8U(const unsigned char* base, int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_mtor_qv_int8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_mtor_qv_int8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers; the
+/// address is rounded down to its size.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_mtor_qv_int16(const short* base, int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_mtor_qv_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_mtor_qv_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_mtor_qv_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_mtor_qv_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers; the
+/// address is rounded down to its size.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_mtor_qv_int16U(const unsigned short* base, int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_mtor_qv_int16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_mtor_qv_int16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_mtor_qv_int16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_f16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_mtor_qv_f16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_f16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_mtor_qv_f16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkfloat
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_mtor_rkfloat(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers; the
+/// address is rounded down to its size.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_mtor_qv_int24(const int* base, int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers; the
+/// address is rounded down to its size.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_mtor_qv_int32v(const int* base, int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers; the
+/// address is rounded down to its size.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_mtor_qv_int32v(const unsigned int* base, int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_mtor_qv_int32v(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers; the
+/// address is rounded down to its size.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_mtor_qv_int32Uv(const int* base, int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers; the
+/// address is rounded down to its size.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_mtor_qv_int32Uv(const unsigned int* base, int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_mtor_qv_int32Uv(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int64_mtor_qv_int48(const long long* base, int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int64
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int64_mtor_qv_int64(const long long* base, int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int64
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_mtor_qv_int64(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int128
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_mtor_qv_int128(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128* base,
+    int offset);
+
+/// loads the register from what is in memory at base + offset bytes, converted as between registers.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int256
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_mtor_qv_int256(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256* base,
+    int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtom_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& value,
+    const signed char* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtom_qv_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtom_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& value,
+    const unsigned char* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtom_qv_int8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated; the
+/// address is rounded down to its size.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtom_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& value,
+    const short* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtom_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& value,
+    const signed char* base, int offset);
+
+/// the register's value to memory at base + offset bytes: all lanes; where it is narrower, saturated.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtom_qv_vecNx8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base, int offset);
+
+/// the register's value to memory at base + offset bytes: all lanes; where it is narrower, the low bits.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtom_qv_vecNx8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtom_qv_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtom_qv_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits; the
+/// address is rounded down to its size.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtom_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& value,
+    const unsigned short* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtom_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& value,
+    const unsigned char* base, int offset);
+
+/// the register's value to memory at base + offset bytes: all lanes; where it is narrower, the low bits.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtom_qv_vecNx8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtom_qv_int8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtom_qv_int16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated; the
+/// address is rounded down to its size.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtom_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& value,
+    const short* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated; the
+/// address is rounded down to its size.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtom_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& value,
+    const int* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits; the
+/// address is rounded down to its size.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtom_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& value,
+    const unsigned int* base, int offset);
+
+/// the register's value to memory at base + offset bytes: all lanes; where it is narrower, saturated.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtom_qv_vecN_2x16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base, int offset);
+
+/// the register's value to memory at base + offset bytes: all lanes; where it is narrower, the low bits.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtom_qv_vecN_2x16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtom_qv_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtom_qv_int32v(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated; the
+/// address is rounded down to its size.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtom_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& value,
+    const int* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits; the
+/// address is rounded down to its size.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtom_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& value,
+    const unsigned short* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits; the
+/// address is rounded down to its size.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtom_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& value,
+    const unsigned int* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtom_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& value,
+    const unsigned char* base, int offset);
+
+/// the register's value to memory at base + offset bytes: all lanes; where it is narrower, the low bits.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtom_qv_vecN_2x16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtom_qv_int16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtom_qv_int32Uv(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_rtom_int64(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& value,
+    const long long* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_rtom_qv_int64(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_rtom_qv_int128(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int128* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_rtom_qv_int256(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int256* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtom_qv_f16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtom_rkfloat(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtom_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& value,
+    const signed char* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtom_qv_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtom_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& value,
+    const unsigned char* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtom_qv_int8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated; the
+/// address is rounded down to its size.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtom_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& value,
+    const short* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtom_qv_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits; the
+/// address is rounded down to its size.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtom_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& value,
+    const unsigned short* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtom_qv_int16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_rtom_qv_f16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated; the
+/// address is rounded down to its size.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtom_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& value,
+    const int* base, int offset);
+
+/// the register's value to memory at base + offset bytes: all lanes; the low bits.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtom_qv_vec2Nx16w(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w* base, int offset);
+
+/// the register's value to memory at base + offset bytes: all lanes; the low bits.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtom_qv_vec2Nx16Uw(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw* base, int offset);
+
+/// the register's value to memory at base + offset bytes: all lanes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtom_qv_wvecspill(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill* base, int offset);
+
+/// the register's value to memory at base + offset bytes: all lanes; the low bits.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtom_qv_vecNx32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32* base, int offset);
+
+/// the register's value to memory at base + offset bytes: all lanes; where it is narrower, the low bits.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtom_qv_vecNx32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U* base, int offset);
+
+/// the register's value to memory at base + offset bytes: all lanes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtom_qv_wvecspill(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtom_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& value,
+    const signed char* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtom_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& value,
+    const unsigned char* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated; the
+/// address is rounded down to its size.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtom_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& value,
+    const short* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtom_qv_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits; the
+/// address is rounded down to its size.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtom_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& value,
+    const unsigned short* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtom_qv_int8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& value,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated; the
+/// address is rounded down to its size.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int24_rtom_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int24& value,
+    const int* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated; the
+/// address is rounded down to its size.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtom_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& value,
+    const int* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits; the
+/// address is rounded down to its size.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtom_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& value,
+    const unsigned int* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated; the
+/// address is rounded down to its size.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtom_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& value,
+    const int* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, the low bits; the
+/// address is rounded down to its size.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtom_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& value,
+    const unsigned int* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int48_rtom_int64(const cstub_Km_ZNB_Orbis_R5_64k_qv_int48& value,
+    const long long* base, int offset);
+
+/// the register's value to memory at base + offset bytes: lane 0; where it is narrower, saturated.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_rtom_int64(const cstub_Km_ZNB_Orbis_R5_64k_qv_int64& value,
+    const long long* base, int offset);
 
 /* Conversions between integer and floating-point registers, and between half and single precision: value to
    value, where the other conversions move bits (the row kinds are those of src/frame/conversions.def).
    Table: src/float/conversions.def */
 
-/// the source's value as a number of the target's format, rounded by RoundMode, with flags; to an integer
-/// truncated toward zero and saturated.
+/// the source's value truncated toward zero and saturated to the target, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_vecNx16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_vecNx16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
+
+/// the source's value truncated toward zero and saturated to the target, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_vecNx16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_vecNx16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
+
+/// the source's value truncated toward zero and saturated to the target, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2x32v(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2x32v(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
+
+/// the source's value truncated toward zero and saturated to the target, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2x32Uv(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2x32Uv(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
+
+/// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_vecNxf16(short value);
+
+/// the source's value truncated toward zero and saturated to the target, with flags.
 KASTARRI_API short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_int16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
+
+/// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_vecNxf16(unsigned short value);
+
+/// the source's value truncated toward zero and saturated to the target, with flags.
 KASTARRI_API unsigned short
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_uint16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
+
+/// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vecNxf16(int value);
+
+/// the source's value truncated toward zero and saturated to the target, with flags.
 KASTARRI_API int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_int32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
+
+/// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vecNxf16(unsigned int value);
+
+/// the source's value truncated toward zero and saturated to the target, with flags.
 KASTARRI_API unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_uint32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
+
+/// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_float_rtor_qv_vecNxf16(float value);
+
+/// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API float
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_float(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_float(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
+
+/// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNxf16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNxf16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& from);
+
+/// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_vecNxf16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_vecNxf16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& from);
+
+/// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_rtor_qv_vecNxf16(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_rtor_qv_vecNxf16(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& from);
+
+/// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vecN_2xf32(int value);
+
+/// the source's value truncated toward zero and saturated to the target, with flags.
 KASTARRI_API int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_int32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
+
+/// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vecN_2xf32(unsigned int value);
+
+/// the source's value truncated toward zero and saturated to the target, with flags.
 KASTARRI_API unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_uint32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
+
+/// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2xf32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2xf32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& from);
+
+/// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_vecN_2xf32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_vecN_2xf32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& from);
+
+/// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_rtor_qv_vecN_2xf32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_rtor_qv_vecN_2xf32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16& from);
+
+/// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2xf16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2xf16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& from);
+
+/// the source's value truncated toward zero and saturated to the target, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& from);
+
+/// the source's value truncated toward zero and saturated to the target, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& from);
+
+/// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_qv_f16(signed char value);
+
+/// the source's value truncated toward zero and saturated to the target, with flags.
 KASTARRI_API signed char
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_int8(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& from);
+
+/// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_qv_f16(unsigned char value);
+
+/// the source's value truncated toward zero and saturated to the target, with flags.
 KASTARRI_API unsigned char
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_uint8(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& from);
+
+/// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_f16(short value);
+
+/// the source's value truncated toward zero and saturated to the target, with flags.
 KASTARRI_API short
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_int16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& from);
+
+/// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_f16(unsigned short value);
+
+/// the source's value truncated toward zero and saturated to the target, with flags.
 KASTARRI_API unsigned short
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_uint16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& from);
+
+/// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_f16(int value);
+
+/// the source's value truncated toward zero and saturated to the target, with flags.
 KASTARRI_API int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_int32(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& from);
+
+/// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_f16(unsigned int value);
+
+/// the source's value truncated toward zero and saturated to the target, with flags.
 KASTARRI_API unsigned int
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_uint32(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& from);
+
+/// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_float_rtor_qv_f16(float value);
+
+/// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API float
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_float(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& from);
+
+/// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_f16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& from);
+
+/// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_f16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_f16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& from);
+
+/// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_rtor_qv_f16(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& from);
+
+/// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_f16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_f16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& from);
+
+/// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_f16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_f16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& from);
+
+/// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_rkfloat(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_rkfloat(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& from);
+
+/// the source's value as a number of the target's format, rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_rkfloat(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& from);
+
+/// the source's value truncated toward zero and saturated to the target, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int32v(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& from);
+
+/// the source's value truncated toward zero and saturated to the target, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int32Uv(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& from);
 

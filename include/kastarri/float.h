@@ -12,133 +12,162 @@
 /// control: bits 0-1 RoundMode, bits 2-6 StickyEnable, which enables nothing; other bits read as 0 and are
 /// dropped when written.
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_RUR_FCR();
+
+/// control: bits 0-1 RoundMode, bits 2-6 StickyEnable, which enables nothing; other bits read as 0 and are
+/// dropped when written.
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_WUR_FCR(unsigned value);
 
 /// status: bits 7-11 StickyFlags (inexact, underflow, overflow, division by zero, invalid); other bits read
 /// as 0 and are dropped when written. Flags are cleared in no other way.
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_RUR_FSR();
+
+/// status: bits 7-11 StickyFlags (inexact, underflow, overflow, division by zero, invalid); other bits read
+/// as 0 and are dropped when written. Flags are cleared in no other way.
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_WUR_FSR(unsigned value);
 
-/// a + b, a - b, a * b, rounded by RoundMode, with flags. A NaN among the operands is the result, the first
-/// one, made quiet.
+/// a + b, rounded by RoundMode, with flags. A NaN among the operands is the result, the first one, made
+/// quiet.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ADD_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ADD_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// a + b, rounded by RoundMode, with flags. A NaN among the operands is the result, the first one, made
+/// quiet.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ADD_S(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_SUB_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_SUB_S(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MUL_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MUL_S(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ADD_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
-/// acc + a * b (MADD), acc - a * b (MSUB), rounded once; MADDN and MSUBN to nearest whatever RoundMode says.
-/// Of several NaNs, a goes before b, b before acc.
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MADD_H(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+/// a - b, rounded by RoundMode, with flags. A NaN among the operands is the result, the first one, made
+/// quiet.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_SUB_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MADD_S(
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MSUB_H(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MSUB_S(
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MADDN_H(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MADDN_S(
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MSUBN_H(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MSUBN_S(
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+
+/// a - b, rounded by RoundMode, with flags. A NaN among the operands is the result, the first one, made
+/// quiet.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_SUB_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
-/// the sign cleared, the sign turned: bits only, NaNs too.
+/// a * b, rounded by RoundMode, with flags. A NaN among the operands is the result, the first one, made
+/// quiet.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MUL_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// a * b, rounded by RoundMode, with flags. A NaN among the operands is the result, the first one, made
+/// quiet.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MUL_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+
+/// acc = acc + a * b, rounded once, by RoundMode. Of several NaNs, a goes before b, b before acc.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MADD_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// acc = acc + a * b, rounded once, by RoundMode. Of several NaNs, a goes before b, b before acc.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MADD_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+
+/// acc = acc - a * b, rounded once, by RoundMode. Of several NaNs, a goes before b, b before acc.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MSUB_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// acc = acc - a * b, rounded once, by RoundMode. Of several NaNs, a goes before b, b before acc.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MSUB_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+
+/// acc = acc + a * b, rounded once, to nearest whatever RoundMode says. Of several NaNs, a goes before b, b
+/// before acc.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MADDN_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// acc = acc + a * b, rounded once, to nearest whatever RoundMode says. Of several NaNs, a goes before b, b
+/// before acc.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MADDN_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+
+/// acc = acc - a * b, rounded once, to nearest whatever RoundMode says. Of several NaNs, a goes before b, b
+/// before acc.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MSUBN_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// acc = acc - a * b, rounded once, to nearest whatever RoundMode says. Of several NaNs, a goes before b, b
+/// before acc.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MSUBN_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+
+/// a with its sign cleared: bits only, NaNs too.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ABS_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a);
+
+/// a with its sign cleared: bits only, NaNs too.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ABS_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a);
+
+/// a with its sign turned: bits only, NaNs too.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_NEG_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a);
+
+/// a with its sign turned: bits only, NaNs too.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_NEG_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a);
 
-/// the smaller, the larger of a and b; -0 is below +0, a NaN is the result.
+/// the smaller of a and b; -0 is below +0, a NaN is the result.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MIN_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MIN_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// the smaller of a and b; -0 is below +0, a NaN is the result.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MIN_S(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MAX_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MAX_S(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MIN_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
-/// as MIN and MAX, but a number wins over a NaN.
+/// the larger of a and b; -0 is below +0, a NaN is the result.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MINNUM_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MAX_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// the larger of a and b; -0 is below +0, a NaN is the result.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MINNUM_S(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MAX_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+
+/// the smaller of a and b; -0 is below +0, a number wins over a NaN.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MAXNUM_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MINNUM_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// the smaller of a and b; -0 is below +0, a number wins over a NaN.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MAXNUM_S(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MINNUM_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+
+/// the larger of a and b; -0 is below +0, a number wins over a NaN.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MAXNUM_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// the larger of a and b; -0 is below +0, a number wins over a NaN.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MAXNUM_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// one bit for the class: bits 0-4 -infinity, -normal, -subnormal, -0, +0; bits 5-7 +subnormal, +normal,
 /// +infinity; bit 8 signalling NaN, bit 9 quiet NaN.
 KASTARRI_API unsigned
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_CLSFY_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a);
+
+/// one bit for the class: bits 0-4 -infinity, -normal, -subnormal, -0, +0; bits 5-7 +subnormal, +normal,
+/// +infinity; bit 8 signalling NaN, bit 9 quiet NaN.
 KASTARRI_API unsigned
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_CLSFY_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a);
 
@@ -146,324 +175,435 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_CLSFY_S(const cstub_Km_ZNB_Orbis
 /// rounded to nearest.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_CONST_H(immediate number);
+
+/// constant number mod 16: 0, 1, 2, 0.5, 3, 4, 0.25, 10, 0.1, pi, pi/2, 1/pi, e, ln 2, log2 e, sqrt 2,
+/// rounded to nearest.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_CONST_S(immediate number);
 
-/// the relation of a and b. O.. is false and U.. true when either is a NaN; -0 equals +0. Invalid: a
-/// signalling NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
+/// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
+/// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OEQ_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OEQ_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
+/// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OEQ_S(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OEQ_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+
+/// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
+/// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OEQA_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OEQA_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
+/// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OLT_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OLT_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
+/// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OLT_S(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OLT_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+
+/// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
+/// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OLTA_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OLTA_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
+/// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OLE_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OLE_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
+/// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OLE_S(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OLE_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+
+/// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
+/// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OLEA_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OLEA_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
+/// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OGT_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OGT_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
+/// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OGT_S(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OGT_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+
+/// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
+/// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OGTA_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OGTA_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
+/// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OGE_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OGE_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
+/// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OGE_S(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OGE_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+
+/// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
+/// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OGEA_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_OGEA_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
+/// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UEQ_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UEQ_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
+/// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UEQ_S(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UEQ_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+
+/// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
+/// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULT_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULT_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
+/// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULT_S(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULT_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+
+/// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
+/// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULE_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULE_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
+/// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULE_S(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULE_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+
+/// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
+/// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UN_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UN_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
+/// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UN_S(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UN_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+
+/// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
+/// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULEQ_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULEQ_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
+/// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULEQ_S(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULEQ_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+
+/// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
+/// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULTQ_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULTQ_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
+/// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULTQ_S(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ULTQ_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+
+/// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
+/// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UNEQ_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UNEQ_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
+/// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UNEQ_S(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UNEQ_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+
+/// the relation of a and b. O. is false and U. true when either is a NaN; -0 equals +0. Invalid: a signalling
+/// NaN, and in OLT OLE OGT OGE ULT ULE a quiet one.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UNEQA_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UNEQA_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
 
 /// x / 2^(scale mod 32), rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_FLOAT_H(int value, immediate scale);
+
+/// x / 2^(scale mod 32), rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_FLOAT_S(int value, immediate scale);
+
+/// x / 2^(scale mod 32), rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UFLOAT_H(unsigned int value, immediate scale);
+
+/// x / 2^(scale mod 32), rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UFLOAT_S(unsigned int value, immediate scale);
 
 /// x / 2^(scale mod 16), rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_FLOAT16_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_FLOAT16_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
     immediate scale);
+
+/// x / 2^(scale mod 16), rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UFLOAT16_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UFLOAT16_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
     immediate scale);
 
 /// a * 2^(scale mod 32) truncated; the bound of the integer where that is out of range, the upper one for a
 /// NaN. Inexact when a fraction is dropped, invalid when out of range.
 KASTARRI_API int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_TRUNC_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_TRUNC_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     immediate scale);
+
+/// a * 2^(scale mod 32) truncated; the bound of the integer where that is out of range, the upper one for a
+/// NaN. Inexact when a fraction is dropped, invalid when out of range.
 KASTARRI_API int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_TRUNC_S(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
-    immediate scale);
-KASTARRI_API unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UTRUNC_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
-    immediate scale);
-KASTARRI_API unsigned int
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UTRUNC_S(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_TRUNC_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     immediate scale);
 
-/// a * 2^(scale mod 16) truncated to 16 bits, otherwise as TRUNC and UTRUNC.
+/// a * 2^(scale mod 32) truncated; the bound of the integer where that is out of range, the upper one for a
+/// NaN. Inexact when a fraction is dropped, invalid when out of range.
+KASTARRI_API unsigned int
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UTRUNC_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    immediate scale);
+
+/// a * 2^(scale mod 32) truncated; the bound of the integer where that is out of range, the upper one for a
+/// NaN. Inexact when a fraction is dropped, invalid when out of range.
+KASTARRI_API unsigned int
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UTRUNC_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    immediate scale);
+
+/// a * 2^(scale mod 16) truncated to 16 bits, otherwise as TRUNC.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_TRUNC16_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
-    immediate scale);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UTRUNC16_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_TRUNC16_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     immediate scale);
 
-/// a rounded to an integer: FIROUND to nearest, ties away from zero, FICEIL up, FIFLOOR down, FITRUNC toward
-/// zero, FIRINT by RoundMode and alone in raising inexact. A zero has the sign of a; a NaN is made quiet, a
+/// a * 2^(scale mod 16) truncated to 16 bits, otherwise as UTRUNC.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_UTRUNC16_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    immediate scale);
+
+/// a rounded to the nearest integer, ties away from zero. A zero has the sign of a; a NaN is made quiet, a
 /// signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_FIROUND_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a);
+
+/// a rounded to the nearest integer, ties away from zero. A zero has the sign of a; a NaN is made quiet, a
+/// signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_FIROUND_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a);
+
+/// a rounded up to an integer. A zero has the sign of a; a NaN is made quiet, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_FICEIL_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a);
+
+/// a rounded up to an integer. A zero has the sign of a; a NaN is made quiet, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_FICEIL_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a);
+
+/// a rounded down to an integer. A zero has the sign of a; a NaN is made quiet, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_FIFLOOR_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a);
+
+/// a rounded down to an integer. A zero has the sign of a; a NaN is made quiet, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_FIFLOOR_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a);
+
+/// a rounded toward zero to an integer. A zero has the sign of a; a NaN is made quiet, a signalling one is
+/// invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_FITRUNC_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a);
+
+/// a rounded toward zero to an integer. A zero has the sign of a; a NaN is made quiet, a signalling one is
+/// invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_FITRUNC_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a);
+
+/// a rounded to an integer by RoundMode; raises inexact, which the like do not. A zero has the sign of a; a
+/// NaN is made quiet, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_FIRINT_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a);
+
+/// a rounded to an integer by RoundMode; raises inexact, which the like do not. A zero has the sign of a; a
+/// NaN is made quiet, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_FIRINT_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a);
 
-/// of a = +-m * 2^e, 1 <= m < 2: +-m (NEXP0), +-m or, for an odd e, +-2m (NEXP01); a zero, infinity or NaN as
-/// it is.
+/// of a = +-m * 2^e, 1 <= m < 2: +-m; a zero, infinity or NaN as it is.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_NEXP0_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a);
+
+/// of a = +-m * 2^e, 1 <= m < 2: +-m; a zero, infinity or NaN as it is.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_NEXP0_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a);
+
+/// of a = +-m * 2^e, 1 <= m < 2: +-m or, for an odd e, +-2m; a zero, infinity or NaN as it is.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_NEXP01_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a);
+
+/// of a = +-m * 2^e, 1 <= m < 2: +-m or, for an odd e, +-2m; a zero, infinity or NaN as it is.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_NEXP01_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a);
 
-/// 2 to the power: e of a less e of b, clamped to the exponents of normal numbers (MKDADJ); half the e of a,
-/// rounded down (MKSADJ). The e of a zero, infinity or NaN is 0.
+/// 2 to the power: e of a less e of b, clamped to the exponents of normal numbers. The e of a zero, infinity
+/// or NaN is 0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MKDADJ_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MKDADJ_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// 2 to the power: e of a less e of b, clamped to the exponents of normal numbers. The e of a zero, infinity
+/// or NaN is 0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MKDADJ_S(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MKDADJ_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+
+/// 2 to the power: half the e of a, rounded down. The e of a zero, infinity or NaN is 0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MKSADJ_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a);
+
+/// 2 to the power: half the e of a, rounded down. The e of a zero, infinity or NaN is 0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MKSADJ_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a);
 
-/// r = r * 2^(e of a): toward zero and without flags (ADDEXP), rounded by RoundMode with flags (ADDEXPM); r
-/// stays when either is zero, infinite or a NaN.
+/// r = r * 2^(e of a): toward zero and without flags; r stays when either is zero, infinite or a NaN.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ADDEXP_H(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ADDEXP_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a);
+
+/// r = r * 2^(e of a): toward zero and without flags; r stays when either is zero, infinite or a NaN.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ADDEXP_S(
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ADDEXPM_H(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ADDEXPM_S(
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ADDEXP_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a);
 
-/// a; r = a where the boolean is true (MOVT), false (MOVF), where the integer is 0 (MOVEQZ), not 0 (MOVNEZ),
-/// at least 0 (MOVGEZ), below 0 (MOVLTZ), and else as it was.
+/// r = r * 2^(e of a): rounded by RoundMode with flags; r stays when either is zero, infinite or a NaN.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ADDEXPM_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a);
+
+/// r = r * 2^(e of a): rounded by RoundMode with flags; r stays when either is zero, infinite or a NaN.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_ADDEXPM_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a);
+
+/// a.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOV_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a);
+
+/// a.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOV_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVT_H(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVT_S(
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVF_H(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVF_S(
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVEQZ_H(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
-    int condition);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVEQZ_S(
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
-    int condition);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVNEZ_H(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
-    int condition);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVNEZ_S(
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
-    int condition);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVGEZ_H(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
-    int condition);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVGEZ_S(
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
-    int condition);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVLTZ_H(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
-    int condition);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVLTZ_S(
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
-    int condition);
 
-/// the bits of a number, a number of the bits; a half is the low 16.
+/// r = a where the boolean is true, else as it was.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVT_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
+
+/// r = a where the boolean is true, else as it was.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVT_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
+
+/// r = a where the boolean is false, else as it was.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVF_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
+
+/// r = a where the boolean is false, else as it was.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVF_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
+
+/// r = a where the integer is 0, else as it was.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVEQZ_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, int condition);
+
+/// r = a where the integer is 0, else as it was.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVEQZ_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, int condition);
+
+/// r = a where the integer is not 0, else as it was.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVNEZ_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, int condition);
+
+/// r = a where the integer is not 0, else as it was.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVNEZ_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, int condition);
+
+/// r = a where the integer is at least 0, else as it was.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVGEZ_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, int condition);
+
+/// r = a where the integer is at least 0, else as it was.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVGEZ_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, int condition);
+
+/// r = a where the integer is below 0, else as it was.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVLTZ_H(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, int condition);
+
+/// r = a where the integer is below 0, else as it was.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_MOVLTZ_S(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, int condition);
+
+/// the bits of a, in the low 16.
 KASTARRI_API unsigned
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_RFR_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a);
+
+/// the bits of a.
 KASTARRI_API unsigned
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_RFR_S(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a);
+
+/// the number whose bits are the low 16.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_WFR_H(unsigned bits);
+
+/// the number of the bits.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_WFR_S(unsigned bits);
 
@@ -471,472 +611,531 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zran_scalarfp_WFR_S(unsigned bits);
    Results are rounded by RoundMode; flags are raised by enabled lanes alone.
    Table: src/float/arithmetic.def */
 
-/// lane i = a[i] + b[i], rounded by RoundMode, with flags. The first NaN operand is the result, made quiet. T
-/// forms keep the destination's lanes whose predicate bit is 0, which raise no flag.
+/// lane i = a[i] + b[i], rounded by RoundMode, with flags. The first NaN operand is the result, made quiet.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDNXF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b);
+
+/// lane i = a[i] + b[i], rounded by RoundMode, with flags. The first NaN operand is the result, made quiet.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDN_2XF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b);
+
+/// lane i = a[i] + b[i], rounded by RoundMode, with flags. The first NaN operand is the result, made quiet.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// lane i = a[i] + b[i], rounded by RoundMode, with flags. The first NaN operand is the result, made quiet.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+
+/// lane i = a[i] + b[i], rounded by RoundMode, with flags. The first NaN operand is the result, made quiet.
+/// Where predicate bit i is 0, r keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDNXF16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDNXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// lane i = a[i] + b[i], rounded by RoundMode, with flags. The first NaN operand is the result, made quiet.
+/// Where predicate bit i is 0, r keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDN_2XF32T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDN_2XF32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// lane i = a[i] + b[i], rounded by RoundMode, with flags. The first NaN operand is the result, made quiet.
+/// Where predicate bit i is 0, r keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDF16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDF32T(
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
-/// lane i = a[i] - b[i], otherwise as ADD. T forms keep the destination's lanes whose predicate bit is 0,
-/// which raise no flag.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBNXF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBN_2XF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+/// lane i = a[i] + b[i], rounded by RoundMode, with flags. The first NaN operand is the result, made quiet.
+/// Where predicate bit i is 0, r keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBNXF16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBN_2XF32T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBF16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBF32T(
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDF32T(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
-/// lane i = a[i] * b[i], otherwise as ADD. T forms keep the destination's lanes whose predicate bit is 0,
-/// which raise no flag.
+/// lane i = a[i] - b[i], otherwise as ADD.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULNXF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b);
+
+/// lane i = a[i] - b[i], otherwise as ADD.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULN_2XF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b);
+
+/// lane i = a[i] - b[i], otherwise as ADD.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// lane i = a[i] - b[i], otherwise as ADD.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+
+/// lane i = a[i] - b[i], otherwise as ADD. Where predicate bit i is 0, r keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULNXF16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBNXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// lane i = a[i] - b[i], otherwise as ADD. Where predicate bit i is 0, r keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULN_2XF32T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBN_2XF32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// lane i = a[i] - b[i], otherwise as ADD. Where predicate bit i is 0, r keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULF16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+
+/// lane i = a[i] - b[i], otherwise as ADD. Where predicate bit i is 0, r keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULF32T(
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBF32T(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+
+/// lane i = a[i] * b[i], otherwise as ADD.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b);
+
+/// lane i = a[i] * b[i], otherwise as ADD.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b);
+
+/// lane i = a[i] * b[i], otherwise as ADD.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// lane i = a[i] * b[i], otherwise as ADD.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+
+/// lane i = a[i] * b[i], otherwise as ADD. Where predicate bit i is 0, r keeps lane i and raises no flag.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULNXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// lane i = a[i] * b[i], otherwise as ADD. Where predicate bit i is 0, r keeps lane i and raises no flag.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULN_2XF32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// lane i = a[i] * b[i], otherwise as ADD. Where predicate bit i is 0, r keeps lane i and raises no flag.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+
+/// lane i = a[i] * b[i], otherwise as ADD. Where predicate bit i is 0, r keeps lane i and raises no flag.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULF32T(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i of acc = acc[i] + a[i] * b[i], rounded once, by RoundMode, with flags. Of several NaNs, a[i] goes
-/// before b[i], b[i] before acc[i]. T forms keep the destination's lanes whose predicate bit is 0, which
-/// raise no flag.
+/// before b[i], b[i] before acc[i].
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANXF16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANXF16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b);
+
+/// lane i of acc = acc[i] + a[i] * b[i], rounded once, by RoundMode, with flags. Of several NaNs, a[i] goes
+/// before b[i], b[i] before acc[i].
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAN_2XF32(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAN_2XF32(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b);
+
+/// lane i of acc = acc[i] + a[i] * b[i], rounded once, by RoundMode, with flags. Of several NaNs, a[i] goes
+/// before b[i], b[i] before acc[i].
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAF16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAF16(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// lane i of acc = acc[i] + a[i] * b[i], rounded once, by RoundMode, with flags. Of several NaNs, a[i] goes
+/// before b[i], b[i] before acc[i].
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAF32(
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAF32(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+
+/// lane i of acc = acc[i] + a[i] * b[i], rounded once, by RoundMode, with flags. Of several NaNs, a[i] goes
+/// before b[i], b[i] before acc[i]. Where predicate bit i is 0, acc keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANXF16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// lane i of acc = acc[i] + a[i] * b[i], rounded once, by RoundMode, with flags. Of several NaNs, a[i] goes
+/// before b[i], b[i] before acc[i]. Where predicate bit i is 0, acc keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAN_2XF32T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAN_2XF32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// lane i of acc = acc[i] + a[i] * b[i], rounded once, by RoundMode, with flags. Of several NaNs, a[i] goes
+/// before b[i], b[i] before acc[i]. Where predicate bit i is 0, acc keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAF16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAF32T(
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
-/// lane i of acc = acc[i] - a[i] * b[i], otherwise as MULA. T forms keep the destination's lanes whose
-/// predicate bit is 0, which raise no flag.
+/// lane i of acc = acc[i] + a[i] * b[i], rounded once, by RoundMode, with flags. Of several NaNs, a[i] goes
+/// before b[i], b[i] before acc[i]. Where predicate bit i is 0, acc keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSNXF16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSN_2XF32(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSF16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSF32(
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSNXF16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSN_2XF32T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSF16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSF32T(
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAF32T(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
-/// lane i = a[i] without its sign: bits only, NaNs too. T forms keep the destination's lanes whose predicate
-/// bit is 0, which raise no flag.
+/// lane i of acc = acc[i] - a[i] * b[i], otherwise as MULA.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSNXF16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b);
+
+/// lane i of acc = acc[i] - a[i] * b[i], otherwise as MULA.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSN_2XF32(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b);
+
+/// lane i of acc = acc[i] - a[i] * b[i], otherwise as MULA.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSF16(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// lane i of acc = acc[i] - a[i] * b[i], otherwise as MULA.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSF32(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+
+/// lane i of acc = acc[i] - a[i] * b[i], otherwise as MULA. Where predicate bit i is 0, acc keeps lane i and
+/// raises no flag.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSNXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// lane i of acc = acc[i] - a[i] * b[i], otherwise as MULA. Where predicate bit i is 0, acc keeps lane i and
+/// raises no flag.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSN_2XF32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// lane i of acc = acc[i] - a[i] * b[i], otherwise as MULA. Where predicate bit i is 0, acc keeps lane i and
+/// raises no flag.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+
+/// lane i of acc = acc[i] - a[i] * b[i], otherwise as MULA. Where predicate bit i is 0, acc keeps lane i and
+/// raises no flag.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSF32T(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+
+/// lane i = a[i] without its sign: bits only, NaNs too.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a);
+
+/// lane i = a[i] without its sign: bits only, NaNs too.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a);
+
+/// lane i = a[i] without its sign: bits only, NaNs too.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a);
+
+/// lane i = a[i] without its sign: bits only, NaNs too.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSNXF16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSN_2XF32T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSF16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSF32T(
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
-/// lane i = a[i] with its sign turned: bits only, NaNs too. T forms keep the destination's lanes whose
-/// predicate bit is 0, which raise no flag.
+/// lane i = a[i] without its sign: bits only, NaNs too. Where predicate bit i is 0, r keeps lane i and raises
+/// no flag.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSNXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// lane i = a[i] without its sign: bits only, NaNs too. Where predicate bit i is 0, r keeps lane i and raises
+/// no flag.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSN_2XF32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// lane i = a[i] without its sign: bits only, NaNs too. Where predicate bit i is 0, r keeps lane i and raises
+/// no flag.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+
+/// lane i = a[i] without its sign: bits only, NaNs too. Where predicate bit i is 0, r keeps lane i and raises
+/// no flag.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSF32T(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+
+/// lane i = a[i] with its sign turned: bits only, NaNs too.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a);
+
+/// lane i = a[i] with its sign turned: bits only, NaNs too.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a);
+
+/// lane i = a[i] with its sign turned: bits only, NaNs too.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a);
+
+/// lane i = a[i] with its sign turned: bits only, NaNs too.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a);
+
+/// lane i = a[i] with its sign turned: bits only, NaNs too. Where predicate bit i is 0, r keeps lane i and
+/// raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGNXF16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGNXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// lane i = a[i] with its sign turned: bits only, NaNs too. Where predicate bit i is 0, r keeps lane i and
+/// raises no flag.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGN_2XF32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// lane i = a[i] with its sign turned: bits only, NaNs too. Where predicate bit i is 0, r keeps lane i and
+/// raises no flag.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+
+/// lane i = a[i] with its sign turned: bits only, NaNs too. Where predicate bit i is 0, r keeps lane i and
+/// raises no flag.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGF32T(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+
+/// lane i = the smaller of a[i] and b[i]; -0 is below +0, a NaN is the result.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b);
+
+/// lane i = the smaller of a[i] and b[i]; -0 is below +0, a NaN is the result.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b);
+
+/// lane i = the smaller of a[i] and b[i]; -0 is below +0, a NaN is the result.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// lane i = the smaller of a[i] and b[i]; -0 is below +0, a NaN is the result.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+
+/// lane i = the smaller of a[i] and b[i]; -0 is below +0, a NaN is the result. Where predicate bit i is 0, r
+/// keeps lane i and raises no flag.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// lane i = the smaller of a[i] and b[i]; -0 is below +0, a NaN is the result. Where predicate bit i is 0, r
+/// keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGN_2XF32T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINN_2XF32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// lane i = the smaller of a[i] and b[i]; -0 is below +0, a NaN is the result. Where predicate bit i is 0, r
+/// keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGF16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGF32T(
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
-/// lane i = the smaller of a[i] and b[i]; -0 is below +0, a NaN is the result. T forms keep the destination's
-/// lanes whose predicate bit is 0, which raise no flag.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNXF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINN_2XF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+/// lane i = the smaller of a[i] and b[i]; -0 is below +0, a NaN is the result. Where predicate bit i is 0, r
+/// keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNXF16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINN_2XF32T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINF16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINF32T(
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINF32T(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
-/// lane i = the larger of a[i] and b[i]; -0 is below +0, a NaN is the result. T forms keep the destination's
-/// lanes whose predicate bit is 0, which raise no flag.
+/// lane i = the larger of a[i] and b[i]; -0 is below +0, a NaN is the result.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNXF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b);
+
+/// lane i = the larger of a[i] and b[i]; -0 is below +0, a NaN is the result.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXN_2XF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b);
+
+/// lane i = the larger of a[i] and b[i]; -0 is below +0, a NaN is the result.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// lane i = the larger of a[i] and b[i]; -0 is below +0, a NaN is the result.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+
+/// lane i = the larger of a[i] and b[i]; -0 is below +0, a NaN is the result. Where predicate bit i is 0, r
+/// keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNXF16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// lane i = the larger of a[i] and b[i]; -0 is below +0, a NaN is the result. Where predicate bit i is 0, r
+/// keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXN_2XF32T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXN_2XF32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// lane i = the larger of a[i] and b[i]; -0 is below +0, a NaN is the result. Where predicate bit i is 0, r
+/// keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXF16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXF32T(
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
-/// lane i = the smaller of a[i] and b[i]; -0 is below +0, a number wins over a NaN. T forms keep the
-/// destination's lanes whose predicate bit is 0, which raise no flag.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMNXF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMN_2XF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+/// lane i = the larger of a[i] and b[i]; -0 is below +0, a NaN is the result. Where predicate bit i is 0, r
+/// keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMNXF16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMN_2XF32T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMF16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMF32T(
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXF32T(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
-/// lane i = the larger of a[i] and b[i]; -0 is below +0, a number wins over a NaN. T forms keep the
-/// destination's lanes whose predicate bit is 0, which raise no flag.
+/// lane i = the smaller of a[i] and b[i]; -0 is below +0, a number wins over a NaN.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMNXF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b);
+
+/// lane i = the smaller of a[i] and b[i]; -0 is below +0, a number wins over a NaN.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMN_2XF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b);
+
+/// lane i = the smaller of a[i] and b[i]; -0 is below +0, a number wins over a NaN.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// lane i = the smaller of a[i] and b[i]; -0 is below +0, a number wins over a NaN.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+
+/// lane i = the smaller of a[i] and b[i]; -0 is below +0, a number wins over a NaN. Where predicate bit i is
+/// 0, r keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMNXF16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMNXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// lane i = the smaller of a[i] and b[i]; -0 is below +0, a number wins over a NaN. Where predicate bit i is
+/// 0, r keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMN_2XF32T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMN_2XF32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// lane i = the smaller of a[i] and b[i]; -0 is below +0, a number wins over a NaN. Where predicate bit i is
+/// 0, r keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMF16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+
+/// lane i = the smaller of a[i] and b[i]; -0 is below +0, a number wins over a NaN. Where predicate bit i is
+/// 0, r keeps lane i and raises no flag.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMF32T(
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNUMF32T(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+
+/// lane i = the larger of a[i] and b[i]; -0 is below +0, a number wins over a NaN.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b);
+
+/// lane i = the larger of a[i] and b[i]; -0 is below +0, a number wins over a NaN.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b);
+
+/// lane i = the larger of a[i] and b[i]; -0 is below +0, a number wins over a NaN.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// lane i = the larger of a[i] and b[i]; -0 is below +0, a number wins over a NaN.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
+
+/// lane i = the larger of a[i] and b[i]; -0 is below +0, a number wins over a NaN. Where predicate bit i is
+/// 0, r keeps lane i and raises no flag.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMNXF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// lane i = the larger of a[i] and b[i]; -0 is below +0, a number wins over a NaN. Where predicate bit i is
+/// 0, r keeps lane i and raises no flag.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMN_2XF32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// lane i = the larger of a[i] and b[i]; -0 is below +0, a number wins over a NaN. Where predicate bit i is
+/// 0, r keeps lane i and raises no flag.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMF16T(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+
+/// lane i = the larger of a[i] and b[i]; -0 is below +0, a number wins over a NaN. Where predicate bit i is
+/// 0, r keeps lane i and raises no flag.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNUMF32T(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a, const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// one bit for the class of a[i]: bits 0-4 -infinity, -normal, -subnormal, -0, +0; bits 5-7 +subnormal,
 /// +normal, +infinity; bit 8 signalling NaN, bit 9 quiet NaN.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CLSFYNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& acc);
+
+/// one bit for the class of a[i]: bits 0-4 -infinity, -normal, -subnormal, -0, +0; bits 5-7 +subnormal,
+/// +normal, +infinity; bit 8 signalling NaN, bit 9 quiet NaN.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CLSFYN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& acc);
+
+/// one bit for the class of a[i]: bits 0-4 -infinity, -normal, -subnormal, -0, +0; bits 5-7 +subnormal,
+/// +normal, +infinity; bit 8 signalling NaN, bit 9 quiet NaN.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CLSFYF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc);
+
+/// one bit for the class of a[i]: bits 0-4 -infinity, -normal, -subnormal, -0, +0; bits 5-7 +subnormal,
+/// +normal, +infinity; bit 8 signalling NaN, bit 9 quiet NaN.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CLSFYF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc);
 
@@ -944,10 +1143,19 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CLSFYF32(const cstub_Km_ZNB_Orbis_R5
 /// sqrt 2, rounded to nearest.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CONSTNXF16(immediate number);
+
+/// every lane = constant number mod 16: 0, 1, 2, 0.5, 3, 4, 0.25, 10, 0.1, pi, pi/2, 1/pi, e, ln 2, log2 e,
+/// sqrt 2, rounded to nearest.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CONSTN_2XF32(immediate number);
+
+/// every lane = constant number mod 16: 0, 1, 2, 0.5, 3, 4, 0.25, 10, 0.1, pi, pi/2, 1/pi, e, ln 2, log2 e,
+/// sqrt 2, rounded to nearest.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CONSTF16(immediate number);
+
+/// every lane = constant number mod 16: 0, 1, 2, 0.5, 3, 4, 0.25, 10, 0.1, pi, pi/2, 1/pi, e, ln 2, log2 e,
+/// sqrt 2, rounded to nearest.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CONSTF32(immediate number);
 
@@ -955,40 +1163,67 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CONSTF32(immediate number);
 /// made quiet, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FIROUNDNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a);
+
+/// lane i = a[i] rounded to the nearest integer, ties away from zero. A zero has the sign of a[i]; a NaN is
+/// made quiet, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FIROUNDN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a);
+
+/// lane i = a[i] rounded to the nearest integer, ties away from zero. A zero has the sign of a[i]; a NaN is
+/// made quiet, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FIROUNDF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a);
+
+/// lane i = a[i] rounded to the nearest integer, ties away from zero. A zero has the sign of a[i]; a NaN is
+/// made quiet, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FIROUNDF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a);
 
 /// lane i = a[i] rounded up to an integer, otherwise as FIROUND.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FICEILNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a);
+
+/// lane i = a[i] rounded up to an integer, otherwise as FIROUND.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FICEILN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a);
+
+/// lane i = a[i] rounded up to an integer, otherwise as FIROUND.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FICEILF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a);
+
+/// lane i = a[i] rounded up to an integer, otherwise as FIROUND.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FICEILF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a);
 
 /// lane i = a[i] rounded down to an integer, otherwise as FIROUND.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FIFLOORNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a);
+
+/// lane i = a[i] rounded down to an integer, otherwise as FIROUND.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FIFLOORN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a);
+
+/// lane i = a[i] rounded down to an integer, otherwise as FIROUND.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FIFLOORF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a);
+
+/// lane i = a[i] rounded down to an integer, otherwise as FIROUND.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FIFLOORF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a);
 
 /// lane i = a[i] rounded toward zero to an integer, otherwise as FIROUND.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FITRUNCNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a);
+
+/// lane i = a[i] rounded toward zero to an integer, otherwise as FIROUND.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FITRUNCN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a);
+
+/// lane i = a[i] rounded toward zero to an integer, otherwise as FIROUND.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FITRUNCF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a);
+
+/// lane i = a[i] rounded toward zero to an integer, otherwise as FIROUND.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FITRUNCF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a);
 
@@ -996,10 +1231,19 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FITRUNCF32(const cstub_Km_ZNB_Orbis_
 /// do not.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FIRINTNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a);
+
+/// lane i = a[i] rounded to an integer by RoundMode, otherwise as FIROUND; raises inexact, which the others
+/// do not.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FIRINTN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a);
+
+/// lane i = a[i] rounded to an integer by RoundMode, otherwise as FIROUND; raises inexact, which the others
+/// do not.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FIRINTF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a);
+
+/// lane i = a[i] rounded to an integer by RoundMode, otherwise as FIROUND; raises inexact, which the others
+/// do not.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FIRINTF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a);
 
@@ -1009,218 +1253,242 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FIRINTF32(const cstub_Km_ZNB_Orbis_R
 
 /// bit i = 1 when a[i] == b[i]; 0 for a NaN, a signalling one is invalid. -0 equals +0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OEQNXF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OEQNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b);
+
+/// bit i = 1 when a[i] == b[i]; 0 for a NaN, a signalling one is invalid. -0 equals +0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OEQN_2XF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OEQN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b);
+
+/// bit i = 1 when a[i] == b[i]; 0 for a NaN, a signalling one is invalid. -0 equals +0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OEQF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OEQF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// bit i = 1 when a[i] == b[i]; 0 for a NaN, a signalling one is invalid. -0 equals +0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OEQF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OEQF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// bit i = 1 when a[i] < b[i]; 0 for a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLTNXF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLTNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b);
+
+/// bit i = 1 when a[i] < b[i]; 0 for a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLTN_2XF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLTN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b);
+
+/// bit i = 1 when a[i] < b[i]; 0 for a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLTF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLTF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// bit i = 1 when a[i] < b[i]; 0 for a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLTF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLTF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// bit i = 1 when a[i] <= b[i]; 0 for a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLENXF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLENXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b);
+
+/// bit i = 1 when a[i] <= b[i]; 0 for a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLEN_2XF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLEN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b);
+
+/// bit i = 1 when a[i] <= b[i]; 0 for a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLEF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLEF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// bit i = 1 when a[i] <= b[i]; 0 for a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLEF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OLEF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// bit i = 1 when a[i] > b[i]; 0 for a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGTNXF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGTNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b);
+
+/// bit i = 1 when a[i] > b[i]; 0 for a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGTN_2XF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGTN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b);
+
+/// bit i = 1 when a[i] > b[i]; 0 for a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGTF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGTF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// bit i = 1 when a[i] > b[i]; 0 for a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGTF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGTF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// bit i = 1 when a[i] >= b[i]; 0 for a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGENXF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGENXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b);
+
+/// bit i = 1 when a[i] >= b[i]; 0 for a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGEN_2XF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGEN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b);
+
+/// bit i = 1 when a[i] >= b[i]; 0 for a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGEF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGEF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// bit i = 1 when a[i] >= b[i]; 0 for a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGEF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OGEF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// bit i = 1 when a[i] == b[i] or either is a NaN, a signalling one is invalid. -0 equals +0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UEQNXF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UEQNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b);
+
+/// bit i = 1 when a[i] == b[i] or either is a NaN, a signalling one is invalid. -0 equals +0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UEQN_2XF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UEQN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b);
+
+/// bit i = 1 when a[i] == b[i] or either is a NaN, a signalling one is invalid. -0 equals +0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UEQF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UEQF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// bit i = 1 when a[i] == b[i] or either is a NaN, a signalling one is invalid. -0 equals +0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UEQF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UEQF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// bit i = 1 when a[i] < b[i] or either is a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTNXF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b);
+
+/// bit i = 1 when a[i] < b[i] or either is a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTN_2XF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b);
+
+/// bit i = 1 when a[i] < b[i] or either is a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// bit i = 1 when a[i] < b[i] or either is a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// bit i = 1 when a[i] <= b[i] or either is a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULENXF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULENXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b);
+
+/// bit i = 1 when a[i] <= b[i] or either is a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULEN_2XF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULEN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b);
+
+/// bit i = 1 when a[i] <= b[i] or either is a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULEF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULEF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// bit i = 1 when a[i] <= b[i] or either is a NaN, which is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULEF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULEF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// bit i = 1 when a[i] or b[i] is a NaN, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNNXF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b);
+
+/// bit i = 1 when a[i] or b[i] is a NaN, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNN_2XF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b);
+
+/// bit i = 1 when a[i] or b[i] is a NaN, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// bit i = 1 when a[i] or b[i] is a NaN, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// bit i = 1 when a[i] <= b[i] or either is a NaN, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULEQNXF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULEQNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b);
+
+/// bit i = 1 when a[i] <= b[i] or either is a NaN, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULEQN_2XF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULEQN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b);
+
+/// bit i = 1 when a[i] <= b[i] or either is a NaN, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULEQF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULEQF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// bit i = 1 when a[i] <= b[i] or either is a NaN, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULEQF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULEQF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// bit i = 1 when a[i] < b[i] or either is a NaN, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTQNXF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTQNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b);
+
+/// bit i = 1 when a[i] < b[i] or either is a NaN, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTQN_2XF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTQN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b);
+
+/// bit i = 1 when a[i] < b[i] or either is a NaN, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTQF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTQF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// bit i = 1 when a[i] < b[i] or either is a NaN, a signalling one is invalid.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTQF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ULTQF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /// bit i = 1 when a[i] != b[i] or either is a NaN, a signalling one is invalid. -0 equals +0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNEQNXF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNEQNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& b);
+
+/// bit i = 1 when a[i] != b[i] or either is a NaN, a signalling one is invalid. -0 equals +0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNEQN_2XF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNEQN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& b);
+
+/// bit i = 1 when a[i] != b[i] or either is a NaN, a signalling one is invalid. -0 equals +0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNEQF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNEQF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& b);
+
+/// bit i = 1 when a[i] != b[i] or either is a NaN, a signalling one is invalid. -0 equals +0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNEQF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNEQF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& b);
 
 /* Conversions between integers and floating point, with a scale, and between the formats.
@@ -1228,161 +1496,177 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UNEQF32(
 
 /// lane i = a[i] / 2^(scale mod 32), rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FLOATN_2X32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FLOATN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     immediate scale);
+
+/// lane i = a[i] / 2^(scale mod 32), rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UFLOATN_2X32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UFLOATN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
     immediate scale);
 
 /// lane i = a[i] / 2^(scale mod 16), rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FLOATNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_FLOATNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     immediate scale);
+
+/// lane i = a[i] / 2^(scale mod 16), rounded by RoundMode, with flags.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UFLOATNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UFLOATNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     immediate scale);
 
 /// lane i = a[i] * 2^(scale mod 32) truncated; the bound of the integer where that is out of range, the upper
 /// one for a NaN. Inexact when a fraction is dropped, invalid when out of range.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_TRUNCN_2XF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_TRUNCN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
     immediate scale);
+
+/// lane i = a[i] * 2^(scale mod 32) truncated; the bound of the integer where that is out of range, the upper
+/// one for a NaN. Inexact when a fraction is dropped, invalid when out of range.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UTRUNCN_2XF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UTRUNCN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& a,
     immediate scale);
 
 /// lane i = a[i] * 2^(scale mod 16) truncated to 16 bits, otherwise as TRUNCN_2XF32.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_TRUNCNXF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_TRUNCNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
     immediate scale);
+
+/// lane i = a[i] * 2^(scale mod 16) truncated to 16 bits, otherwise as TRUNCN_2XF32.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UTRUNCNXF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_UTRUNCNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& a,
     immediate scale);
 
 /// a in the other format, rounded by RoundMode, with flags. A NaN is made quiet and keeps the top of its
 /// fraction.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CVTF16F32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat& acc);
+
+/// a in the other format, rounded by RoundMode, with flags. A NaN is made quiet and keeps the top of its
+/// fraction.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CVTF32F16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16& acc);
 
-/// lane i = half lane 2i (_0) or 2i + 1 (_1) of a in single precision.
+/// lane i = half lane 2i of a in single precision.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CVTF32NXF16_0(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& acc);
+
+/// lane i = half lane 2i + 1 of a in single precision.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CVTF32NXF16_1(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& acc);
 
-/// half lane 2i (_0) or 2i + 1 (_1) = a[i] rounded by RoundMode, with flags; the other halves 0.
+/// half lane 2i = a[i] rounded by RoundMode, with flags; the other halves 0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CVTF16N_2XF32_0(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& acc);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CVTF16N_2XF32_0(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& acc);
+
+/// half lane 2i + 1 = a[i] rounded by RoundMode, with flags; the other halves 0.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CVTF16N_2XF32_1(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& acc);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_CVTF16N_2XF32_1(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& acc);
 
 /* Loads and stores of singles that are halves in memory, at any byte address.
    Table: src/float/memory.def */
 
-/// lane i = the half in memory in single precision; a signalling NaN becomes quiet and is invalid.
+/// loads: lane i = the half in memory in single precision; a signalling NaN becomes quiet and is invalid. The
+/// address is base + offset bytes.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base,
     int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer,
-    int increment);
 
-/// lane i = the half in memory in single precision where predicate bit i is 1, else 0 and no flag; all 32
-/// bytes are read.
+/// loads: lane i = the half in memory in single precision; a signalling NaN becomes quiet and is invalid. The
+/// address is base + offset bytes.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16T_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base,
-    int offset,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base,
+    int offset);
+
+/// loads: lane i = the half in memory in single precision; a signalling NaN becomes quiet and is invalid. The
+/// address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer, int increment);
+
+/// loads: lane i = the half in memory in single precision; a signalling NaN becomes quiet and is invalid. The
+/// address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer, int increment);
+
+/// loads: lane i = the half in memory in single precision where predicate bit i is 1, else 0 and no flag; all
+/// 32 bytes are read. The address is base + offset bytes.
 KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16T_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base,
-    int offset,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16T_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base,
+    int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// loads: lane i = the half in memory in single precision where predicate bit i is 1, else 0 and no flag; all
+/// 32 bytes are read. The address is base + offset bytes.
+KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16T_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base,
+    int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// loads: lane i = the half in memory in single precision where predicate bit i is 1, else 0 and no flag; all
+/// 32 bytes are read. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16T_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer,
-    int increment,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16T_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer,
-    int increment,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16T_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
-/// writes the lanes as halves, rounded by RoundMode, with flags.
+/// loads: lane i = the half in memory in single precision where predicate bit i is 1, else 0 and no flag; all
+/// 32 bytes are read. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF16_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base,
-    int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF16T_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer, int increment,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// writes the lanes as halves, rounded by RoundMode, with flags. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF16_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base,
-    int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF16_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base, int offset);
+
+/// writes the lanes as halves, rounded by RoundMode, with flags. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF16_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF16_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base, int offset);
+
+/// writes the lanes as halves, rounded by RoundMode, with flags. The address is the pointer, which then moves
+/// by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF16_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF16_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer, int increment);
+
+/// writes the lanes as halves, rounded by RoundMode, with flags. The address is the pointer, which then moves
+/// by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF16_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer, int increment);
 
 /// writes the lanes whose predicate bit is 1 as halves, rounded by RoundMode, with their flags alone, and
-/// leaves the others in memory as they are; memory is not touched when every bit is 0.
+/// leaves the others in memory as they are; memory is not touched when every bit is 0. The address is base +
+/// offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF16T_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base,
-    int offset,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF16T_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base, int offset,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// writes the lanes whose predicate bit is 1 as halves, rounded by RoundMode, with their flags alone, and
+/// leaves the others in memory as they are; memory is not touched when every bit is 0. The address is base +
+/// offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF16T_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base,
-    int offset,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF16T_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16* base, int offset,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// writes the lanes whose predicate bit is 1 as halves, rounded by RoundMode, with their flags alone, and
+/// leaves the others in memory as they are; memory is not touched when every bit is 0. The address is the
+/// pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF16T_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer,
-    int increment,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF16T_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// writes the lanes whose predicate bit is 1 as halves, rounded by RoundMode, with their flags alone, and
+/// leaves the others in memory as they are; memory is not touched when every bit is 0. The address is the
+/// pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF16T_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer,
-    int increment,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF16T_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 #endif

@@ -9,924 +9,1072 @@
 /* Addition, subtraction, negation, absolute values.
    Table: src/integer/arithmetic.def */
 
-/// lane i = a[i] + b[i], modulo 2^w. T forms keep the destination's lanes whose predicate bit is 0.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
+/// lane i = a[i] + b[i], modulo 2^8.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+
+/// lane i = a[i] + b[i], modulo 2^8.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
+
+/// lane i = a[i] + b[i], modulo 2^8. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD8T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD8T(cstub_Km_ZNB_Orbis_R5_64k_qv_int8& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+
+/// lane i = a[i] + b[i], modulo 2^8. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD8UT(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD8UT(cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+
+/// lane i = a[i] + b[i], modulo 2^16.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+
+/// lane i = a[i] + b[i], modulo 2^16.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
+
+/// lane i = a[i] + b[i], modulo 2^16. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD16T(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+
+/// lane i = a[i] + b[i], modulo 2^16. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD16UT(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD16UT(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+
+/// lane i = a[i] + b[i], modulo 2^32.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+
+/// lane i = a[i] + b[i], modulo 2^32.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
+
+/// lane i = a[i] + b[i], modulo 2^32. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD32T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD32T(cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+
+/// lane i = a[i] + b[i], modulo 2^32. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD32UT(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD32UT(cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+
+/// lane i = a[i] + b[i], modulo 2^8.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD2NX8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+
+/// lane i = a[i] + b[i], modulo 2^8.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
+
+/// lane i = a[i] + b[i], modulo 2^8. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD2NX8T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD2NX8T(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+
+/// lane i = a[i] + b[i], modulo 2^8. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD2NX8UT(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADD2NX8UT(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// lane i = a[i] + b[i], modulo 2^16.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDNX16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+
+/// lane i = a[i] + b[i], modulo 2^16.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
+
+/// lane i = a[i] + b[i], modulo 2^16. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDNX16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDNX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// lane i = a[i] + b[i], modulo 2^16. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDNX16UT(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDNX16UT(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDN_2X32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+
+/// lane i = a[i] + b[i], modulo 2^32.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDN_2X32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+
+/// lane i = a[i] + b[i], modulo 2^32.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
+
+/// lane i = a[i] + b[i], modulo 2^32. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDN_2X32T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDN_2X32UT(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDN_2X32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
-/// lane i = a[i] - b[i], modulo 2^w. T forms keep the destination's lanes whose predicate bit is 0.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
+/// lane i = a[i] + b[i], modulo 2^32. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB8T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB8UT(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB16UT(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB32T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB32UT(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB2NX8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB2NX8T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB2NX8UT(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBNX16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBNX16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBNX16UT(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBN_2X32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBN_2X32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBN_2X32T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBN_2X32UT(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDN_2X32UT(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
-/// lane i = -a[i], modulo 2^w: the most negative value is its own negative. T forms keep the destination's
-/// lanes whose predicate bit is 0.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+/// lane i = a[i] - b[i], modulo 2^8.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
+
+/// lane i = a[i] - b[i], modulo 2^8.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
+
+/// lane i = a[i] - b[i], modulo 2^8. Where predicate bit i is 0, r keeps lane i.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB8T(cstub_Km_ZNB_Orbis_R5_64k_qv_int8& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+
+/// lane i = a[i] - b[i], modulo 2^8. Where predicate bit i is 0, r keeps lane i.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB8UT(cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+
+/// lane i = a[i] - b[i], modulo 2^16.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+
+/// lane i = a[i] - b[i], modulo 2^16.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
+
+/// lane i = a[i] - b[i], modulo 2^16. Where predicate bit i is 0, r keeps lane i.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB16T(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+
+/// lane i = a[i] - b[i], modulo 2^16. Where predicate bit i is 0, r keeps lane i.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB16UT(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+
+/// lane i = a[i] - b[i], modulo 2^32.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
+
+/// lane i = a[i] - b[i], modulo 2^32.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
+
+/// lane i = a[i] - b[i], modulo 2^32. Where predicate bit i is 0, r keeps lane i.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB32T(cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+
+/// lane i = a[i] - b[i], modulo 2^32. Where predicate bit i is 0, r keeps lane i.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB32UT(cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+
+/// lane i = a[i] - b[i], modulo 2^8.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+
+/// lane i = a[i] - b[i], modulo 2^8.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
+
+/// lane i = a[i] - b[i], modulo 2^8. Where predicate bit i is 0, r keeps lane i.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB2NX8T(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+
+/// lane i = a[i] - b[i], modulo 2^8. Where predicate bit i is 0, r keeps lane i.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUB2NX8UT(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+
+/// lane i = a[i] - b[i], modulo 2^16.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+
+/// lane i = a[i] - b[i], modulo 2^16.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
+
+/// lane i = a[i] - b[i], modulo 2^16. Where predicate bit i is 0, r keeps lane i.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBNX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// lane i = a[i] - b[i], modulo 2^16. Where predicate bit i is 0, r keeps lane i.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBNX16UT(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// lane i = a[i] - b[i], modulo 2^32.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
+
+/// lane i = a[i] - b[i], modulo 2^32.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
+
+/// lane i = a[i] - b[i], modulo 2^32. Where predicate bit i is 0, r keeps lane i.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBN_2X32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// lane i = a[i] - b[i], modulo 2^32. Where predicate bit i is 0, r keeps lane i.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBN_2X32UT(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// lane i = -a[i], modulo 2^8: the most negative value is its own negative.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEG8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+
+/// lane i = -a[i], modulo 2^8: the most negative value is its own negative.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEG8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+
+/// lane i = -a[i], modulo 2^16: the most negative value is its own negative.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEG16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+
+/// lane i = -a[i], modulo 2^16: the most negative value is its own negative.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEG16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a);
+
+/// lane i = -a[i], modulo 2^16: the most negative value is its own negative. Where predicate bit i is 0, r
+/// keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEG16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEG16T(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+
+/// lane i = -a[i], modulo 2^16: the most negative value is its own negative. Where predicate bit i is 0, r
+/// keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEG16UT(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEG16UT(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+
+/// lane i = -a[i], modulo 2^32: the most negative value is its own negative.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEG32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+
+/// lane i = -a[i], modulo 2^32: the most negative value is its own negative.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEG32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+
+/// lane i = -a[i], modulo 2^8: the most negative value is its own negative.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEG2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+
+/// lane i = -a[i], modulo 2^8: the most negative value is its own negative.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEG2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+
+/// lane i = -a[i], modulo 2^16: the most negative value is its own negative.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+
+/// lane i = -a[i], modulo 2^16: the most negative value is its own negative.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
+
+/// lane i = -a[i], modulo 2^16: the most negative value is its own negative. Where predicate bit i is 0, r
+/// keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGNX16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGNX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// lane i = -a[i], modulo 2^16: the most negative value is its own negative. Where predicate bit i is 0, r
+/// keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGNX16UT(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGNX16UT(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// lane i = -a[i], modulo 2^32: the most negative value is its own negative.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+
+/// lane i = -a[i], modulo 2^32: the most negative value is its own negative.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
 
-/// lane i = a[i] + b[i], clamped to the signed range of the lane. T forms keep the destination's lanes whose
-/// predicate bit is 0.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDS16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+/// lane i = a[i] + b[i], clamped to the signed range of the lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDS16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+
+/// lane i = a[i] + b[i], clamped to the signed range of the lane. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDS16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDS16T(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDSNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// lane i = a[i] + b[i], clamped to the signed range of the lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDSNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+
+/// lane i = a[i] + b[i], clamped to the signed range of the lane. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDSNX16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDSNX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
-/// lane i = a[i] - b[i], clamped to the signed range of the lane. T forms keep the destination's lanes whose
-/// predicate bit is 0.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBS16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+/// lane i = a[i] - b[i], clamped to the signed range of the lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBS16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+
+/// lane i = a[i] - b[i], clamped to the signed range of the lane. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBS16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBS16T(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBSNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// lane i = a[i] - b[i], clamped to the signed range of the lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBSNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+
+/// lane i = a[i] - b[i], clamped to the signed range of the lane. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBSNX16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBSNX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
-/// lane i = -a[i], clamped to the signed range of the lane: the most negative value gives the largest one. T
-/// forms keep the destination's lanes whose predicate bit is 0.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+/// lane i = -a[i], clamped to the signed range of the lane: the most negative value gives the largest one.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGS16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGS16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGSNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGSNX16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
-/// lane i = |a[i]|, modulo 2^w: the most negative value stays as it is.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+/// lane i = -a[i], clamped to the signed range of the lane: the most negative value gives the largest one.
+/// Where predicate bit i is 0, r keeps lane i.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGS16T(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+
+/// lane i = -a[i], clamped to the signed range of the lane: the most negative value gives the largest one.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGSNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
+
+/// lane i = -a[i], clamped to the signed range of the lane: the most negative value gives the largest one.
+/// Where predicate bit i is 0, r keeps lane i.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEGSNX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// lane i = |a[i]|, modulo 2^8: the most negative value stays as it is.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABS8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+
+/// lane i = |a[i]|, modulo 2^16: the most negative value stays as it is.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABS16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+
+/// lane i = |a[i]|, modulo 2^32: the most negative value stays as it is.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABS32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+
+/// lane i = |a[i]|, modulo 2^8: the most negative value stays as it is.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABS2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+
+/// lane i = |a[i]|, modulo 2^16: the most negative value stays as it is.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+
+/// lane i = |a[i]|, modulo 2^32: the most negative value stays as it is.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
 
-/// lane i = |a[i]|, modulo 2^w: the most negative value stays as it is; bit i of p = 1 when a[i] is negative,
-/// else 0.
+/// lane i = |a[i]|, modulo 2^16: the most negative value stays as it is; bit i of p = 1 when a[i] is
+/// negative, else 0.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_BABSNX16(
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN& p,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_BABSNX16(cstub_Km_ZNB_Orbis_R5_64k_vboolN& p,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
 
 /// lane i = |a[i]|, clamped to the signed range of the lane: the most negative value gives the largest one.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSS16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+
+/// lane i = |a[i]|, clamped to the signed range of the lane: the most negative value gives the largest one.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
 
 /// lane i = |a[i] - b[i]| of signed a[i] and b[i], exact as an unsigned lane.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSUB8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSUB8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSUB16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+
+/// lane i = |a[i] - b[i]| of signed a[i] and b[i], exact as an unsigned lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSUB16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSUB2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+
+/// lane i = |a[i] - b[i]| of signed a[i] and b[i], exact as an unsigned lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSUB2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSUBNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// lane i = |a[i] - b[i]| of signed a[i] and b[i], exact as an unsigned lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSUBNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
 /// lane i = |a[i] - b[i]| of unsigned a[i] and b[i].
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSUBU8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSUBU8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSUBU16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+
+/// lane i = |a[i] - b[i]| of unsigned a[i] and b[i].
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSUBU16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSUBU2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+
+/// lane i = |a[i] - b[i]| of unsigned a[i] and b[i].
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSUBU2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSUBU2NX8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+
+/// lane i = |a[i] - b[i]| of unsigned a[i] and b[i].
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSUBU2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSUBUNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// lane i = |a[i] - b[i]| of unsigned a[i] and b[i].
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSUBUNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSUBUNX16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+
+/// lane i = |a[i] - b[i]| of unsigned a[i] and b[i].
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSUBUNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
 
 /// lane i = |a[i] - b[i]| of signed a[i] and b[i], clamped to the signed range of the lane.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSSUB16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSSUB16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSSUBNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// lane i = |a[i] - b[i]| of signed a[i] and b[i], clamped to the signed range of the lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ABSSSUBNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
 /* Smaller, larger and mean of two lanes.
    Table: src/integer/extremes.def */
 
-/// lane i = the smaller of a[i] and b[i], compared as signed. T forms keep the destination's lanes whose
-/// predicate bit is 0.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MIN8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
+/// lane i = the smaller of a[i] and b[i], compared as signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MIN8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MIN16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+
+/// lane i = the smaller of a[i] and b[i], compared as signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MIN16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+
+/// lane i = the smaller of a[i] and b[i], compared as signed. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MIN16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MIN16T(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MIN32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+
+/// lane i = the smaller of a[i] and b[i], compared as signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MIN32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MIN2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+
+/// lane i = the smaller of a[i] and b[i], compared as signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MIN2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// lane i = the smaller of a[i] and b[i], compared as signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+
+/// lane i = the smaller of a[i] and b[i], compared as signed. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNX16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINNX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINN_2X32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+
+/// lane i = the smaller of a[i] and b[i], compared as signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
 
-/// lane i = the larger of a[i] and b[i], compared as signed. T forms keep the destination's lanes whose
-/// predicate bit is 0.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
+/// lane i = the larger of a[i] and b[i], compared as signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+
+/// lane i = the larger of a[i] and b[i], compared as signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+
+/// lane i = the larger of a[i] and b[i], compared as signed. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAX16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAX32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+
+/// lane i = the larger of a[i] and b[i], compared as signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAX32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAX2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+
+/// lane i = the larger of a[i] and b[i], compared as signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAX2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// lane i = the larger of a[i] and b[i], compared as signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+
+/// lane i = the larger of a[i] and b[i], compared as signed. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNX16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXNX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXN_2X32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+
+/// lane i = the larger of a[i] and b[i], compared as signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
 
-/// lane i = the smaller of a[i] and b[i], compared as unsigned. T forms keep the destination's lanes whose
-/// predicate bit is 0.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINU8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+/// lane i = the smaller of a[i] and b[i], compared as unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINU8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINU16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+
+/// lane i = the smaller of a[i] and b[i], compared as unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINU16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
+
+/// lane i = the smaller of a[i] and b[i], compared as unsigned. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINU16UT(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINU16UT(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINU32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+
+/// lane i = the smaller of a[i] and b[i], compared as unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINU32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINU2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+
+/// lane i = the smaller of a[i] and b[i], compared as unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINU2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINU2NX8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+
+/// lane i = the smaller of a[i] and b[i], compared as unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINU2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINUNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// lane i = the smaller of a[i] and b[i], compared as unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINUNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINUNX16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+
+/// lane i = the smaller of a[i] and b[i], compared as unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINUNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
+
+/// lane i = the smaller of a[i] and b[i], compared as unsigned. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINUNX16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINUNX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// lane i = the smaller of a[i] and b[i], compared as unsigned. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINUNX16UT(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINUNX16UT(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINUN_2X32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+
+/// lane i = the smaller of a[i] and b[i], compared as unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINUN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINUN_2X32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+
+/// lane i = the smaller of a[i] and b[i], compared as unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MINUN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
 
-/// lane i = the larger of a[i] and b[i], compared as unsigned. T forms keep the destination's lanes whose
-/// predicate bit is 0.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXU8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+/// lane i = the larger of a[i] and b[i], compared as unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXU8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXU16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+
+/// lane i = the larger of a[i] and b[i], compared as unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXU16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
+
+/// lane i = the larger of a[i] and b[i], compared as unsigned. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXU16UT(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXU16UT(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXU32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+
+/// lane i = the larger of a[i] and b[i], compared as unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXU32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXU2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+
+/// lane i = the larger of a[i] and b[i], compared as unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXU2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXU2NX8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+
+/// lane i = the larger of a[i] and b[i], compared as unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXU2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXUNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// lane i = the larger of a[i] and b[i], compared as unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXUNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXUNX16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+
+/// lane i = the larger of a[i] and b[i], compared as unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXUNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
+
+/// lane i = the larger of a[i] and b[i], compared as unsigned. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXUNX16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXUNX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// lane i = the larger of a[i] and b[i], compared as unsigned. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXUNX16UT(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXUNX16UT(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXUN_2X32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+
+/// lane i = the larger of a[i] and b[i], compared as unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXUN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXUN_2X32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+
+/// lane i = the larger of a[i] and b[i], compared as unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MAXUN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
 
 /// lane i = floor((a[i] + b[i]) / 2) of signed a[i] and b[i], never overflowing.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVG8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVG8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVG16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+
+/// lane i = floor((a[i] + b[i]) / 2) of signed a[i] and b[i], never overflowing.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVG16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVG2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+
+/// lane i = floor((a[i] + b[i]) / 2) of signed a[i] and b[i], never overflowing.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVG2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// lane i = floor((a[i] + b[i]) / 2) of signed a[i] and b[i], never overflowing.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
 /// lane i = floor((a[i] + b[i]) / 2) of unsigned a[i] and b[i], never overflowing.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGU8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGU8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGU16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+
+/// lane i = floor((a[i] + b[i]) / 2) of unsigned a[i] and b[i], never overflowing.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGU16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGU2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+
+/// lane i = floor((a[i] + b[i]) / 2) of unsigned a[i] and b[i], never overflowing.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGU2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGU2NX8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+
+/// lane i = floor((a[i] + b[i]) / 2) of unsigned a[i] and b[i], never overflowing.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGU2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGUNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// lane i = floor((a[i] + b[i]) / 2) of unsigned a[i] and b[i], never overflowing.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGUNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGUNX16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+
+/// lane i = floor((a[i] + b[i]) / 2) of unsigned a[i] and b[i], never overflowing.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGUNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
 
 /// lane i = floor((a[i] + b[i] + 1) / 2) of signed a[i] and b[i], never overflowing: halves round up.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGR8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGR8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGR16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+
+/// lane i = floor((a[i] + b[i] + 1) / 2) of signed a[i] and b[i], never overflowing: halves round up.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGR16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGR2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+
+/// lane i = floor((a[i] + b[i] + 1) / 2) of signed a[i] and b[i], never overflowing: halves round up.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGR2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGRNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// lane i = floor((a[i] + b[i] + 1) / 2) of signed a[i] and b[i], never overflowing: halves round up.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGRNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
 /// lane i = floor((a[i] + b[i] + 1) / 2) of unsigned a[i] and b[i], never overflowing: halves round up.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGRU8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGRU8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGRU16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+
+/// lane i = floor((a[i] + b[i] + 1) / 2) of unsigned a[i] and b[i], never overflowing: halves round up.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGRU16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGRU2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+
+/// lane i = floor((a[i] + b[i] + 1) / 2) of unsigned a[i] and b[i], never overflowing: halves round up.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGRU2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGRU2NX8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+
+/// lane i = floor((a[i] + b[i] + 1) / 2) of unsigned a[i] and b[i], never overflowing: halves round up.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGRU2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGRUNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// lane i = floor((a[i] + b[i] + 1) / 2) of unsigned a[i] and b[i], never overflowing: halves round up.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGRUNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGRUNX16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+
+/// lane i = floor((a[i] + b[i] + 1) / 2) of unsigned a[i] and b[i], never overflowing: halves round up.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AVGRUNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
 
 /* Bitwise logic on whole registers.
    Table: src/integer/logic.def */
 
 /// the bits that are 1 in both a and b.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+
+/// the bits that are 1 in both a and b.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+
+/// the bits that are 1 in both a and b.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+
+/// the bits that are 1 in both a and b.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+
+/// the bits that are 1 in both a and b.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+
+/// the bits that are 1 in both a and b.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int64
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND64(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64& a,
+
+/// the bits that are 1 in both a and b.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int64
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND64(const cstub_Km_ZNB_Orbis_R5_64k_qv_int64& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int64& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+
+/// the bits that are 1 in both a and b.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND2NX8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+
+/// the bits that are 1 in both a and b.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_AND2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// the bits that are 1 in both a and b.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDNX16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+
+/// the bits that are 1 in both a and b.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDN_2X32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+
+/// the bits that are 1 in both a and b.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDN_2X32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+
+/// the bits that are 1 in both a and b.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDN_4X64(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& a,
+
+/// the bits that are 1 in both a and b.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDN_4X64(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& b);
 
 /// the bits that are 1 in a or b.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+
+/// the bits that are 1 in a or b.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+
+/// the bits that are 1 in a or b.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+
+/// the bits that are 1 in a or b.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+
+/// the bits that are 1 in a or b.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+
+/// the bits that are 1 in a or b.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int64
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR64(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64& a,
+
+/// the bits that are 1 in a or b.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int64
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR64(const cstub_Km_ZNB_Orbis_R5_64k_qv_int64& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int64& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+
+/// the bits that are 1 in a or b.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR2NX8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+
+/// the bits that are 1 in a or b.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_OR2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// the bits that are 1 in a or b.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORNX16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+
+/// the bits that are 1 in a or b.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORN_2X32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+
+/// the bits that are 1 in a or b.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORN_2X32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+
+/// the bits that are 1 in a or b.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORN_4X64(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& a,
+
+/// the bits that are 1 in a or b.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORN_4X64(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& b);
 
 /// the bits in which a and b differ.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+
+/// the bits in which a and b differ.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+
+/// the bits in which a and b differ.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+
+/// the bits in which a and b differ.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+
+/// the bits in which a and b differ.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+
+/// the bits in which a and b differ.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int64
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR64(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int64& a,
+
+/// the bits in which a and b differ.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int64
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR64(const cstub_Km_ZNB_Orbis_R5_64k_qv_int64& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int64& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+
+/// the bits in which a and b differ.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR2NX8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+
+/// the bits in which a and b differ.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XOR2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// the bits in which a and b differ.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORNX16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+
+/// the bits in which a and b differ.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORN_2X32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+
+/// the bits in which a and b differ.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORN_2X32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+
+/// the bits in which a and b differ.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORN_4X64(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& a,
+
+/// the bits in which a and b differ.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORN_4X64(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& b);
 
 /// every bit of a turned.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NOT16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+
+/// every bit of a turned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NOT16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+
+/// every bit of a turned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NOT32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+
+/// every bit of a turned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NOT32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+
+/// every bit of a turned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NOT2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+
+/// every bit of a turned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NOT2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+
+/// every bit of a turned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NOTNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+
+/// every bit of a turned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NOTNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+
+/// every bit of a turned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NOTN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+
+/// every bit of a turned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NOTN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
+
+/// every bit of a turned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NOTN_4X64(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& a);
 
 /* Shifts by a count a lane. A count is the whole signed lane, of the signed and of the unsigned types: a
@@ -934,439 +1082,590 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NOTN_4X64(const cstub_Km_ZNB_Orbis_R
    Table: src/integer/shifts.def */
 
 /// lane i = a[i] shifted left by b[i], zeros shifted in; right by -b[i] when b[i] is negative; 0 when |b[i]|
-/// >= w.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLL16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+/// >= 16.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLL16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLL16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+
+/// lane i = a[i] shifted left by b[i], zeros shifted in; right by -b[i] when b[i] is negative; 0 when |b[i]|
+/// >= 16.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLL16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLL32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+
+/// lane i = a[i] shifted left by b[i], zeros shifted in; right by -b[i] when b[i] is negative; 0 when |b[i]|
+/// >= 32.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLL32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLL32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+
+/// lane i = a[i] shifted left by b[i], zeros shifted in; right by -b[i] when b[i] is negative; 0 when |b[i]|
+/// >= 32.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLL32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// lane i = a[i] shifted left by b[i], zeros shifted in; right by -b[i] when b[i] is negative; 0 when |b[i]|
+/// >= 16.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLNX16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+
+/// lane i = a[i] shifted left by b[i], zeros shifted in; right by -b[i] when b[i] is negative; 0 when |b[i]|
+/// >= 16.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLN_2X32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+
+/// lane i = a[i] shifted left by b[i], zeros shifted in; right by -b[i] when b[i] is negative; 0 when |b[i]|
+/// >= 32.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLN_2X32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+
+/// lane i = a[i] shifted left by b[i], zeros shifted in; right by -b[i] when b[i] is negative; 0 when |b[i]|
+/// >= 32.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
 
 /// lane i = a[i] shifted right by b[i], zeros shifted in; left by -b[i] when b[i] is negative; 0 when |b[i]|
-/// >= w.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRL16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+/// >= 16.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRL16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRL16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+
+/// lane i = a[i] shifted right by b[i], zeros shifted in; left by -b[i] when b[i] is negative; 0 when |b[i]|
+/// >= 16.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRL16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRL32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+
+/// lane i = a[i] shifted right by b[i], zeros shifted in; left by -b[i] when b[i] is negative; 0 when |b[i]|
+/// >= 32.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRL32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRL32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+
+/// lane i = a[i] shifted right by b[i], zeros shifted in; left by -b[i] when b[i] is negative; 0 when |b[i]|
+/// >= 32.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRL32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// lane i = a[i] shifted right by b[i], zeros shifted in; left by -b[i] when b[i] is negative; 0 when |b[i]|
+/// >= 16.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLNX16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+
+/// lane i = a[i] shifted right by b[i], zeros shifted in; left by -b[i] when b[i] is negative; 0 when |b[i]|
+/// >= 16.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLN_2X32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+
+/// lane i = a[i] shifted right by b[i], zeros shifted in; left by -b[i] when b[i] is negative; 0 when |b[i]|
+/// >= 32.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLN_2X32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+
+/// lane i = a[i] shifted right by b[i], zeros shifted in; left by -b[i] when b[i] is negative; 0 when |b[i]|
+/// >= 32.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
 
-/// lane i = a[i] shifted right by b[i], copies of the sign shifted in, all sign when b[i] >= w; left by -b[i]
-/// when b[i] is negative, 0 when b[i] <= -w.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRA16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+/// lane i = a[i] shifted right by b[i], copies of the sign shifted in, all sign when b[i] >= 16; left by
+/// -b[i] when b[i] is negative, 0 when b[i] <= -16.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRA16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRA32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+
+/// lane i = a[i] shifted right by b[i], copies of the sign shifted in, all sign when b[i] >= 32; left by
+/// -b[i] when b[i] is negative, 0 when b[i] <= -32.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRA32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRANX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// lane i = a[i] shifted right by b[i], copies of the sign shifted in, all sign when b[i] >= 16; left by
+/// -b[i] when b[i] is negative, 0 when b[i] <= -16.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRANX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRAN_2X32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+
+/// lane i = a[i] shifted right by b[i], copies of the sign shifted in, all sign when b[i] >= 32; left by
+/// -b[i] when b[i] is negative, 0 when b[i] <= -32.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRAN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
 
 /// lane i = a[i] * 2^b[i], clamped to the signed range of the lane; when b[i] is negative a[i] shifted right
 /// by -b[i], copies of the sign shifted in.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLS16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLS16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLS32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+
+/// lane i = a[i] * 2^b[i], clamped to the signed range of the lane; when b[i] is negative a[i] shifted right
+/// by -b[i], copies of the sign shifted in.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLS32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLSNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// lane i = a[i] * 2^b[i], clamped to the signed range of the lane; when b[i] is negative a[i] shifted right
+/// by -b[i], copies of the sign shifted in.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLSNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLSN_2X32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+
+/// lane i = a[i] * 2^b[i], clamped to the signed range of the lane; when b[i] is negative a[i] shifted right
+/// by -b[i], copies of the sign shifted in.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLSN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
 
 /* Shifts by one immediate count for all lanes, which is taken modulo the lane width w.
    Table: src/integer/immediate_shifts.def */
 
-/// lane i = a[i] shifted left by the immediate modulo w, zeros shifted in.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+/// lane i = a[i] shifted left by the immediate modulo 8, zeros shifted in.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLI8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a, immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+
+/// lane i = a[i] shifted left by the immediate modulo 8, zeros shifted in.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLI8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a, immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+
+/// lane i = a[i] shifted left by the immediate modulo 16, zeros shifted in.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLI16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLI16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+
+/// lane i = a[i] shifted left by the immediate modulo 16, zeros shifted in.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLI16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
     immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+
+/// lane i = a[i] shifted left by the immediate modulo 32, zeros shifted in.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLI32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a, immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLI32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
-    immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLI2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLI2NX8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLINX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLINX16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLIN_2X32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
-    immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLIN_2X32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+
+/// lane i = a[i] shifted left by the immediate modulo 32, zeros shifted in.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLI32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
     immediate i);
 
-/// lane i = a[i] shifted right by the immediate modulo w, zeros shifted in.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+/// lane i = a[i] shifted left by the immediate modulo 8, zeros shifted in.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLI2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    immediate i);
+
+/// lane i = a[i] shifted left by the immediate modulo 8, zeros shifted in.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLI2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+    immediate i);
+
+/// lane i = a[i] shifted left by the immediate modulo 16, zeros shifted in.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLINX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    immediate i);
+
+/// lane i = a[i] shifted left by the immediate modulo 16, zeros shifted in.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLINX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+    immediate i);
+
+/// lane i = a[i] shifted left by the immediate modulo 32, zeros shifted in.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLIN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+    immediate i);
+
+/// lane i = a[i] shifted left by the immediate modulo 32, zeros shifted in.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLLIN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+    immediate i);
+
+/// lane i = a[i] shifted right by the immediate modulo 8, zeros shifted in.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLI8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a, immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+
+/// lane i = a[i] shifted right by the immediate modulo 8, zeros shifted in.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLI8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a, immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+
+/// lane i = a[i] shifted right by the immediate modulo 16, zeros shifted in.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLI16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLI16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+
+/// lane i = a[i] shifted right by the immediate modulo 16, zeros shifted in.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLI16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
     immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+
+/// lane i = a[i] shifted right by the immediate modulo 32, zeros shifted in.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLI32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a, immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLI32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
-    immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLI2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLI2NX8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLINX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLINX16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLIN_2X32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
-    immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLIN_2X32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+
+/// lane i = a[i] shifted right by the immediate modulo 32, zeros shifted in.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLI32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
     immediate i);
 
-/// lane i = a[i] shifted right by the immediate modulo w, copies of the sign shifted in (of the unsigned
+/// lane i = a[i] shifted right by the immediate modulo 8, zeros shifted in.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLI2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    immediate i);
+
+/// lane i = a[i] shifted right by the immediate modulo 8, zeros shifted in.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLI2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+    immediate i);
+
+/// lane i = a[i] shifted right by the immediate modulo 16, zeros shifted in.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLINX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    immediate i);
+
+/// lane i = a[i] shifted right by the immediate modulo 16, zeros shifted in.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLINX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+    immediate i);
+
+/// lane i = a[i] shifted right by the immediate modulo 32, zeros shifted in.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLIN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+    immediate i);
+
+/// lane i = a[i] shifted right by the immediate modulo 32, zeros shifted in.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRLIN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+    immediate i);
+
+/// lane i = a[i] shifted right by the immediate modulo 8, copies of the sign shifted in (of the unsigned
 /// types too).
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRAI8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a, immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+
+/// lane i = a[i] shifted right by the immediate modulo 8, copies of the sign shifted in (of the unsigned
+/// types too).
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRAI8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a, immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+
+/// lane i = a[i] shifted right by the immediate modulo 16, copies of the sign shifted in (of the unsigned
+/// types too).
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRAI16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+
+/// lane i = a[i] shifted right by the immediate modulo 32, copies of the sign shifted in (of the unsigned
+/// types too).
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRAI32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a, immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRAI2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRAI2NX8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRAINX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRAIN_2X32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+
+/// lane i = a[i] shifted right by the immediate modulo 8, copies of the sign shifted in (of the unsigned
+/// types too).
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRAI2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     immediate i);
 
-/// lane i = a[i] * 2^(immediate modulo w), clamped to the signed range of the lane.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLSI16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLSI32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a, immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLSINX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+/// lane i = a[i] shifted right by the immediate modulo 8, copies of the sign shifted in (of the unsigned
+/// types too).
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRAI2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
     immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLSIN_2X32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+
+/// lane i = a[i] shifted right by the immediate modulo 16, copies of the sign shifted in (of the unsigned
+/// types too).
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRAINX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    immediate i);
+
+/// lane i = a[i] shifted right by the immediate modulo 32, copies of the sign shifted in (of the unsigned
+/// types too).
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SRAIN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+    immediate i);
+
+/// lane i = a[i] * 2^(immediate modulo 16), clamped to the signed range of the lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLSI16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, immediate i);
+
+/// lane i = a[i] * 2^(immediate modulo 32), clamped to the signed range of the lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLSI32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a, immediate i);
+
+/// lane i = a[i] * 2^(immediate modulo 16), clamped to the signed range of the lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLSINX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    immediate i);
+
+/// lane i = a[i] * 2^(immediate modulo 32), clamped to the signed range of the lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SLSIN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     immediate i);
 
 /* Rotations and the counts by which a lane can be shifted left until it is normalised.
    Table: src/integer/rotates.def */
 
-/// lane i = a[i] rotated right by b[i] modulo w.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTR16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+/// lane i = a[i] rotated right by b[i] modulo 16.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTR16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTR16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+
+/// lane i = a[i] rotated right by b[i] modulo 16.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTR16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTR32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+
+/// lane i = a[i] rotated right by b[i] modulo 32.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTR32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTR32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+
+/// lane i = a[i] rotated right by b[i] modulo 32.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTR32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// lane i = a[i] rotated right by b[i] modulo 16.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRNX16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+
+/// lane i = a[i] rotated right by b[i] modulo 16.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRN_2X32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+
+/// lane i = a[i] rotated right by b[i] modulo 32.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRN_2X32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+
+/// lane i = a[i] rotated right by b[i] modulo 32.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
 
-/// lane i = a[i] rotated right by the immediate modulo w.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+/// lane i = a[i] rotated right by the immediate modulo 8.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRI8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a, immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+
+/// lane i = a[i] rotated right by the immediate modulo 8.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRI8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a, immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+
+/// lane i = a[i] rotated right by the immediate modulo 16.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRI16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRI16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
-    immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRI32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
-    immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRI32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
-    immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRI2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRI2NX8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRINX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRINX16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRIN_2X32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
-    immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRIN_2X32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+
+/// lane i = a[i] rotated right by the immediate modulo 16.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRI16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
     immediate i);
 
-/// lane i = the number of copies of the sign bit below it in a[i]: w - 1 for 0 and -1.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+/// lane i = a[i] rotated right by the immediate modulo 32.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRI32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+    immediate i);
+
+/// lane i = a[i] rotated right by the immediate modulo 32.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRI32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+    immediate i);
+
+/// lane i = a[i] rotated right by the immediate modulo 8.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRI2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    immediate i);
+
+/// lane i = a[i] rotated right by the immediate modulo 8.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRI2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+    immediate i);
+
+/// lane i = a[i] rotated right by the immediate modulo 16.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRINX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    immediate i);
+
+/// lane i = a[i] rotated right by the immediate modulo 16.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRINX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+    immediate i);
+
+/// lane i = a[i] rotated right by the immediate modulo 32.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRIN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+    immediate i);
+
+/// lane i = a[i] rotated right by the immediate modulo 32.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROTRIN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+    immediate i);
+
+/// lane i = the number of copies of the sign bit below it in a[i]: 16 - 1 for 0 and -1.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NSA16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+
+/// lane i = the number of copies of the sign bit below it in a[i]: 32 - 1 for 0 and -1.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NSA32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+
+/// lane i = the number of copies of the sign bit below it in a[i]: 16 - 1 for 0 and -1.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NSANX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+
+/// lane i = the number of copies of the sign bit below it in a[i]: 32 - 1 for 0 and -1.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NSAN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
 
-/// lane i = the number of zero bits above the highest 1 in a[i]: w for 0.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+/// lane i = the number of zero bits above the highest 1 in a[i]: 16 for 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NSAU16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+
+/// lane i = the number of zero bits above the highest 1 in a[i]: 32 for 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NSAU32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+
+/// lane i = the number of zero bits above the highest 1 in a[i]: 16 for 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NSAUNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+
+/// lane i = the number of zero bits above the highest 1 in a[i]: 16 for 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NSAUNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+
+/// lane i = the number of zero bits above the highest 1 in a[i]: 32 for 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NSAUN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+
+/// lane i = the number of zero bits above the highest 1 in a[i]: 32 for 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NSAUN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
 
 /* One value in every lane, and a lane alone.
    Table: src/integer/replicate.def */
 
-/// every lane = lane number (immediate modulo the number of lanes) of a. T forms keep the destination's lanes
-/// whose predicate bit is 0.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REP2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+/// every lane = lane number (immediate modulo 64) of a.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REP2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REP2NX8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+
+/// every lane = lane number (immediate modulo 64) of a.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REP2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
     immediate i);
+
+/// every lane = lane number (immediate modulo 64) of a. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REP2NX8T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    immediate i,
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REP2NX8T(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, immediate i, const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+
+/// every lane = lane number (immediate modulo 64) of a. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REP2NX8UT(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    immediate i,
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REPNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REP2NX8UT(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a, immediate i, const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+
+/// every lane = lane number (immediate modulo 32) of a.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REPNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REPNX16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+
+/// every lane = lane number (immediate modulo 32) of a.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REPNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     immediate i);
+
+/// every lane = lane number (immediate modulo 32) of a. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REPNX16T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    immediate i,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REPNX16T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, immediate i, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// every lane = lane number (immediate modulo 32) of a. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REPNX16UT(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    immediate i,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REPN_2X32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REPNX16UT(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, immediate i, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// every lane = lane number (immediate modulo 16) of a.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REPN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     immediate i);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REPN_2X32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+
+/// every lane = lane number (immediate modulo 16) of a.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REPN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
     immediate i);
+
+/// every lane = lane number (immediate modulo 16) of a. Where predicate bit i is 0, r keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REPN_2X32T(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
-    immediate i,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REPN_2X32UT(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
-    immediate i,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REPN_2X32T(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a, immediate i,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
-/// lane number (immediate modulo the number of lanes) of a.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SELS2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+/// every lane = lane number (immediate modulo 16) of a. Where predicate bit i is 0, r keeps lane i.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_REPN_2X32UT(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a, immediate i,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// lane number (immediate modulo 64) of a.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SELS2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     immediate i);
 
 /// every bit is 0.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ZERO2NX8();
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ZERO2NX8U();
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ZERONX16();
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ZERONX16U();
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ZERON_2X32();
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ZERO2NX8();
+
+/// every bit is 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ZERO2NX8U();
+
+/// every bit is 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ZERONX16();
+
+/// every bit is 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ZERONX16U();
+
+/// every bit is 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ZERON_2X32();
+
+/// every bit is 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ZERON_2X32U();
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ZERON_4X64();
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128
+
+/// every bit is 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ZERON_4X64();
+
+/// every bit is 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ZERON_8X128();
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256
+
+/// every bit is 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ZERON_16X256();
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ZERONX8S();
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ZERONX8U();
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ZERON_2X16S();
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U
+
+/// every bit is 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ZERONX8S();
+
+/// every bit is 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ZERONX8U();
+
+/// every bit is 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ZERON_2X16S();
+
+/// every bit is 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ZERON_2X16U();
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ZERO2NX24();
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ZERONX48();
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
+
+/// every bit is 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ZERO2NX24();
+
+/// every bit is 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ZERONX48();
+
+/// every bit is 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ZERON_2X64W();
 
 /* Comparisons: bit i of the predicate is the relation between lanes i, the one bit of a vbool1 that of
@@ -1374,867 +1673,1051 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ZERON_2X64W();
    Table: src/integer/compare.def */
 
 /// bit i = 1 when a[i] == b[i], else 0.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQ8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQ8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQ8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+
+/// bit i = 1 when a[i] == b[i], else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQ8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQ16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+
+/// bit i = 1 when a[i] == b[i], else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQ16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQ16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+
+/// bit i = 1 when a[i] == b[i], else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQ16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQ32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+
+/// bit i = 1 when a[i] == b[i], else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQ32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQ32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+
+/// bit i = 1 when a[i] == b[i], else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQ32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQ2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+
+/// bit i = 1 when a[i] == b[i], else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQ2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQ2NX8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+
+/// bit i = 1 when a[i] == b[i], else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQ2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// bit i = 1 when a[i] == b[i], else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQNX16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+
+/// bit i = 1 when a[i] == b[i], else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQN_2X32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+
+/// bit i = 1 when a[i] == b[i], else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQN_2X32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+
+/// bit i = 1 when a[i] == b[i], else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_EQN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
 
 /// bit i = 1 when a[i] != b[i], else 0.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQ8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQ8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQ8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+
+/// bit i = 1 when a[i] != b[i], else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQ8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQ16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+
+/// bit i = 1 when a[i] != b[i], else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQ16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQ16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+
+/// bit i = 1 when a[i] != b[i], else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQ16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQ32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+
+/// bit i = 1 when a[i] != b[i], else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQ32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQ32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+
+/// bit i = 1 when a[i] != b[i], else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQ32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQ2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+
+/// bit i = 1 when a[i] != b[i], else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQ2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQ2NX8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+
+/// bit i = 1 when a[i] != b[i], else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQ2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// bit i = 1 when a[i] != b[i], else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQNX16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+
+/// bit i = 1 when a[i] != b[i], else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQN_2X32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+
+/// bit i = 1 when a[i] != b[i], else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQN_2X32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+
+/// bit i = 1 when a[i] != b[i], else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NEQN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
 
 /// bit i = 1 when a[i] < b[i], compared as signed, else 0.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LT8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LT8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LT16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+
+/// bit i = 1 when a[i] < b[i], compared as signed, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LT16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LT32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+
+/// bit i = 1 when a[i] < b[i], compared as signed, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LT32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LT2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+
+/// bit i = 1 when a[i] < b[i], compared as signed, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LT2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// bit i = 1 when a[i] < b[i], compared as signed, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTN_2X32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+
+/// bit i = 1 when a[i] < b[i], compared as signed, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
 
 /// bit i = 1 when a[i] <= b[i], compared as signed, else 0.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LE8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LE8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LE16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+
+/// bit i = 1 when a[i] <= b[i], compared as signed, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LE16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LE32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+
+/// bit i = 1 when a[i] <= b[i], compared as signed, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LE32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LE2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+
+/// bit i = 1 when a[i] <= b[i], compared as signed, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LE2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LENX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// bit i = 1 when a[i] <= b[i], compared as signed, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LENX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEN_2X32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+
+/// bit i = 1 when a[i] <= b[i], compared as signed, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
 
 /// bit i = 1 when a[i] > b[i], compared as signed, else 0.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GT8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GT8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GT16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+
+/// bit i = 1 when a[i] > b[i], compared as signed, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GT16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GT32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+
+/// bit i = 1 when a[i] > b[i], compared as signed, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GT32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GT2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+
+/// bit i = 1 when a[i] > b[i], compared as signed, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GT2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GTNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// bit i = 1 when a[i] > b[i], compared as signed, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GTNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GTN_2X32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+
+/// bit i = 1 when a[i] > b[i], compared as signed, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GTN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
 
 /// bit i = 1 when a[i] >= b[i], compared as signed, else 0.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GE8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GE8(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GE16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+
+/// bit i = 1 when a[i] >= b[i], compared as signed, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GE16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GE32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+
+/// bit i = 1 when a[i] >= b[i], compared as signed, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GE32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GE2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+
+/// bit i = 1 when a[i] >= b[i], compared as signed, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GE2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GENX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// bit i = 1 when a[i] >= b[i], compared as signed, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GENX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GEN_2X32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+
+/// bit i = 1 when a[i] >= b[i], compared as signed, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GEN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
 
 /// bit i = 1 when a[i] < b[i], compared as unsigned, else 0.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTU8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTU8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTU16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+
+/// bit i = 1 when a[i] < b[i], compared as unsigned, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTU16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTU32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+
+/// bit i = 1 when a[i] < b[i], compared as unsigned, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTU32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTU2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+
+/// bit i = 1 when a[i] < b[i], compared as unsigned, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTU2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTU2NX8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+
+/// bit i = 1 when a[i] < b[i], compared as unsigned, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTU2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTUNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// bit i = 1 when a[i] < b[i], compared as unsigned, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTUNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTUNX16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+
+/// bit i = 1 when a[i] < b[i], compared as unsigned, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTUNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTUN_2X32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+
+/// bit i = 1 when a[i] < b[i], compared as unsigned, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTUN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTUN_2X32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+
+/// bit i = 1 when a[i] < b[i], compared as unsigned, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTUN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
 
 /// bit i = 1 when a[i] <= b[i], compared as unsigned, else 0.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEU8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEU8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEU16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+
+/// bit i = 1 when a[i] <= b[i], compared as unsigned, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEU16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEU32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+
+/// bit i = 1 when a[i] <= b[i], compared as unsigned, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEU32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEU2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+
+/// bit i = 1 when a[i] <= b[i], compared as unsigned, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEU2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEU2NX8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+
+/// bit i = 1 when a[i] <= b[i], compared as unsigned, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEU2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEUNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// bit i = 1 when a[i] <= b[i], compared as unsigned, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEUNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEUNX16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+
+/// bit i = 1 when a[i] <= b[i], compared as unsigned, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEUNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEUN_2X32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+
+/// bit i = 1 when a[i] <= b[i], compared as unsigned, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEUN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEUN_2X32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+
+/// bit i = 1 when a[i] <= b[i], compared as unsigned, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LEUN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
 
 /// bit i = 1 when a[i] > b[i], compared as unsigned, else 0.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GTU8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GTU8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GTU16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+
+/// bit i = 1 when a[i] > b[i], compared as unsigned, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GTU16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GTU32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+
+/// bit i = 1 when a[i] > b[i], compared as unsigned, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GTU32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GTU2NX8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+
+/// bit i = 1 when a[i] > b[i], compared as unsigned, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GTU2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GTUNX16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+
+/// bit i = 1 when a[i] > b[i], compared as unsigned, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GTUNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GTUN_2X32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+
+/// bit i = 1 when a[i] > b[i], compared as unsigned, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GTUN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
 
 /// bit i = 1 when a[i] >= b[i], compared as unsigned, else 0.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GEU8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GEU8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GEU16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+
+/// bit i = 1 when a[i] >= b[i], compared as unsigned, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GEU16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GEU32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+
+/// bit i = 1 when a[i] >= b[i], compared as unsigned, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GEU32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GEU2NX8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+
+/// bit i = 1 when a[i] >= b[i], compared as unsigned, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GEU2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GEUNX16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+
+/// bit i = 1 when a[i] >= b[i], compared as unsigned, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GEUNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GEUN_2X32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+
+/// bit i = 1 when a[i] >= b[i], compared as unsigned, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GEUN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
 
 /* Logic on predicates, their reductions, and predicates of the first lanes. One-bit results hold 0 or 1.
    Table: src/integer/predicates.def */
 
 /// bit i = a[i] and b[i].
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDB(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDB(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDB1(
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& a,
+
+/// bit i = a[i] and b[i].
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDB1(const cstub_Km_ZNB_Orbis_R5_64k_vbool1& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDB2N(
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& a,
+
+/// bit i = a[i] and b[i].
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDB2N(const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDBN(
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& a,
+
+/// bit i = a[i] and b[i].
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDBN(const cstub_Km_ZNB_Orbis_R5_64k_vboolN& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDBN_2(
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& a,
+
+/// bit i = a[i] and b[i].
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDBN_2(const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& b);
 
 /// bit i = a[i] or b[i].
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORB(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORB(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORB1(
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& a,
+
+/// bit i = a[i] or b[i].
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORB1(const cstub_Km_ZNB_Orbis_R5_64k_vbool1& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORB2N(
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& a,
+
+/// bit i = a[i] or b[i].
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORB2N(const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORBN(
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& a,
+
+/// bit i = a[i] or b[i].
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORBN(const cstub_Km_ZNB_Orbis_R5_64k_vboolN& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORBN_2(
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& a,
+
+/// bit i = a[i] or b[i].
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORBN_2(const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& b);
 
 /// bit i = 1 when a[i] and b[i] differ.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORB(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORB(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORB1(
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& a,
+
+/// bit i = 1 when a[i] and b[i] differ.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORB1(const cstub_Km_ZNB_Orbis_R5_64k_vbool1& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORB2N(
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& a,
+
+/// bit i = 1 when a[i] and b[i] differ.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORB2N(const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORBN(
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& a,
+
+/// bit i = 1 when a[i] and b[i] differ.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORBN(const cstub_Km_ZNB_Orbis_R5_64k_vboolN& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORBN_2(
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& a,
+
+/// bit i = 1 when a[i] and b[i] differ.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_XORBN_2(const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& b);
 
 /// bit i = a[i] and not b[i].
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDNOTB(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDNOTB(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDNOTB1(
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& a,
+
+/// bit i = a[i] and not b[i].
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDNOTB1(const cstub_Km_ZNB_Orbis_R5_64k_vbool1& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDNOTB2N(
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& a,
+
+/// bit i = a[i] and not b[i].
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDNOTB2N(const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDNOTBN(
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& a,
+
+/// bit i = a[i] and not b[i].
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDNOTBN(const cstub_Km_ZNB_Orbis_R5_64k_vboolN& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDNOTBN_2(
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& a,
+
+/// bit i = a[i] and not b[i].
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ANDNOTBN_2(const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& b);
 
 /// bit i = a[i] or not b[i].
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORNOTB(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORNOTB(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORNOTB1(
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool1& a,
+
+/// bit i = a[i] or not b[i].
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORNOTB1(const cstub_Km_ZNB_Orbis_R5_64k_vbool1& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORNOTB2N(
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& a,
+
+/// bit i = a[i] or not b[i].
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORNOTB2N(const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORNOTBN(
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& a,
+
+/// bit i = a[i] or not b[i].
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORNOTBN(const cstub_Km_ZNB_Orbis_R5_64k_vboolN& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORNOTBN_2(
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& a,
+
+/// bit i = a[i] or not b[i].
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ORNOTBN_2(const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& b);
 
 /// bit i = not a[i].
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NOTB(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
+
+/// bit i = not a[i].
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NOTB1(const cstub_Km_ZNB_Orbis_R5_64k_vbool1& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool2N
+
+/// bit i = not a[i].
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NOTB2N(const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
+
+/// bit i = not a[i].
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NOTBN(const cstub_Km_ZNB_Orbis_R5_64k_vboolN& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
+
+/// bit i = not a[i].
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_NOTBN_2(const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& a);
 
 /// 1 when every bit of p is 1, else 0.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDB2N(const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
+
+/// 1 when every bit of p is 1, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDBN(const cstub_Km_ZNB_Orbis_R5_64k_vboolN& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
+
+/// 1 when every bit of p is 1, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDBN_2(const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& a);
 
 /// 1 when any bit of p is 1, else 0.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORB2N(const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
+
+/// 1 when any bit of p is 1, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORBN(const cstub_Km_ZNB_Orbis_R5_64k_vboolN& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool1
+
+/// 1 when any bit of p is 1, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool1
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORBN_2(const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& a);
 
-/// bits 0 to (n modulo the number of lanes) - 1 are 1, the others 0: none when n is a multiple of the number
-/// of lanes.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool2N cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTR2N(int n);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool2N
+/// bits 0 to (n modulo 64) - 1 are 1, the others 0: none when n is a multiple of 64.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTR2N(int n);
+
+/// bits 0 to (n modulo 64) - 1 are 1, the others 0: none when n is a multiple of 64.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTR2NI(immediate n);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTRN(int n);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTRNI(immediate n);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTRN_2(int n);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
+
+/// bits 0 to (n modulo 32) - 1 are 1, the others 0: none when n is a multiple of 32.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTRN(int n);
+
+/// bits 0 to (n modulo 32) - 1 are 1, the others 0: none when n is a multiple of 32.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTRNI(immediate n);
+
+/// bits 0 to (n modulo 16) - 1 are 1, the others 0: none when n is a multiple of 16.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTRN_2(int n);
+
+/// bits 0 to (n modulo 16) - 1 are 1, the others 0: none when n is a multiple of 16.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTRN_2I(immediate n);
 
-/// bits 0 to n - 1 are 1, the others 0: none when n is negative, all when n is the number of lanes or more.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool2N cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTRS2N(int n);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTRSN(int n);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTRSN_2(int n);
+/// bits 0 to n - 1 are 1, the others 0: none when n is negative, all when n is 64 or more.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTRS2N(int n);
+
+/// bits 0 to n - 1 are 1, the others 0: none when n is negative, all when n is 32 or more.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTRSN(int n);
+
+/// bits 0 to n - 1 are 1, the others 0: none when n is negative, all when n is 16 or more.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LTRSN_2(int n);
 
 /* All lanes, or those whose predicate bit is 1, to one value: sums, extremes, bitwise logic.
    Table: src/integer/reductions.def */
 
 /// the sum of all signed lanes, exact.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADD2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+
+/// the sum of all signed lanes, exact.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADDNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
 
 /// the sum of the signed lanes whose predicate bit is 1, exact.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADD2NX8T(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADD2NX8T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADDNX16T(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// the sum of the signed lanes whose predicate bit is 1, exact.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADDNX16T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// the sum of all unsigned lanes, exact.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADDU2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+
+/// the sum of all unsigned lanes, exact.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADDUNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
 
 /// the sum of the unsigned lanes whose predicate bit is 1, exact.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADDU2NX8T(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADDU2NX8T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADDUNX16T(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+
+/// the sum of the unsigned lanes whose predicate bit is 1, exact.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADDUNX16T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// the sum of all lanes, modulo 2^32.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADDN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+
+/// the sum of all lanes, modulo 2^32.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADDN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
 
 /// the sum of the lanes whose predicate bit is 1, modulo 2^32.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADDN_2X32T(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADDN_2X32T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADDN_2X32UT(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+
+/// the sum of the lanes whose predicate bit is 1, modulo 2^32.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADDN_2X32UT(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// the sum of all signed lanes, clamped once to the signed range of a lane.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADDSNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
 
 /// the sum of the signed lanes whose predicate bit is 1, clamped once to the signed range of a lane.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADDSNX16T(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RADDSNX16T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
 /// the largest signed lane.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAX2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+
+/// the largest signed lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+
+/// the largest signed lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
 
 /// the largest signed lane of those whose predicate bit is 1; without any, the lowest number of a lane.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAX2NX8T(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAX2NX8T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXNX16T(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// the largest signed lane of those whose predicate bit is 1; without any, the lowest number of a lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXNX16T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXN_2X32T(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+
+/// the largest signed lane of those whose predicate bit is 1; without any, the lowest number of a lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXN_2X32T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// the smallest signed lane.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMIN2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+
+/// the smallest signed lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+
+/// the smallest signed lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
 
 /// the smallest signed lane of those whose predicate bit is 1; without any, the highest number of a lane.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMIN2NX8T(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMIN2NX8T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINNX16T(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// the smallest signed lane of those whose predicate bit is 1; without any, the highest number of a lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINNX16T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINN_2X32T(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+
+/// the smallest signed lane of those whose predicate bit is 1; without any, the highest number of a lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINN_2X32T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// the largest unsigned lane.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXU2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+
+/// the largest unsigned lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXUNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+
+/// the largest unsigned lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXUN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
 
 /// the largest unsigned lane of those whose predicate bit is 1; without any, 0.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXU2NX8T(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXU2NX8T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXUNX16T(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+
+/// the largest unsigned lane of those whose predicate bit is 1; without any, 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXUNX16T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXUN_2X32T(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+
+/// the largest unsigned lane of those whose predicate bit is 1; without any, 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXUN_2X32T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// the smallest unsigned lane.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINU2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+
+/// the smallest unsigned lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINUNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+
+/// the smallest unsigned lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINUN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
 
 /// the smallest unsigned lane of those whose predicate bit is 1; without any, the highest number of a lane.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINU2NX8T(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINU2NX8T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINUNX16T(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+
+/// the smallest unsigned lane of those whose predicate bit is 1; without any, the highest number of a lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINUNX16T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINUN_2X32T(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+
+/// the smallest unsigned lane of those whose predicate bit is 1; without any, the highest number of a lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINUN_2X32T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// the exclusive or of all lanes.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXOR2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+
+/// the exclusive or of all lanes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXOR2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+
+/// the exclusive or of all lanes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+
+/// the exclusive or of all lanes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+
+/// the exclusive or of all lanes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+
+/// the exclusive or of all lanes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
 
 /// the exclusive or of the lanes whose predicate bit is 1; without any, 0.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXOR2NX8T(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXOR2NX8T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXOR2NX8UT(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+
+/// the exclusive or of the lanes whose predicate bit is 1; without any, 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXOR2NX8UT(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORNX16T(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// the exclusive or of the lanes whose predicate bit is 1; without any, 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORNX16T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORNX16UT(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+
+/// the exclusive or of the lanes whose predicate bit is 1; without any, 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORNX16UT(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORN_2X32T(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+
+/// the exclusive or of the lanes whose predicate bit is 1; without any, 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORN_2X32T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORN_2X32UT(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+
+/// the exclusive or of the lanes whose predicate bit is 1; without any, 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORN_2X32UT(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// the bits that are 1 in any lane.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROR2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+
+/// the bits that are 1 in any lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROR2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+
+/// the bits that are 1 in any lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+
+/// the bits that are 1 in any lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+
+/// the bits that are 1 in any lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+
+/// the bits that are 1 in any lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
 
 /// the bits that are 1 in any lane whose predicate bit is 1; without any such lane, 0.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROR2NX8T(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROR2NX8T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROR2NX8UT(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+
+/// the bits that are 1 in any lane whose predicate bit is 1; without any such lane, 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ROR2NX8UT(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORNX16T(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// the bits that are 1 in any lane whose predicate bit is 1; without any such lane, 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORNX16T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORNX16UT(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+
+/// the bits that are 1 in any lane whose predicate bit is 1; without any such lane, 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORNX16UT(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORN_2X32T(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+
+/// the bits that are 1 in any lane whose predicate bit is 1; without any such lane, 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORN_2X32T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORN_2X32UT(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+
+/// the bits that are 1 in any lane whose predicate bit is 1; without any such lane, 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORN_2X32UT(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// the bits that are 1 in every lane.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RAND2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+
+/// the bits that are 1 in every lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RAND2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+
+/// the bits that are 1 in every lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+
+/// the bits that are 1 in every lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+
+/// the bits that are 1 in every lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+
+/// the bits that are 1 in every lane.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
 
 /// the bits that are 1 in every lane whose predicate bit is 1; without any such lane, all ones.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RAND2NX8T(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RAND2NX8T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RAND2NX8UT(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+
+/// the bits that are 1 in every lane whose predicate bit is 1; without any such lane, all ones.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RAND2NX8UT(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDNX16T(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// the bits that are 1 in every lane whose predicate bit is 1; without any such lane, all ones.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDNX16T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDNX16UT(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+
+/// the bits that are 1 in every lane whose predicate bit is 1; without any such lane, all ones.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDNX16UT(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDN_2X32T(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+
+/// the bits that are 1 in every lane whose predicate bit is 1; without any such lane, all ones.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDN_2X32T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDN_2X32UT(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+
+/// the bits that are 1 in every lane whose predicate bit is 1; without any such lane, all ones.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDN_2X32UT(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// acc = the larger of acc and the largest lane of a, all signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXA2NX8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& acc,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXA2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_int8& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
+
+/// acc = the larger of acc and the largest lane of a, all signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXANX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXANX16(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
+
+/// acc = the larger of acc and the largest lane of a, all signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXAN_2X32(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& acc,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMAXAN_2X32(cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
 
 /// acc = the smaller of acc and the smallest lane of a, all signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINA2NX8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& acc,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINA2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_int8& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
+
+/// acc = the smaller of acc and the smallest lane of a, all signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINANX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINANX16(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
+
+/// acc = the smaller of acc and the smallest lane of a, all signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINAN_2X32(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& acc,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RMINAN_2X32(cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
 
 /// acc = the exclusive or of acc and all lanes of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORA2NX8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& acc,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORA2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_int8& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
+
+/// acc = the exclusive or of acc and all lanes of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORA2NX8U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& acc,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORA2NX8U(cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a);
+
+/// acc = the exclusive or of acc and all lanes of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORANX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORANX16(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
+
+/// acc = the exclusive or of acc and all lanes of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORANX16U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& acc,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORANX16U(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
+
+/// acc = the exclusive or of acc and all lanes of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORAN_2X32(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& acc,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORAN_2X32(cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
+
+/// acc = the exclusive or of acc and all lanes of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORAN_2X32U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& acc,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RXORAN_2X32U(cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
 
 /// acc = the bits that are 1 in acc or any lane of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORA2NX8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& acc,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORA2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_int8& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
+
+/// acc = the bits that are 1 in acc or any lane of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORA2NX8U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& acc,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORA2NX8U(cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a);
+
+/// acc = the bits that are 1 in acc or any lane of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORANX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORANX16(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
+
+/// acc = the bits that are 1 in acc or any lane of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORANX16U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& acc,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORANX16U(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
+
+/// acc = the bits that are 1 in acc or any lane of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORAN_2X32(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& acc,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORAN_2X32(cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
+
+/// acc = the bits that are 1 in acc or any lane of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORAN_2X32U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& acc,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RORAN_2X32U(cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
 
 /// acc = the bits that are 1 in acc and every lane of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDA2NX8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& acc,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDA2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_int8& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a);
+
+/// acc = the bits that are 1 in acc and every lane of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDA2NX8U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& acc,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDA2NX8U(cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a);
+
+/// acc = the bits that are 1 in acc and every lane of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDANX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDANX16(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a);
+
+/// acc = the bits that are 1 in acc and every lane of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDANX16U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& acc,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDANX16U(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a);
+
+/// acc = the bits that are 1 in acc and every lane of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDAN_2X32(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& acc,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDAN_2X32(cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a);
+
+/// acc = the bits that are 1 in acc and every lane of a.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDAN_2X32U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& acc,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_RANDAN_2X32U(cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a);
 
 #endif

@@ -3,6 +3,8 @@
 #ifndef KASTARRI_LAYOUTS
 #define KASTARRI_LAYOUTS
 
+#include "kastarri/library.h"
+
 /// X(type, kind, bits, number) for every register type.
 /// How the lanes of a register type are to be read: kind, bits, number. The kinds are i signed, u unsigned,
 /// f floating point, b bits of a predicate, w words without a number. Lanes share the bytes of the type

@@ -2,8 +2,21 @@
 #ifndef KASTARRI_LIBRARY_H
 #define KASTARRI_LIBRARY_H
 
+#ifndef __cplusplus
+#error "kastarri is for C++: compile with g++ or clang++, a kernel in C with g++ -x c++"
+#include <cstddef>  // which a C compiler does not find: it stops here
+#endif
+
 /// What a declaration of the library carries: its symbol is exported.
 #define KASTARRI_API __attribute__((visibility("default")))
+
+/// The same of a function that is called for its result: a call that does not use it is warned of, unless it is cast to
+/// void.
+#ifdef __clang__
+#define KASTARRI_RESULT KASTARRI_API __attribute__((warn_unused_result))
+#else
+#define KASTARRI_RESULT [[nodiscard]] KASTARRI_API
+#endif
 
 /// The version of these headers, "0.2.0". The build, the packages and the tools take theirs from here.
 #define KASTARRI_VERSION_MAJOR 0

@@ -11,2232 +11,2645 @@
    all types look alike; the lanes matter to a predicate only.
    Table: src/memory/vectors.def */
 
-/// the 64 bytes at the address.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LV2NX8_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8* base,
+/// loads the 64 bytes at the address. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LV2NX8_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8* base,
     int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LV2NX8_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LV2NX8_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LV2NX8_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LV2NX8U_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LV2NX8U_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LV2NX8U_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LV2NX8U_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX16_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX16_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX16_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX16_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX16U_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX16U_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX16U_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX16U_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNXF16_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNXF16_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNXF16_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNXF16_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X32_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X32_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X32_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X32_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X32U_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X32U_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X32U_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X32U_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF32_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF32_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF32_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF32_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_4X64_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_4X64_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_4X64_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_4X64_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64** pointer,
-    int increment);
 
-/// lane i = the lane in memory where predicate bit i is 1, else 0; all 64 bytes are read.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LV2NX8T_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8* base,
-    int offset,
+/// loads the 64 bytes at the address. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LV2NX8_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8* base,
+    int offset);
+
+/// loads the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LV2NX8_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8** pointer, int increment);
+
+/// loads the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LV2NX8_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8** pointer, int increment);
+
+/// loads the 64 bytes at the address. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LV2NX8U_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U* base,
+    int offset);
+
+/// loads the 64 bytes at the address. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LV2NX8U_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U* base,
+    int offset);
+
+/// loads the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LV2NX8U_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U** pointer, int increment);
+
+/// loads the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LV2NX8U_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U** pointer, int increment);
+
+/// loads the 64 bytes at the address. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX16_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16* base,
+    int offset);
+
+/// loads the 64 bytes at the address. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX16_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16* base,
+    int offset);
+
+/// loads the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX16_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16** pointer, int increment);
+
+/// loads the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX16_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16** pointer, int increment);
+
+/// loads the 64 bytes at the address. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX16U_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U* base,
+    int offset);
+
+/// loads the 64 bytes at the address. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX16U_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U* base,
+    int offset);
+
+/// loads the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX16U_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U** pointer, int increment);
+
+/// loads the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX16U_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U** pointer, int increment);
+
+/// loads the 64 bytes at the address. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNXF16_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16* base,
+    int offset);
+
+/// loads the 64 bytes at the address. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNXF16_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16* base,
+    int offset);
+
+/// loads the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNXF16_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16** pointer, int increment);
+
+/// loads the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNXF16_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16** pointer, int increment);
+
+/// loads the 64 bytes at the address. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X32_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base,
+    int offset);
+
+/// loads the 64 bytes at the address. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X32_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base,
+    int offset);
+
+/// loads the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X32_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v** pointer, int increment);
+
+/// loads the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X32_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v** pointer, int increment);
+
+/// loads the 64 bytes at the address. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X32U_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base,
+    int offset);
+
+/// loads the 64 bytes at the address. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X32U_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base,
+    int offset);
+
+/// loads the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X32U_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv** pointer, int increment);
+
+/// loads the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X32U_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv** pointer, int increment);
+
+/// loads the 64 bytes at the address. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF32_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base,
+    int offset);
+
+/// loads the 64 bytes at the address. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF32_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base,
+    int offset);
+
+/// loads the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF32_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32** pointer, int increment);
+
+/// loads the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF32_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32** pointer, int increment);
+
+/// loads the 64 bytes at the address. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_4X64_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64* base,
+    int offset);
+
+/// loads the 64 bytes at the address. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_4X64_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64* base,
+    int offset);
+
+/// loads the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_4X64_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64** pointer, int increment);
+
+/// loads the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_4X64_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64** pointer, int increment);
+
+/// loads: lane i = the lane in memory where predicate bit i is 1, else 0; all 64 bytes are read. The address
+/// is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LV2NX8T_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8* base,
+    int offset, const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+
+/// loads: lane i = the lane in memory where predicate bit i is 1, else 0; all 64 bytes are read. The address
+/// is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LV2NX8T_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8* base,
+    int offset, const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+
+/// loads: lane i = the lane in memory where predicate bit i is 1, else 0; all 64 bytes are read. The address
+/// is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LV2NX8T_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LV2NX8T_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8* base,
-    int offset,
+
+/// loads: lane i = the lane in memory where predicate bit i is 1, else 0; all 64 bytes are read. The address
+/// is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LV2NX8T_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+
+/// loads: lane i = the lane in memory where predicate bit i is 1, else 0; all 64 bytes are read. The address
+/// is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LV2NX8UT_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U* base,
+    int offset, const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+
+/// loads: lane i = the lane in memory where predicate bit i is 1, else 0; all 64 bytes are read. The address
+/// is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LV2NX8UT_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U* base,
+    int offset, const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+
+/// loads: lane i = the lane in memory where predicate bit i is 1, else 0; all 64 bytes are read. The address
+/// is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LV2NX8T_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8** pointer,
-    int increment,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LV2NX8UT_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+
+/// loads: lane i = the lane in memory where predicate bit i is 1, else 0; all 64 bytes are read. The address
+/// is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LV2NX8T_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8** pointer,
-    int increment,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LV2NX8UT_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LV2NX8UT_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U* base,
-    int offset,
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LV2NX8UT_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U* base,
-    int offset,
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+
+/// loads: lane i = the lane in memory where predicate bit i is 1, else 0; all 64 bytes are read. The address
+/// is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX16T_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16* base,
+    int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// loads: lane i = the lane in memory where predicate bit i is 1, else 0; all 64 bytes are read. The address
+/// is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX16T_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16* base,
+    int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// loads: lane i = the lane in memory where predicate bit i is 1, else 0; all 64 bytes are read. The address
+/// is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LV2NX8UT_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U** pointer,
-    int increment,
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LV2NX8UT_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U** pointer,
-    int increment,
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX16T_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16* base,
-    int offset,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX16T_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX16T_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16* base,
-    int offset,
+
+/// loads: lane i = the lane in memory where predicate bit i is 1, else 0; all 64 bytes are read. The address
+/// is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX16T_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// loads: lane i = the lane in memory where predicate bit i is 1, else 0; all 64 bytes are read. The address
+/// is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX16UT_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U* base,
+    int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// loads: lane i = the lane in memory where predicate bit i is 1, else 0; all 64 bytes are read. The address
+/// is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX16UT_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U* base,
+    int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// loads: lane i = the lane in memory where predicate bit i is 1, else 0; all 64 bytes are read. The address
+/// is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX16T_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16** pointer,
-    int increment,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX16UT_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// loads: lane i = the lane in memory where predicate bit i is 1, else 0; all 64 bytes are read. The address
+/// is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX16T_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16** pointer,
-    int increment,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX16UT_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX16UT_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U* base,
-    int offset,
+
+/// loads: lane i = the lane in memory where predicate bit i is 1, else 0; all 64 bytes are read. The address
+/// is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNXF16T_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16* base,
+    int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// loads: lane i = the lane in memory where predicate bit i is 1, else 0; all 64 bytes are read. The address
+/// is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNXF16T_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16* base,
+    int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// loads: lane i = the lane in memory where predicate bit i is 1, else 0; all 64 bytes are read. The address
+/// is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNXF16T_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX16UT_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U* base,
-    int offset,
+
+/// loads: lane i = the lane in memory where predicate bit i is 1, else 0; all 64 bytes are read. The address
+/// is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNXF16T_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// loads: lane i = the lane in memory where predicate bit i is 1, else 0; all 64 bytes are read. The address
+/// is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X32T_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base,
+    int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// loads: lane i = the lane in memory where predicate bit i is 1, else 0; all 64 bytes are read. The address
+/// is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X32T_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base,
+    int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// loads: lane i = the lane in memory where predicate bit i is 1, else 0; all 64 bytes are read. The address
+/// is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX16UT_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U** pointer,
-    int increment,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX16UT_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U** pointer,
-    int increment,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNXF16T_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16* base,
-    int offset,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNXF16T_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16* base,
-    int offset,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNXF16T_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16** pointer,
-    int increment,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNXF16T_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16** pointer,
-    int increment,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X32T_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base,
-    int offset,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X32T_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base,
-    int offset,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X32T_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v** pointer,
-    int increment,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X32T_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v** pointer,
-    int increment,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X32UT_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base,
-    int offset,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X32UT_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base,
-    int offset,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X32UT_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv** pointer,
-    int increment,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X32UT_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv** pointer,
-    int increment,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF32T_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base,
-    int offset,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF32T_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base,
-    int offset,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF32T_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32** pointer,
-    int increment,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF32T_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32** pointer,
-    int increment,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X32T_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
-/// writes the 64 bytes at the address.
+/// loads: lane i = the lane in memory where predicate bit i is 1, else 0; all 64 bytes are read. The address
+/// is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SV2NX8_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8* base,
-    int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X32T_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v** pointer, int increment,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// loads: lane i = the lane in memory where predicate bit i is 1, else 0; all 64 bytes are read. The address
+/// is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X32UT_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base,
+    int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// loads: lane i = the lane in memory where predicate bit i is 1, else 0; all 64 bytes are read. The address
+/// is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X32UT_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base,
+    int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// loads: lane i = the lane in memory where predicate bit i is 1, else 0; all 64 bytes are read. The address
+/// is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SV2NX8_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8* base,
-    int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X32UT_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv** pointer, int increment,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// loads: lane i = the lane in memory where predicate bit i is 1, else 0; all 64 bytes are read. The address
+/// is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SV2NX8_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X32UT_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv** pointer, int increment,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// loads: lane i = the lane in memory where predicate bit i is 1, else 0; all 64 bytes are read. The address
+/// is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF32T_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base,
+    int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// loads: lane i = the lane in memory where predicate bit i is 1, else 0; all 64 bytes are read. The address
+/// is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF32T_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base,
+    int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// loads: lane i = the lane in memory where predicate bit i is 1, else 0; all 64 bytes are read. The address
+/// is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SV2NX8_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF32T_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32** pointer, int increment,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// loads: lane i = the lane in memory where predicate bit i is 1, else 0; all 64 bytes are read. The address
+/// is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SV2NX8U_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U* base,
-    int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2XF32T_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32** pointer, int increment,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// writes the 64 bytes at the address. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SV2NX8U_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U* base,
-    int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SV2NX8_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8* base, int offset);
+
+/// writes the 64 bytes at the address. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SV2NX8U_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SV2NX8_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8* base, int offset);
+
+/// writes the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SV2NX8U_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SV2NX8_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8** pointer, int increment);
+
+/// writes the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX16_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16* base,
-    int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SV2NX8_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8** pointer, int increment);
+
+/// writes the 64 bytes at the address. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX16_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16* base,
-    int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SV2NX8U_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U* base, int offset);
+
+/// writes the 64 bytes at the address. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX16_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SV2NX8U_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U* base, int offset);
+
+/// writes the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX16_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SV2NX8U_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U** pointer, int increment);
+
+/// writes the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX16U_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U* base,
-    int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SV2NX8U_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U** pointer, int increment);
+
+/// writes the 64 bytes at the address. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX16U_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U* base,
-    int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX16_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16* base, int offset);
+
+/// writes the 64 bytes at the address. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX16U_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX16_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16* base, int offset);
+
+/// writes the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX16U_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX16_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16** pointer, int increment);
+
+/// writes the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNXF16_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16* base,
-    int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX16_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16** pointer, int increment);
+
+/// writes the 64 bytes at the address. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNXF16_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16* base,
-    int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX16U_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U* base, int offset);
+
+/// writes the 64 bytes at the address. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNXF16_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX16U_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U* base, int offset);
+
+/// writes the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNXF16_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX16U_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U** pointer, int increment);
+
+/// writes the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X32_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base,
-    int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX16U_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U** pointer, int increment);
+
+/// writes the 64 bytes at the address. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X32_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base,
-    int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNXF16_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16* base, int offset);
+
+/// writes the 64 bytes at the address. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X32_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNXF16_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16* base, int offset);
+
+/// writes the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X32_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNXF16_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16** pointer, int increment);
+
+/// writes the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X32U_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base,
-    int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNXF16_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16** pointer, int increment);
+
+/// writes the 64 bytes at the address. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X32U_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base,
-    int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X32_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base, int offset);
+
+/// writes the 64 bytes at the address. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X32U_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X32_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base, int offset);
+
+/// writes the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X32U_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X32_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v** pointer, int increment);
+
+/// writes the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF32_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base,
-    int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X32_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v** pointer, int increment);
+
+/// writes the 64 bytes at the address. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF32_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base,
-    int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X32U_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base, int offset);
+
+/// writes the 64 bytes at the address. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF32_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X32U_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base, int offset);
+
+/// writes the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF32_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X32U_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv** pointer, int increment);
+
+/// writes the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_4X64_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64* base,
-    int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X32U_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv** pointer, int increment);
+
+/// writes the 64 bytes at the address. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_4X64_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64* base,
-    int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF32_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base, int offset);
+
+/// writes the 64 bytes at the address. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_4X64_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF32_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base, int offset);
+
+/// writes the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_4X64_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF32_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32** pointer, int increment);
+
+/// writes the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF32_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32** pointer, int increment);
+
+/// writes the 64 bytes at the address. The address is base + offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_4X64_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64* base, int offset);
+
+/// writes the 64 bytes at the address. The address is base + offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_4X64_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64* base, int offset);
+
+/// writes the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_4X64_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64** pointer, int increment);
+
+/// writes the 64 bytes at the address. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_4X64_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64** pointer, int increment);
 
 /// writes the lanes whose predicate bit is 1 and leaves the others in memory as they are; memory is not
-/// touched when every bit is 0, else all 64 bytes may be read and written back.
+/// touched when every bit is 0, else all 64 bytes may be read and written back. The address is base + offset
+/// bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SV2NX8T_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8* base,
-    int offset,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SV2NX8T_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8* base, int offset, const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+
+/// writes the lanes whose predicate bit is 1 and leaves the others in memory as they are; memory is not
+/// touched when every bit is 0, else all 64 bytes may be read and written back. The address is base + offset
+/// bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SV2NX8T_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8* base, int offset, const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+
+/// writes the lanes whose predicate bit is 1 and leaves the others in memory as they are; memory is not
+/// touched when every bit is 0, else all 64 bytes may be read and written back. The address is the pointer,
+/// which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SV2NX8T_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+
+/// writes the lanes whose predicate bit is 1 and leaves the others in memory as they are; memory is not
+/// touched when every bit is 0, else all 64 bytes may be read and written back. The address is the pointer,
+/// which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SV2NX8T_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8* base,
-    int offset,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SV2NX8T_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+
+/// writes the lanes whose predicate bit is 1 and leaves the others in memory as they are; memory is not
+/// touched when every bit is 0, else all 64 bytes may be read and written back. The address is base + offset
+/// bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SV2NX8T_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8** pointer,
-    int increment,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SV2NX8UT_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U* base, int offset,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+
+/// writes the lanes whose predicate bit is 1 and leaves the others in memory as they are; memory is not
+/// touched when every bit is 0, else all 64 bytes may be read and written back. The address is base + offset
+/// bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SV2NX8T_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8** pointer,
-    int increment,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SV2NX8UT_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U* base, int offset,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+
+/// writes the lanes whose predicate bit is 1 and leaves the others in memory as they are; memory is not
+/// touched when every bit is 0, else all 64 bytes may be read and written back. The address is the pointer,
+/// which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SV2NX8UT_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U* base,
-    int offset,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SV2NX8UT_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+
+/// writes the lanes whose predicate bit is 1 and leaves the others in memory as they are; memory is not
+/// touched when every bit is 0, else all 64 bytes may be read and written back. The address is the pointer,
+/// which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SV2NX8UT_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U* base,
-    int offset,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SV2NX8UT_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+
+/// writes the lanes whose predicate bit is 1 and leaves the others in memory as they are; memory is not
+/// touched when every bit is 0, else all 64 bytes may be read and written back. The address is base + offset
+/// bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SV2NX8UT_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U** pointer,
-    int increment,
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX16T_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16* base, int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// writes the lanes whose predicate bit is 1 and leaves the others in memory as they are; memory is not
+/// touched when every bit is 0, else all 64 bytes may be read and written back. The address is base + offset
+/// bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SV2NX8UT_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U** pointer,
-    int increment,
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX16T_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16* base, int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// writes the lanes whose predicate bit is 1 and leaves the others in memory as they are; memory is not
+/// touched when every bit is 0, else all 64 bytes may be read and written back. The address is the pointer,
+/// which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX16T_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16* base,
-    int offset,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX16T_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16** pointer, int increment, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// writes the lanes whose predicate bit is 1 and leaves the others in memory as they are; memory is not
+/// touched when every bit is 0, else all 64 bytes may be read and written back. The address is the pointer,
+/// which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX16T_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16** pointer, int increment, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// writes the lanes whose predicate bit is 1 and leaves the others in memory as they are; memory is not
+/// touched when every bit is 0, else all 64 bytes may be read and written back. The address is base + offset
+/// bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX16UT_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U* base, int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// writes the lanes whose predicate bit is 1 and leaves the others in memory as they are; memory is not
+/// touched when every bit is 0, else all 64 bytes may be read and written back. The address is base + offset
+/// bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX16UT_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U* base, int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// writes the lanes whose predicate bit is 1 and leaves the others in memory as they are; memory is not
+/// touched when every bit is 0, else all 64 bytes may be read and written back. The address is the pointer,
+/// which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX16UT_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// writes the lanes whose predicate bit is 1 and leaves the others in memory as they are; memory is not
+/// touched when every bit is 0, else all 64 bytes may be read and written back. The address is the pointer,
+/// which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX16T_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16* base,
-    int offset,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX16UT_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// writes the lanes whose predicate bit is 1 and leaves the others in memory as they are; memory is not
+/// touched when every bit is 0, else all 64 bytes may be read and written back. The address is base + offset
+/// bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX16T_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16** pointer,
-    int increment,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNXF16T_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16* base, int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// writes the lanes whose predicate bit is 1 and leaves the others in memory as they are; memory is not
+/// touched when every bit is 0, else all 64 bytes may be read and written back. The address is base + offset
+/// bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNXF16T_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16* base, int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// writes the lanes whose predicate bit is 1 and leaves the others in memory as they are; memory is not
+/// touched when every bit is 0, else all 64 bytes may be read and written back. The address is the pointer,
+/// which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNXF16T_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// writes the lanes whose predicate bit is 1 and leaves the others in memory as they are; memory is not
+/// touched when every bit is 0, else all 64 bytes may be read and written back. The address is the pointer,
+/// which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX16T_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16** pointer,
-    int increment,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNXF16T_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// writes the lanes whose predicate bit is 1 and leaves the others in memory as they are; memory is not
+/// touched when every bit is 0, else all 64 bytes may be read and written back. The address is base + offset
+/// bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX16UT_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U* base,
-    int offset,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX16UT_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U* base,
-    int offset,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX16UT_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U** pointer,
-    int increment,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX16UT_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U** pointer,
-    int increment,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNXF16T_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16* base,
-    int offset,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNXF16T_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16* base,
-    int offset,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNXF16T_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16** pointer,
-    int increment,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNXF16T_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16** pointer,
-    int increment,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X32T_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base,
-    int offset,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X32T_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base, int offset,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// writes the lanes whose predicate bit is 1 and leaves the others in memory as they are; memory is not
+/// touched when every bit is 0, else all 64 bytes may be read and written back. The address is base + offset
+/// bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X32T_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base,
-    int offset,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X32T_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v* base, int offset,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// writes the lanes whose predicate bit is 1 and leaves the others in memory as they are; memory is not
+/// touched when every bit is 0, else all 64 bytes may be read and written back. The address is the pointer,
+/// which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X32T_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v** pointer,
-    int increment,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X32T_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// writes the lanes whose predicate bit is 1 and leaves the others in memory as they are; memory is not
+/// touched when every bit is 0, else all 64 bytes may be read and written back. The address is the pointer,
+/// which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X32T_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v** pointer,
-    int increment,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X32T_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// writes the lanes whose predicate bit is 1 and leaves the others in memory as they are; memory is not
+/// touched when every bit is 0, else all 64 bytes may be read and written back. The address is base + offset
+/// bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X32UT_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base,
-    int offset,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X32UT_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base, int offset,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// writes the lanes whose predicate bit is 1 and leaves the others in memory as they are; memory is not
+/// touched when every bit is 0, else all 64 bytes may be read and written back. The address is base + offset
+/// bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X32UT_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base,
-    int offset,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X32UT_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv* base, int offset,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// writes the lanes whose predicate bit is 1 and leaves the others in memory as they are; memory is not
+/// touched when every bit is 0, else all 64 bytes may be read and written back. The address is the pointer,
+/// which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X32UT_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv** pointer,
-    int increment,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X32UT_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// writes the lanes whose predicate bit is 1 and leaves the others in memory as they are; memory is not
+/// touched when every bit is 0, else all 64 bytes may be read and written back. The address is the pointer,
+/// which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X32UT_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv** pointer,
-    int increment,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X32UT_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// writes the lanes whose predicate bit is 1 and leaves the others in memory as they are; memory is not
+/// touched when every bit is 0, else all 64 bytes may be read and written back. The address is base + offset
+/// bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF32T_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base,
-    int offset,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF32T_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base, int offset,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// writes the lanes whose predicate bit is 1 and leaves the others in memory as they are; memory is not
+/// touched when every bit is 0, else all 64 bytes may be read and written back. The address is base + offset
+/// bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF32T_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base,
-    int offset,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF32T_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32* base, int offset,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// writes the lanes whose predicate bit is 1 and leaves the others in memory as they are; memory is not
+/// touched when every bit is 0, else all 64 bytes may be read and written back. The address is the pointer,
+/// which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF32T_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32** pointer,
-    int increment,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF32T_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// writes the lanes whose predicate bit is 1 and leaves the others in memory as they are; memory is not
+/// touched when every bit is 0, else all 64 bytes may be read and written back. The address is the pointer,
+/// which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF32T_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32** pointer,
-    int increment,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2XF32T_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /* Loads into wider lanes and stores into narrower ones: 32 bytes of memory for a vector of 64, at any byte
    address. Modes as of whole vectors.
    Table: src/memory/widening.def */
 
-/// lane i = lane i of the 32 bytes at the address, sign-extended (..S) or zero-extended (..U).
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX8S_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base,
+/// loads: lane i = lane i of the 32 bytes at the address, sign-extended. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX8S_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base,
     int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX8S_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX8S_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX8S_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX8U_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX8U_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX8U_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX8U_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X16S_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X16S_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X16S_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X16S_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X16U_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X16U_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X16U_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X16U_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U** pointer,
-    int increment);
 
-/// lane i = lane i of the 32 bytes at the address, extended, where predicate bit i is 1, else 0; all 32 bytes
-/// are read.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX8ST_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base,
-    int offset,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX8ST_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base,
-    int offset,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+/// loads: lane i = lane i of the 32 bytes at the address, sign-extended. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX8S_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base,
+    int offset);
+
+/// loads: lane i = lane i of the 32 bytes at the address, sign-extended. The address is the pointer, which
+/// then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX8ST_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8** pointer,
-    int increment,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX8S_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8** pointer, int increment);
+
+/// loads: lane i = lane i of the 32 bytes at the address, sign-extended. The address is the pointer, which
+/// then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX8S_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8** pointer, int increment);
+
+/// loads: lane i = lane i of the 32 bytes at the address, zero-extended. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX8U_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base,
+    int offset);
+
+/// loads: lane i = lane i of the 32 bytes at the address, zero-extended. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX8U_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base,
+    int offset);
+
+/// loads: lane i = lane i of the 32 bytes at the address, zero-extended. The address is the pointer, which
+/// then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX8U_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U** pointer, int increment);
+
+/// loads: lane i = lane i of the 32 bytes at the address, zero-extended. The address is the pointer, which
+/// then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX8U_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U** pointer, int increment);
+
+/// loads: lane i = lane i of the 32 bytes at the address, sign-extended. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X16S_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base,
+    int offset);
+
+/// loads: lane i = lane i of the 32 bytes at the address, sign-extended. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X16S_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base,
+    int offset);
+
+/// loads: lane i = lane i of the 32 bytes at the address, sign-extended. The address is the pointer, which
+/// then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X16S_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16** pointer, int increment);
+
+/// loads: lane i = lane i of the 32 bytes at the address, sign-extended. The address is the pointer, which
+/// then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X16S_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16** pointer, int increment);
+
+/// loads: lane i = lane i of the 32 bytes at the address, zero-extended. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X16U_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base,
+    int offset);
+
+/// loads: lane i = lane i of the 32 bytes at the address, zero-extended. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X16U_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base,
+    int offset);
+
+/// loads: lane i = lane i of the 32 bytes at the address, zero-extended. The address is the pointer, which
+/// then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X16U_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U** pointer, int increment);
+
+/// loads: lane i = lane i of the 32 bytes at the address, zero-extended. The address is the pointer, which
+/// then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X16U_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U** pointer, int increment);
+
+/// loads: lane i = lane i of the 32 bytes at the address, sign-extended, where predicate bit i is 1, else 0;
+/// all 32 bytes are read. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX8ST_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base,
+    int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// loads: lane i = lane i of the 32 bytes at the address, sign-extended, where predicate bit i is 1, else 0;
+/// all 32 bytes are read. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX8ST_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base,
+    int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// loads: lane i = lane i of the 32 bytes at the address, sign-extended, where predicate bit i is 1, else 0;
+/// all 32 bytes are read. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX8ST_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// loads: lane i = lane i of the 32 bytes at the address, sign-extended, where predicate bit i is 1, else 0;
+/// all 32 bytes are read. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX8ST_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8** pointer,
-    int increment,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX8ST_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX8UT_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base,
-    int offset,
+
+/// loads: lane i = lane i of the 32 bytes at the address, zero-extended, where predicate bit i is 1, else 0;
+/// all 32 bytes are read. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX8UT_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base,
+    int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// loads: lane i = lane i of the 32 bytes at the address, zero-extended, where predicate bit i is 1, else 0;
+/// all 32 bytes are read. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX8UT_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base,
+    int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// loads: lane i = lane i of the 32 bytes at the address, zero-extended, where predicate bit i is 1, else 0;
+/// all 32 bytes are read. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX8UT_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX8UT_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base,
-    int offset,
+
+/// loads: lane i = lane i of the 32 bytes at the address, zero-extended, where predicate bit i is 1, else 0;
+/// all 32 bytes are read. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX8UT_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// loads: lane i = lane i of the 32 bytes at the address, sign-extended, where predicate bit i is 1, else 0;
+/// all 32 bytes are read. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X16ST_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base,
+    int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// loads: lane i = lane i of the 32 bytes at the address, sign-extended, where predicate bit i is 1, else 0;
+/// all 32 bytes are read. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X16ST_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base,
+    int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// loads: lane i = lane i of the 32 bytes at the address, sign-extended, where predicate bit i is 1, else 0;
+/// all 32 bytes are read. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX8UT_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U** pointer,
-    int increment,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVNX8UT_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U** pointer,
-    int increment,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X16ST_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base,
-    int offset,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X16ST_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base,
-    int offset,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X16ST_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16** pointer,
-    int increment,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X16ST_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16** pointer,
-    int increment,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X16UT_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base,
-    int offset,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X16UT_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base,
-    int offset,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X16UT_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U** pointer,
-    int increment,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X16UT_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U** pointer,
-    int increment,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X16ST_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
-/// writes 32 bytes at the address: lane i saturated to half its width (..S) or its low half (..U).
+/// loads: lane i = lane i of the 32 bytes at the address, sign-extended, where predicate bit i is 1, else 0;
+/// all 32 bytes are read. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8S_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8S_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8S_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8S_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8U_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8U_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8U_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8U_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16S_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16S_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16S_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16S_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16U_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16U_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16U_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16U_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X16ST_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16** pointer, int increment,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
-/// the same for the lanes whose predicate bit is 1; the others stay in memory as they are. Memory is not
-/// touched when every bit is 0, else all 32 bytes may be read and written back.
+/// loads: lane i = lane i of the 32 bytes at the address, zero-extended, where predicate bit i is 1, else 0;
+/// all 32 bytes are read. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X16UT_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base,
+    int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// loads: lane i = lane i of the 32 bytes at the address, zero-extended, where predicate bit i is 1, else 0;
+/// all 32 bytes are read. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X16UT_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base,
+    int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// loads: lane i = lane i of the 32 bytes at the address, zero-extended, where predicate bit i is 1, else 0;
+/// all 32 bytes are read. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8ST_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base,
-    int offset,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8ST_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base,
-    int offset,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8ST_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8** pointer,
-    int increment,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8ST_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8** pointer,
-    int increment,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8UT_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base,
-    int offset,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8UT_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base,
-    int offset,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8UT_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U** pointer,
-    int increment,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8UT_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U** pointer,
-    int increment,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16ST_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base,
-    int offset,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X16UT_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// loads: lane i = lane i of the 32 bytes at the address, zero-extended, where predicate bit i is 1, else 0;
+/// all 32 bytes are read. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16ST_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base,
-    int offset,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LVN_2X16UT_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// writes 32 bytes at the address: lane i saturated to half its width. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16ST_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16** pointer,
-    int increment,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8S_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base, int offset);
+
+/// writes 32 bytes at the address: lane i saturated to half its width. The address is base + offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8S_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base, int offset);
+
+/// writes 32 bytes at the address: lane i saturated to half its width. The address is the pointer, which then
+/// moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8S_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8** pointer, int increment);
+
+/// writes 32 bytes at the address: lane i saturated to half its width. The address is the pointer, which then
+/// moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8S_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8** pointer, int increment);
+
+/// writes 32 bytes at the address: the low half of lane i. The address is base + offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8U_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base, int offset);
+
+/// writes 32 bytes at the address: the low half of lane i. The address is base + offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8U_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base, int offset);
+
+/// writes 32 bytes at the address: the low half of lane i. The address is the pointer, which then moves by
+/// increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8U_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U** pointer, int increment);
+
+/// writes 32 bytes at the address: the low half of lane i. The address is the pointer, which then moves by
+/// increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8U_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U** pointer, int increment);
+
+/// writes 32 bytes at the address: lane i saturated to half its width. The address is base + offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16S_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base, int offset);
+
+/// writes 32 bytes at the address: lane i saturated to half its width. The address is base + offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16S_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base, int offset);
+
+/// writes 32 bytes at the address: lane i saturated to half its width. The address is the pointer, which then
+/// moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16S_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16** pointer, int increment);
+
+/// writes 32 bytes at the address: lane i saturated to half its width. The address is the pointer, which then
+/// moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16S_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16** pointer, int increment);
+
+/// writes 32 bytes at the address: the low half of lane i. The address is base + offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16U_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base, int offset);
+
+/// writes 32 bytes at the address: the low half of lane i. The address is base + offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16U_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base, int offset);
+
+/// writes 32 bytes at the address: the low half of lane i. The address is the pointer, which then moves by
+/// increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16U_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U** pointer, int increment);
+
+/// writes 32 bytes at the address: the low half of lane i. The address is the pointer, which then moves by
+/// increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16U_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U** pointer, int increment);
+
+/// writes 32 bytes at the address: lane i saturated to half its width where its predicate bit is 1; the
+/// others stay in memory as they are. Memory is not touched when every bit is 0, else all 32 bytes may be
+/// read and written back. The address is base + offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8ST_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base, int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// writes 32 bytes at the address: lane i saturated to half its width where its predicate bit is 1; the
+/// others stay in memory as they are. Memory is not touched when every bit is 0, else all 32 bytes may be
+/// read and written back. The address is base + offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8ST_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8* base, int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// writes 32 bytes at the address: lane i saturated to half its width where its predicate bit is 1; the
+/// others stay in memory as they are. Memory is not touched when every bit is 0, else all 32 bytes may be
+/// read and written back. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8ST_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8** pointer, int increment, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// writes 32 bytes at the address: lane i saturated to half its width where its predicate bit is 1; the
+/// others stay in memory as they are. Memory is not touched when every bit is 0, else all 32 bytes may be
+/// read and written back. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8ST_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8** pointer, int increment, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// writes 32 bytes at the address: the low half of lane i where its predicate bit is 1; the others stay in
+/// memory as they are. Memory is not touched when every bit is 0, else all 32 bytes may be read and written
+/// back. The address is base + offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8UT_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base, int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// writes 32 bytes at the address: the low half of lane i where its predicate bit is 1; the others stay in
+/// memory as they are. Memory is not touched when every bit is 0, else all 32 bytes may be read and written
+/// back. The address is base + offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8UT_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U* base, int offset, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// writes 32 bytes at the address: the low half of lane i where its predicate bit is 1; the others stay in
+/// memory as they are. Memory is not touched when every bit is 0, else all 32 bytes may be read and written
+/// back. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8UT_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U** pointer, int increment, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// writes 32 bytes at the address: the low half of lane i where its predicate bit is 1; the others stay in
+/// memory as they are. Memory is not touched when every bit is 0, else all 32 bytes may be read and written
+/// back. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVNX8UT_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U** pointer, int increment, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// writes 32 bytes at the address: lane i saturated to half its width where its predicate bit is 1; the
+/// others stay in memory as they are. Memory is not touched when every bit is 0, else all 32 bytes may be
+/// read and written back. The address is base + offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16ST_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base, int offset,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// writes 32 bytes at the address: lane i saturated to half its width where its predicate bit is 1; the
+/// others stay in memory as they are. Memory is not touched when every bit is 0, else all 32 bytes may be
+/// read and written back. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16ST_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16** pointer,
-    int increment,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16ST_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16* base, int offset,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// writes 32 bytes at the address: lane i saturated to half its width where its predicate bit is 1; the
+/// others stay in memory as they are. Memory is not touched when every bit is 0, else all 32 bytes may be
+/// read and written back. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16UT_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base,
-    int offset,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16ST_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// writes 32 bytes at the address: lane i saturated to half its width where its predicate bit is 1; the
+/// others stay in memory as they are. Memory is not touched when every bit is 0, else all 32 bytes may be
+/// read and written back. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16UT_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base,
-    int offset,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16ST_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// writes 32 bytes at the address: the low half of lane i where its predicate bit is 1; the others stay in
+/// memory as they are. Memory is not touched when every bit is 0, else all 32 bytes may be read and written
+/// back. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16UT_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U** pointer,
-    int increment,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16UT_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base, int offset,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// writes 32 bytes at the address: the low half of lane i where its predicate bit is 1; the others stay in
+/// memory as they are. Memory is not touched when every bit is 0, else all 32 bytes may be read and written
+/// back. The address is base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16UT_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U** pointer,
-    int increment,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16UT_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U* base, int offset,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// writes 32 bytes at the address: the low half of lane i where its predicate bit is 1; the others stay in
+/// memory as they are. Memory is not touched when every bit is 0, else all 32 bytes may be read and written
+/// back. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16UT_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U** pointer, int increment,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// writes 32 bytes at the address: the low half of lane i where its predicate bit is 1; the others stay in
+/// memory as they are. Memory is not touched when every bit is 0, else all 32 bytes may be read and written
+/// back. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SVN_2X16UT_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U** pointer, int increment,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /* Loads and stores of one element. The number in a name is the element's width in memory; NX8S to N_2X16U
    are extended to the register's lane and narrowed from it. Modes as of whole vectors.
    Table: src/memory/elements.def */
 
-/// the element at the address; no alignment is tested.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+/// loads the element at the address; no alignment is tested. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LS2NX8_I(const signed char* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8
+
+/// loads the element at the address; no alignment is tested. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LS2NX8_X(const signed char* base, int offset);
+
+/// loads the element at the address; no alignment is tested. The address is the pointer, which then moves by
+/// increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LS2NX8_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& r,
-    const signed char** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LS2NX8_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_int8& r,
+    const signed char** pointer, int increment);
+
+/// loads the element at the address; no alignment is tested. The address is the pointer, which then moves by
+/// increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LS2NX8_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8& r,
-    const signed char** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LS2NX8_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_int8& r,
+    const signed char** pointer, int increment);
+
+/// loads the element at the address; no alignment is tested. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LS2NX8U_I(const unsigned char* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
+
+/// loads the element at the address; no alignment is tested. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LS2NX8U_X(const unsigned char* base, int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LS2NX8U_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& r,
-    const unsigned char** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LS2NX8U_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& r,
-    const unsigned char** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int256
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_16X256_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int256* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int256
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_16X256_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int256* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_16X256_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int256& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int256** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_16X256_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int256& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int256** pointer,
-    int increment);
 
-/// the element at the address, which may be any. The post-increment modes demand of the destination object,
-/// not of the element, that it be aligned, or the program ends: to 2 bytes where it is made of 16-bit units,
-/// else to 4.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+/// loads the element at the address; no alignment is tested. The address is the pointer, which then moves by
+/// increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LS2NX8U_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& r,
+    const unsigned char** pointer, int increment);
+
+/// loads the element at the address; no alignment is tested. The address is the pointer, which then moves by
+/// increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LS2NX8U_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& r,
+    const unsigned char** pointer, int increment);
+
+/// loads the element at the address; no alignment is tested. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int256
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_16X256_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_int256* base,
+    int offset);
+
+/// loads the element at the address; no alignment is tested. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int256
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_16X256_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_int256* base,
+    int offset);
+
+/// loads the element at the address; no alignment is tested. The address is the pointer, which then moves by
+/// increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_16X256_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_int256& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int256** pointer, int increment);
+
+/// loads the element at the address; no alignment is tested. The address is the pointer, which then moves by
+/// increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_16X256_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_int256& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int256** pointer, int increment);
+
+/// loads the element at the address, which may be any. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSNX16_I(const short* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+
+/// loads the element at the address, which may be any. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSNX16_X(const short* base, int offset);
+
+/// loads the element at the address, which may be any. The destination object, not the element, must be
+/// aligned to 2 bytes, or the program ends. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSNX16_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
-    const short** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSNX16_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
+    const short** pointer, int increment);
+
+/// loads the element at the address, which may be any. The destination object, not the element, must be
+/// aligned to 2 bytes, or the program ends. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSNX16_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
-    const short** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSNX16_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
+    const short** pointer, int increment);
+
+/// loads the element at the address, which may be any. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSNX16U_I(const unsigned short* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+
+/// loads the element at the address, which may be any. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSNX16U_X(const unsigned short* base, int offset);
+
+/// loads the element at the address, which may be any. The destination object, not the element, must be
+/// aligned to 2 bytes, or the program ends. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSNX16U_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r,
-    const unsigned short** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSNX16U_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r,
+    const unsigned short** pointer, int increment);
+
+/// loads the element at the address, which may be any. The destination object, not the element, must be
+/// aligned to 2 bytes, or the program ends. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSNX16U_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r,
-    const unsigned short** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSNXF16_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSNX16U_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r,
+    const unsigned short** pointer, int increment);
+
+/// loads the element at the address, which may be any. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_f16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSNXF16_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base,
     int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_f16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSNXF16_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base,
+
+/// loads the element at the address, which may be any. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_f16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSNXF16_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base,
     int offset);
+
+/// loads the element at the address, which may be any. The destination object, not the element, must be
+/// aligned to 2 bytes, or the program ends. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSNXF16_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSNXF16_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16** pointer, int increment);
+
+/// loads the element at the address, which may be any. The destination object, not the element, must be
+/// aligned to 2 bytes, or the program ends. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSNXF16_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSNXF16_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_f16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16** pointer, int increment);
+
+/// loads the element at the address, which may be any. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_2X32_I(const int* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+
+/// loads the element at the address, which may be any. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_2X32_X(const int* base, int offset);
+
+/// loads the element at the address, which may be any. The destination object, not the element, must be
+/// aligned to 4 bytes, or the program ends. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_2X32_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& r,
-    const int** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_2X32_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& r,
+    const int** pointer, int increment);
+
+/// loads the element at the address, which may be any. The destination object, not the element, must be
+/// aligned to 4 bytes, or the program ends. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_2X32_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& r,
-    const int** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_2X32_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& r,
+    const int** pointer, int increment);
+
+/// loads the element at the address, which may be any. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_2X32U_I(const unsigned int* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+
+/// loads the element at the address, which may be any. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_2X32U_X(const unsigned int* base, int offset);
+
+/// loads the element at the address, which may be any. The destination object, not the element, must be
+/// aligned to 4 bytes, or the program ends. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_2X32U_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& r,
-    const unsigned int** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_2X32U_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& r,
+    const unsigned int** pointer, int increment);
+
+/// loads the element at the address, which may be any. The destination object, not the element, must be
+/// aligned to 4 bytes, or the program ends. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_2X32U_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& r,
-    const unsigned int** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_2XF32_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_2X32U_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& r,
+    const unsigned int** pointer, int increment);
+
+/// loads the element at the address, which may be any. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkfloat
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_2XF32_I(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base,
     int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkfloat
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_2XF32_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base,
+
+/// loads the element at the address, which may be any. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkfloat
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_2XF32_X(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base,
     int offset);
+
+/// loads the element at the address, which may be any. The destination object, not the element, must be
+/// aligned to 4 bytes, or the program ends. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_2XF32_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_2XF32_IP(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat** pointer, int increment);
+
+/// loads the element at the address, which may be any. The destination object, not the element, must be
+/// aligned to 4 bytes, or the program ends. The address is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_2XF32_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int64
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_2XF32_XP(cstub_Km_ZNB_Orbis_R5_64k_rkfloat& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat** pointer, int increment);
+
+/// loads the element at the address, which may be any. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int64
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_4X64_I(const long long* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int64
+
+/// loads the element at the address, which may be any. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int64
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_4X64_X(const long long* base, int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_4X64_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int64& r,
-    const long long** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_4X64_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int64& r,
-    const long long** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int128
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_8X128_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int128* base,
-    int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int128
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_8X128_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int128* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_8X128_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int128& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int128** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_8X128_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int128& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int128** pointer,
-    int increment);
 
-/// the element at the address, which may be any, sign-extended (..S) or zero-extended (..U). The
-/// post-increment modes demand that the destination object be aligned, or the program ends, as above.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+/// loads the element at the address, which may be any. The destination object, not the element, must be
+/// aligned to 4 bytes, or the program ends. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_4X64_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_int64& r,
+    const long long** pointer, int increment);
+
+/// loads the element at the address, which may be any. The destination object, not the element, must be
+/// aligned to 4 bytes, or the program ends. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_4X64_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_int64& r,
+    const long long** pointer, int increment);
+
+/// loads the element at the address, which may be any. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int128
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_8X128_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_int128* base,
+    int offset);
+
+/// loads the element at the address, which may be any. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int128
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_8X128_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_int128* base,
+    int offset);
+
+/// loads the element at the address, which may be any. The destination object, not the element, must be
+/// aligned to 4 bytes, or the program ends. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_8X128_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_int128& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int128** pointer, int increment);
+
+/// loads the element at the address, which may be any. The destination object, not the element, must be
+/// aligned to 4 bytes, or the program ends. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_8X128_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_int128& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int128** pointer, int increment);
+
+/// loads the element at the address, which may be any, sign-extended. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSNX8S_I(const signed char* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+
+/// loads the element at the address, which may be any, sign-extended. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSNX8S_X(const signed char* base, int offset);
+
+/// loads the element at the address, which may be any, sign-extended. The destination object, not the
+/// element, must be aligned to 2 bytes, or the program ends. The address is the pointer, which then moves by
+/// increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSNX8S_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
-    const signed char** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSNX8S_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
+    const signed char** pointer, int increment);
+
+/// loads the element at the address, which may be any, sign-extended. The destination object, not the
+/// element, must be aligned to 2 bytes, or the program ends. The address is the pointer, which then moves by
+/// increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSNX8S_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
-    const signed char** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSNX8S_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& r,
+    const signed char** pointer, int increment);
+
+/// loads the element at the address, which may be any, zero-extended. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSNX8U_I(const unsigned char* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+
+/// loads the element at the address, which may be any, zero-extended. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSNX8U_X(const unsigned char* base, int offset);
+
+/// loads the element at the address, which may be any, zero-extended. The destination object, not the
+/// element, must be aligned to 2 bytes, or the program ends. The address is the pointer, which then moves by
+/// increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSNX8U_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r,
-    const unsigned char** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSNX8U_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r,
+    const unsigned char** pointer, int increment);
+
+/// loads the element at the address, which may be any, zero-extended. The destination object, not the
+/// element, must be aligned to 2 bytes, or the program ends. The address is the pointer, which then moves by
+/// increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSNX8U_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r,
-    const unsigned char** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSNX8U_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& r,
+    const unsigned char** pointer, int increment);
+
+/// loads the element at the address, which may be any, sign-extended. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_2X16S_I(const short* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+
+/// loads the element at the address, which may be any, sign-extended. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_2X16S_X(const short* base, int offset);
+
+/// loads the element at the address, which may be any, sign-extended. The destination object, not the
+/// element, must be aligned to 4 bytes, or the program ends. The address is the pointer, which then moves by
+/// increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_2X16S_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& r,
-    const short** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_2X16S_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& r,
+    const short** pointer, int increment);
+
+/// loads the element at the address, which may be any, sign-extended. The destination object, not the
+/// element, must be aligned to 4 bytes, or the program ends. The address is the pointer, which then moves by
+/// increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_2X16S_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& r,
-    const short** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_2X16S_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& r,
+    const short** pointer, int increment);
+
+/// loads the element at the address, which may be any, zero-extended. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_2X16U_I(const unsigned short* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
+
+/// loads the element at the address, which may be any, zero-extended. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_2X16U_X(const unsigned short* base, int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_2X16U_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& r,
-    const unsigned short** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_2X16U_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& r,
-    const unsigned short** pointer,
-    int increment);
 
-/// writes lane 0 at the address; no alignment is tested. SSNX8S saturates it to 8 bits, SSNX8U writes its low
-/// byte.
+/// loads the element at the address, which may be any, zero-extended. The destination object, not the
+/// element, must be aligned to 4 bytes, or the program ends. The address is the pointer, which then moves by
+/// increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SS2NX8_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
-    const signed char* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SS2NX8_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
-    const signed char* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SS2NX8_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
-    signed char** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SS2NX8_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
-    signed char** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SS2NX8U_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
-    const unsigned char* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SS2NX8U_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
-    const unsigned char* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SS2NX8U_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
-    unsigned char** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SS2NX8U_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
-    unsigned char** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNX8S_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
-    const signed char* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNX8S_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
-    const signed char* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNX8S_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
-    signed char** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNX8S_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
-    signed char** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNX8U_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
-    const unsigned char* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNX8U_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
-    const unsigned char* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNX8U_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
-    unsigned char** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNX8U_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
-    unsigned char** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_16X256_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int256* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_16X256_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int256* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_16X256_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int256** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_16X256_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int256** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_2X16U_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& r,
+    const unsigned short** pointer, int increment);
 
-/// writes lane 0 at the address, which must be aligned, or the program ends: to 2 bytes for 16-bit elements,
-/// else to 4. SSN_2X16S saturates it to 16 bits, SSN_2X16U writes its low half.
+/// loads the element at the address, which may be any, zero-extended. The destination object, not the
+/// element, must be aligned to 4 bytes, or the program ends. The address is the pointer, which then moves by
+/// increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNX16_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
-    const short* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNX16_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
-    const short* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNX16_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
-    short** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNX16_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
-    short** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNX16U_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
-    const unsigned short* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNX16U_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
-    const unsigned short* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNX16U_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
-    unsigned short** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNX16U_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
-    unsigned short** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNXF16_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNXF16_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNXF16_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNXF16_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_f16** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2X16S_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
-    const short* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2X16S_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
-    const short* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2X16S_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
-    short** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2X16S_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
-    short** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2X16U_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
-    const unsigned short* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2X16U_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
-    const unsigned short* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2X16U_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
-    unsigned short** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2X16U_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
-    unsigned short** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2X32_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
-    const int* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2X32_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
-    const int* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2X32_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
-    int** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2X32_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
-    int** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2X32U_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
-    const unsigned int* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2X32U_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
-    const unsigned int* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2X32U_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
-    unsigned int** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2X32U_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
-    unsigned int** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2XF32_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2XF32_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2XF32_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2XF32_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
-    cstub_Km_ZNB_Orbis_R5_64k_rkfloat** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_4X64_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& v,
-    const long long* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_4X64_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& v,
-    const long long* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_4X64_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& v,
-    long long** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_4X64_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& v,
-    long long** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_8X128_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int128* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_8X128_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int128* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_8X128_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int128** pointer,
-    int increment);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_8X128_XP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& v,
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int128** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSN_2X16U_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& r,
+    const unsigned short** pointer, int increment);
 
-/// every lane = the element at the address; no alignment is tested. NX8S and N_2X16S sign-extend it, NX8U and
-/// N_2X16U zero-extend it.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+/// writes lane 0 at the address; no alignment is tested. The address is base + offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SS2NX8_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
+    const signed char* base, int offset);
+
+/// writes lane 0 at the address; no alignment is tested. The address is base + offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SS2NX8_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
+    const signed char* base, int offset);
+
+/// writes lane 0 at the address; no alignment is tested. The address is the pointer, which then moves by
+/// increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SS2NX8_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
+    signed char** pointer, int increment);
+
+/// writes lane 0 at the address; no alignment is tested. The address is the pointer, which then moves by
+/// increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SS2NX8_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
+    signed char** pointer, int increment);
+
+/// writes lane 0 at the address; no alignment is tested. The address is base + offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SS2NX8U_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
+    const unsigned char* base, int offset);
+
+/// writes lane 0 at the address; no alignment is tested. The address is base + offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SS2NX8U_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
+    const unsigned char* base, int offset);
+
+/// writes lane 0 at the address; no alignment is tested. The address is the pointer, which then moves by
+/// increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SS2NX8U_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
+    unsigned char** pointer, int increment);
+
+/// writes lane 0 at the address; no alignment is tested. The address is the pointer, which then moves by
+/// increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SS2NX8U_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
+    unsigned char** pointer, int increment);
+
+/// writes lane 0 at the address; no alignment is tested. It is saturated to 8 bits. The address is base +
+/// offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNX8S_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
+    const signed char* base, int offset);
+
+/// writes lane 0 at the address; no alignment is tested. It is saturated to 8 bits. The address is base +
+/// offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNX8S_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
+    const signed char* base, int offset);
+
+/// writes lane 0 at the address; no alignment is tested. It is saturated to 8 bits. The address is the
+/// pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNX8S_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
+    signed char** pointer, int increment);
+
+/// writes lane 0 at the address; no alignment is tested. It is saturated to 8 bits. The address is the
+/// pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNX8S_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
+    signed char** pointer, int increment);
+
+/// writes lane 0 at the address; no alignment is tested. Its low byte is written. The address is base +
+/// offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNX8U_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    const unsigned char* base, int offset);
+
+/// writes lane 0 at the address; no alignment is tested. Its low byte is written. The address is base +
+/// offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNX8U_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    const unsigned char* base, int offset);
+
+/// writes lane 0 at the address; no alignment is tested. Its low byte is written. The address is the pointer,
+/// which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNX8U_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    unsigned char** pointer, int increment);
+
+/// writes lane 0 at the address; no alignment is tested. Its low byte is written. The address is the pointer,
+/// which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNX8U_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    unsigned char** pointer, int increment);
+
+/// writes lane 0 at the address; no alignment is tested. The address is base + offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_16X256_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int256* base, int offset);
+
+/// writes lane 0 at the address; no alignment is tested. The address is base + offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_16X256_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int256* base, int offset);
+
+/// writes lane 0 at the address; no alignment is tested. The address is the pointer, which then moves by
+/// increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_16X256_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int256** pointer, int increment);
+
+/// writes lane 0 at the address; no alignment is tested. The address is the pointer, which then moves by
+/// increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_16X256_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int256** pointer, int increment);
+
+/// writes lane 0 at the address, which must be aligned to 2 bytes, or the program ends. The address is base +
+/// offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNX16_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
+    const short* base, int offset);
+
+/// writes lane 0 at the address, which must be aligned to 2 bytes, or the program ends. The address is base +
+/// offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNX16_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
+    const short* base, int offset);
+
+/// writes lane 0 at the address, which must be aligned to 2 bytes, or the program ends. The address is the
+/// pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNX16_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
+    short** pointer, int increment);
+
+/// writes lane 0 at the address, which must be aligned to 2 bytes, or the program ends. The address is the
+/// pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNX16_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
+    short** pointer, int increment);
+
+/// writes lane 0 at the address, which must be aligned to 2 bytes, or the program ends. The address is base +
+/// offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNX16U_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    const unsigned short* base, int offset);
+
+/// writes lane 0 at the address, which must be aligned to 2 bytes, or the program ends. The address is base +
+/// offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNX16U_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    const unsigned short* base, int offset);
+
+/// writes lane 0 at the address, which must be aligned to 2 bytes, or the program ends. The address is the
+/// pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNX16U_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    unsigned short** pointer, int increment);
+
+/// writes lane 0 at the address, which must be aligned to 2 bytes, or the program ends. The address is the
+/// pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNX16U_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    unsigned short** pointer, int increment);
+
+/// writes lane 0 at the address, which must be aligned to 2 bytes, or the program ends. The address is base +
+/// offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNXF16_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base, int offset);
+
+/// writes lane 0 at the address, which must be aligned to 2 bytes, or the program ends. The address is base +
+/// offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNXF16_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base, int offset);
+
+/// writes lane 0 at the address, which must be aligned to 2 bytes, or the program ends. The address is the
+/// pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNXF16_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_f16** pointer, int increment);
+
+/// writes lane 0 at the address, which must be aligned to 2 bytes, or the program ends. The address is the
+/// pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSNXF16_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_f16** pointer, int increment);
+
+/// writes lane 0 at the address, which must be aligned to 2 bytes, or the program ends. It is saturated to 16
+/// bits. The address is base + offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2X16S_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
+    const short* base, int offset);
+
+/// writes lane 0 at the address, which must be aligned to 2 bytes, or the program ends. It is saturated to 16
+/// bits. The address is base + offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2X16S_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
+    const short* base, int offset);
+
+/// writes lane 0 at the address, which must be aligned to 2 bytes, or the program ends. It is saturated to 16
+/// bits. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2X16S_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
+    short** pointer, int increment);
+
+/// writes lane 0 at the address, which must be aligned to 2 bytes, or the program ends. It is saturated to 16
+/// bits. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2X16S_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
+    short** pointer, int increment);
+
+/// writes lane 0 at the address, which must be aligned to 2 bytes, or the program ends. Its low half is
+/// written. The address is base + offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2X16U_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
+    const unsigned short* base, int offset);
+
+/// writes lane 0 at the address, which must be aligned to 2 bytes, or the program ends. Its low half is
+/// written. The address is base + offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2X16U_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
+    const unsigned short* base, int offset);
+
+/// writes lane 0 at the address, which must be aligned to 2 bytes, or the program ends. Its low half is
+/// written. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2X16U_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
+    unsigned short** pointer, int increment);
+
+/// writes lane 0 at the address, which must be aligned to 2 bytes, or the program ends. Its low half is
+/// written. The address is the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2X16U_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
+    unsigned short** pointer, int increment);
+
+/// writes lane 0 at the address, which must be aligned to 4 bytes, or the program ends. The address is base +
+/// offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2X32_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
+    const int* base, int offset);
+
+/// writes lane 0 at the address, which must be aligned to 4 bytes, or the program ends. The address is base +
+/// offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2X32_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
+    const int* base, int offset);
+
+/// writes lane 0 at the address, which must be aligned to 4 bytes, or the program ends. The address is the
+/// pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2X32_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
+    int** pointer, int increment);
+
+/// writes lane 0 at the address, which must be aligned to 4 bytes, or the program ends. The address is the
+/// pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2X32_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
+    int** pointer, int increment);
+
+/// writes lane 0 at the address, which must be aligned to 4 bytes, or the program ends. The address is base +
+/// offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2X32U_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
+    const unsigned int* base, int offset);
+
+/// writes lane 0 at the address, which must be aligned to 4 bytes, or the program ends. The address is base +
+/// offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2X32U_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
+    const unsigned int* base, int offset);
+
+/// writes lane 0 at the address, which must be aligned to 4 bytes, or the program ends. The address is the
+/// pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2X32U_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
+    unsigned int** pointer, int increment);
+
+/// writes lane 0 at the address, which must be aligned to 4 bytes, or the program ends. The address is the
+/// pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2X32U_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
+    unsigned int** pointer, int increment);
+
+/// writes lane 0 at the address, which must be aligned to 4 bytes, or the program ends. The address is base +
+/// offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2XF32_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base, int offset);
+
+/// writes lane 0 at the address, which must be aligned to 4 bytes, or the program ends. The address is base +
+/// offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2XF32_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base, int offset);
+
+/// writes lane 0 at the address, which must be aligned to 4 bytes, or the program ends. The address is the
+/// pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2XF32_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    cstub_Km_ZNB_Orbis_R5_64k_rkfloat** pointer, int increment);
+
+/// writes lane 0 at the address, which must be aligned to 4 bytes, or the program ends. The address is the
+/// pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_2XF32_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    cstub_Km_ZNB_Orbis_R5_64k_rkfloat** pointer, int increment);
+
+/// writes lane 0 at the address, which must be aligned to 4 bytes, or the program ends. The address is base +
+/// offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_4X64_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& v,
+    const long long* base, int offset);
+
+/// writes lane 0 at the address, which must be aligned to 4 bytes, or the program ends. The address is base +
+/// offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_4X64_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& v,
+    const long long* base, int offset);
+
+/// writes lane 0 at the address, which must be aligned to 4 bytes, or the program ends. The address is the
+/// pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_4X64_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& v,
+    long long** pointer, int increment);
+
+/// writes lane 0 at the address, which must be aligned to 4 bytes, or the program ends. The address is the
+/// pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_4X64_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& v,
+    long long** pointer, int increment);
+
+/// writes lane 0 at the address, which must be aligned to 4 bytes, or the program ends. The address is base +
+/// offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_8X128_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int128* base, int offset);
+
+/// writes lane 0 at the address, which must be aligned to 4 bytes, or the program ends. The address is base +
+/// offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_8X128_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int128* base, int offset);
+
+/// writes lane 0 at the address, which must be aligned to 4 bytes, or the program ends. The address is the
+/// pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_8X128_IP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int128** pointer, int increment);
+
+/// writes lane 0 at the address, which must be aligned to 4 bytes, or the program ends. The address is the
+/// pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SSN_8X128_XP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128& v,
+    cstub_Km_ZNB_Orbis_R5_64k_qv_int128** pointer, int increment);
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is base + offset
+/// bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSR2NX8_I(const signed char* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is base + offset
+/// bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSR2NX8_X(const signed char* base, int offset);
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is the pointer, which
+/// then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSR2NX8_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r,
-    const signed char** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSR2NX8_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r,
+    const signed char** pointer, int increment);
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is the pointer, which
+/// then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSR2NX8_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r,
-    const signed char** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSR2NX8_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r,
+    const signed char** pointer, int increment);
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is base + offset
+/// bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSR2NX8U_I(const unsigned char* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is base + offset
+/// bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSR2NX8U_X(const unsigned char* base, int offset);
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is the pointer, which
+/// then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSR2NX8U_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& r,
-    const unsigned char** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSR2NX8U_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& r,
+    const unsigned char** pointer, int increment);
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is the pointer, which
+/// then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSR2NX8U_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& r,
-    const unsigned char** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSR2NX8U_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& r,
+    const unsigned char** pointer, int increment);
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is base + offset
+/// bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRNX16_I(const short* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is base + offset
+/// bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRNX16_X(const short* base, int offset);
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is the pointer, which
+/// then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRNX16_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
-    const short** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRNX16_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const short** pointer, int increment);
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is the pointer, which
+/// then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRNX16_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
-    const short** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRNX16_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const short** pointer, int increment);
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is base + offset
+/// bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRNX16U_I(const unsigned short* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is base + offset
+/// bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRNX16U_X(const unsigned short* base, int offset);
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is the pointer, which
+/// then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRNX16U_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
-    const unsigned short** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRNX16U_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
+    const unsigned short** pointer, int increment);
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is the pointer, which
+/// then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRNX16U_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
-    const unsigned short** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRNXF16_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRNX16U_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
+    const unsigned short** pointer, int increment);
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is base + offset
+/// bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRNXF16_I(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base,
     int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRNXF16_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base,
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is base + offset
+/// bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRNXF16_X(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base,
     int offset);
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is the pointer, which
+/// then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRNXF16_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRNXF16_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16** pointer, int increment);
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is the pointer, which
+/// then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRNXF16_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRNXF16_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16** pointer, int increment);
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is base + offset
+/// bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_2X32_I(const int* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is base + offset
+/// bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_2X32_X(const int* base, int offset);
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is the pointer, which
+/// then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_2X32_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
-    const int** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_2X32_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
+    const int** pointer, int increment);
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is the pointer, which
+/// then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_2X32_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
-    const int** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_2X32_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
+    const int** pointer, int increment);
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is base + offset
+/// bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_2X32U_I(const unsigned int* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is base + offset
+/// bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_2X32U_X(const unsigned int* base, int offset);
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is the pointer, which
+/// then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_2X32U_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
-    const unsigned int** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_2X32U_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
+    const unsigned int** pointer, int increment);
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is the pointer, which
+/// then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_2X32U_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
-    const unsigned int** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_2XF32_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_2X32U_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
+    const unsigned int** pointer, int increment);
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is base + offset
+/// bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_2XF32_I(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base,
     int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_2XF32_X(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base,
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is base + offset
+/// bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_2XF32_X(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base,
     int offset);
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is the pointer, which
+/// then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_2XF32_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_2XF32_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat** pointer, int increment);
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is the pointer, which
+/// then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_2XF32_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_2XF32_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat** pointer, int increment);
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is base + offset
+/// bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_4X64_I(const long long* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is base + offset
+/// bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_4X64_X(const long long* base, int offset);
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is the pointer, which
+/// then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_4X64_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& r,
-    const long long** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_4X64_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& r,
+    const long long** pointer, int increment);
+
+/// loads: every lane = the element at the address; no alignment is tested. The address is the pointer, which
+/// then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_4X64_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& r,
-    const long long** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_4X64_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64& r,
+    const long long** pointer, int increment);
+
+/// loads: every lane = the element at the address; no alignment is tested. It is sign-extended. The address
+/// is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRNX8S_I(const signed char* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+
+/// loads: every lane = the element at the address; no alignment is tested. It is sign-extended. The address
+/// is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRNX8S_X(const signed char* base, int offset);
+
+/// loads: every lane = the element at the address; no alignment is tested. It is sign-extended. The address
+/// is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRNX8S_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
-    const signed char** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRNX8S_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const signed char** pointer, int increment);
+
+/// loads: every lane = the element at the address; no alignment is tested. It is sign-extended. The address
+/// is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRNX8S_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
-    const signed char** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRNX8S_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& r,
+    const signed char** pointer, int increment);
+
+/// loads: every lane = the element at the address; no alignment is tested. It is zero-extended. The address
+/// is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRNX8U_I(const unsigned char* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+
+/// loads: every lane = the element at the address; no alignment is tested. It is zero-extended. The address
+/// is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRNX8U_X(const unsigned char* base, int offset);
+
+/// loads: every lane = the element at the address; no alignment is tested. It is zero-extended. The address
+/// is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRNX8U_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
-    const unsigned char** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRNX8U_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
+    const unsigned char** pointer, int increment);
+
+/// loads: every lane = the element at the address; no alignment is tested. It is zero-extended. The address
+/// is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRNX8U_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
-    const unsigned char** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRNX8U_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& r,
+    const unsigned char** pointer, int increment);
+
+/// loads: every lane = the element at the address; no alignment is tested. It is sign-extended. The address
+/// is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_2X16S_I(const short* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+
+/// loads: every lane = the element at the address; no alignment is tested. It is sign-extended. The address
+/// is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_2X16S_X(const short* base, int offset);
+
+/// loads: every lane = the element at the address; no alignment is tested. It is sign-extended. The address
+/// is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_2X16S_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
-    const short** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_2X16S_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
+    const short** pointer, int increment);
+
+/// loads: every lane = the element at the address; no alignment is tested. It is sign-extended. The address
+/// is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_2X16S_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
-    const short** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_2X16S_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& r,
+    const short** pointer, int increment);
+
+/// loads: every lane = the element at the address; no alignment is tested. It is zero-extended. The address
+/// is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_2X16U_I(const unsigned short* base, int offset);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+
+/// loads: every lane = the element at the address; no alignment is tested. It is zero-extended. The address
+/// is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_2X16U_X(const unsigned short* base, int offset);
+
+/// loads: every lane = the element at the address; no alignment is tested. It is zero-extended. The address
+/// is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_2X16U_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
-    const unsigned short** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_2X16U_IP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
+    const unsigned short** pointer, int increment);
+
+/// loads: every lane = the element at the address; no alignment is tested. It is zero-extended. The address
+/// is the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_2X16U_XP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
-    const unsigned short** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LSRN_2X16U_XP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& r,
+    const unsigned short** pointer, int increment);
 
 /* Predicates in memory.
    Table: src/memory/predicates.def */
 
-/// the predicate at the address: any address with an offset; with post-increment one aligned to 4 bytes, of
-/// LBN_2 to 2, or the program ends.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN
+/// loads the predicate at the address, which may be any. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LBN_I(const cstub_Km_ZNB_Orbis_R5_64k_vboolN* base, int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LBN_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LBN_2_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2* base,
-    int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LBN_2_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2** pointer,
-    int increment);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_vbool2N
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LB2N_I(const cstub_Km_ZNB_Orbis_R5_64k_vbool2N* base, int offset);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LB2N_IP(
-    cstub_Km_ZNB_Orbis_R5_64k_vbool2N& r,
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N** pointer,
-    int increment);
 
-/// writes the predicate at the address, which must be aligned to 4 bytes, of SBN_2 to 2, or the program ends.
+/// loads the predicate at the address, which must be aligned to 4 bytes, or the program ends. The address is
+/// the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SBN_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LBN_IP(cstub_Km_ZNB_Orbis_R5_64k_vboolN& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN** pointer, int increment);
+
+/// loads the predicate at the address, which may be any. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vboolN_2
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LBN_2_I(const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2* base,
     int offset);
+
+/// loads the predicate at the address, which must be aligned to 2 bytes, or the program ends. The address is
+/// the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SBN_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& v,
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LBN_2_IP(cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2** pointer, int increment);
+
+/// loads the predicate at the address, which may be any. The address is base + offset bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_vbool2N
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LB2N_I(const cstub_Km_ZNB_Orbis_R5_64k_vbool2N* base, int offset);
+
+/// loads the predicate at the address, which must be aligned to 4 bytes, or the program ends. The address is
+/// the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SBN_2_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2* base,
-    int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_LB2N_IP(cstub_Km_ZNB_Orbis_R5_64k_vbool2N& r,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N** pointer, int increment);
+
+/// writes the predicate at the address, which must be aligned to 4 bytes, or the program ends. The address is
+/// base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SBN_2_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& v,
-    cstub_Km_ZNB_Orbis_R5_64k_vboolN_2** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SBN_I(const cstub_Km_ZNB_Orbis_R5_64k_vboolN& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN* base, int offset);
+
+/// writes the predicate at the address, which must be aligned to 4 bytes, or the program ends. The address is
+/// the pointer, which then moves by increment bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SB2N_I(
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N* base,
-    int offset);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SBN_IP(const cstub_Km_ZNB_Orbis_R5_64k_vboolN& v,
+    cstub_Km_ZNB_Orbis_R5_64k_vboolN** pointer, int increment);
+
+/// writes the predicate at the address, which must be aligned to 2 bytes, or the program ends. The address is
+/// base + offset bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SB2N_IP(
-    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& v,
-    cstub_Km_ZNB_Orbis_R5_64k_vbool2N** pointer,
-    int increment);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SBN_2_I(const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2* base, int offset);
+
+/// writes the predicate at the address, which must be aligned to 2 bytes, or the program ends. The address is
+/// the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SBN_2_IP(const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& v,
+    cstub_Km_ZNB_Orbis_R5_64k_vboolN_2** pointer, int increment);
+
+/// writes the predicate at the address, which must be aligned to 4 bytes, or the program ends. The address is
+/// base + offset bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SB2N_I(const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_vbool2N* base, int offset);
+
+/// writes the predicate at the address, which must be aligned to 4 bytes, or the program ends. The address is
+/// the pointer, which then moves by increment bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SB2N_IP(const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& v,
+    cstub_Km_ZNB_Orbis_R5_64k_vbool2N** pointer, int increment);
 
 /* Gathers, in two steps: the elements into the gather register (GATHERA), and that into a vector (GATHERD).
    No address is tested.
    Table: src/memory/gather.def */
 
-/// element i, at base + offset i bytes, into 16-bit unit i, zero-extended; 0 and nothing read where predicate
-/// bit i is 0. The byte after each element is read too. The int of the _V forms is ignored.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX8U(
-    const unsigned char* base,
+/// element i, at base + offset i bytes, into 16-bit unit i, zero-extended. The byte after each element is
+/// read too.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX8U(const unsigned char* base,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX8U_V(
-    const unsigned char* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets,
-    int);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX8UT(
-    const unsigned char* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX8UT_V(
-    const unsigned char* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets,
-    int,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX8S(
-    const signed char* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX8S_V(
-    const signed char* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets,
-    int);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX8ST(
-    const signed char* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX8ST_V(
-    const signed char* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets,
-    int,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
 
-/// element i, at base + offset i bytes, into lane i; 0 and nothing read where predicate bit i is 0. The int
-/// of the _V forms is ignored.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX16(
-    const short* base,
+/// element i, at base + offset i bytes, into 16-bit unit i, zero-extended. The byte after each element is
+/// read too. The last int is ignored.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX8U_V(const unsigned char* base,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets, int);
+
+/// element i, at base + offset i bytes, into 16-bit unit i, zero-extended; 0 and nothing read where predicate
+/// bit i is 0. The byte after each element is read too.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX8UT(const unsigned char* base,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// element i, at base + offset i bytes, into 16-bit unit i, zero-extended; 0 and nothing read where predicate
+/// bit i is 0. The byte after each element is read too. The last int is ignored.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX8UT_V(const unsigned char* base,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets, int, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// element i, at base + offset i bytes, into 16-bit unit i, zero-extended. The byte after each element is
+/// read too.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX8S(const signed char* base,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX16_V(
-    const short* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets,
-    int);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX16T(
-    const short* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX16T_V(
-    const short* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets,
-    int,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX16U(
-    const unsigned short* base,
+
+/// element i, at base + offset i bytes, into 16-bit unit i, zero-extended. The byte after each element is
+/// read too. The last int is ignored.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX8S_V(const signed char* base,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets, int);
+
+/// element i, at base + offset i bytes, into 16-bit unit i, zero-extended; 0 and nothing read where predicate
+/// bit i is 0. The byte after each element is read too.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX8ST(const signed char* base,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// element i, at base + offset i bytes, into 16-bit unit i, zero-extended; 0 and nothing read where predicate
+/// bit i is 0. The byte after each element is read too. The last int is ignored.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX8ST_V(const signed char* base,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets, int, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// element i, at base + offset i bytes, into lane i.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX16(const short* base,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX16U_V(
-    const unsigned short* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets,
-    int);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX16UT(
-    const unsigned short* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX16UT_V(
-    const unsigned short* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets,
-    int,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANXF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base,
+
+/// element i, at base + offset i bytes, into lane i. The last int is ignored.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX16_V(const short* base,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets, int);
+
+/// element i, at base + offset i bytes, into lane i; 0 and nothing read where predicate bit i is 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX16T(const short* base,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// element i, at base + offset i bytes, into lane i; 0 and nothing read where predicate bit i is 0. The last
+/// int is ignored.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX16T_V(const short* base,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets, int, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// element i, at base + offset i bytes, into lane i.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX16U(const unsigned short* base,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANXF16_V(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets,
-    int);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANXF16T(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANXF16T_V(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets,
-    int,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERAN_2X32(
-    const int* base,
+
+/// element i, at base + offset i bytes, into lane i. The last int is ignored.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX16U_V(const unsigned short* base,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets, int);
+
+/// element i, at base + offset i bytes, into lane i; 0 and nothing read where predicate bit i is 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX16UT(const unsigned short* base,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// element i, at base + offset i bytes, into lane i; 0 and nothing read where predicate bit i is 0. The last
+/// int is ignored.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANX16UT_V(const unsigned short* base,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets, int, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// element i, at base + offset i bytes, into lane i.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets);
+
+/// element i, at base + offset i bytes, into lane i. The last int is ignored.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANXF16_V(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets, int);
+
+/// element i, at base + offset i bytes, into lane i; 0 and nothing read where predicate bit i is 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANXF16T(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// element i, at base + offset i bytes, into lane i; 0 and nothing read where predicate bit i is 0. The last
+/// int is ignored.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERANXF16T_V(const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets, int, const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// element i, at base + offset i bytes, into lane i.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERAN_2X32(const int* base,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERAN_2X32_V(
-    const int* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets,
-    int);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERAN_2X32T(
-    const int* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets,
+
+/// element i, at base + offset i bytes, into lane i. The last int is ignored.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERAN_2X32_V(const int* base,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets, int);
+
+/// element i, at base + offset i bytes, into lane i; 0 and nothing read where predicate bit i is 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERAN_2X32T(const int* base,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets, const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// element i, at base + offset i bytes, into lane i; 0 and nothing read where predicate bit i is 0. The last
+/// int is ignored.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERAN_2X32T_V(const int* base,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets, int,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERAN_2X32T_V(
-    const int* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets,
-    int,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERAN_2X32U(
-    const unsigned int* base,
+
+/// element i, at base + offset i bytes, into lane i.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERAN_2X32U(const unsigned int* base,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERAN_2X32U_V(
-    const unsigned int* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets,
-    int);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERAN_2X32UT(
-    const unsigned int* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets,
+
+/// element i, at base + offset i bytes, into lane i. The last int is ignored.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERAN_2X32U_V(const unsigned int* base,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets, int);
+
+/// element i, at base + offset i bytes, into lane i; 0 and nothing read where predicate bit i is 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERAN_2X32UT(const unsigned int* base,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets, const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// element i, at base + offset i bytes, into lane i; 0 and nothing read where predicate bit i is 0. The last
+/// int is ignored.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERAN_2X32UT_V(const unsigned int* base,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets, int,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERAN_2X32UT_V(
-    const unsigned int* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets,
-    int,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERAN_2XF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base,
+
+/// element i, at base + offset i bytes, into lane i.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERAN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERAN_2XF32_V(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets,
-    int);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERAN_2XF32T(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERAN_2XF32T_V(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets,
-    int,
+
+/// element i, at base + offset i bytes, into lane i. The last int is ignored.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERAN_2XF32_V(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets, int);
+
+/// element i, at base + offset i bytes, into lane i; 0 and nothing read where predicate bit i is 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERAN_2XF32T(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets, const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// element i, at base + offset i bytes, into lane i; 0 and nothing read where predicate bit i is 0. The last
+/// int is ignored.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_gsr
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERAN_2XF32T_V(const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets, int,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
 /// the 64 bytes of the gather register.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERDNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_gsr& gathered);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+
+/// the 64 bytes of the gather register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERDNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_gsr& gathered);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
+
+/// the 64 bytes of the gather register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERDNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_gsr& gathered);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+
+/// the 64 bytes of the gather register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERDN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_gsr& gathered);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
+
+/// the 64 bytes of the gather register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERDN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_gsr& gathered);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
+
+/// the 64 bytes of the gather register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERDN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_gsr& gathered);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+
+/// the 64 bytes of the gather register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERDNX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_gsr& gathered);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+
+/// the 64 bytes of the gather register.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MOVGATHERD(const cstub_Km_ZNB_Orbis_R5_64k_qv_gsr& gathered);
 
 /// byte i = the low byte of 16-bit unit i.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERDNX8S(const cstub_Km_ZNB_Orbis_R5_64k_qv_gsr& gathered);
 
 /// lane i = the low byte of 16-bit unit i for i below 32, else 0.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERD2NX8_L(const cstub_Km_ZNB_Orbis_R5_64k_qv_gsr& gathered);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+
+/// lane i = the low byte of 16-bit unit i for i below 32, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERD2NX8U_L(const cstub_Km_ZNB_Orbis_R5_64k_qv_gsr& gathered);
 
 /// lane 32 + i = the low byte of 16-bit unit i; lanes 0 to 31 keep their values.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERD2NX8_H(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERD2NX8_H(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& r,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_gsr& gathered);
+
+/// lane 32 + i = the low byte of 16-bit unit i; lanes 0 to 31 keep their values.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERD2NX8U_H(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& r,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_GATHERD2NX8U_H(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& r,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_gsr& gathered);
 
 /* Scatters: elements at base + offset bytes, one after the other in ascending order, so that of several at
    one address the last one stays. No address is tested.
    Table: src/memory/scatter.def */
 
-/// writes lane i, of SCATTERNX8U its low byte, at base + offset i bytes. The byte after an 8-bit element is
-/// read too.
+/// writes lane i's low byte at base + offset i bytes. The byte after each element is read too.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERNX8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
-    const unsigned char* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
-    const short* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERNX16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
-    const unsigned short* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERNXF16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERN_2X32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
-    const int* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERN_2X32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
-    const unsigned int* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERN_2XF32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERNX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    const unsigned char* base, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets);
 
-/// the same for the elements whose predicate bit is 1; for the others memory is not touched.
+/// writes lane i at base + offset i bytes.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERNX8UT(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
-    const unsigned char* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
+    const short* base, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets);
+
+/// writes lane i at base + offset i bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    const unsigned short* base, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets);
+
+/// writes lane i at base + offset i bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERNXF16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets);
+
+/// writes lane i at base + offset i bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
+    const int* base, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets);
+
+/// writes lane i at base + offset i bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
+    const unsigned int* base, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets);
+
+/// writes lane i at base + offset i bytes.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERN_2XF32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets);
+
+/// writes lane i's low byte at base + offset i bytes where its predicate bit is 1, else memory is not
+/// touched. The byte after each element is read too.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERNX8UT(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    const unsigned char* base, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// writes lane i at base + offset i bytes where its predicate bit is 1, else memory is not touched.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERNX16T(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
-    const short* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERNX16T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& v,
+    const short* base, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// writes lane i at base + offset i bytes where its predicate bit is 1, else memory is not touched.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERNX16UT(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
-    const unsigned short* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERNX16UT(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& v,
+    const unsigned short* base, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// writes lane i at base + offset i bytes where its predicate bit is 1, else memory is not touched.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERNXF16T(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERNXF16T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_f16* base, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// writes lane i at base + offset i bytes where its predicate bit is 1, else memory is not touched.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERN_2X32T(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
-    const int* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERN_2X32UT(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
-    const unsigned int* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets,
-    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERN_2XF32T(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERN_2X32T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& v,
+    const int* base, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
 
-/// writes lane i (_L) or lane 32 + i (_H) at base + offset i bytes for i below 32, of the T forms where the
-/// lane's predicate bit is 1. The byte after an element is read too.
+/// writes lane i at base + offset i bytes where its predicate bit is 1, else memory is not touched.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTER2NX8_L(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
-    const signed char* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERN_2X32UT(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& v,
+    const unsigned int* base, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// writes lane i at base + offset i bytes where its predicate bit is 1, else memory is not touched.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTER2NX8_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
-    const signed char* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERN_2XF32T(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32& v,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkfloat* base, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets,
+    const cstub_Km_ZNB_Orbis_R5_64k_vboolN_2& p);
+
+/// writes lane i at base + offset i bytes for i below 32. The byte after an element is read too.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTER2NX8U_L(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
-    const unsigned char* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTER2NX8_L(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
+    const signed char* base, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets);
+
+/// writes lane 32 + i at base + offset i bytes for i below 32. The byte after an element is read too.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTER2NX8U_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
-    const unsigned char* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTER2NX8_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
+    const signed char* base, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets);
+
+/// writes lane i at base + offset i bytes for i below 32. The byte after an element is read too.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTER2NX8T_L(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
-    const signed char* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTER2NX8U_L(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
+    const unsigned char* base, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets);
+
+/// writes lane 32 + i at base + offset i bytes for i below 32. The byte after an element is read too.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTER2NX8U_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
+    const unsigned char* base, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets);
+
+/// writes lane i at base + offset i bytes for i below 32, where the lane's predicate bit is 1. The byte after
+/// an element is read too.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTER2NX8T_L(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
+    const signed char* base, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+
+/// writes lane 32 + i at base + offset i bytes for i below 32, where the lane's predicate bit is 1. The byte
+/// after an element is read too.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTER2NX8T_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
-    const signed char* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTER2NX8T_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& v,
+    const signed char* base, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+
+/// writes lane i at base + offset i bytes for i below 32, where the lane's predicate bit is 1. The byte after
+/// an element is read too.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTER2NX8UT_L(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
-    const unsigned char* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTER2NX8UT_L(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
+    const unsigned char* base, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
+
+/// writes lane 32 + i at base + offset i bytes for i below 32, where the lane's predicate bit is 1. The byte
+/// after an element is read too.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTER2NX8UT_H(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
-    const unsigned char* base,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTER2NX8UT_H(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& v,
+    const unsigned char* base, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool2N& p);
 
 /// adds 1, wrapping, to the element at base + offset i bytes for every i: n to an element that n lanes
 /// address.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERINCNX16(
-    const short* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERINCNX16(const short* base,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets);
+
+/// adds 1, wrapping, to the element at base + offset i bytes for every i: n to an element that n lanes
+/// address.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERINCNX16U(
-    const unsigned short* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERINCNX16U(const unsigned short* base,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& offsets);
+
+/// adds 1, wrapping, to the element at base + offset i bytes for every i: n to an element that n lanes
+/// address.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERINCN_2X32(
-    const int* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERINCN_2X32(const int* base,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets);
+
+/// adds 1, wrapping, to the element at base + offset i bytes for every i: n to an element that n lanes
+/// address.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERINCN_2X32U(
-    const unsigned int* base,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SCATTERINCN_2X32U(const unsigned int* base,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& offsets);
 
 /// waits for scatters to complete; here every one has when it returns.

@@ -9,2286 +9,2202 @@
 /* Single products. Factors are signed; in UU forms unsigned; in US forms the first is unsigned.
    Table: src/multiply/products.def */
 
-/// lane i = a[i] * b[i], exact; UU forms read both factors as unsigned, US forms the first.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+/// lane i = a[i] * b[i], exact; the factors are signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUU2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+
+/// lane i = a[i] * b[i], exact; both factors are unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUU2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUU2NX8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+
+/// lane i = a[i] * b[i], exact; both factors are unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUU2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUS2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+
+/// lane i = a[i] * b[i], exact; the first factor is unsigned, the second signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUS2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUS2NX8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+
+/// lane i = a[i] * b[i], exact; the first factor is unsigned, the second signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUS2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// lane i = a[i] * b[i], exact; the factors are signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// lane i = a[i] * b[i], exact; both factors are unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUNX16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+
+/// lane i = a[i] * b[i], exact; both factors are unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+
+/// lane i = a[i] * b[i], exact; the first factor is unsigned, the second signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULN_2X32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+
+/// lane i = a[i] * b[i], exact; the factors are signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSN_2X32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+
+/// lane i = a[i] * b[i], exact; the first factor is unsigned, the second signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSN_2X32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
+
+/// lane i = a[i] * b[i], exact; the first factor is unsigned, the second signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSN_2X32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUU8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+
+/// lane i = a[i] * b[i], exact; both factors are unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUU8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUS8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+
+/// lane i = a[i] * b[i], exact; the first factor is unsigned, the second signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUS8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+
+/// lane i = a[i] * b[i], exact; the factors are signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUU16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+
+/// lane i = a[i] * b[i], exact; both factors are unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUU16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int64w
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int64w
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUS32U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+
+/// lane i = a[i] * b[i], exact; the factors are signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int64w
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
 
-/// lane i of acc = acc[i] + a[i] * b[i], modulo 2^24, 2^48 or 2^64; UU forms read both factors as unsigned,
-/// US forms the first.
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULA2NX8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUA2NX8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUA2NX8U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSA2NX8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSA2NX8U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUANX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUANX16U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSANX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAN_2X32(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSAN_2X32(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSAN_2X32U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUA8U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSA8U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULA16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUA16U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULA32(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSA32U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
+/// lane i = a[i] * b[i], exact; the first factor is unsigned, the second signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int64w
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUS32U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
 
-/// lane i of acc = acc[i] - a[i] * b[i], modulo 2^24, 2^48 or 2^64; UU forms read both factors as unsigned,
-/// US forms the first.
+/// lane i of acc = acc[i] + a[i] * b[i], modulo 2^24; the factors are signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULS2NX8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULA2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+
+/// lane i of acc = acc[i] + a[i] * b[i], modulo 2^24; both factors are unsigned.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUS2NX8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUA2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+
+/// lane i of acc = acc[i] + a[i] * b[i], modulo 2^24; both factors are unsigned.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUS2NX8U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUA2NX8U(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
+
+/// lane i of acc = acc[i] + a[i] * b[i], modulo 2^24; the first factor is unsigned, the second signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSS2NX8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSA2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+
+/// lane i of acc = acc[i] + a[i] * b[i], modulo 2^24; the first factor is unsigned, the second signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSS2NX8U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSA2NX8U(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+
+/// lane i of acc = acc[i] + a[i] * b[i], modulo 2^48; the factors are signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSNX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANX16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+
+/// lane i of acc = acc[i] + a[i] * b[i], modulo 2^48; both factors are unsigned.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUSNX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUANX16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+
+/// lane i of acc = acc[i] + a[i] * b[i], modulo 2^48; both factors are unsigned.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUSNX16U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUANX16U(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
+
+/// lane i of acc = acc[i] + a[i] * b[i], modulo 2^48; the first factor is unsigned, the second signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSSNX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSANX16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+
+/// lane i of acc = acc[i] + a[i] * b[i], modulo 2^64; the factors are signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSSNX16U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAN_2X32(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
+
+/// lane i of acc = acc[i] + a[i] * b[i], modulo 2^64; the first factor is unsigned, the second signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSN_2X32(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSAN_2X32(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
+
+/// lane i of acc = acc[i] + a[i] * b[i], modulo 2^64; the first factor is unsigned, the second signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSSN_2X32(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSAN_2X32U(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
+
+/// lane i of acc = acc[i] + a[i] * b[i], modulo 2^24; both factors are unsigned.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSSN_2X32U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUA8U(cstub_Km_ZNB_Orbis_R5_64k_qv_int24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
+
+/// lane i of acc = acc[i] + a[i] * b[i], modulo 2^24; the first factor is unsigned, the second signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUS8U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSA8U(cstub_Km_ZNB_Orbis_R5_64k_qv_int24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
+
+/// lane i of acc = acc[i] + a[i] * b[i], modulo 2^48; the factors are signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSS8U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULA16(cstub_Km_ZNB_Orbis_R5_64k_qv_int48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+
+/// lane i of acc = acc[i] + a[i] * b[i], modulo 2^48; both factors are unsigned.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULS16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUA16U(cstub_Km_ZNB_Orbis_R5_64k_qv_int48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
+
+/// lane i of acc = acc[i] + a[i] * b[i], modulo 2^64; the factors are signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUS16U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULA32(cstub_Km_ZNB_Orbis_R5_64k_qv_int64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
+
+/// lane i of acc = acc[i] + a[i] * b[i], modulo 2^64; the first factor is unsigned, the second signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSS16U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSA32U(cstub_Km_ZNB_Orbis_R5_64k_qv_int64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
+
+/// lane i of acc = acc[i] - a[i] * b[i], modulo 2^24; the factors are signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULS32(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULS2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+
+/// lane i of acc = acc[i] - a[i] * b[i], modulo 2^24; both factors are unsigned.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSS32U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUS2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+
+/// lane i of acc = acc[i] - a[i] * b[i], modulo 2^24; both factors are unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUS2NX8U(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
+
+/// lane i of acc = acc[i] - a[i] * b[i], modulo 2^24; the first factor is unsigned, the second signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSS2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+
+/// lane i of acc = acc[i] - a[i] * b[i], modulo 2^24; the first factor is unsigned, the second signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSS2NX8U(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+
+/// lane i of acc = acc[i] - a[i] * b[i], modulo 2^48; the factors are signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSNX16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+
+/// lane i of acc = acc[i] - a[i] * b[i], modulo 2^48; both factors are unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUSNX16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+
+/// lane i of acc = acc[i] - a[i] * b[i], modulo 2^48; both factors are unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUSNX16U(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
+
+/// lane i of acc = acc[i] - a[i] * b[i], modulo 2^48; the first factor is unsigned, the second signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSSNX16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+
+/// lane i of acc = acc[i] - a[i] * b[i], modulo 2^48; the first factor is unsigned, the second signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSSNX16U(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+
+/// lane i of acc = acc[i] - a[i] * b[i], modulo 2^64; the factors are signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSN_2X32(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
+
+/// lane i of acc = acc[i] - a[i] * b[i], modulo 2^64; the first factor is unsigned, the second signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSSN_2X32(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
+
+/// lane i of acc = acc[i] - a[i] * b[i], modulo 2^64; the first factor is unsigned, the second signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSSN_2X32U(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
+
+/// lane i of acc = acc[i] - a[i] * b[i], modulo 2^24; both factors are unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUS8U(cstub_Km_ZNB_Orbis_R5_64k_qv_int24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
+
+/// lane i of acc = acc[i] - a[i] * b[i], modulo 2^24; the first factor is unsigned, the second signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSS8U(cstub_Km_ZNB_Orbis_R5_64k_qv_int24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int8& b);
+
+/// lane i of acc = acc[i] - a[i] * b[i], modulo 2^48; the factors are signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULS16(cstub_Km_ZNB_Orbis_R5_64k_qv_int48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+
+/// lane i of acc = acc[i] - a[i] * b[i], modulo 2^48; both factors are unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUS16U(cstub_Km_ZNB_Orbis_R5_64k_qv_int48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
+
+/// lane i of acc = acc[i] - a[i] * b[i], modulo 2^48; the first factor is unsigned, the second signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSS16U(cstub_Km_ZNB_Orbis_R5_64k_qv_int48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+
+/// lane i of acc = acc[i] - a[i] * b[i], modulo 2^64; the factors are signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULS32(cstub_Km_ZNB_Orbis_R5_64k_qv_int64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
+
+/// lane i of acc = acc[i] - a[i] * b[i], modulo 2^64; the first factor is unsigned, the second signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSS32U(cstub_Km_ZNB_Orbis_R5_64k_qv_int64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
 
 /* Paired products: the sum of two, or in PD forms the first less the second.
    Table: src/multiply/pairs.def */
 
-/// lane i = a[i] * b[i] + c[i] * d[i], exact; UU forms read both factors of a product as unsigned, US forms
-/// the first.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULP2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& c,
+/// lane i = a[i] * b[i] + c[i] * d[i], exact; the factors are signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULP2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& c,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& d);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUP2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& c,
+
+/// lane i = a[i] * b[i] + c[i] * d[i], exact; both factors are unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUP2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& c,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& d);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSP2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& c,
+
+/// lane i = a[i] * b[i] + c[i] * d[i], exact; the first factor is unsigned, the second signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSP2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& c,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& d);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& d);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUPNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& d);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& c,
+
+/// lane i = a[i] * b[i] + c[i] * d[i], exact; the factors are signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& c,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& d);
 
-/// lane i of acc = acc[i] + (a[i] * b[i] + c[i] * d[i]), modulo 2^24 or 2^48; UU forms read both factors of a
-/// product as unsigned, US forms the first.
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPA2NX8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& d);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUPA2NX8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& d);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPA2NX8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& d);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPANX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& d);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUPANX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& c,
+/// lane i = a[i] * b[i] + c[i] * d[i], exact; both factors are unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUPNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& c,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& d);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPANX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& c,
+
+/// lane i = a[i] * b[i] + c[i] * d[i], exact; the first factor is unsigned, the second signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& c,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& d);
 
-/// lane i of acc = acc[i] - (a[i] * b[i] + c[i] * d[i]), modulo 2^24 or 2^48; UU forms read both factors of a
-/// product as unsigned, US forms the first.
+/// lane i of acc = acc[i] + (a[i] * b[i] + c[i] * d[i]), modulo 2^24; the factors are signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPS2NX8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& c,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPA2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& d);
+
+/// lane i of acc = acc[i] + (a[i] * b[i] + c[i] * d[i]), modulo 2^24; both factors are unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUPA2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& d);
+
+/// lane i of acc = acc[i] + (a[i] * b[i] + c[i] * d[i]), modulo 2^24; the first factor is unsigned, the
+/// second signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPA2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& d);
+
+/// lane i of acc = acc[i] + (a[i] * b[i] + c[i] * d[i]), modulo 2^48; the factors are signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPANX16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& d);
+
+/// lane i of acc = acc[i] + (a[i] * b[i] + c[i] * d[i]), modulo 2^48; both factors are unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUPANX16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& d);
+
+/// lane i of acc = acc[i] + (a[i] * b[i] + c[i] * d[i]), modulo 2^48; the first factor is unsigned, the
+/// second signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPANX16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& d);
+
+/// lane i of acc = acc[i] - (a[i] * b[i] + c[i] * d[i]), modulo 2^24; the factors are signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPS2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& d);
+
+/// lane i of acc = acc[i] - (a[i] * b[i] + c[i] * d[i]), modulo 2^24; both factors are unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUPS2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& d);
+
+/// lane i of acc = acc[i] - (a[i] * b[i] + c[i] * d[i]), modulo 2^24; the first factor is unsigned, the
+/// second signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPS2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& d);
+
+/// lane i of acc = acc[i] - (a[i] * b[i] + c[i] * d[i]), modulo 2^48; the factors are signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPSNX16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& d);
+
+/// lane i of acc = acc[i] - (a[i] * b[i] + c[i] * d[i]), modulo 2^48; both factors are unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUPSNX16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& d);
+
+/// lane i of acc = acc[i] - (a[i] * b[i] + c[i] * d[i]), modulo 2^48; the first factor is unsigned, the
+/// second signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPSNX16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& d);
+
+/// lane i = a[i] * b[i] - c[i] * d[i], exact; the factors are signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPD2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& c,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& d);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUPS2NX8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& c,
+
+/// lane i = a[i] * b[i] - c[i] * d[i], exact; both factors are unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUPD2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& c,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& d);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPS2NX8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& c,
+
+/// lane i = a[i] * b[i] - c[i] * d[i], exact; the first factor is unsigned, the second signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPD2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& c,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& d);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPSNX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& d);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUPSNX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& d);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPSNX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& c,
+
+/// lane i = a[i] * b[i] - c[i] * d[i], exact; the factors are signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPDNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& c,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& d);
 
-/// lane i = a[i] * b[i] - c[i] * d[i], exact; UU forms read both factors of a product as unsigned, US forms
-/// the first.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPD2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& d);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUPD2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& d);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPD2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& d);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPDNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& d);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUPDNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& c,
+/// lane i = a[i] * b[i] - c[i] * d[i], exact; both factors are unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUPDNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& c,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& d);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPDNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& c,
+
+/// lane i = a[i] * b[i] - c[i] * d[i], exact; the first factor is unsigned, the second signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPDNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& c,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& d);
 
-/// lane i of acc = acc[i] + (a[i] * b[i] - c[i] * d[i]), modulo 2^24 or 2^48; UU forms read both factors of a
-/// product as unsigned, US forms the first.
+/// lane i of acc = acc[i] + (a[i] * b[i] - c[i] * d[i]), modulo 2^24; the factors are signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPDA2NX8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& d);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPDA2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& d);
+
+/// lane i of acc = acc[i] + (a[i] * b[i] - c[i] * d[i]), modulo 2^24; both factors are unsigned.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUPDA2NX8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& d);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUPDA2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& d);
+
+/// lane i of acc = acc[i] + (a[i] * b[i] - c[i] * d[i]), modulo 2^24; the first factor is unsigned, the
+/// second signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPDA2NX8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& d);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPDA2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& d);
+
+/// lane i of acc = acc[i] + (a[i] * b[i] - c[i] * d[i]), modulo 2^48; the factors are signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPDANX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& d);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPDANX16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& d);
+
+/// lane i of acc = acc[i] + (a[i] * b[i] - c[i] * d[i]), modulo 2^48; both factors are unsigned.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUPDANX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& d);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUPDANX16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& d);
+
+/// lane i of acc = acc[i] + (a[i] * b[i] - c[i] * d[i]), modulo 2^48; the first factor is unsigned, the
+/// second signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPDANX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& d);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPDANX16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& d);
 
 /* Sums of two squares, in PD forms the first less the second.
    Table: src/multiply/squares.def */
 
-/// lane i = a[i]^2 + b[i]^2, exact; SQRU forms read the lanes as unsigned.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRP2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+/// lane i = a[i]^2 + b[i]^2, exact; the lanes are signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRP2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUP2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+
+/// lane i = a[i]^2 + b[i]^2, exact; the lanes are unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUP2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUP2NX8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+
+/// lane i = a[i]^2 + b[i]^2, exact; the lanes are unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUP2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRPNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// lane i = a[i]^2 + b[i]^2, exact; the lanes are signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRPNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// lane i = a[i]^2 + b[i]^2, exact; the lanes are unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPNX16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+
+/// lane i = a[i]^2 + b[i]^2, exact; the lanes are unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUP8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+
+/// lane i = a[i]^2 + b[i]^2, exact; the lanes are unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUP8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRP16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+
+/// lane i = a[i]^2 + b[i]^2, exact; the lanes are signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRP16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUP16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+
+/// lane i = a[i]^2 + b[i]^2, exact; the lanes are unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUP16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
 
-/// lane i of acc = acc[i] + (a[i]^2 + b[i]^2), modulo 2^24 or 2^48; SQRU forms read the lanes as unsigned.
+/// lane i of acc = acc[i] + (a[i]^2 + b[i]^2), modulo 2^24; the lanes are signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRPA2NX8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRPA2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+
+/// lane i of acc = acc[i] + (a[i]^2 + b[i]^2), modulo 2^24; the lanes are unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPA2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+
+/// lane i of acc = acc[i] + (a[i]^2 + b[i]^2), modulo 2^24; the lanes are unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPA2NX8U(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
+
+/// lane i of acc = acc[i] + (a[i]^2 + b[i]^2), modulo 2^48; the lanes are signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRPANX16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+
+/// lane i of acc = acc[i] + (a[i]^2 + b[i]^2), modulo 2^48; the lanes are unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPANX16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+
+/// lane i of acc = acc[i] + (a[i]^2 + b[i]^2), modulo 2^48; the lanes are unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPANX16U(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
+
+/// lane i of acc = acc[i] + (a[i]^2 + b[i]^2), modulo 2^24; the lanes are unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPA8U(cstub_Km_ZNB_Orbis_R5_64k_qv_int24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
+
+/// lane i of acc = acc[i] + (a[i]^2 + b[i]^2), modulo 2^48; the lanes are signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRPA16(cstub_Km_ZNB_Orbis_R5_64k_qv_int48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+
+/// lane i of acc = acc[i] + (a[i]^2 + b[i]^2), modulo 2^48; the lanes are unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPA16U(cstub_Km_ZNB_Orbis_R5_64k_qv_int48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
+
+/// lane i of acc = acc[i] - (a[i]^2 + b[i]^2), modulo 2^24; the lanes are signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRPS2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+
+/// lane i of acc = acc[i] - (a[i]^2 + b[i]^2), modulo 2^24; the lanes are unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPS2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+
+/// lane i of acc = acc[i] - (a[i]^2 + b[i]^2), modulo 2^24; the lanes are unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPS2NX8U(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
+
+/// lane i of acc = acc[i] - (a[i]^2 + b[i]^2), modulo 2^48; the lanes are signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRPSNX16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+
+/// lane i of acc = acc[i] - (a[i]^2 + b[i]^2), modulo 2^48; the lanes are unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPSNX16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+
+/// lane i of acc = acc[i] - (a[i]^2 + b[i]^2), modulo 2^48; the lanes are unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPSNX16U(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
+
+/// lane i of acc = acc[i] - (a[i]^2 + b[i]^2), modulo 2^24; the lanes are unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPS8U(cstub_Km_ZNB_Orbis_R5_64k_qv_int24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
+
+/// lane i of acc = acc[i] - (a[i]^2 + b[i]^2), modulo 2^48; the lanes are signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRPS16(cstub_Km_ZNB_Orbis_R5_64k_qv_int48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+
+/// lane i of acc = acc[i] - (a[i]^2 + b[i]^2), modulo 2^48; the lanes are unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPS16U(cstub_Km_ZNB_Orbis_R5_64k_qv_int48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
+
+/// lane i = a[i]^2 - b[i]^2, exact; the lanes are signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRPD2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPA2NX8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+
+/// lane i = a[i]^2 - b[i]^2, exact; the lanes are unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPD2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPA2NX8U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+
+/// lane i = a[i]^2 - b[i]^2, exact; the lanes are unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPD2NX8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRPANX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// lane i = a[i]^2 - b[i]^2, exact; the lanes are signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRPDNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPANX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// lane i = a[i]^2 - b[i]^2, exact; the lanes are unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPDNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPANX16U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+
+/// lane i = a[i]^2 - b[i]^2, exact; the lanes are unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPDNX16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPA8U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
+
+/// lane i = a[i]^2 - b[i]^2, exact; the lanes are unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPD8U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRPA16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+
+/// lane i = a[i]^2 - b[i]^2, exact; the lanes are signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRPD16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPA16U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+
+/// lane i = a[i]^2 - b[i]^2, exact; the lanes are unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPD16U(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
 
-/// lane i of acc = acc[i] - (a[i]^2 + b[i]^2), modulo 2^24 or 2^48; SQRU forms read the lanes as unsigned.
+/// lane i of acc = acc[i] + (a[i]^2 - b[i]^2), modulo 2^24; the lanes are signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRPS2NX8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPS2NX8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPS2NX8U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRPSNX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPSNX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPSNX16U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPS8U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRPS16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPS16U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRPDA2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
 
-/// lane i = a[i]^2 - b[i]^2, exact; SQRU forms read the lanes as unsigned.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRPD2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPD2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPD2NX8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRPDNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPDNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPDNX16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPD8U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRPD16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPD16U(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
+/// lane i of acc = acc[i] + (a[i]^2 - b[i]^2), modulo 2^24; the lanes are unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPDA2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
 
-/// lane i of acc = acc[i] + (a[i]^2 - b[i]^2), modulo 2^24 or 2^48; SQRU forms read the lanes as unsigned.
+/// lane i of acc = acc[i] + (a[i]^2 - b[i]^2), modulo 2^24; the lanes are unsigned.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRPDA2NX8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPDA2NX8U(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
+
+/// lane i of acc = acc[i] + (a[i]^2 - b[i]^2), modulo 2^48; the lanes are signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPDA2NX8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRPDANX16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+
+/// lane i of acc = acc[i] + (a[i]^2 - b[i]^2), modulo 2^48; the lanes are unsigned.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPDA2NX8U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPDANX16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+
+/// lane i of acc = acc[i] + (a[i]^2 - b[i]^2), modulo 2^48; the lanes are unsigned.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRPDANX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPDANX16U(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
+
+/// lane i of acc = acc[i] + (a[i]^2 - b[i]^2), modulo 2^24; the lanes are unsigned.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPDANX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPDA8U(cstub_Km_ZNB_Orbis_R5_64k_qv_int24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
+
+/// lane i of acc = acc[i] + (a[i]^2 - b[i]^2), modulo 2^48; the lanes are signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPDANX16U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRPDA16(cstub_Km_ZNB_Orbis_R5_64k_qv_int48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+
+/// lane i of acc = acc[i] + (a[i]^2 - b[i]^2), modulo 2^48; the lanes are unsigned.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPDA8U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int8U& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRPDA16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPDA16U(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SQRUPDA16U(cstub_Km_ZNB_Orbis_R5_64k_qv_int48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
 
 /* Vectors times coefficients from words of the scalar core. A word is the one in whose bytes the reference
    points: the low two bits of the address are ignored.
    Table: src/multiply/taps.def */
 
-/// lane i = a[i] * s0, s0 the low half of s, exact; vectors and coefficients are signed, US forms the vectors
-/// as unsigned.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL2N8XR16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUS2N8XR16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+/// lane i = a[i] * s0, s0 the low half of s, exact; vectors and coefficients are signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL2N8XR16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
 
-/// added to acc, modulo 2^24: lane i = a[i] * s0, s0 the low half of s; vectors and coefficients are signed,
-/// US forms the vectors as unsigned.
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULA2N8XR16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+/// lane i = a[i] * s0, s0 the low half of s, exact; vectors are unsigned, coefficients signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUS2N8XR16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+
+/// added to acc, modulo 2^24: lane i = a[i] * s0, s0 the low half of s; vectors and coefficients are signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSA2N8XR16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULA2N8XR16(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+
+/// added to acc, modulo 2^24: lane i = a[i] * s0, s0 the low half of s; vectors are unsigned, coefficients
+/// signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSA2N8XR16(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
 
 /// lane i = a[i] * s1 + b[i] * s0, s1 the high and s0 the low half of s, modulo 2^24; vectors and
-/// coefficients are signed, US forms the vectors as unsigned.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULP2N8XR16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSP2N8XR16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b,
+/// coefficients are signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULP2N8XR16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+
+/// lane i = a[i] * s1 + b[i] * s0, s1 the high and s0 the low half of s, modulo 2^24; vectors are unsigned,
+/// coefficients signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSP2N8XR16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+
+/// added to acc, modulo 2^24: lane i = a[i] * s1 + b[i] * s0, s1 the high and s0 the low half of s; vectors
+/// and coefficients are signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPA2N8XR16(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
 
 /// added to acc, modulo 2^24: lane i = a[i] * s1 + b[i] * s0, s1 the high and s0 the low half of s; vectors
-/// and coefficients are signed, US forms the vectors as unsigned.
+/// are unsigned, coefficients signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPA2N8XR16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPA2N8XR16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPA2N8XR16(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
 
 /// lane i = a[i] * s1 + b[i] * s0, s1 the high and s0 the low half of s, exact; vectors and coefficients are
-/// signed, UU forms read both as unsigned, US forms the vectors, SU forms the coefficients.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPN16XR16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUPN16XR16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPN16XR16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUPN16XR16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
+/// signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPN16XR16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+
+/// lane i = a[i] * s1 + b[i] * s0, s1 the high and s0 the low half of s, exact; vectors and coefficients are
+/// unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUPN16XR16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+
+/// lane i = a[i] * s1 + b[i] * s0, s1 the high and s0 the low half of s, exact; vectors are unsigned,
+/// coefficients signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPN16XR16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+
+/// lane i = a[i] * s1 + b[i] * s0, s1 the high and s0 the low half of s, exact; vectors are signed,
+/// coefficients unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUPN16XR16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+
+/// added to acc, modulo 2^48: lane i = a[i] * s1 + b[i] * s0, s1 the high and s0 the low half of s; vectors
+/// and coefficients are signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPAN16XR16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
 
 /// added to acc, modulo 2^48: lane i = a[i] * s1 + b[i] * s0, s1 the high and s0 the low half of s; vectors
-/// and coefficients are signed, UU forms read both as unsigned, US forms the vectors, SU forms the
-/// coefficients.
+/// and coefficients are unsigned.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPAN16XR16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUPAN16XR16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+
+/// added to acc, modulo 2^48: lane i = a[i] * s1 + b[i] * s0, s1 the high and s0 the low half of s; vectors
+/// are unsigned, coefficients signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUPAN16XR16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPAN16XR16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+
+/// added to acc, modulo 2^48: lane i = a[i] * s1 + b[i] * s0, s1 the high and s0 the low half of s; vectors
+/// are signed, coefficients unsigned.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPAN16XR16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUPAN16XR16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUPAN16XR16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
 
 /// lane i = a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the bytes of s from the highest, exact;
-/// vectors and coefficients are signed, UU forms read both as unsigned, US forms the vectors, SU forms the
-/// coefficients.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQ2N8XR8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUQ2N8XR8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSQ2N8XR8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUQ2N8XR8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d,
+/// vectors and coefficients are signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQ2N8XR8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &c,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &d, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+
+/// lane i = a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the bytes of s from the highest, exact;
+/// vectors and coefficients are unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUQ2N8XR8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+
+/// lane i = a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the bytes of s from the highest, exact;
+/// vectors are unsigned, coefficients signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSQ2N8XR8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+
+/// lane i = a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the bytes of s from the highest, exact;
+/// vectors are signed, coefficients unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUQ2N8XR8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+
+/// added to acc, modulo 2^24: lane i = a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the bytes of s
+/// from the highest; vectors and coefficients are signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQA2N8XR8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &d,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
 
 /// added to acc, modulo 2^24: lane i = a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the bytes of s
-/// from the highest; vectors and coefficients are signed, UU forms read both as unsigned, US forms the
-/// vectors, SU forms the coefficients.
+/// from the highest; vectors and coefficients are unsigned.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQA2N8XR8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &d,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUQA2N8XR8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+
+/// added to acc, modulo 2^24: lane i = a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the bytes of s
+/// from the highest; vectors are unsigned, coefficients signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUQA2N8XR8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSQA2N8XR8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+
+/// added to acc, modulo 2^24: lane i = a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the bytes of s
+/// from the highest; vectors are signed, coefficients unsigned.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSQA2N8XR8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUQA2N8XR8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUQA2N8XR8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
 
 /// even lanes i = a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the bytes of s from the highest,
-/// odd lanes the same with t, exact; vectors and coefficients are signed, UU forms read both as unsigned, US
-/// forms the vectors, SU forms the coefficients.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQ2N8DXR8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
+/// odd lanes the same with t, exact; vectors and coefficients are signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQ2N8DXR8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &c,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &d, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUQ2N8DXR8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
+
+/// even lanes i = a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the bytes of s from the highest,
+/// odd lanes the same with t, exact; vectors and coefficients are unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUQ2N8DXR8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSQ2N8DXR8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
+
+/// even lanes i = a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the bytes of s from the highest,
+/// odd lanes the same with t, exact; vectors are unsigned, coefficients signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSQ2N8DXR8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUQ2N8DXR8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
+
+/// even lanes i = a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the bytes of s from the highest,
+/// odd lanes the same with t, exact; vectors are signed, coefficients unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUQ2N8DXR8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t);
 
 /// added to acc, modulo 2^24: even lanes i = a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the
-/// bytes of s from the highest, odd lanes the same with t; vectors and coefficients are signed, UU forms read
-/// both as unsigned, US forms the vectors, SU forms the coefficients.
+/// bytes of s from the highest, odd lanes the same with t; vectors and coefficients are signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQA2N8DXR8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQA2N8DXR8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &d,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t);
+
+/// added to acc, modulo 2^24: even lanes i = a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the
+/// bytes of s from the highest, odd lanes the same with t; vectors and coefficients are unsigned.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUQA2N8DXR8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUQA2N8DXR8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t);
+
+/// added to acc, modulo 2^24: even lanes i = a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the
+/// bytes of s from the highest, odd lanes the same with t; vectors are unsigned, coefficients signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSQA2N8DXR8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSQA2N8DXR8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t);
+
+/// added to acc, modulo 2^24: even lanes i = a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the
+/// bytes of s from the highest, odd lanes the same with t; vectors are signed, coefficients unsigned.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUQA2N8DXR8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUQA2N8DXR8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t);
 
 /// lanes i with i mod 4 = 0: a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the bytes of s from the
-/// highest; with i mod 4 = 1, 2, 3 the same with t, u, v, exact; vectors and coefficients are signed, UU
-/// forms read both as unsigned, US forms the vectors, SU forms the coefficients.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQ2N8QXR8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& u,
+/// highest; with i mod 4 = 1, 2, 3 the same with t, u, v, exact; vectors and coefficients are signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQ2N8QXR8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &c,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &d, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& u,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& v);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUQ2N8QXR8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& u,
+
+/// lanes i with i mod 4 = 0: a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the bytes of s from the
+/// highest; with i mod 4 = 1, 2, 3 the same with t, u, v, exact; vectors and coefficients are unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUQ2N8QXR8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& u,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& v);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSQ2N8QXR8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& u,
+
+/// lanes i with i mod 4 = 0: a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the bytes of s from the
+/// highest; with i mod 4 = 1, 2, 3 the same with t, u, v, exact; vectors are unsigned, coefficients signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSQ2N8QXR8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& u,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& v);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUQ2N8QXR8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& u,
+
+/// lanes i with i mod 4 = 0: a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the bytes of s from the
+/// highest; with i mod 4 = 1, 2, 3 the same with t, u, v, exact; vectors are signed, coefficients unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUQ2N8QXR8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& u,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& v);
 
 /// added to acc, modulo 2^24: lanes i with i mod 4 = 0: a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to
 /// s0 the bytes of s from the highest; with i mod 4 = 1, 2, 3 the same with t, u, v; vectors and coefficients
-/// are signed, UU forms read both as unsigned, US forms the vectors, SU forms the coefficients.
+/// are signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQA2N8QXR8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& u,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& v);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQA2N8QXR8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8 &d,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& u, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& v);
+
+/// added to acc, modulo 2^24: lanes i with i mod 4 = 0: a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to
+/// s0 the bytes of s from the highest; with i mod 4 = 1, 2, 3 the same with t, u, v; vectors and coefficients
+/// are unsigned.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUQA2N8QXR8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& u,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& v);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUQA2N8QXR8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& u, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& v);
+
+/// added to acc, modulo 2^24: lanes i with i mod 4 = 0: a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to
+/// s0 the bytes of s from the highest; with i mod 4 = 1, 2, 3 the same with t, u, v; vectors are unsigned,
+/// coefficients signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSQA2N8QXR8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& u,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& v);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSQA2N8QXR8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& u, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& v);
+
+/// added to acc, modulo 2^24: lanes i with i mod 4 = 0: a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to
+/// s0 the bytes of s from the highest; with i mod 4 = 1, 2, 3 the same with t, u, v; vectors are signed,
+/// coefficients unsigned.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUQA2N8QXR8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& u,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& v);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUQA2N8QXR8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U &d,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& u, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& v);
 
 /// lane i = a[i] * s1 + b[i] * s0 + c[i] * s1 + d[i] * s0, s1 the high and s0 the low half of s, exact;
-/// vectors and coefficients are signed, UU forms read both as unsigned, US forms the vectors, SU forms the
-/// coefficients.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQN16XR16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUQN16XR16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSQN16XR16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUQN16XR16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &d,
+/// vectors and coefficients are signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQN16XR16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &c,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &d, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+
+/// lane i = a[i] * s1 + b[i] * s0 + c[i] * s1 + d[i] * s0, s1 the high and s0 the low half of s, exact;
+/// vectors and coefficients are unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUQN16XR16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &c,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &d, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+
+/// lane i = a[i] * s1 + b[i] * s0 + c[i] * s1 + d[i] * s0, s1 the high and s0 the low half of s, exact;
+/// vectors are unsigned, coefficients signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSQN16XR16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &c,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &d, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+
+/// lane i = a[i] * s1 + b[i] * s0 + c[i] * s1 + d[i] * s0, s1 the high and s0 the low half of s, exact;
+/// vectors are signed, coefficients unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUQN16XR16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &c,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &d, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+
+/// added to acc, modulo 2^48: lane i = a[i] * s1 + b[i] * s0 + c[i] * s1 + d[i] * s0, s1 the high and s0 the
+/// low half of s; vectors and coefficients are signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQAN16XR16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &d,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
 
 /// added to acc, modulo 2^48: lane i = a[i] * s1 + b[i] * s0 + c[i] * s1 + d[i] * s0, s1 the high and s0 the
-/// low half of s; vectors and coefficients are signed, UU forms read both as unsigned, US forms the vectors,
-/// SU forms the coefficients.
+/// low half of s; vectors and coefficients are unsigned.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQAN16XR16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &d,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUQAN16XR16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &d,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+
+/// added to acc, modulo 2^48: lane i = a[i] * s1 + b[i] * s0 + c[i] * s1 + d[i] * s0, s1 the high and s0 the
+/// low half of s; vectors are unsigned, coefficients signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUQAN16XR16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &d,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSQAN16XR16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &d,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+
+/// added to acc, modulo 2^48: lane i = a[i] * s1 + b[i] * s0 + c[i] * s1 + d[i] * s0, s1 the high and s0 the
+/// low half of s; vectors are signed, coefficients unsigned.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSQAN16XR16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUQAN16XR16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &d,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUQAN16XR16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &d,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
 
 /// even lanes i = a[i] * s1 + b[i] * s0 + c[i] * s1 + d[i] * s0, s1 the high and s0 the low half of s, odd
-/// lanes the same with t, exact; vectors and coefficients are signed, UU forms read both as unsigned, US
-/// forms the vectors, SU forms the coefficients.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQN16DXR16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
+/// lanes the same with t, exact; vectors and coefficients are signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQN16DXR16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &c,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &d, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUQN16DXR16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
+
+/// even lanes i = a[i] * s1 + b[i] * s0 + c[i] * s1 + d[i] * s0, s1 the high and s0 the low half of s, odd
+/// lanes the same with t, exact; vectors and coefficients are unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUQN16DXR16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &c,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &d, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSQN16DXR16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
+
+/// even lanes i = a[i] * s1 + b[i] * s0 + c[i] * s1 + d[i] * s0, s1 the high and s0 the low half of s, odd
+/// lanes the same with t, exact; vectors are unsigned, coefficients signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSQN16DXR16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &c,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &d, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUQN16DXR16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
+
+/// even lanes i = a[i] * s1 + b[i] * s0 + c[i] * s1 + d[i] * s0, s1 the high and s0 the low half of s, odd
+/// lanes the same with t, exact; vectors are signed, coefficients unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUQN16DXR16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &c,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &d, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t);
 
 /// added to acc, modulo 2^48: even lanes i = a[i] * s1 + b[i] * s0 + c[i] * s1 + d[i] * s0, s1 the high and
-/// s0 the low half of s, odd lanes the same with t; vectors and coefficients are signed, UU forms read both
-/// as unsigned, US forms the vectors, SU forms the coefficients.
+/// s0 the low half of s, odd lanes the same with t; vectors and coefficients are signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQAN16DXR16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQAN16DXR16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &d,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t);
+
+/// added to acc, modulo 2^48: even lanes i = a[i] * s1 + b[i] * s0 + c[i] * s1 + d[i] * s0, s1 the high and
+/// s0 the low half of s, odd lanes the same with t; vectors and coefficients are unsigned.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUQAN16DXR16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUQAN16DXR16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &d,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t);
+
+/// added to acc, modulo 2^48: even lanes i = a[i] * s1 + b[i] * s0 + c[i] * s1 + d[i] * s0, s1 the high and
+/// s0 the low half of s, odd lanes the same with t; vectors are unsigned, coefficients signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSQAN16DXR16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSQAN16DXR16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &d,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t);
+
+/// added to acc, modulo 2^48: even lanes i = a[i] * s1 + b[i] * s0 + c[i] * s1 + d[i] * s0, s1 the high and
+/// s0 the low half of s, odd lanes the same with t; vectors are signed, coefficients unsigned.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUQAN16DXR16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUQAN16DXR16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &d,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& t);
 
 /// lane i = a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the bytes of s from the highest, exact;
 /// vectors and coefficients are signed.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQN16XR8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQN16XR8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &c,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &d, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
 
 /// added to acc, modulo 2^48: lane i = a[i] * s3 + b[i] * s2 + c[i] * s1 + d[i] * s0, s3 to s0 the bytes of s
 /// from the highest; vectors and coefficients are signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQAN16XR8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &d,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULQAN16XR8(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &d,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
 
 /* Four neighbouring lanes times coefficients, and two channels that alternate.
    Table: src/multiply/windows.def */
 
 /// lane i = x[i] * s3 + x[i + 1] * s2 + x[i + 2] * s1 + x[i + 3] * s0, x the lanes of a followed by those of
-/// b, s3 to s0 the bytes of s from the highest, exact; vectors and coefficients are signed, US forms the
-/// vectors as unsigned.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL4T2N8XR8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUS4T2N8XR8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+/// b, s3 to s0 the bytes of s from the highest, exact; vectors and coefficients are signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL4T2N8XR8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+
+/// lane i = x[i] * s3 + x[i + 1] * s2 + x[i + 2] * s1 + x[i + 3] * s0, x the lanes of a followed by those of
+/// b, s3 to s0 the bytes of s from the highest, exact; vectors are unsigned, coefficients signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUS4T2N8XR8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
 
 /// added to acc, modulo 2^24: lane i = x[i] * s3 + x[i + 1] * s2 + x[i + 2] * s1 + x[i + 3] * s0, x the lanes
 /// of a followed by those of b, s3 to s0 the bytes of s from the highest; vectors and coefficients are
-/// signed, US forms the vectors as unsigned.
+/// signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL4TA2N8XR8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL4TA2N8XR8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+
+/// added to acc, modulo 2^24: lane i = x[i] * s3 + x[i + 1] * s2 + x[i + 2] * s1 + x[i + 3] * s0, x the lanes
+/// of a followed by those of b, s3 to s0 the bytes of s from the highest; vectors are unsigned, coefficients
+/// signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUS4TA2N8XR8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUS4TA2N8XR8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
 
 /// lane i = x[i] * s3 + x[i + 1] * s2 + x[i + 2] * s1 + x[i + 3] * s0, x the lanes of a followed by those of
 /// b, s3 to s0 the bytes of s from the highest, exact; vectors and coefficients are signed.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL4TN16XR8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL4TN16XR8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
 
 /// added to acc, modulo 2^48: lane i = x[i] * s3 + x[i + 1] * s2 + x[i + 2] * s1 + x[i + 3] * s0, x the lanes
 /// of a followed by those of b, s3 to s0 the bytes of s from the highest; vectors and coefficients are
 /// signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL4TAN16XR8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL4TAN16XR8(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
 
 /// lane i = x[i] * s1 + x[i + 1] * s0 + x[i + 2] * s1 + x[i + 3] * s0, x the lanes of a followed by those of
-/// b, s1 the high and s0 the low half of s, exact; vectors and coefficients are signed, US forms the vectors
-/// as unsigned.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL4TN16XR16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUS4TN16XR16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
+/// b, s1 the high and s0 the low half of s, exact; vectors and coefficients are signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL4TN16XR16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+
+/// lane i = x[i] * s1 + x[i + 1] * s0 + x[i + 2] * s1 + x[i + 3] * s0, x the lanes of a followed by those of
+/// b, s1 the high and s0 the low half of s, exact; vectors are unsigned, coefficients signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUS4TN16XR16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+
+/// added to acc, modulo 2^48: lane i = x[i] * s1 + x[i + 1] * s0 + x[i + 2] * s1 + x[i + 3] * s0, x the lanes
+/// of a followed by those of b, s1 the high and s0 the low half of s; vectors and coefficients are signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL4TAN16XR16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
 
 /// added to acc, modulo 2^48: lane i = x[i] * s1 + x[i + 1] * s0 + x[i + 2] * s1 + x[i + 3] * s0, x the lanes
-/// of a followed by those of b, s1 the high and s0 the low half of s; vectors and coefficients are signed, US
-/// forms the vectors as unsigned.
+/// of a followed by those of b, s1 the high and s0 the low half of s; vectors are unsigned, coefficients
+/// signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL4TAN16XR16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUS4TAN16XR16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUS4TAN16XR16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
 
 /// lane 2k = a[k] * s0, lane 2k + 1 = b[k] * s0, s0 the lowest byte of s, exact; vectors and coefficients are
-/// signed, US forms the vectors as unsigned.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULI2NR8X16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSI2NR8X16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
+/// signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULI2NR8X16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+
+/// lane 2k = a[k] * s0, lane 2k + 1 = b[k] * s0, s0 the lowest byte of s, exact; vectors are unsigned,
+/// coefficients signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSI2NR8X16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+
+/// added to acc, modulo 2^24: lane 2k = a[k] * s0, lane 2k + 1 = b[k] * s0, s0 the lowest byte of s; vectors
+/// and coefficients are signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAI2NR8X16(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
 
 /// added to acc, modulo 2^24: lane 2k = a[k] * s0, lane 2k + 1 = b[k] * s0, s0 the lowest byte of s; vectors
-/// and coefficients are signed, US forms the vectors as unsigned.
+/// are unsigned, coefficients signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAI2NR8X16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSAI2NR8X16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSAI2NR8X16(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
 
 /// lane 2k = a[k] * s0, lane 2k + 1 = b[k] * s0, s0 the lowest byte of s, exact; vectors are signed,
 /// coefficients unsigned.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULI2NR8UX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULI2NR8UX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
 
 /// added to acc, modulo 2^24: lane 2k = a[k] * s0, lane 2k + 1 = b[k] * s0, s0 the lowest byte of s; vectors
 /// are signed, coefficients unsigned.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAI2NR8UX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAI2NR8UX16(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
 
 /// lane 2k = a[k] * s1 + c[k] * s0, lane 2k + 1 = b[k] * s1 + d[k] * s0, s1 and s0 the lower bytes of s,
-/// modulo 2^24; vectors and coefficients are signed, US forms the vectors as unsigned.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPI2NR8X16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPI2NR8X16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &d,
+/// modulo 2^24; vectors and coefficients are signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPI2NR8X16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &c,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &d, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+
+/// lane 2k = a[k] * s1 + c[k] * s0, lane 2k + 1 = b[k] * s1 + d[k] * s0, s1 and s0 the lower bytes of s,
+/// modulo 2^24; vectors are unsigned, coefficients signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPI2NR8X16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &c,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &d, const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
+
+/// added to acc, modulo 2^24: lane 2k = a[k] * s1 + c[k] * s0, lane 2k + 1 = b[k] * s1 + d[k] * s0, s1 and s0
+/// the lower bytes of s; vectors and coefficients are signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPAI2NR8X16(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &d,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
 
 /// added to acc, modulo 2^24: lane 2k = a[k] * s1 + c[k] * s0, lane 2k + 1 = b[k] * s1 + d[k] * s0, s1 and s0
-/// the lower bytes of s; vectors and coefficients are signed, US forms the vectors as unsigned.
+/// the lower bytes of s; vectors are unsigned, coefficients signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULPAI2NR8X16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16 &d,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPAI2NR8X16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &c,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &d,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSPAI2NR8X16(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &b,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &c, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U &d,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr& s);
 
 /* Products of a 16-bit lane and a 32-bit lane.
    Table: src/multiply/mixed16x32.def */
 
-/// lane k = a[2k] * b[k], exact; UU forms read both factors as unsigned, US forms the 16-bit one, SU forms
-/// the 32-bit one.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULN_2X16X32_0(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+/// lane k = a[2k] * b[k], exact; both factors are signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULN_2X16X32_0(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUN_2X16X32_0(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSN_2X16X32_0(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUN_2X16X32_0(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// lane k = a[2k] * b[k], exact; both factors are unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUN_2X16X32_0(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
 
-/// lane k of acc = acc[k] + a[2k] * b[k], modulo 2^64; UU forms read both factors as unsigned, US forms the
-/// 16-bit one, SU forms the 32-bit one.
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAN_2X16X32_0(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+/// lane k = a[2k] * b[k], exact; the 16-bit factor is unsigned, the 32-bit one signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSN_2X16X32_0(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUAN_2X16X32_0(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSAN_2X16X32_0(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUAN_2X16X32_0(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// lane k = a[2k] * b[k], exact; the 16-bit factor is signed, the 32-bit one unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUN_2X16X32_0(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
 
-/// lane k of acc = acc[k] - a[2k] * b[k], modulo 2^64; UU forms read both factors as unsigned, US forms the
-/// 16-bit one, SU forms the 32-bit one.
+/// lane k of acc = acc[k] + a[2k] * b[k], modulo 2^64; both factors are signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSN_2X16X32_0(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAN_2X16X32_0(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
+
+/// lane k of acc = acc[k] + a[2k] * b[k], modulo 2^64; both factors are unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUAN_2X16X32_0(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
+
+/// lane k of acc = acc[k] + a[2k] * b[k], modulo 2^64; the 16-bit factor is unsigned, the 32-bit one signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSAN_2X16X32_0(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
+
+/// lane k of acc = acc[k] + a[2k] * b[k], modulo 2^64; the 16-bit factor is signed, the 32-bit one unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUAN_2X16X32_0(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
+
+/// lane k of acc = acc[k] - a[2k] * b[k], modulo 2^64; both factors are signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSN_2X16X32_0(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
+
+/// lane k of acc = acc[k] - a[2k] * b[k], modulo 2^64; both factors are unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUSN_2X16X32_0(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
+
+/// lane k of acc = acc[k] - a[2k] * b[k], modulo 2^64; the 16-bit factor is unsigned, the 32-bit one signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSSN_2X16X32_0(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
+
+/// lane k of acc = acc[k] - a[2k] * b[k], modulo 2^64; the 16-bit factor is signed, the 32-bit one unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUSN_2X16X32_0(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
+
+/// lane k = a[2k + 1] * b[k], exact; both factors are signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULN_2X16X32_1(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUSN_2X16X32_0(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSSN_2X16X32_0(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUSN_2X16X32_0(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// lane k = a[2k + 1] * b[k], exact; both factors are unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUN_2X16X32_1(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
 
-/// lane k = a[2k + 1] * b[k], exact; UU forms read both factors as unsigned, US forms the 16-bit one, SU
-/// forms the 32-bit one.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULN_2X16X32_1(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+/// lane k = a[2k + 1] * b[k], exact; the 16-bit factor is unsigned, the 32-bit one signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSN_2X16X32_1(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUN_2X16X32_1(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSN_2X16X32_1(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUN_2X16X32_1(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// lane k = a[2k + 1] * b[k], exact; the 16-bit factor is signed, the 32-bit one unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUN_2X16X32_1(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
 
-/// lane k of acc = acc[k] + a[2k + 1] * b[k], modulo 2^64; UU forms read both factors as unsigned, US forms
-/// the 16-bit one, SU forms the 32-bit one.
+/// lane k of acc = acc[k] + a[2k + 1] * b[k], modulo 2^64; both factors are signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAN_2X16X32_1(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAN_2X16X32_1(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
+
+/// lane k of acc = acc[k] + a[2k + 1] * b[k], modulo 2^64; both factors are unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUAN_2X16X32_1(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
+
+/// lane k of acc = acc[k] + a[2k + 1] * b[k], modulo 2^64; the 16-bit factor is unsigned, the 32-bit one
+/// signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSAN_2X16X32_1(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
+
+/// lane k of acc = acc[k] + a[2k + 1] * b[k], modulo 2^64; the 16-bit factor is signed, the 32-bit one
+/// unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUAN_2X16X32_1(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
+
+/// lane k of acc = acc[k] - a[2k + 1] * b[k], modulo 2^64; both factors are signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSN_2X16X32_1(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
+
+/// lane k of acc = acc[k] - a[2k + 1] * b[k], modulo 2^64; both factors are unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUSN_2X16X32_1(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
+
+/// lane k of acc = acc[k] - a[2k + 1] * b[k], modulo 2^64; the 16-bit factor is unsigned, the 32-bit one
+/// signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSSN_2X16X32_1(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
+
+/// lane k of acc = acc[k] - a[2k + 1] * b[k], modulo 2^64; the 16-bit factor is signed, the 32-bit one
+/// unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUSN_2X16X32_1(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
+
+/// lane k = a[2k + 1] * b[k] * 2^16, modulo 2^64; both factors are signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULHN_2X16X32_1(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUAN_2X16X32_1(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSAN_2X16X32_1(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUAN_2X16X32_1(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// lane k = a[2k + 1] * b[k] * 2^16, modulo 2^64; both factors are unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUHN_2X16X32_1(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
 
-/// lane k of acc = acc[k] - a[2k + 1] * b[k], modulo 2^64; UU forms read both factors as unsigned, US forms
-/// the 16-bit one, SU forms the 32-bit one.
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSN_2X16X32_1(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+/// lane k = a[2k + 1] * b[k] * 2^16, modulo 2^64; the 16-bit factor is unsigned, the 32-bit one signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSHN_2X16X32_1(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUSN_2X16X32_1(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSSN_2X16X32_1(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUSN_2X16X32_1(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// lane k = a[2k + 1] * b[k] * 2^16, modulo 2^64; the 16-bit factor is signed, the 32-bit one unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUHN_2X16X32_1(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
 
-/// lane k = a[2k + 1] * b[k] * 2^16, modulo 2^64; UU forms read both factors as unsigned, US forms the 16-bit
-/// one, SU forms the 32-bit one.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULHN_2X16X32_1(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUHN_2X16X32_1(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSHN_2X16X32_1(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUHN_2X16X32_1(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
+/// lane k of acc = acc[k] + a[2k + 1] * b[k] * 2^16, modulo 2^64; both factors are signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAHN_2X16X32_1(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
 
-/// lane k of acc = acc[k] + a[2k + 1] * b[k] * 2^16, modulo 2^64; UU forms read both factors as unsigned, US
-/// forms the 16-bit one, SU forms the 32-bit one.
+/// lane k of acc = acc[k] + a[2k + 1] * b[k] * 2^16, modulo 2^64; both factors are unsigned.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAHN_2X16X32_1(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUAHN_2X16X32_1(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSAHN_2X16X32_1(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUAHN_2X16X32_1(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUAHN_2X16X32_1(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
 
-/// lane k of acc = acc[k] - a[2k + 1] * b[k] * 2^16, modulo 2^64; UU forms read both factors as unsigned, US
-/// forms the 16-bit one, SU forms the 32-bit one.
+/// lane k of acc = acc[k] + a[2k + 1] * b[k] * 2^16, modulo 2^64; the 16-bit factor is unsigned, the 32-bit
+/// one signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSHN_2X16X32_1(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSAHN_2X16X32_1(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
+
+/// lane k of acc = acc[k] + a[2k + 1] * b[k] * 2^16, modulo 2^64; the 16-bit factor is signed, the 32-bit one
+/// unsigned.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUSHN_2X16X32_1(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUAHN_2X16X32_1(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
+
+/// lane k of acc = acc[k] - a[2k + 1] * b[k] * 2^16, modulo 2^64; both factors are signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSSHN_2X16X32_1(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSHN_2X16X32_1(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
+
+/// lane k of acc = acc[k] - a[2k + 1] * b[k] * 2^16, modulo 2^64; both factors are unsigned.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUSHN_2X16X32_1(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUUSHN_2X16X32_1(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
+
+/// lane k of acc = acc[k] - a[2k + 1] * b[k] * 2^16, modulo 2^64; the 16-bit factor is unsigned, the 32-bit
+/// one signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSSHN_2X16X32_1(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
+
+/// lane k of acc = acc[k] - a[2k + 1] * b[k] * 2^16, modulo 2^64; the 16-bit factor is signed, the 32-bit one
+/// unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSUSHN_2X16X32_1(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv& b);
 
 /* Products of 8-bit lanes and 16-bit lanes, interleaved.
    Table: src/multiply/mixed8x16.def */
 
-/// lane 2k = a[2k] * b[k], lane 2k + 1 = a[2k + 1] * c[k], exact; US forms read a as unsigned.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULI2NX8X16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& c);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSI2NX8X16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
+/// lane 2k = a[2k] * b[k], lane 2k + 1 = a[2k + 1] * c[k], exact; a is signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULI2NX8X16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& c);
+
+/// lane 2k = a[2k] * b[k], lane 2k + 1 = a[2k + 1] * c[k], exact; a is unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSI2NX8X16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& c);
+
+/// lane 2k of acc = acc[2k] + a[2k] * b[k], lane 2k + 1 of acc = acc[2k + 1] + a[2k + 1] * c[k], modulo 2^24;
+/// a is signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAI2NX8X16(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& c);
 
 /// lane 2k of acc = acc[2k] + a[2k] * b[k], lane 2k + 1 of acc = acc[2k + 1] + a[2k + 1] * c[k], modulo 2^24;
-/// US forms read a as unsigned.
+/// a is unsigned.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAI2NX8X16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& c);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSAI2NX8X16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULUSAI2NX8X16(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& c);
 
 /* Complex products: number k has its real part in lane 2k, its imaginary part in lane 2k + 1.
    Table: src/multiply/complex.def */
 
 /// lanes 2k, 2k + 1 = the complex product, real part a[2k] * b[2k] - a[2k + 1] * b[2k + 1], imaginary part
-/// a[2k + 1] * b[2k] + a[2k] * b[2k + 1]; modulo 2^48 or 2^64.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULNX16C(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+/// a[2k + 1] * b[2k] + a[2k] * b[2k + 1]; modulo 2^48.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULNX16C(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULN_2X32C(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+
+/// lanes 2k, 2k + 1 = the complex product, real part a[2k] * b[2k] - a[2k + 1] * b[2k + 1], imaginary part
+/// a[2k + 1] * b[2k] + a[2k] * b[2k + 1]; modulo 2^64.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULN_2X32C(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
 
 /// lanes 2k, 2k + 1 of acc plus the complex product, real part a[2k] * b[2k] - a[2k + 1] * b[2k + 1],
-/// imaginary part a[2k + 1] * b[2k] + a[2k] * b[2k + 1]; modulo 2^48 or 2^64.
+/// imaginary part a[2k + 1] * b[2k] + a[2k] * b[2k + 1]; modulo 2^48.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANX16C(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANX16C(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+
+/// lanes 2k, 2k + 1 of acc plus the complex product, real part a[2k] * b[2k] - a[2k + 1] * b[2k + 1],
+/// imaginary part a[2k + 1] * b[2k] + a[2k] * b[2k + 1]; modulo 2^64.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAN_2X32C(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAN_2X32C(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
 
 /// lanes 2k, 2k + 1 of acc less the complex product, real part a[2k] * b[2k] - a[2k + 1] * b[2k + 1],
-/// imaginary part a[2k + 1] * b[2k] + a[2k] * b[2k + 1]; modulo 2^48 or 2^64.
+/// imaginary part a[2k + 1] * b[2k] + a[2k] * b[2k + 1]; modulo 2^48.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSNX16C(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSNX16C(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+
+/// lanes 2k, 2k + 1 of acc less the complex product, real part a[2k] * b[2k] - a[2k + 1] * b[2k + 1],
+/// imaginary part a[2k + 1] * b[2k] + a[2k] * b[2k + 1]; modulo 2^64.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSN_2X32C(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSN_2X32C(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
 
 /// lanes 2k, 2k + 1 = the complex product, with the second factor conjugated: real part a[2k] * b[2k] + a[2k
-/// + 1] * b[2k + 1], imaginary part a[2k + 1] * b[2k] - a[2k] * b[2k + 1]; modulo 2^48 or 2^64.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULNX16J(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+/// + 1] * b[2k + 1], imaginary part a[2k + 1] * b[2k] - a[2k] * b[2k + 1]; modulo 2^48.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULNX16J(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULN_2X32J(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+
+/// lanes 2k, 2k + 1 = the complex product, with the second factor conjugated: real part a[2k] * b[2k] + a[2k
+/// + 1] * b[2k + 1], imaginary part a[2k + 1] * b[2k] - a[2k] * b[2k + 1]; modulo 2^64.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULN_2X32J(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
 
 /// lanes 2k, 2k + 1 of acc plus the complex product, with the second factor conjugated: real part a[2k] *
-/// b[2k] + a[2k + 1] * b[2k + 1], imaginary part a[2k + 1] * b[2k] - a[2k] * b[2k + 1]; modulo 2^48 or 2^64.
+/// b[2k] + a[2k + 1] * b[2k + 1], imaginary part a[2k + 1] * b[2k] - a[2k] * b[2k + 1]; modulo 2^48.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANX16J(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANX16J(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+
+/// lanes 2k, 2k + 1 of acc plus the complex product, with the second factor conjugated: real part a[2k] *
+/// b[2k] + a[2k + 1] * b[2k + 1], imaginary part a[2k + 1] * b[2k] - a[2k] * b[2k + 1]; modulo 2^64.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAN_2X32J(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAN_2X32J(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
 
 /// lanes 2k, 2k + 1 of acc less the complex product, with the second factor conjugated: real part a[2k] *
-/// b[2k] + a[2k + 1] * b[2k + 1], imaginary part a[2k + 1] * b[2k] - a[2k] * b[2k + 1]; modulo 2^48 or 2^64.
+/// b[2k] + a[2k + 1] * b[2k + 1], imaginary part a[2k + 1] * b[2k] - a[2k] * b[2k + 1]; modulo 2^48.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSNX16J(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSNX16J(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+
+/// lanes 2k, 2k + 1 of acc less the complex product, with the second factor conjugated: real part a[2k] *
+/// b[2k] + a[2k + 1] * b[2k + 1], imaginary part a[2k + 1] * b[2k] - a[2k] * b[2k + 1]; modulo 2^64.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSN_2X32J(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSN_2X32J(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
 
 /// lanes 2k, 2k + 1 = the terms with the real part of b: real part a[2k] * b[2k], imaginary part a[2k + 1] *
-/// b[2k]; modulo 2^48 or 2^64.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULN_2X32C_0(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+/// b[2k]; modulo 2^64.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULN_2X32C_0(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
 
 /// lanes 2k, 2k + 1 of acc plus the terms with the real part of b: real part a[2k] * b[2k], imaginary part
-/// a[2k + 1] * b[2k]; modulo 2^48 or 2^64.
+/// a[2k + 1] * b[2k]; modulo 2^64.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAN_2X32C_0(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAN_2X32C_0(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
 
 /// lanes 2k, 2k + 1 of acc less the terms with the real part of b: real part a[2k] * b[2k], imaginary part
-/// a[2k + 1] * b[2k]; modulo 2^48 or 2^64.
+/// a[2k + 1] * b[2k]; modulo 2^64.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSN_2X32C_0(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSN_2X32C_0(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
 
 /// lanes 2k, 2k + 1 of acc plus the terms with the imaginary part of b: real part -a[2k + 1] * b[2k + 1],
-/// imaginary part a[2k] * b[2k + 1]; modulo 2^48 or 2^64.
+/// imaginary part a[2k] * b[2k + 1]; modulo 2^64.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAN_2X32C_1(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULAN_2X32C_1(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
 
 /// lanes 2k, 2k + 1 of acc less the terms with the imaginary part of b: real part -a[2k + 1] * b[2k + 1],
-/// imaginary part a[2k] * b[2k + 1]; modulo 2^48 or 2^64.
+/// imaginary part a[2k] * b[2k + 1]; modulo 2^64.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSN_2X32C_1(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSN_2X32C_1(cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
 
 /* 16 bits of the products of 16-bit lanes, and transfers of sign.
    Table: src/multiply/narrow.def */
 
 /// lane i = bits 0 to 15 of a[i] * b[i].
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULNX16PACKL(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULNX16PACKL(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULNX16UPACKL(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+
+/// lane i = bits 0 to 15 of a[i] * b[i].
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULNX16UPACKL(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL16PACKL(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+
+/// lane i = bits 0 to 15 of a[i] * b[i].
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL16PACKL(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL16UPACKL(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
+
+/// lane i = bits 0 to 15 of a[i] * b[i].
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL16UPACKL(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
 
-/// lane i of acc = acc[i] plus, modulo 2^16, bits 0 to 15 of a[i] * b[i]. T forms keep the destination's
-/// lanes whose predicate bit is 0.
+/// lane i of acc = acc[i] plus, modulo 2^16, bits 0 to 15 of a[i] * b[i].
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANX16PACKL(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANX16PACKL(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+
+/// lane i of acc = acc[i] plus, modulo 2^16, bits 0 to 15 of a[i] * b[i]. Where predicate bit i is 0, acc
+/// keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANX16PACKLT(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANX16PACKLT(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// lane i of acc = acc[i] plus, modulo 2^16, bits 0 to 15 of a[i] * b[i].
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANX16UPACKL(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANX16UPACKL(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
+
+/// lane i of acc = acc[i] plus, modulo 2^16, bits 0 to 15 of a[i] * b[i]. Where predicate bit i is 0, acc
+/// keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANX16UPACKLT(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANX16UPACKLT(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// lane i of acc = acc[i] plus, modulo 2^16, bits 0 to 15 of a[i] * b[i].
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULA16PACKL(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULA16PACKL(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+
+/// lane i of acc = acc[i] plus, modulo 2^16, bits 0 to 15 of a[i] * b[i]. Where predicate bit i is 0, acc
+/// keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULA16PACKLT(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULA16PACKLT(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
+
+/// lane i of acc = acc[i] plus, modulo 2^16, bits 0 to 15 of a[i] * b[i].
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULA16UPACKL(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULA16UPACKL(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
+
+/// lane i of acc = acc[i] plus, modulo 2^16, bits 0 to 15 of a[i] * b[i]. Where predicate bit i is 0, acc
+/// keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULA16UPACKLT(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULA16UPACKLT(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i of acc = acc[i] less, modulo 2^16, bits 0 to 15 of a[i] * b[i].
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSNX16PACKL(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSNX16PACKL(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+
+/// lane i of acc = acc[i] less, modulo 2^16, bits 0 to 15 of a[i] * b[i].
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSNX16UPACKL(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSNX16UPACKL(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
+
+/// lane i of acc = acc[i] less, modulo 2^16, bits 0 to 15 of a[i] * b[i].
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULS16PACKL(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULS16PACKL(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+
+/// lane i of acc = acc[i] less, modulo 2^16, bits 0 to 15 of a[i] * b[i].
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULS16UPACKL(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULS16UPACKL(cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16U& b);
 
 /// lane i = bits 16 to 31 of (2 * a[i] * b[i] + 0x8000), modulo 2^32: a Q15 product rounded half up, not
 /// saturated.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULNX16PACKQ(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULNX16PACKQ(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL16PACKQ(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+
+/// lane i = bits 16 to 31 of (2 * a[i] * b[i] + 0x8000), modulo 2^32: a Q15 product rounded half up, not
+/// saturated.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL16PACKQ(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
 
 /// lane i of acc = acc[i] plus, modulo 2^16, bits 16 to 31 of (2 * a[i] * b[i] + 0x8000), modulo 2^32: a Q15
-/// product rounded half up, not saturated. T forms keep the destination's lanes whose predicate bit is 0.
+/// product rounded half up, not saturated.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANX16PACKQ(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANX16PACKQ(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+
+/// lane i of acc = acc[i] plus, modulo 2^16, bits 16 to 31 of (2 * a[i] * b[i] + 0x8000), modulo 2^32: a Q15
+/// product rounded half up, not saturated. Where predicate bit i is 0, acc keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANX16PACKQT(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANX16PACKQT(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// lane i of acc = acc[i] plus, modulo 2^16, bits 16 to 31 of (2 * a[i] * b[i] + 0x8000), modulo 2^32: a Q15
+/// product rounded half up, not saturated.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULA16PACKQ(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULA16PACKQ(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+
+/// lane i of acc = acc[i] plus, modulo 2^16, bits 16 to 31 of (2 * a[i] * b[i] + 0x8000), modulo 2^32: a Q15
+/// product rounded half up, not saturated. Where predicate bit i is 0, acc keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULA16PACKQT(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULA16PACKQT(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i of acc = acc[i] less, modulo 2^16, bits 16 to 31 of (2 * a[i] * b[i] + 0x8000), modulo 2^32: a Q15
 /// product rounded half up, not saturated.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSNX16PACKQ(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSNX16PACKQ(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+
+/// lane i of acc = acc[i] less, modulo 2^16, bits 16 to 31 of (2 * a[i] * b[i] + 0x8000), modulo 2^32: a Q15
+/// product rounded half up, not saturated.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULS16PACKQ(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULS16PACKQ(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
 
 /// lane i = bits 10 to 25 of (a[i] * b[i] + 0x200): a product less 10 fractional bits, rounded half up, not
 /// saturated.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULNX16PACKP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULNX16PACKP(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL16PACKP(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+
+/// lane i = bits 10 to 25 of (a[i] * b[i] + 0x200): a product less 10 fractional bits, rounded half up, not
+/// saturated.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MUL16PACKP(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
 
 /// lane i of acc = acc[i] plus, modulo 2^16, bits 10 to 25 of (a[i] * b[i] + 0x200): a product less 10
-/// fractional bits, rounded half up, not saturated. T forms keep the destination's lanes whose predicate bit
-/// is 0.
+/// fractional bits, rounded half up, not saturated.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANX16PACKP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANX16PACKP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+
+/// lane i of acc = acc[i] plus, modulo 2^16, bits 10 to 25 of (a[i] * b[i] + 0x200): a product less 10
+/// fractional bits, rounded half up, not saturated. Where predicate bit i is 0, acc keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANX16PACKPT(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULANX16PACKPT(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vboolN& p);
+
+/// lane i of acc = acc[i] plus, modulo 2^16, bits 10 to 25 of (a[i] * b[i] + 0x200): a product less 10
+/// fractional bits, rounded half up, not saturated.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULA16PACKP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULA16PACKP(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+
+/// lane i of acc = acc[i] plus, modulo 2^16, bits 10 to 25 of (a[i] * b[i] + 0x200): a product less 10
+/// fractional bits, rounded half up, not saturated. Where predicate bit i is 0, acc keeps lane i.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULA16PACKPT(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULA16PACKPT(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b,
     const cstub_Km_ZNB_Orbis_R5_64k_vbool1& p);
 
 /// lane i of acc = acc[i] less, modulo 2^16, bits 10 to 25 of (a[i] * b[i] + 0x200): a product less 10
 /// fractional bits, rounded half up, not saturated.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSNX16PACKP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSNX16PACKP(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+
+/// lane i of acc = acc[i] less, modulo 2^16, bits 10 to 25 of (a[i] * b[i] + 0x200): a product less 10
+/// fractional bits, rounded half up, not saturated.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULS16PACKP(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULS16PACKP(cstub_Km_ZNB_Orbis_R5_64k_qv_int16& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
+
+/// lane i = b[i] when a[i] is positive, 0 when it is 0, -b[i] modulo 2^16 when it is negative.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSGNNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+
+/// lane i = b[i] when a[i] is positive, 0 when it is 0, -b[i] modulo 2^16 when it is negative.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSGN16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
 
-/// lane i = b[i] when a[i] is positive, 0 when it is 0, -b[i] modulo 2^w when it is negative.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSGNNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSGN16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSGNN_2X32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
+/// lane i = b[i] when a[i] is positive, 0 when it is 0, -b[i] modulo 2^32 when it is negative.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSGNN_2X32(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSGN32(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
+
+/// lane i = b[i] when a[i] is positive, 0 when it is 0, -b[i] modulo 2^32 when it is negative.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSGN32(const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int32v& b);
 
 /// lane i = b[i] when a[i] is positive, 0 when it is 0, -b[i] clamped to the signed range of the lane when it
 /// is negative.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSGNSNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSGNSNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_int16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSGNS16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
+
+/// lane i = b[i] when a[i] is positive, 0 when it is 0, -b[i] clamped to the signed range of the lane when it
+/// is negative.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_int16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_MULSGNS16(const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_int16& b);
 
 /* Sums and differences of narrow lanes in accumulators. Lanes are signed, in U forms unsigned.
    Table: src/multiply/sums.def */
 
-/// lane i = a[i] + b[i], exact; U forms read both as unsigned.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDW2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+/// lane i = a[i] + b[i], exact; a and b are signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDW2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDWU2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+
+/// lane i = a[i] + b[i], exact; a and b are unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDWU2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDWNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// lane i = a[i] + b[i], exact; a and b are signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDWNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDWUNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+
+/// lane i = a[i] + b[i], exact; a and b are unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDWUNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
 
-/// lane i = a[i] - b[i], exact, also below 0; U forms read both as unsigned.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBW2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
+/// lane i = a[i] - b[i], exact, also below 0; a and b are signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBW2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBWU2NX8(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
+
+/// lane i = a[i] - b[i], exact, also below 0; a and b are unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBWU2NX8(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBWNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
+
+/// lane i = a[i] - b[i], exact, also below 0; a and b are signed.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBWNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBWUNX16(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
+
+/// lane i = a[i] - b[i], exact, also below 0; a and b are unsigned.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBWUNX16(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
 
-/// lane i of acc = acc[i] + (a[i] + b[i]), modulo 2^24 or 2^48; U forms read a and b as unsigned.
+/// lane i of acc = acc[i] + (a[i] + b[i]), modulo 2^24; a and b are signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDWA2NX8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDWUA2NX8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDWANX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDWUANX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDWA2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
 
-/// lane i of acc = acc[i] + (a[i] - b[i]), modulo 2^24 or 2^48; U forms read a and b as unsigned.
+/// lane i of acc = acc[i] + (a[i] + b[i]), modulo 2^24; a and b are unsigned.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBWA2NX8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBWUA2NX8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBWANX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBWUANX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDWUA2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
 
-/// lane i of acc = acc[i] - (a[i] + b[i]), modulo 2^24 or 2^48; U forms read a and b as unsigned.
+/// lane i of acc = acc[i] + (a[i] + b[i]), modulo 2^48; a and b are signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDWS2NX8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDWUS2NX8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDWSNX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
-KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDWUSNX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDWANX16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
 
-/// lane i of acc = acc[i] - (a[i] - b[i]), modulo 2^24 or 2^48; U forms read a and b as unsigned.
+/// lane i of acc = acc[i] + (a[i] + b[i]), modulo 2^48; a and b are unsigned.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBWS2NX8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDWUANX16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
+
+/// lane i of acc = acc[i] + (a[i] - b[i]), modulo 2^24; a and b are signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBWUS2NX8(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBWA2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+
+/// lane i of acc = acc[i] + (a[i] - b[i]), modulo 2^24; a and b are unsigned.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBWSNX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBWUA2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
+
+/// lane i of acc = acc[i] + (a[i] - b[i]), modulo 2^48; a and b are signed.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBWUSNX16(
-    cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBWANX16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+
+/// lane i of acc = acc[i] + (a[i] - b[i]), modulo 2^48; a and b are unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBWUANX16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
+
+/// lane i of acc = acc[i] - (a[i] + b[i]), modulo 2^24; a and b are signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDWS2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+
+/// lane i of acc = acc[i] - (a[i] + b[i]), modulo 2^24; a and b are unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDWUS2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
+
+/// lane i of acc = acc[i] - (a[i] + b[i]), modulo 2^48; a and b are signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDWSNX16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+
+/// lane i of acc = acc[i] - (a[i] + b[i]), modulo 2^48; a and b are unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDWUSNX16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
+
+/// lane i of acc = acc[i] - (a[i] - b[i]), modulo 2^24; a and b are signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBWS2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& b);
+
+/// lane i of acc = acc[i] - (a[i] - b[i]), modulo 2^24; a and b are unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBWUS2NX8(cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U& b);
+
+/// lane i of acc = acc[i] - (a[i] - b[i]), modulo 2^48; a and b are signed.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBWSNX16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& b);
+
+/// lane i of acc = acc[i] - (a[i] - b[i]), modulo 2^48; a and b are unsigned.
+KASTARRI_API void
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_SUBWUSNX16(cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& a, const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U& b);
 
 /* Packs of wide accumulators to narrow lanes. Counts are read as unsigned.
    Table: src/multiply/pack.def */
 
 /// lane i = the low bits of acc[i], as many as the result has.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKLNX48(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+
+/// lane i = the low bits of acc[i], as many as the result has.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKL2NX24(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+
+/// lane i = the low bits of acc[i], as many as the result has.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKLN_2X64W(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+
+/// lane i = the low bits of acc[i], as many as the result has.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKLN_2X96(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc);
 
 /// lane k = bits 0 to 7 of acc[2k], extended by zeros.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKL2NX24_0(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc);
 
 /// lane k = bits 0 to 7 of acc[2k + 1], extended by zeros.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKL2NX24_1(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc);
 
 /// lane i = bits 16 to 31 of acc[i].
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKMNX48(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc);
 
 /// lane k = bits 32 to 63 of acc[k].
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKHN_2X64W(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc);
 
 /// lane i = bits 16 to 31 of (2 * bits 0 to 31 of acc[i] + 0x8000), modulo 2^32: a Q15 product rounded half
 /// up.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKQNX48(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc);
 
 /// lane i = bits 10 to 25 of (bits 0 to 31 of acc[i] + 0x200): a product less 10 fractional bits, rounded
 /// half up.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKPNX48(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc);
 
-/// lane i = acc[i] shifted right by shift, rounded half up, clamped to the signed range of the result's lane,
-/// in U forms to the unsigned one; a shift above 23 (24-bit lanes) or 32 (others), or below 0, acts as that
-/// bound.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVR2NX24(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+/// lane i = acc[i] shifted right by shift, rounded half up, clamped to the signed range of the result's lane;
+/// a shift above 23, or below 0, acts as that bound.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVR2NX24(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
     int shift);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRU2NX24(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+
+/// lane i = acc[i] shifted right by shift, rounded half up, clamped to the unsigned range of the result's
+/// lane; a shift above 23, or below 0, acts as that bound.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRU2NX24(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
     int shift);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNX48(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+
+/// lane i = acc[i] shifted right by shift, rounded half up, clamped to the signed range of the result's lane;
+/// a shift above 32, or below 0, acts as that bound.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNX48(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
     int shift);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRN_2X64W(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+
+/// lane i = acc[i] shifted right by shift, rounded half up, clamped to the signed range of the result's lane;
+/// a shift above 32, or below 0, acts as that bound.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRN_2X64W(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
     unsigned int shift);
 
 /// lane k = acc[2k] shifted right by shift, rounded half up, clamped to the signed range of the result's
-/// lane, in U forms to the unsigned one; a shift above 23 (24-bit lanes) or 32 (others), or below 0, acts as
-/// that bound.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVR2NX24_0(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+/// lane; a shift above 23, or below 0, acts as that bound.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVR2NX24_0(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
     unsigned int shift);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRU2NX24_0(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+
+/// lane k = acc[2k] shifted right by shift, rounded half up, clamped to the unsigned range of the result's
+/// lane; a shift above 23, or below 0, acts as that bound.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRU2NX24_0(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
     unsigned int shift);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNX48_0(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+
+/// lane k = acc[2k] shifted right by shift, rounded half up, clamped to the signed range of the result's
+/// lane; a shift above 32, or below 0, acts as that bound.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNX48_0(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
     unsigned int shift);
 
 /// lane k = acc[2k + 1] shifted right by shift, rounded half up, clamped to the signed range of the result's
-/// lane, in U forms to the unsigned one; a shift above 23 (24-bit lanes) or 32 (others), or below 0, acts as
-/// that bound.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVR2NX24_1(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+/// lane; a shift above 23, or below 0, acts as that bound.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVR2NX24_1(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
     unsigned int shift);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRU2NX24_1(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+
+/// lane k = acc[2k + 1] shifted right by shift, rounded half up, clamped to the unsigned range of the
+/// result's lane; a shift above 23, or below 0, acts as that bound.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRU2NX24_1(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
     unsigned int shift);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNX48_1(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+
+/// lane k = acc[2k + 1] shifted right by shift, rounded half up, clamped to the signed range of the result's
+/// lane; a shift above 32, or below 0, acts as that bound.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNX48_1(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
     unsigned int shift);
 
 /// lane i = acc[i] shifted right by shift, truncated, clamped to the signed range of the result's lane; a
-/// shift above 23 (24-bit lanes) or 32 (others), or below 0, acts as that bound.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNR2NX24(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+/// shift above 23, or below 0, acts as that bound.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNR2NX24(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
     unsigned int shift);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNRNX48(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+
+/// lane i = acc[i] shifted right by shift, truncated, clamped to the signed range of the result's lane; a
+/// shift above 32, or below 0, acts as that bound.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNRNX48(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
     unsigned int shift);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNRN_2X64W(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+
+/// lane i = acc[i] shifted right by shift, truncated, clamped to the signed range of the result's lane; a
+/// shift above 32, or below 0, acts as that bound.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNRN_2X64W(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
     unsigned int shift);
 
 /// lane k = acc[2k] shifted right by shift, truncated, clamped to the signed range of the result's lane; a
-/// shift above 23 (24-bit lanes) or 32 (others), or below 0, acts as that bound.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNR2NX24_0(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+/// shift above 23, or below 0, acts as that bound.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNR2NX24_0(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
     unsigned int shift);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNRNX48_0(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+
+/// lane k = acc[2k] shifted right by shift, truncated, clamped to the signed range of the result's lane; a
+/// shift above 32, or below 0, acts as that bound.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNRNX48_0(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
     unsigned int shift);
 
 /// lane k = acc[2k + 1] shifted right by shift, truncated, clamped to the signed range of the result's lane;
-/// a shift above 23 (24-bit lanes) or 32 (others), or below 0, acts as that bound.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNR2NX24_1(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+/// a shift above 23, or below 0, acts as that bound.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNR2NX24_1(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
     unsigned int shift);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNRNX48_1(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+
+/// lane k = acc[2k + 1] shifted right by shift, truncated, clamped to the signed range of the result's lane;
+/// a shift above 32, or below 0, acts as that bound.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVRNRNX48_1(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
     unsigned int shift);
 
 /// lane i = acc[i] shifted right by shift[i], rounded half up, clamped to the signed range of the result's
-/// lane, in U forms to the unsigned one; a shift[i] above 23 (24-bit lanes) or 32 (others), or below 0, acts
-/// as that bound.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKV2NX24(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+/// lane; a shift[i] above 23, or below 0, acts as that bound.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKV2NX24(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& shift);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVU2NX24(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+
+/// lane i = acc[i] shifted right by shift[i], rounded half up, clamped to the unsigned range of the result's
+/// lane; a shift[i] above 23, or below 0, acts as that bound.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVU2NX24(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& shift);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNX48(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+
+/// lane i = acc[i] shifted right by shift[i], rounded half up, clamped to the signed range of the result's
+/// lane; a shift[i] above 32, or below 0, acts as that bound.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNX48(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& shift);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVN_2X64W(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+
+/// lane i = acc[i] shifted right by shift[i], rounded half up, clamped to the signed range of the result's
+/// lane; a shift[i] above 32, or below 0, acts as that bound.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVN_2X64W(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& shift);
 
 /// lane k = acc[2k] shifted right by shift[k], rounded half up, clamped to the signed range of the result's
-/// lane, in U forms to the unsigned one; a shift[k] above 23 (24-bit lanes) or 32 (others), or below 0, acts
-/// as that bound.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKV2NX24_0(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+/// lane; a shift[k] above 23, or below 0, acts as that bound.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKV2NX24_0(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& shift);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVU2NX24_0(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+
+/// lane k = acc[2k] shifted right by shift[k], rounded half up, clamped to the unsigned range of the result's
+/// lane; a shift[k] above 23, or below 0, acts as that bound.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVU2NX24_0(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& shift);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNX48_0(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+
+/// lane k = acc[2k] shifted right by shift[k], rounded half up, clamped to the signed range of the result's
+/// lane; a shift[k] above 32, or below 0, acts as that bound.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNX48_0(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& shift);
 
 /// lane k = acc[2k + 1] shifted right by shift[k], rounded half up, clamped to the signed range of the
-/// result's lane, in U forms to the unsigned one; a shift[k] above 23 (24-bit lanes) or 32 (others), or below
-/// 0, acts as that bound.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKV2NX24_1(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+/// result's lane; a shift[k] above 23, or below 0, acts as that bound.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKV2NX24_1(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& shift);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVU2NX24_1(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+
+/// lane k = acc[2k + 1] shifted right by shift[k], rounded half up, clamped to the unsigned range of the
+/// result's lane; a shift[k] above 23, or below 0, acts as that bound.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVU2NX24_1(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& shift);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNX48_1(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+
+/// lane k = acc[2k + 1] shifted right by shift[k], rounded half up, clamped to the signed range of the
+/// result's lane; a shift[k] above 32, or below 0, acts as that bound.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNX48_1(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& shift);
 
 /// lane i = acc[i] shifted right by shift[i], truncated, clamped to the signed range of the result's lane; a
-/// shift[i] above 23 (24-bit lanes) or 32 (others), or below 0, acts as that bound.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNR2NX24(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+/// shift[i] above 23, or below 0, acts as that bound.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNR2NX24(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8& shift);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNRNX48(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+
+/// lane i = acc[i] shifted right by shift[i], truncated, clamped to the signed range of the result's lane; a
+/// shift[i] above 32, or below 0, acts as that bound.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNRNX48(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& shift);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNRN_2X64W(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
+
+/// lane i = acc[i] shifted right by shift[i], truncated, clamped to the signed range of the result's lane; a
+/// shift[i] above 32, or below 0, acts as that bound.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNRN_2X64W(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& shift);
 
 /// lane k = acc[2k] shifted right by shift[k], truncated, clamped to the signed range of the result's lane; a
-/// shift[k] above 23 (24-bit lanes) or 32 (others), or below 0, acts as that bound.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNR2NX24_0(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+/// shift[k] above 23, or below 0, acts as that bound.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNR2NX24_0(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& shift);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNRNX48_0(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+
+/// lane k = acc[2k] shifted right by shift[k], truncated, clamped to the signed range of the result's lane; a
+/// shift[k] above 32, or below 0, acts as that bound.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNRNX48_0(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& shift);
 
 /// lane k = acc[2k + 1] shifted right by shift[k], truncated, clamped to the signed range of the result's
-/// lane; a shift[k] above 23 (24-bit lanes) or 32 (others), or below 0, acts as that bound.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNR2NX24_1(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
+/// lane; a shift[k] above 23, or below 0, acts as that bound.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNR2NX24_1(const cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16& shift);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNRNX48_1(
-    const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
+
+/// lane k = acc[2k + 1] shifted right by shift[k], truncated, clamped to the signed range of the result's
+/// lane; a shift[k] above 32, or below 0, acts as that bound.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_PACKVNRNX48_1(const cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48& acc,
     const cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v& shift);
 
 #endif

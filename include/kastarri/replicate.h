@@ -3,11 +3,46 @@
 #ifndef KASTARRI_REPLICATE_H
 #define KASTARRI_REPLICATE_H
 
+#include "kastarri/library.h"
+
 /// A program may have parts compiled for different instruction sets. A function that the linker takes from any of them
 /// must not be one of these.
 #define KASTARRI_ALWAYS_INLINE __attribute__((always_inline)) inline
 
 namespace kastarri {
+
+/// The scalars that registers made from several types of scalar do not take: which of those it is to become, the
+/// program has to say.
+template <class Scalar>
+struct not_taken {};
+template <>
+struct not_taken<float> {
+  typedef float type;
+};
+template <>
+struct not_taken<double> {
+  typedef double type;
+};
+template <>
+struct not_taken<long double> {
+  typedef long double type;
+};
+template <>
+struct not_taken<long> {
+  typedef long type;
+};
+template <>
+struct not_taken<unsigned long> {
+  typedef unsigned long type;
+};
+template <>
+struct not_taken<long long> {
+  typedef long long type;
+};
+template <>
+struct not_taken<unsigned long long> {
+  typedef unsigned long long type;
+};
 
 /// The bits of a scalar: integers extended by their sign, floats as they lie in memory.
 template <class Host>

@@ -18,8 +18,7 @@ KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_ioports_CHECK_IPQ();
 /// takes the next entry of the input queue if there is one: ok = 1 and value = the entry; else ok = 0 and
 /// value stays.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_ioports_READ_IPQ_NBLK(
-    unsigned& value,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_ioports_READ_IPQ_NBLK(unsigned& value,
     cstub_Km_ZNB_Orbis_R5_64k_rkbool& ok);
 
 /// puts the value into the output queue, which waits for room.
@@ -38,8 +37,10 @@ KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_ioports_RUR_EXPSTATE();
 /// the handler is told the new value, then the exported state becomes it.
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_ioports_WUR_EXPSTATE(unsigned value);
 
-/// as WUR_EXPSTATE with bit (bit mod 32) of the exported state set, cleared.
+/// as WUR_EXPSTATE with bit (bit mod 32) of the exported state set.
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_ioports_SETB_EXPSTATE(immediate bit);
+
+/// as WUR_EXPSTATE with bit (bit mod 32) of the exported state cleared.
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_ioports_CLRB_EXPSTATE(immediate bit);
 
 /// the bits of the exported state that are 1 in mask become those of the value, then the handler is told the
@@ -54,77 +55,125 @@ KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_ioports_READ_IMPWIRE();
    Table: src/scalar/scalar.def */
 
 /// a + b, modulo 2^32.
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_ADD(int a, int b);
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_ADDI(int a, immediate b);
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_ADDMI(int a, immediate b);
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_density_ADD_N(int a, int b);
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_density_ADDI_N(int a, immediate b);
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_virtualops_ADD_A(int a, int b);
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_virtualops_ADDI_A(int a, immediate b);
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_virtualops_ADDMI_A(int a, immediate b);
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_ADD(int a, int b);
 
-/// n a + b, modulo 2^32, for n = 2, 4, 8.
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_ADDX2(int a, int b);
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_ADDX4(int a, int b);
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_ADDX8(int a, int b);
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_virtualops_ADDX2_A(int a, int b);
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_virtualops_ADDX4_A(int a, int b);
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_virtualops_ADDX8_A(int a, int b);
+/// a + b, modulo 2^32.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_ADDI(int a, immediate b);
+
+/// a + b, modulo 2^32.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_ADDMI(int a, immediate b);
+
+/// a + b, modulo 2^32.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_density_ADD_N(int a, int b);
+
+/// a + b, modulo 2^32.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_density_ADDI_N(int a, immediate b);
+
+/// a + b, modulo 2^32.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_virtualops_ADD_A(int a, int b);
+
+/// a + b, modulo 2^32.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_virtualops_ADDI_A(int a, immediate b);
+
+/// a + b, modulo 2^32.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_virtualops_ADDMI_A(int a, immediate b);
+
+/// 2 a + b, modulo 2^32.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_ADDX2(int a, int b);
+
+/// 4 a + b, modulo 2^32.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_ADDX4(int a, int b);
+
+/// 8 a + b, modulo 2^32.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_ADDX8(int a, int b);
+
+/// 2 a + b, modulo 2^32.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_virtualops_ADDX2_A(int a, int b);
+
+/// 4 a + b, modulo 2^32.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_virtualops_ADDX4_A(int a, int b);
+
+/// 8 a + b, modulo 2^32.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_virtualops_ADDX8_A(int a, int b);
 
 /// a - b, modulo 2^32.
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SUB(int a, int b);
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_virtualops_SUB_A(int a, int b);
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SUB(int a, int b);
 
-/// n a - b, modulo 2^32, for n = 2, 4, 8.
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SUBX2(int a, int b);
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SUBX4(int a, int b);
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SUBX8(int a, int b);
+/// a - b, modulo 2^32.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_virtualops_SUB_A(int a, int b);
 
-/// -a, and the magnitude of a; both wrap: -2^31 stays -2^31.
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_NEG(int a);
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_ABS(int a);
+/// 2 a - b, modulo 2^32.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SUBX2(int a, int b);
+
+/// 4 a - b, modulo 2^32.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SUBX4(int a, int b);
+
+/// 8 a - b, modulo 2^32.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SUBX8(int a, int b);
+
+/// -a, which wraps: -2^31 stays -2^31.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_NEG(int a);
+
+/// the magnitude of a, which wraps: -2^31 stays -2^31.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_ABS(int a);
 
 /// a * b, its low 32 bits.
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_mul_MULL(int a, int b);
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_mul_MULL(int a, int b);
 
-/// a * b, the high 32 bits of the 64-bit product: of unsigned factors (U) and of signed ones (S).
-KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_mul_MULUH(unsigned a, unsigned b);
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_mul_MULSH(int a, int b);
+/// a * b, the high 32 bits of the 64-bit product: of unsigned factors.
+KASTARRI_RESULT unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_mul_MULUH(unsigned a, unsigned b);
 
-/// the product of the factors' low halves, read as signed (S) and as unsigned (U).
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_mul_MUL16S(int a, int b);
-KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_mul_MUL16U(unsigned a, unsigned b);
+/// a * b, the high 32 bits of the 64-bit product: of signed factors.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_mul_MULSH(int a, int b);
 
-/// bitwise and, or, exclusive or.
-KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_AND(unsigned a, unsigned b);
-KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_OR(unsigned a, unsigned b);
-KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_XOR(unsigned a, unsigned b);
+/// the product of the factors' low halves, read as signed.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_mul_MUL16S(int a, int b);
 
-/// 1 when a < b, else 0; SALTU compares as unsigned.
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SALT(int a, int b);
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SALTU(unsigned a, unsigned b);
+/// the product of the factors' low halves, read as unsigned.
+KASTARRI_RESULT unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_mul_MUL16U(unsigned a, unsigned b);
 
-/// the smaller and the larger of a and b; MINU and MAXU compare as unsigned.
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_misc_MIN(int a, int b);
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_misc_MAX(int a, int b);
-KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_misc_MINU(unsigned a, unsigned b);
-KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_misc_MAXU(unsigned a, unsigned b);
+/// a and b, bit by bit.
+KASTARRI_RESULT unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_AND(unsigned a, unsigned b);
 
-/// v clamped to -2^t .. 2^t - 1; v as it is when t is not in 0 .. 31.
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_misc_CLAMPS(int v, int t);
+/// a or b, bit by bit.
+KASTARRI_RESULT unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_OR(unsigned a, unsigned b);
 
-/// v sign-extended from bit b; v as it is when b is not in 0 .. 31.
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_misc_SEXT(int v, int b);
+/// a exclusive or b, bit by bit.
+KASTARRI_RESULT unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_XOR(unsigned a, unsigned b);
+
+/// 1 when a < b, else 0, compared as signed.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SALT(int a, int b);
+
+/// 1 when a < b, else 0, compared as unsigned.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SALTU(unsigned a, unsigned b);
+
+/// the smaller of a and b, compared as signed.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_misc_MIN(int a, int b);
+
+/// the larger of a and b, compared as signed.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_misc_MAX(int a, int b);
+
+/// the smaller of a and b, compared as unsigned.
+KASTARRI_RESULT unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_misc_MINU(unsigned a, unsigned b);
+
+/// the larger of a and b, compared as unsigned.
+KASTARRI_RESULT unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_misc_MAXU(unsigned a, unsigned b);
+
+/// v clamped to -2^t . 2^t - 1; v as it is when t is not in 0 . 31.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_misc_CLAMPS(int v, int t);
+
+/// v sign-extended from bit b; v as it is when b is not in 0 . 31.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_misc_SEXT(int v, int b);
 
 /// how far v can be shifted left without change of sign (31 for 0 and -1).
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_misc_NSA(int v);
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_misc_NSA(int v);
 
 /// the number of leading zero bits of v, 32 for 0.
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_misc_NSAU(unsigned v);
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_misc_NSAU(unsigned v);
 
-/// n bits of v from bit shift mod 32 up, zero-extended: n = 1 .. 16 for bits = 1 .. 16; bits counts modulo
-/// 16, so 0 means 16.
-KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_EXTUI(unsigned v, int shift, unsigned bits);
+/// n bits of v from bit shift mod 32 up, zero-extended: n = 1 . 16 for bits = 1 . 16; bits counts modulo 16,
+/// so 0 means 16.
+KASTARRI_RESULT unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_EXTUI(unsigned v, int shift, unsigned bits);
 
 /// bits shift mod 32 and up of r become the low n bits of v, n as for EXTUI; what would lie above bit 31 is
 /// lost.
@@ -135,85 +184,110 @@ cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_DEPBITS(unsigned& r, unsigned v, int shif
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_CONST16(unsigned& r, unsigned short imm);
 
 /// the bytes of v in reverse order.
-KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_virtualops_BSWP(unsigned v);
+KASTARRI_RESULT unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_virtualops_BSWP(unsigned v);
 
-/// bit i = 1 when byte i of a equals byte i of b, for i = 0 .. 3.
-KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_virtualops_CMP4(unsigned a, unsigned b);
+/// bit i = 1 when byte i of a equals byte i of b, for i = 0 . 3.
+KASTARRI_RESULT unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_virtualops_CMP4(unsigned a, unsigned b);
 
 /// the argument.
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_MOVI(immediate a);
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_density_MOVI_N(immediate a);
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_density_MOV_N(int a);
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_virtualops_MOV_A(int a);
-KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_uint32_move(unsigned a);
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_MOVI(immediate a);
 
-/// r = v when t == 0, t != 0, t < 0, t >= 0; else r stays.
+/// the argument.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_density_MOVI_N(immediate a);
+
+/// the argument.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_density_MOV_N(int a);
+
+/// the argument.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_virtualops_MOV_A(int a);
+
+/// the argument.
+KASTARRI_RESULT unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_uint32_move(unsigned a);
+
+/// r = v when t == 0; else r stays.
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_MOVEQZ(int& r, int v, int t);
+
+/// r = v when t != 0; else r stays.
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_MOVNEZ(int& r, int v, int t);
+
+/// r = v when t < 0; else r stays.
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_MOVLTZ(int& r, int v, int t);
+
+/// r = v when t >= 0; else r stays.
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_MOVGEZ(int& r, int v, int t);
 
-/// the bitwise and, or, exclusive or of the two bytes.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_ANDB(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_ORB(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_XORB(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
+/// the bitwise and of the two bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_ANDB(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
 
-/// the bitwise and, or of the byte a and 1 when b is 0, else 0.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_ANDBC(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
-    const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_ORBC(
-    const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
+/// the bitwise or of the two bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_ORB(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
     const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
 
-/// 1 when all 4 or 8 bits are 1 and no other bit of the byte is, else 0.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
+/// the bitwise exclusive or of the two bytes.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_XORB(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
+
+/// the bitwise and of the byte a and 1 when b is 0, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_ANDBC(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
+
+/// the bitwise or of the byte a and 1 when b is 0, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_ORBC(const cstub_Km_ZNB_Orbis_R5_64k_rkbool& a,
+    const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
+
+/// 1 when all 4 bits are 1 and no other bit of the byte is, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_ALL4(const cstub_Km_ZNB_Orbis_R5_64k_rkbool4& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
+
+/// 1 when all 8 bits are 1 and no other bit of the byte is, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_ALL8(const cstub_Km_ZNB_Orbis_R5_64k_rkbool8& b);
 
 /// 1 when any bit of the byte is 1, else 0.
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_ANY4(const cstub_Km_ZNB_Orbis_R5_64k_rkbool4& b);
-KASTARRI_API cstub_Km_ZNB_Orbis_R5_64k_rkbool
+
+/// 1 when any bit of the byte is 1, else 0.
+KASTARRI_RESULT cstub_Km_ZNB_Orbis_R5_64k_rkbool
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_ANY8(const cstub_Km_ZNB_Orbis_R5_64k_rkbool8& b);
 
-/// r = v when the byte b is not 0 (MOVT), when it is 0 (MOVF); else r stays.
+/// r = v when the byte b is not 0; else r stays.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_MOVT(
-    unsigned& r,
-    unsigned v,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_MOVT(unsigned& r, unsigned v,
     const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
+
+/// r = v when the byte b is 0; else r stays.
 KASTARRI_API void
-cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_MOVF(
-    unsigned& r,
-    unsigned v,
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_booleans_MOVF(unsigned& r, unsigned v,
     const cstub_Km_ZNB_Orbis_R5_64k_rkbool& b);
 
 /// nothing.
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_NOP();
+
+/// nothing.
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_density_NOP_N();
 
 /// the processor's number.
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_RSR_PRID();
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_RSR_PRID();
 
-/// quotient toward zero and remainder, which has the dividend's sign; a divisor of 0, and -2^31 by -1 in the
-/// signed forms, raise the host's division fault.
-KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k_QUOU(unsigned a, unsigned b);
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k_QUOS(int a, int b);
-KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k_REMU(unsigned a, unsigned b);
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k_REMS(int a, int b);
+/// the quotient; a divisor of 0 raises the host's division fault.
+KASTARRI_RESULT unsigned cstub_Km_ZNB_Orbis_R5_64k_QUOU(unsigned a, unsigned b);
+
+/// the quotient, toward zero; a divisor of 0, and -2^31 by -1, raise the host's division fault.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k_QUOS(int a, int b);
+
+/// the remainder; a divisor of 0 raises the host's division fault.
+KASTARRI_RESULT unsigned cstub_Km_ZNB_Orbis_R5_64k_REMU(unsigned a, unsigned b);
+
+/// the remainder, which has the dividend's sign; a divisor of 0, and -2^31 by -1, raise the host's division
+/// fault.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k_REMS(int a, int b);
 
 /* The shift-amount state SAR and the shifts of the scalar core. A funnel shift takes 64 bits, hi above lo,
    shifts them right by an amount of 0 to 63 and keeps the low 32.
@@ -221,17 +295,21 @@ KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k_REMS(int a, int b);
 
 /// SAR = s mod 32.
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SSR(int s);
+
+/// SAR = s mod 32.
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SSAI(immediate s);
 
 /// SAR = 32 - s mod 32: what SLL needs to shift left by s.
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SSL(int s);
 
-/// SAR = 8 s mod 32, and 32 less that: byte positions of unaligned data, little-endian and big-endian.
+/// SAR = 8 s mod 32: the byte position of unaligned data, little-endian.
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SSA8L(int s);
+
+/// SAR = 32 - 8 s mod 32: the byte position of unaligned data, big-endian.
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SSA8B(int s);
 
 /// reads SAR.
-KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_RSR_SAR();
+KASTARRI_RESULT unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_RSR_SAR();
 
 /// SAR = v mod 64.
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_WSR_SAR(unsigned v);
@@ -240,23 +318,27 @@ KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_WSR_SAR(unsigned v);
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_XSR_SAR(unsigned& r);
 
 /// the funnel shift of a above b by SAR.
-KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SRC(unsigned a, unsigned b);
+KASTARRI_RESULT unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SRC(unsigned a, unsigned b);
 
 /// v above 32 zeros, shifted right by SAR: v shifted left by 32 - SAR.
-KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SLL(unsigned v);
+KASTARRI_RESULT unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SLL(unsigned v);
 
 /// v below 32 copies of its sign, shifted right by SAR.
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SRA(int v);
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SRA(int v);
 
 /// v below 32 zeros, shifted right by SAR.
-KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SRL(unsigned v);
+KASTARRI_RESULT unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SRL(unsigned v);
 
 /// SAR = s mod 32, then the funnel shift of a above b by it.
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SSAI_SRC(unsigned a, unsigned b, immediate s);
+
+/// SAR = s mod 32, then the funnel shift of a above b by it.
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SSR_SRC(unsigned a, unsigned b, int s);
 
-/// SAR = s mod 32, then v shifted right by it: arithmetically (SRA), logically (SRL).
+/// SAR = s mod 32, then v shifted right by it: arithmetically.
 KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SSR_SRA(int v, int s);
+
+/// SAR = s mod 32, then v shifted right by it: logically.
 KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SSR_SRL(unsigned v, int s);
 
 /// SAR = 32 - s mod 32; v shifted left by s mod 32 (v itself when that is 0).
@@ -264,38 +346,52 @@ KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SSL_SLL(unsigned v,
 
 /// v shifted left by s mod 32, and 0 when that is 0: the core's SLLI is a funnel shift of v above 32 zeros by
 /// (32 - s) mod 32.
-KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SLLI(unsigned v, immediate s);
+KASTARRI_RESULT unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SLLI(unsigned v, immediate s);
 
-/// v shifted right by s mod 32: arithmetically (SRAI), logically (SRLI).
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SRAI(int v, immediate s);
-KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SRLI(unsigned v, immediate s);
+/// v shifted right by s mod 32: arithmetically.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SRAI(int v, immediate s);
+
+/// v shifted right by s mod 32: logically.
+KASTARRI_RESULT unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_SRLI(unsigned v, immediate s);
 
 /* Loads and stores of the scalar core, at base + offset bytes. A 32-bit access at an address that is not a
    multiple of 4, or a 16-bit one at an odd address, ends the program before anything is read or written.
    Table: src/scalar/access.def */
 
 /// the word at the address, which must be a multiple of 4, or the program ends.
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_L32I(const int* base, int offset);
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_density_L32I_N(const int* base, int offset);
-KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_uint32_loadi(const unsigned* base, int offset);
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_L32I(const int* base, int offset);
+
+/// the word at the address, which must be a multiple of 4, or the program ends.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_density_L32I_N(const int* base, int offset);
+
+/// the word at the address, which must be a multiple of 4, or the program ends.
+KASTARRI_RESULT unsigned
+cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_uint32_loadi(const unsigned* base, int offset);
 
 /// writes the word at the address, which must be a multiple of 4, or the program ends.
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_S32I(int value, const int* base, int offset);
+
+/// writes the word at the address, which must be a multiple of 4, or the program ends.
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_density_S32I_N(int value, const int* base, int offset);
+
+/// writes the word at the address, which must be a multiple of 4, or the program ends.
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_S32NB(int value, const int* base, int offset);
+
+/// writes the word at the address, which must be a multiple of 4, or the program ends.
 KASTARRI_API void
 cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_uint32_storei(unsigned value, const unsigned* base, int offset);
 
-/// the halfword at the address, zero-extended (L16UI), sign-extended (L16SI); the address must be even, or
-/// the program ends.
-KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_L16UI(const unsigned short* base, int offset);
-KASTARRI_API int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_L16SI(const short* base, int offset);
+/// the halfword at the address, zero-extended; the address must be even, or the program ends.
+KASTARRI_RESULT unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_L16UI(const unsigned short* base, int offset);
+
+/// the halfword at the address, sign-extended; the address must be even, or the program ends.
+KASTARRI_RESULT int cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_L16SI(const short* base, int offset);
 
 /// writes the low 16 bits at the address, which must be even, or the program ends.
 KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_S16I(int value, const short* base, int offset);
 
 /// the byte at the address, zero-extended.
-KASTARRI_API unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_L8UI(const unsigned char* base, int offset);
+KASTARRI_RESULT unsigned cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_L8UI(const unsigned char* base, int offset);
 
 /// writes the low 8 bits at the address.
 KASTARRI_API void

@@ -47,37 +47,45 @@
 
    examples/ports is a whole program with handlers. */
 
-/// What a handler is told of its port. The four kinds have the same members.
+/// What the exported state's handler is told. All kinds of port have the same members.
 typedef struct cstub_ExportState_struct {
   void* user_object;  ///< what the program registered
   const char* name;   ///< "EXPSTATE"
   unsigned width;     ///< in bits
 } cstub_ExportState_t, cstub_ExportState_struct_t;
 
+/// What the input queue's handlers are told.
 typedef struct cstub_InputQueue_struct {
   void* user_object;
   const char* name;  ///< "IPQ"
   unsigned width;
 } cstub_InputQueue_t, cstub_InputQueue_struct_t;
 
+/// What the output queue's handlers are told.
 typedef struct cstub_OutputQueue_struct {
   void* user_object;
   const char* name;  ///< "OPQ"
   unsigned width;
 } cstub_OutputQueue_t, cstub_OutputQueue_struct_t;
 
+/// What the imported wire's handler is told.
 typedef struct cstub_ImportWire_struct {
   void* user_object;
   const char* name;  ///< "IMPWIRE"
   unsigned width;
 } cstub_ImportWire_t, cstub_ImportWire_struct_t;
 
-/// Handlers. An entry handler returns nonzero when the transfer can happen now; `flag` is explained above.
+/// The exported state's handler, with the new value.
 typedef void (*cstub_ExportState_func_t)(const cstub_ExportState_t* port, const unsigned* value);
+/// Nonzero when an entry can be taken from the input queue now.
 typedef unsigned (*cstub_InputQueue_Entry_func_t)(const cstub_InputQueue_t* port);
+/// Takes an entry, or makes ready, as `flag` has it; see above.
 typedef void (*cstub_InputQueue_Data_func_t)(const cstub_InputQueue_t* port, unsigned flag, unsigned* data);
+/// Nonzero when an entry can be put into the output queue now.
 typedef unsigned (*cstub_OutputQueue_Entry_func_t)(const cstub_OutputQueue_t* port);
+/// Appends an entry, or makes ready, as `flag` has it; see above.
 typedef void (*cstub_OutputQueue_Data_func_t)(const cstub_OutputQueue_t* port, unsigned flag, const unsigned* data);
+/// Writes the imported wire's value.
 typedef void (*cstub_ImportWire_func_t)(const cstub_ImportWire_t* port, unsigned* value);
 
 /// The exported state: `handler` sees every value that the core gives it.
@@ -96,7 +104,7 @@ KASTARRI_API void cstub_Km_ZNB_Orbis_R5_64k_register_IMPWIRE(void* user_object, 
 
 /* The state block. */
 
-/// The library's own records of the ports: the public record, which handlers are given, and the handlers.
+/// The library's own record of the exported state: the public record, which handlers are given, and the handlers.
 typedef struct cstub_Km_ZNB_Orbis_R5_64k_ExportState_Internal {
   void* user_object;
   const char* name;
@@ -104,6 +112,7 @@ typedef struct cstub_Km_ZNB_Orbis_R5_64k_ExportState_Internal {
   cstub_ExportState_func_t handler;
 } cstub_Km_ZNB_Orbis_R5_64k_ExportState_Internal_t;
 
+/// The same of the input queue.
 typedef struct cstub_Km_ZNB_Orbis_R5_64k_InputQueue_Internal {
   void* user_object;
   const char* name;
@@ -113,6 +122,7 @@ typedef struct cstub_Km_ZNB_Orbis_R5_64k_InputQueue_Internal {
   cstub_InputQueue_Data_func_t data_handler;
 } cstub_Km_ZNB_Orbis_R5_64k_InputQueue_Internal_t;
 
+/// The same of the output queue.
 typedef struct cstub_Km_ZNB_Orbis_R5_64k_OutputQueue_Internal {
   void* user_object;
   const char* name;
@@ -121,6 +131,7 @@ typedef struct cstub_Km_ZNB_Orbis_R5_64k_OutputQueue_Internal {
   cstub_OutputQueue_Data_func_t data_handler;
 } cstub_Km_ZNB_Orbis_R5_64k_OutputQueue_Internal_t;
 
+/// The same of the imported wire.
 typedef struct cstub_Km_ZNB_Orbis_R5_64k_ImportWire_Internal {
   void* user_object;
   const char* name;
@@ -213,10 +224,12 @@ typedef struct cstub_Km_ZNB_Orbis_R5_64k_states {
 /// Used by the general multiplies of wide vectors.
 typedef void (*cstub_mulpp_inplace)(unsigned*, const unsigned*);
 
+/// Functions that the library may call.
 typedef struct cstub_callbacks {
   cstub_mulpp_inplace mulpp_inplace;
 } cstub_callbacks_t;
 
+/// All that the core is outside its registers: states, ports, callbacks.
 typedef struct cstub_Km_ZNB_Orbis_R5_64k_processor {
   cstub_Km_ZNB_Orbis_R5_64k_states_t states;
   cstub_Km_ZNB_Orbis_R5_64k_ExportState_Internal_t EXPSTATE;

@@ -3,6 +3,9 @@
 #ifndef KASTARRI_TYPES
 #define KASTARRI_TYPES
 
+#include "kastarri/library.h"
+#include "kastarri/replicate.h"
+
 /// The type of every immediate operand.
 typedef int immediate;
 
@@ -64,1150 +67,1311 @@ namespace qv_int256_space { class qv_int256_; }
 namespace rkbool2_space {}
 namespace rkbool16_space {}
 
+/// 8-bit data vector: 64 x 8 bits, signed (64 bytes).
 typedef qv_vec2Nx8_space::qv_vec2Nx8_ cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8;
+/// 8-bit data vector: 64 x 8 bits, unsigned (64 bytes).
 typedef qv_vec2Nx8U_space::qv_vec2Nx8U_ cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx8U;
+/// 16-bit data vector: 32 x 16 bits, signed (64 bytes).
 typedef qv_vecNx16_space::qv_vecNx16_ cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16;
+/// 16-bit data vector: 32 x 16 bits, unsigned (64 bytes).
 typedef qv_vecNx16U_space::qv_vecNx16U_ cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx16U;
+/// 32-bit data vector: 16 x 32 bits, signed (64 bytes).
 typedef qv_vecN_2x32v_space::qv_vecN_2x32v_ cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32v;
+/// 32-bit data vector: 16 x 32 bits, unsigned (64 bytes).
 typedef qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_ cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x32Uv;
+/// 64-bit lanes, two words each, low word first: 8 x 64 bits, signed (64 bytes).
 typedef qv_vecN_4x64_space::qv_vecN_4x64_ cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_4x64;
+/// 128-bit lanes, four words each: 4 x 128 bits (64 bytes).
 typedef qv_vecN_8x128_space::qv_vecN_8x128_ cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_8x128;
+/// 256-bit lanes, eight words each: 2 x 256 bits (64 bytes).
 typedef qv_vecN_16x256_space::qv_vecN_16x256_ cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_16x256;
+/// IEEE binary16 bit patterns: 32 x 16 bits, floating point (64 bytes).
 typedef qv_vecNxf16_space::qv_vecNxf16_ cstub_Km_ZNB_Orbis_R5_64k_qv_vecNxf16;
+/// IEEE binary32 bit patterns: 16 x 32 bits, floating point (64 bytes).
 typedef qv_vecN_2xf32_space::qv_vecN_2xf32_ cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf32;
+/// half-width vector: 8-bit data in memory for 16-bit lanes: 32 x 8 bits, signed (32 bytes).
 typedef qv_vecNx8_space::qv_vecNx8_ cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8;
+/// half-width vector: 8-bit data in memory for 16-bit lanes: 32 x 8 bits, unsigned (32 bytes).
 typedef qv_vecNx8U_space::qv_vecNx8U_ cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx8U;
+/// half-width vector: 16-bit data in memory for 32-bit lanes: 16 x 16 bits, signed (32 bytes).
 typedef qv_vecN_2x16_space::qv_vecN_2x16_ cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16;
+/// half-width vector: 16-bit data in memory for 32-bit lanes: 16 x 16 bits, unsigned (32 bytes).
 typedef qv_vecN_2x16U_space::qv_vecN_2x16U_ cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x16U;
+/// half-width vector of IEEE binary16 bit patterns: 16 x 16 bits, floating point (32 bytes).
 typedef qv_vecN_2xf16_space::qv_vecN_2xf16_ cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2xf16;
+/// wide accumulator: one lane a word, sign-extended from bit 23: 64 x 24 bits, signed (256 bytes).
 typedef qv_vec2Nx24_space::qv_vec2Nx24_ cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx24;
+/// wide accumulator: one lane a pair of words, low word first, sign-extended from bit 47: 32 x 48 bits, signed (256 bytes).
 typedef qv_vecNx48_space::qv_vecNx48_ cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx48;
+/// wide accumulator: one lane a pair of words, low word first: 16 x 64 bits, signed (128 bytes).
 typedef qv_vecN_2x64w_space::qv_vecN_2x64w_ cstub_Km_ZNB_Orbis_R5_64k_qv_vecN_2x64w;
+/// 16-bit image of a qv_vec2Nx24: 64 x 16 bits, signed (128 bytes).
 typedef qv_vec2Nx16w_space::qv_vec2Nx16w_ cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16w;
+/// 16-bit image of a qv_vec2Nx24: 64 x 16 bits, unsigned (128 bytes).
 typedef qv_vec2Nx16Uw_space::qv_vec2Nx16Uw_ cstub_Km_ZNB_Orbis_R5_64k_qv_vec2Nx16Uw;
+/// 32-bit image of a qv_vecNx48: 32 x 32 bits, signed (128 bytes).
 typedef qv_vecNx32_space::qv_vecNx32_ cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32;
+/// 32-bit image of a qv_vecNx48: 32 x 32 bits, unsigned (128 bytes).
 typedef qv_vecNx32U_space::qv_vecNx32U_ cstub_Km_ZNB_Orbis_R5_64k_qv_vecNx32U;
+/// spill image of a wide vector: 1536 bits of lanes, packed without padding: 1536 bits (192 bytes).
 typedef qv_wvecspill_space::qv_wvecspill_ cstub_Km_ZNB_Orbis_R5_64k_qv_wvecspill;
+/// alignment register: 512 bits: 512 bits (64 bytes).
 typedef valign_space::valign_ cstub_Km_ZNB_Orbis_R5_64k_valign;
+/// gather/scatter register: 512 bits: 512 bits (64 bytes).
 typedef qv_gsr_space::qv_gsr_ cstub_Km_ZNB_Orbis_R5_64k_qv_gsr;
+/// predicate: bit i governs lane i of 32: 32 x 1 bit (4 bytes).
 typedef vboolN_space::vboolN_ cstub_Km_ZNB_Orbis_R5_64k_vboolN;
+/// predicate: bit i governs lane i of 64: 64 x 1 bit (8 bytes).
 typedef vbool2N_space::vbool2N_ cstub_Km_ZNB_Orbis_R5_64k_vbool2N;
+/// predicate: bit i governs lane i of 16: 16 x 1 bit (2 bytes).
 typedef vboolN_2_space::vboolN_2_ cstub_Km_ZNB_Orbis_R5_64k_vboolN_2;
+/// predicate of a scalar: bit 0: 1 x 1 bit (1 byte).
 typedef vbool1_space::vbool1_ cstub_Km_ZNB_Orbis_R5_64k_vbool1;
+/// boolean of the scalar core: bit 0: 1 x 1 bit, unsigned (1 byte).
 typedef rkbool_space::rkbool_ cstub_Km_ZNB_Orbis_R5_64k_rkbool;
+/// four booleans of the scalar core: bits 0 to 3: 1 x 4 bits, unsigned (1 byte).
 typedef rkbool4_space::rkbool4_ cstub_Km_ZNB_Orbis_R5_64k_rkbool4;
+/// eight booleans of the scalar core: bits 0 to 7: 1 x 8 bits, unsigned (1 byte).
 typedef rkbool8_space::rkbool8_ cstub_Km_ZNB_Orbis_R5_64k_rkbool8;
+/// scalar of the vector unit: 1 x 8 bits, signed (1 byte).
 typedef qv_int8_space::qv_int8_ cstub_Km_ZNB_Orbis_R5_64k_qv_int8;
+/// scalar of the vector unit: 1 x 8 bits, unsigned (1 byte).
 typedef qv_int8U_space::qv_int8U_ cstub_Km_ZNB_Orbis_R5_64k_qv_int8U;
+/// scalar of the vector unit: 1 x 16 bits, signed (2 bytes).
 typedef qv_int16_space::qv_int16_ cstub_Km_ZNB_Orbis_R5_64k_qv_int16;
+/// scalar of the vector unit: 1 x 16 bits, unsigned (2 bytes).
 typedef qv_int16U_space::qv_int16U_ cstub_Km_ZNB_Orbis_R5_64k_qv_int16U;
+/// half-precision scalar: an IEEE binary16 bit pattern: 1 x 16 bits, floating point (2 bytes).
 typedef qv_f16_space::qv_f16_ cstub_Km_ZNB_Orbis_R5_64k_qv_f16;
+/// single-precision scalar: an IEEE binary32 bit pattern: 1 x 32 bits, floating point (4 bytes).
 typedef rkfloat_space::rkfloat_ cstub_Km_ZNB_Orbis_R5_64k_rkfloat;
+/// scalar of the vector unit, sign-extended into the word: 1 x 24 bits, signed (4 bytes).
 typedef qv_int24_space::qv_int24_ cstub_Km_ZNB_Orbis_R5_64k_qv_int24;
+/// scalar of the vector unit: 1 x 32 bits, signed (4 bytes).
 typedef qv_int32v_space::qv_int32v_ cstub_Km_ZNB_Orbis_R5_64k_qv_int32v;
+/// scalar of the vector unit: 1 x 32 bits, unsigned (4 bytes).
 typedef qv_int32Uv_space::qv_int32Uv_ cstub_Km_ZNB_Orbis_R5_64k_qv_int32Uv;
+/// 32-bit register of the scalar core as the vector unit sees it: 1 x 32 bits, unsigned (4 bytes).
 typedef qv_int32pr_space::qv_int32pr_ cstub_Km_ZNB_Orbis_R5_64k_qv_int32pr;
+/// scalar of the vector unit, sign-extended to 64 bits, low word first: 1 x 48 bits, signed (8 bytes).
 typedef qv_int48_space::qv_int48_ cstub_Km_ZNB_Orbis_R5_64k_qv_int48;
+/// scalar of the vector unit, low word first: 1 x 64 bits, signed (8 bytes).
 typedef qv_int64_space::qv_int64_ cstub_Km_ZNB_Orbis_R5_64k_qv_int64;
+/// pair of 32-bit registers of the scalar core, low word first: 1 x 64 bits, signed (8 bytes).
 typedef qv_int64pr_space::qv_int64pr_ cstub_Km_ZNB_Orbis_R5_64k_qv_int64pr;
+/// scalar form of a 64-bit accumulator lane, low word first: 1 x 64 bits, signed (8 bytes).
 typedef qv_int64w_space::qv_int64w_ cstub_Km_ZNB_Orbis_R5_64k_qv_int64w;
+/// scalar form of a 128-bit lane, low word first: 1 x 128 bits (16 bytes).
 typedef qv_int128_space::qv_int128_ cstub_Km_ZNB_Orbis_R5_64k_qv_int128;
+/// scalar form of a 256-bit lane, low word first: 1 x 256 bits (32 bytes).
 typedef qv_int256_space::qv_int256_ cstub_Km_ZNB_Orbis_R5_64k_qv_int256;
 
-/// 8-bit data vector: 64 x 8 bits, signed (64 bytes).
 namespace qv_vec2Nx8_space {
+/// 8-bit data vector: 64 x 8 bits, signed (64 bytes).
 class qv_vec2Nx8_ {
  public:
-  qv_vec2Nx8_() = default;
-  inline qv_vec2Nx8_(signed char from);
-  inline qv_vec2Nx8_(unsigned char from);
-  inline qv_vec2Nx8_(short from);
-  inline qv_vec2Nx8_(unsigned short from);
-  inline qv_vec2Nx8_(int from);
-  inline qv_vec2Nx8_(unsigned int from);
-  explicit inline qv_vec2Nx8_(const qv_vec2Nx8U_space::qv_vec2Nx8U_& from);
-  explicit inline qv_vec2Nx8_(const qv_int8_space::qv_int8_& from);
-  inline qv_vec2Nx8_& operator=(signed char from);
-  inline qv_vec2Nx8_& operator=(unsigned char from);
-  inline qv_vec2Nx8_& operator=(short from);
-  inline qv_vec2Nx8_& operator=(unsigned short from);
-  inline qv_vec2Nx8_& operator=(int from);
-  inline qv_vec2Nx8_& operator=(unsigned int from);
-  inline qv_vec2Nx8_& operator=(const qv_vec2Nx8U_space::qv_vec2Nx8U_& from);
-  inline qv_vec2Nx8_& operator=(const qv_int8_space::qv_int8_& from);
-  inline operator qv_vec2Nx8U_space::qv_vec2Nx8U_() const;
-  inline operator qv_int8_space::qv_int8_() const;
+  qv_vec2Nx8_() = default;  ///< uninitialised
+  inline qv_vec2Nx8_(signed char from);  ///< every lane = the source
+  inline qv_vec2Nx8_(unsigned char from);  ///< every lane = the source
+  inline qv_vec2Nx8_(short from);  ///< every lane = the source, its low 8 bits
+  inline qv_vec2Nx8_(unsigned short from);  ///< every lane = the source, its low 8 bits
+  inline qv_vec2Nx8_(int from);  ///< every lane = the source, its low 8 bits
+  inline qv_vec2Nx8_(unsigned int from);  ///< every lane = the source, its low 8 bits
+  explicit inline qv_vec2Nx8_(const qv_vec2Nx8U_space::qv_vec2Nx8U_& from);  ///< lane i = lane i of the source
+  explicit inline qv_vec2Nx8_(const qv_int8_space::qv_int8_& from);  ///< every lane = the source
+  inline qv_vec2Nx8_& operator=(signed char from);  ///< every lane = the source
+  inline qv_vec2Nx8_& operator=(unsigned char from);  ///< every lane = the source
+  inline qv_vec2Nx8_& operator=(short from);  ///< every lane = the source, its low 8 bits
+  inline qv_vec2Nx8_& operator=(unsigned short from);  ///< every lane = the source, its low 8 bits
+  inline qv_vec2Nx8_& operator=(int from);  ///< every lane = the source, its low 8 bits
+  inline qv_vec2Nx8_& operator=(unsigned int from);  ///< every lane = the source, its low 8 bits
+  inline qv_vec2Nx8_& operator=(const qv_vec2Nx8U_space::qv_vec2Nx8U_& from);  ///< lane i = lane i of the source
+  inline qv_vec2Nx8_& operator=(const qv_int8_space::qv_int8_& from);  ///< every lane = the source
+  inline operator qv_vec2Nx8U_space::qv_vec2Nx8U_() const;  ///< lane i = lane i of the source
+  inline operator qv_int8_space::qv_int8_() const;  ///< lane 0 of the source
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vec2Nx8_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vec2Nx8_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[16];
 };
 }
 
-/// 8-bit data vector: 64 x 8 bits, unsigned (64 bytes).
 namespace qv_vec2Nx8U_space {
+/// 8-bit data vector: 64 x 8 bits, unsigned (64 bytes).
 class qv_vec2Nx8U_ {
  public:
-  qv_vec2Nx8U_() = default;
-  inline qv_vec2Nx8U_(signed char from);
-  inline qv_vec2Nx8U_(unsigned char from);
-  inline qv_vec2Nx8U_(short from);
-  inline qv_vec2Nx8U_(unsigned short from);
-  inline qv_vec2Nx8U_(int from);
-  inline qv_vec2Nx8U_(unsigned int from);
-  explicit inline qv_vec2Nx8U_(const qv_vec2Nx8_space::qv_vec2Nx8_& from);
-  explicit inline qv_vec2Nx8U_(const qv_vec2Nx24_space::qv_vec2Nx24_& from);
-  explicit inline qv_vec2Nx8U_(const qv_int8U_space::qv_int8U_& from);
-  inline qv_vec2Nx8U_& operator=(signed char from);
-  inline qv_vec2Nx8U_& operator=(unsigned char from);
-  inline qv_vec2Nx8U_& operator=(short from);
-  inline qv_vec2Nx8U_& operator=(unsigned short from);
-  inline qv_vec2Nx8U_& operator=(int from);
-  inline qv_vec2Nx8U_& operator=(unsigned int from);
-  inline qv_vec2Nx8U_& operator=(const qv_vec2Nx8_space::qv_vec2Nx8_& from);
-  inline qv_vec2Nx8U_& operator=(const qv_vec2Nx24_space::qv_vec2Nx24_& from);
-  inline qv_vec2Nx8U_& operator=(const qv_int8U_space::qv_int8U_& from);
-  inline operator qv_vec2Nx8_space::qv_vec2Nx8_() const;
-  inline operator qv_int8U_space::qv_int8U_() const;
+  qv_vec2Nx8U_() = default;  ///< uninitialised
+  inline qv_vec2Nx8U_(signed char from);  ///< every lane = the source
+  inline qv_vec2Nx8U_(unsigned char from);  ///< every lane = the source
+  inline qv_vec2Nx8U_(short from);  ///< every lane = the source, its low 8 bits
+  inline qv_vec2Nx8U_(unsigned short from);  ///< every lane = the source, its low 8 bits
+  inline qv_vec2Nx8U_(int from);  ///< every lane = the source, its low 8 bits
+  inline qv_vec2Nx8U_(unsigned int from);  ///< every lane = the source, its low 8 bits
+  explicit inline qv_vec2Nx8U_(const qv_vec2Nx8_space::qv_vec2Nx8_& from);  ///< lane i = lane i of the source
+  explicit inline qv_vec2Nx8U_(const qv_vec2Nx24_space::qv_vec2Nx24_& from);  ///< lane i = lane i of the source, its low 8 bits
+  explicit inline qv_vec2Nx8U_(const qv_int8U_space::qv_int8U_& from);  ///< every lane = the source
+  inline qv_vec2Nx8U_& operator=(signed char from);  ///< every lane = the source
+  inline qv_vec2Nx8U_& operator=(unsigned char from);  ///< every lane = the source
+  inline qv_vec2Nx8U_& operator=(short from);  ///< every lane = the source, its low 8 bits
+  inline qv_vec2Nx8U_& operator=(unsigned short from);  ///< every lane = the source, its low 8 bits
+  inline qv_vec2Nx8U_& operator=(int from);  ///< every lane = the source, its low 8 bits
+  inline qv_vec2Nx8U_& operator=(unsigned int from);  ///< every lane = the source, its low 8 bits
+  inline qv_vec2Nx8U_& operator=(const qv_vec2Nx8_space::qv_vec2Nx8_& from);  ///< lane i = lane i of the source
+  inline qv_vec2Nx8U_& operator=(const qv_vec2Nx24_space::qv_vec2Nx24_& from);  ///< lane i = lane i of the source, its low 8 bits
+  inline qv_vec2Nx8U_& operator=(const qv_int8U_space::qv_int8U_& from);  ///< every lane = the source
+  inline operator qv_vec2Nx8_space::qv_vec2Nx8_() const;  ///< lane i = lane i of the source
+  inline operator qv_int8U_space::qv_int8U_() const;  ///< lane 0 of the source
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vec2Nx8U_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vec2Nx8U_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[16];
 };
 }
 
-/// 16-bit data vector: 32 x 16 bits, signed (64 bytes).
 namespace qv_vecNx16_space {
+/// 16-bit data vector: 32 x 16 bits, signed (64 bytes).
 class qv_vecNx16_ {
  public:
-  qv_vecNx16_() = default;
-  inline qv_vecNx16_(signed char from);
-  inline qv_vecNx16_(unsigned char from);
-  inline qv_vecNx16_(short from);
-  inline qv_vecNx16_(unsigned short from);
-  inline qv_vecNx16_(int from);
-  inline qv_vecNx16_(unsigned int from);
-  explicit inline qv_vecNx16_(const qv_vecNx16U_space::qv_vecNx16U_& from);
-  explicit inline qv_vecNx16_(const qv_vecNx8_space::qv_vecNx8_& from);
-  explicit inline qv_vecNx16_(const qv_vecNx8U_space::qv_vecNx8U_& from);
-  explicit inline qv_vecNx16_(const qv_int16_space::qv_int16_& from);
-  explicit inline qv_vecNx16_(const qv_vecNxf16_space::qv_vecNxf16_& from);
-  inline qv_vecNx16_& operator=(signed char from);
-  inline qv_vecNx16_& operator=(unsigned char from);
-  inline qv_vecNx16_& operator=(short from);
-  inline qv_vecNx16_& operator=(unsigned short from);
-  inline qv_vecNx16_& operator=(int from);
-  inline qv_vecNx16_& operator=(unsigned int from);
-  inline qv_vecNx16_& operator=(const qv_vecNx16U_space::qv_vecNx16U_& from);
-  inline qv_vecNx16_& operator=(const qv_vecNx8_space::qv_vecNx8_& from);
-  inline qv_vecNx16_& operator=(const qv_vecNx8U_space::qv_vecNx8U_& from);
-  inline qv_vecNx16_& operator=(const qv_int16_space::qv_int16_& from);
-  inline qv_vecNx16_& operator=(const qv_vecNxf16_space::qv_vecNxf16_& from);
-  inline operator qv_vecNx16U_space::qv_vecNx16U_() const;
-  inline operator qv_vecNx8_space::qv_vecNx8_() const;
-  inline operator qv_vecNx8U_space::qv_vecNx8U_() const;
-  inline operator qv_int8_space::qv_int8_() const;
-  inline operator qv_int16_space::qv_int16_() const;
-  inline operator qv_vecNxf16_space::qv_vecNxf16_() const;
+  qv_vecNx16_() = default;  ///< uninitialised
+  inline qv_vecNx16_(signed char from);  ///< every lane = the source, sign-extended
+  inline qv_vecNx16_(unsigned char from);  ///< every lane = the source, zero-extended
+  inline qv_vecNx16_(short from);  ///< every lane = the source
+  inline qv_vecNx16_(unsigned short from);  ///< every lane = the source
+  inline qv_vecNx16_(int from);  ///< every lane = the source, its low 16 bits
+  inline qv_vecNx16_(unsigned int from);  ///< every lane = the source, its low 16 bits
+  explicit inline qv_vecNx16_(const qv_vecNx16U_space::qv_vecNx16U_& from);  ///< lane i = lane i of the source
+  explicit inline qv_vecNx16_(const qv_vecNx8_space::qv_vecNx8_& from);  ///< lane i = lane i of the source, sign-extended
+  explicit inline qv_vecNx16_(const qv_vecNx8U_space::qv_vecNx8U_& from);  ///< lane i = lane i of the source, zero-extended
+  explicit inline qv_vecNx16_(const qv_int16_space::qv_int16_& from);  ///< every lane = the source
+  explicit inline qv_vecNx16_(const qv_vecNxf16_space::qv_vecNxf16_& from);  ///< the source's value truncated toward zero and saturated to the target, with flags
+  inline qv_vecNx16_& operator=(signed char from);  ///< every lane = the source, sign-extended
+  inline qv_vecNx16_& operator=(unsigned char from);  ///< every lane = the source, zero-extended
+  inline qv_vecNx16_& operator=(short from);  ///< every lane = the source
+  inline qv_vecNx16_& operator=(unsigned short from);  ///< every lane = the source
+  inline qv_vecNx16_& operator=(int from);  ///< every lane = the source, its low 16 bits
+  inline qv_vecNx16_& operator=(unsigned int from);  ///< every lane = the source, its low 16 bits
+  inline qv_vecNx16_& operator=(const qv_vecNx16U_space::qv_vecNx16U_& from);  ///< lane i = lane i of the source
+  inline qv_vecNx16_& operator=(const qv_vecNx8_space::qv_vecNx8_& from);  ///< lane i = lane i of the source, sign-extended
+  inline qv_vecNx16_& operator=(const qv_vecNx8U_space::qv_vecNx8U_& from);  ///< lane i = lane i of the source, zero-extended
+  inline qv_vecNx16_& operator=(const qv_int16_space::qv_int16_& from);  ///< every lane = the source
+  inline qv_vecNx16_& operator=(const qv_vecNxf16_space::qv_vecNxf16_& from);  ///< the source's value truncated toward zero and saturated to the target, with flags
+  inline operator qv_vecNx16U_space::qv_vecNx16U_() const;  ///< lane i = lane i of the source
+  inline operator qv_vecNx8_space::qv_vecNx8_() const;  ///< lane i = lane i of the source, its low 8 bits
+  inline operator qv_vecNx8U_space::qv_vecNx8U_() const;  ///< lane i = lane i of the source, its low 8 bits
+  inline operator qv_int8_space::qv_int8_() const;  ///< lane 0 of the source, its low 8 bits
+  inline operator qv_int16_space::qv_int16_() const;  ///< lane 0 of the source
+  inline operator qv_vecNxf16_space::qv_vecNxf16_() const;  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecNx16_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecNx16_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[16];
 };
 }
 
-/// 16-bit data vector: 32 x 16 bits, unsigned (64 bytes).
 namespace qv_vecNx16U_space {
+/// 16-bit data vector: 32 x 16 bits, unsigned (64 bytes).
 class qv_vecNx16U_ {
  public:
-  qv_vecNx16U_() = default;
-  inline qv_vecNx16U_(signed char from);
-  inline qv_vecNx16U_(unsigned char from);
-  inline qv_vecNx16U_(short from);
-  inline qv_vecNx16U_(unsigned short from);
-  inline qv_vecNx16U_(int from);
-  inline qv_vecNx16U_(unsigned int from);
-  explicit inline qv_vecNx16U_(const qv_vecNx16_space::qv_vecNx16_& from);
-  explicit inline qv_vecNx16U_(const qv_vecNx8_space::qv_vecNx8_& from);
-  explicit inline qv_vecNx16U_(const qv_vecNx8U_space::qv_vecNx8U_& from);
-  explicit inline qv_vecNx16U_(const qv_vecNx48_space::qv_vecNx48_& from);
-  explicit inline qv_vecNx16U_(const qv_int16U_space::qv_int16U_& from);
-  explicit inline qv_vecNx16U_(const qv_vecNxf16_space::qv_vecNxf16_& from);
-  inline qv_vecNx16U_& operator=(signed char from);
-  inline qv_vecNx16U_& operator=(unsigned char from);
-  inline qv_vecNx16U_& operator=(short from);
-  inline qv_vecNx16U_& operator=(unsigned short from);
-  inline qv_vecNx16U_& operator=(int from);
-  inline qv_vecNx16U_& operator=(unsigned int from);
-  inline qv_vecNx16U_& operator=(const qv_vecNx16_space::qv_vecNx16_& from);
-  inline qv_vecNx16U_& operator=(const qv_vecNx8_space::qv_vecNx8_& from);
-  inline qv_vecNx16U_& operator=(const qv_vecNx8U_space::qv_vecNx8U_& from);
-  inline qv_vecNx16U_& operator=(const qv_vecNx48_space::qv_vecNx48_& from);
-  inline qv_vecNx16U_& operator=(const qv_int16U_space::qv_int16U_& from);
-  inline qv_vecNx16U_& operator=(const qv_vecNxf16_space::qv_vecNxf16_& from);
-  inline operator qv_vecNx16_space::qv_vecNx16_() const;
-  inline operator qv_vecNx8U_space::qv_vecNx8U_() const;
-  inline operator qv_int8U_space::qv_int8U_() const;
-  inline operator qv_int16U_space::qv_int16U_() const;
-  inline operator qv_vecNxf16_space::qv_vecNxf16_() const;
+  qv_vecNx16U_() = default;  ///< uninitialised
+  inline qv_vecNx16U_(signed char from);  ///< every lane = the source, sign-extended
+  inline qv_vecNx16U_(unsigned char from);  ///< every lane = the source, zero-extended
+  inline qv_vecNx16U_(short from);  ///< every lane = the source
+  inline qv_vecNx16U_(unsigned short from);  ///< every lane = the source
+  inline qv_vecNx16U_(int from);  ///< every lane = the source, its low 16 bits
+  inline qv_vecNx16U_(unsigned int from);  ///< every lane = the source, its low 16 bits
+  explicit inline qv_vecNx16U_(const qv_vecNx16_space::qv_vecNx16_& from);  ///< lane i = lane i of the source
+  explicit inline qv_vecNx16U_(const qv_vecNx8_space::qv_vecNx8_& from);  ///< lane i = lane i of the source, sign-extended
+  explicit inline qv_vecNx16U_(const qv_vecNx8U_space::qv_vecNx8U_& from);  ///< lane i = lane i of the source, zero-extended
+  explicit inline qv_vecNx16U_(const qv_vecNx48_space::qv_vecNx48_& from);  ///< lane i = lane i of the source, its low 16 bits
+  explicit inline qv_vecNx16U_(const qv_int16U_space::qv_int16U_& from);  ///< every lane = the source
+  explicit inline qv_vecNx16U_(const qv_vecNxf16_space::qv_vecNxf16_& from);  ///< the source's value truncated toward zero and saturated to the target, with flags
+  inline qv_vecNx16U_& operator=(signed char from);  ///< every lane = the source, sign-extended
+  inline qv_vecNx16U_& operator=(unsigned char from);  ///< every lane = the source, zero-extended
+  inline qv_vecNx16U_& operator=(short from);  ///< every lane = the source
+  inline qv_vecNx16U_& operator=(unsigned short from);  ///< every lane = the source
+  inline qv_vecNx16U_& operator=(int from);  ///< every lane = the source, its low 16 bits
+  inline qv_vecNx16U_& operator=(unsigned int from);  ///< every lane = the source, its low 16 bits
+  inline qv_vecNx16U_& operator=(const qv_vecNx16_space::qv_vecNx16_& from);  ///< lane i = lane i of the source
+  inline qv_vecNx16U_& operator=(const qv_vecNx8_space::qv_vecNx8_& from);  ///< lane i = lane i of the source, sign-extended
+  inline qv_vecNx16U_& operator=(const qv_vecNx8U_space::qv_vecNx8U_& from);  ///< lane i = lane i of the source, zero-extended
+  inline qv_vecNx16U_& operator=(const qv_vecNx48_space::qv_vecNx48_& from);  ///< lane i = lane i of the source, its low 16 bits
+  inline qv_vecNx16U_& operator=(const qv_int16U_space::qv_int16U_& from);  ///< every lane = the source
+  inline qv_vecNx16U_& operator=(const qv_vecNxf16_space::qv_vecNxf16_& from);  ///< the source's value truncated toward zero and saturated to the target, with flags
+  inline operator qv_vecNx16_space::qv_vecNx16_() const;  ///< lane i = lane i of the source
+  inline operator qv_vecNx8U_space::qv_vecNx8U_() const;  ///< lane i = lane i of the source, its low 8 bits
+  inline operator qv_int8U_space::qv_int8U_() const;  ///< lane 0 of the source, its low 8 bits
+  inline operator qv_int16U_space::qv_int16U_() const;  ///< lane 0 of the source
+  inline operator qv_vecNxf16_space::qv_vecNxf16_() const;  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecNx16U_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecNx16U_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[16];
 };
 }
 
-/// 32-bit data vector: 16 x 32 bits, signed (64 bytes).
 namespace qv_vecN_2x32v_space {
+/// 32-bit data vector: 16 x 32 bits, signed (64 bytes).
 class qv_vecN_2x32v_ {
  public:
-  qv_vecN_2x32v_() = default;
-  inline qv_vecN_2x32v_(signed char from);
-  inline qv_vecN_2x32v_(unsigned char from);
-  inline qv_vecN_2x32v_(short from);
-  inline qv_vecN_2x32v_(unsigned short from);
-  inline qv_vecN_2x32v_(int from);
-  inline qv_vecN_2x32v_(unsigned int from);
-  explicit inline qv_vecN_2x32v_(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from);
-  explicit inline qv_vecN_2x32v_(const qv_vecN_2x16_space::qv_vecN_2x16_& from);
-  explicit inline qv_vecN_2x32v_(const qv_vecN_2x16U_space::qv_vecN_2x16U_& from);
-  explicit inline qv_vecN_2x32v_(const qv_int32v_space::qv_int32v_& from);
-  explicit inline qv_vecN_2x32v_(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from);
-  inline qv_vecN_2x32v_& operator=(signed char from);
-  inline qv_vecN_2x32v_& operator=(unsigned char from);
-  inline qv_vecN_2x32v_& operator=(short from);
-  inline qv_vecN_2x32v_& operator=(unsigned short from);
-  inline qv_vecN_2x32v_& operator=(int from);
-  inline qv_vecN_2x32v_& operator=(unsigned int from);
-  inline qv_vecN_2x32v_& operator=(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from);
-  inline qv_vecN_2x32v_& operator=(const qv_vecN_2x16_space::qv_vecN_2x16_& from);
-  inline qv_vecN_2x32v_& operator=(const qv_vecN_2x16U_space::qv_vecN_2x16U_& from);
-  inline qv_vecN_2x32v_& operator=(const qv_int32v_space::qv_int32v_& from);
-  inline qv_vecN_2x32v_& operator=(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from);
-  inline operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_() const;
-  inline operator qv_vecN_2x16_space::qv_vecN_2x16_() const;
-  inline operator qv_vecN_2x16U_space::qv_vecN_2x16U_() const;
-  inline operator qv_int16_space::qv_int16_() const;
-  inline operator qv_int32v_space::qv_int32v_() const;
-  inline operator qv_vecN_2xf32_space::qv_vecN_2xf32_() const;
+  qv_vecN_2x32v_() = default;  ///< uninitialised
+  inline qv_vecN_2x32v_(signed char from);  ///< every lane = the source, sign-extended
+  inline qv_vecN_2x32v_(unsigned char from);  ///< every lane = the source, zero-extended
+  inline qv_vecN_2x32v_(short from);  ///< every lane = the source, sign-extended
+  inline qv_vecN_2x32v_(unsigned short from);  ///< every lane = the source, zero-extended
+  inline qv_vecN_2x32v_(int from);  ///< every lane = the source
+  inline qv_vecN_2x32v_(unsigned int from);  ///< every lane = the source
+  explicit inline qv_vecN_2x32v_(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from);  ///< lane i = lane i of the source
+  explicit inline qv_vecN_2x32v_(const qv_vecN_2x16_space::qv_vecN_2x16_& from);  ///< lane i = lane i of the source, sign-extended
+  explicit inline qv_vecN_2x32v_(const qv_vecN_2x16U_space::qv_vecN_2x16U_& from);  ///< lane i = lane i of the source, zero-extended
+  explicit inline qv_vecN_2x32v_(const qv_int32v_space::qv_int32v_& from);  ///< every lane = the source
+  explicit inline qv_vecN_2x32v_(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from);  ///< the source's value truncated toward zero and saturated to the target, with flags
+  inline qv_vecN_2x32v_& operator=(signed char from);  ///< every lane = the source, sign-extended
+  inline qv_vecN_2x32v_& operator=(unsigned char from);  ///< every lane = the source, zero-extended
+  inline qv_vecN_2x32v_& operator=(short from);  ///< every lane = the source, sign-extended
+  inline qv_vecN_2x32v_& operator=(unsigned short from);  ///< every lane = the source, zero-extended
+  inline qv_vecN_2x32v_& operator=(int from);  ///< every lane = the source
+  inline qv_vecN_2x32v_& operator=(unsigned int from);  ///< every lane = the source
+  inline qv_vecN_2x32v_& operator=(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from);  ///< lane i = lane i of the source
+  inline qv_vecN_2x32v_& operator=(const qv_vecN_2x16_space::qv_vecN_2x16_& from);  ///< lane i = lane i of the source, sign-extended
+  inline qv_vecN_2x32v_& operator=(const qv_vecN_2x16U_space::qv_vecN_2x16U_& from);  ///< lane i = lane i of the source, zero-extended
+  inline qv_vecN_2x32v_& operator=(const qv_int32v_space::qv_int32v_& from);  ///< every lane = the source
+  inline qv_vecN_2x32v_& operator=(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from);  ///< the source's value truncated toward zero and saturated to the target, with flags
+  inline operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_() const;  ///< lane i = lane i of the source
+  inline operator qv_vecN_2x16_space::qv_vecN_2x16_() const;  ///< lane i = lane i of the source, its low 16 bits
+  inline operator qv_vecN_2x16U_space::qv_vecN_2x16U_() const;  ///< lane i = lane i of the source, its low 16 bits
+  inline operator qv_int16_space::qv_int16_() const;  ///< lane 0 of the source, its low 16 bits
+  inline operator qv_int32v_space::qv_int32v_() const;  ///< lane 0 of the source
+  inline operator qv_vecN_2xf32_space::qv_vecN_2xf32_() const;  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecN_2x32v_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecN_2x32v_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[16];
 };
 }
 
-/// 32-bit data vector: 16 x 32 bits, unsigned (64 bytes).
 namespace qv_vecN_2x32Uv_space {
+/// 32-bit data vector: 16 x 32 bits, unsigned (64 bytes).
 class qv_vecN_2x32Uv_ {
  public:
-  qv_vecN_2x32Uv_() = default;
-  inline qv_vecN_2x32Uv_(signed char from);
-  inline qv_vecN_2x32Uv_(unsigned char from);
-  inline qv_vecN_2x32Uv_(short from);
-  inline qv_vecN_2x32Uv_(unsigned short from);
-  inline qv_vecN_2x32Uv_(int from);
-  inline qv_vecN_2x32Uv_(unsigned int from);
-  explicit inline qv_vecN_2x32Uv_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);
-  explicit inline qv_vecN_2x32Uv_(const qv_vecN_2x16_space::qv_vecN_2x16_& from);
-  explicit inline qv_vecN_2x32Uv_(const qv_vecN_2x16U_space::qv_vecN_2x16U_& from);
-  explicit inline qv_vecN_2x32Uv_(const qv_vecN_2x64w_space::qv_vecN_2x64w_& from);
-  explicit inline qv_vecN_2x32Uv_(const qv_int32Uv_space::qv_int32Uv_& from);
-  explicit inline qv_vecN_2x32Uv_(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from);
-  inline qv_vecN_2x32Uv_& operator=(signed char from);
-  inline qv_vecN_2x32Uv_& operator=(unsigned char from);
-  inline qv_vecN_2x32Uv_& operator=(short from);
-  inline qv_vecN_2x32Uv_& operator=(unsigned short from);
-  inline qv_vecN_2x32Uv_& operator=(int from);
-  inline qv_vecN_2x32Uv_& operator=(unsigned int from);
-  inline qv_vecN_2x32Uv_& operator=(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);
-  inline qv_vecN_2x32Uv_& operator=(const qv_vecN_2x16_space::qv_vecN_2x16_& from);
-  inline qv_vecN_2x32Uv_& operator=(const qv_vecN_2x16U_space::qv_vecN_2x16U_& from);
-  inline qv_vecN_2x32Uv_& operator=(const qv_vecN_2x64w_space::qv_vecN_2x64w_& from);
-  inline qv_vecN_2x32Uv_& operator=(const qv_int32Uv_space::qv_int32Uv_& from);
-  inline qv_vecN_2x32Uv_& operator=(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from);
-  inline operator qv_vecN_2x32v_space::qv_vecN_2x32v_() const;
-  inline operator qv_vecN_2x16U_space::qv_vecN_2x16U_() const;
-  inline operator qv_int16U_space::qv_int16U_() const;
-  inline operator qv_int32Uv_space::qv_int32Uv_() const;
-  inline operator qv_vecN_2xf32_space::qv_vecN_2xf32_() const;
+  qv_vecN_2x32Uv_() = default;  ///< uninitialised
+  inline qv_vecN_2x32Uv_(signed char from);  ///< every lane = the source, sign-extended
+  inline qv_vecN_2x32Uv_(unsigned char from);  ///< every lane = the source, zero-extended
+  inline qv_vecN_2x32Uv_(short from);  ///< every lane = the source, sign-extended
+  inline qv_vecN_2x32Uv_(unsigned short from);  ///< every lane = the source, zero-extended
+  inline qv_vecN_2x32Uv_(int from);  ///< every lane = the source
+  inline qv_vecN_2x32Uv_(unsigned int from);  ///< every lane = the source
+  explicit inline qv_vecN_2x32Uv_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);  ///< lane i = lane i of the source
+  explicit inline qv_vecN_2x32Uv_(const qv_vecN_2x16_space::qv_vecN_2x16_& from);  ///< lane i = lane i of the source, sign-extended
+  explicit inline qv_vecN_2x32Uv_(const qv_vecN_2x16U_space::qv_vecN_2x16U_& from);  ///< lane i = lane i of the source, zero-extended
+  explicit inline qv_vecN_2x32Uv_(const qv_vecN_2x64w_space::qv_vecN_2x64w_& from);  ///< lane i = lane i of the source, its low 32 bits
+  explicit inline qv_vecN_2x32Uv_(const qv_int32Uv_space::qv_int32Uv_& from);  ///< every lane = the source
+  explicit inline qv_vecN_2x32Uv_(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from);  ///< the source's value truncated toward zero and saturated to the target, with flags
+  inline qv_vecN_2x32Uv_& operator=(signed char from);  ///< every lane = the source, sign-extended
+  inline qv_vecN_2x32Uv_& operator=(unsigned char from);  ///< every lane = the source, zero-extended
+  inline qv_vecN_2x32Uv_& operator=(short from);  ///< every lane = the source, sign-extended
+  inline qv_vecN_2x32Uv_& operator=(unsigned short from);  ///< every lane = the source, zero-extended
+  inline qv_vecN_2x32Uv_& operator=(int from);  ///< every lane = the source
+  inline qv_vecN_2x32Uv_& operator=(unsigned int from);  ///< every lane = the source
+  inline qv_vecN_2x32Uv_& operator=(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);  ///< lane i = lane i of the source
+  inline qv_vecN_2x32Uv_& operator=(const qv_vecN_2x16_space::qv_vecN_2x16_& from);  ///< lane i = lane i of the source, sign-extended
+  inline qv_vecN_2x32Uv_& operator=(const qv_vecN_2x16U_space::qv_vecN_2x16U_& from);  ///< lane i = lane i of the source, zero-extended
+  inline qv_vecN_2x32Uv_& operator=(const qv_vecN_2x64w_space::qv_vecN_2x64w_& from);  ///< lane i = lane i of the source, its low 32 bits
+  inline qv_vecN_2x32Uv_& operator=(const qv_int32Uv_space::qv_int32Uv_& from);  ///< every lane = the source
+  inline qv_vecN_2x32Uv_& operator=(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from);  ///< the source's value truncated toward zero and saturated to the target, with flags
+  inline operator qv_vecN_2x32v_space::qv_vecN_2x32v_() const;  ///< lane i = lane i of the source
+  inline operator qv_vecN_2x16U_space::qv_vecN_2x16U_() const;  ///< lane i = lane i of the source, its low 16 bits
+  inline operator qv_int16U_space::qv_int16U_() const;  ///< lane 0 of the source, its low 16 bits
+  inline operator qv_int32Uv_space::qv_int32Uv_() const;  ///< lane 0 of the source
+  inline operator qv_vecN_2xf32_space::qv_vecN_2xf32_() const;  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecN_2x32Uv_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecN_2x32Uv_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[16];
 };
 }
 
-/// 64-bit lanes, two words each, low word first: 8 x 64 bits, signed (64 bytes).
 namespace qv_vecN_4x64_space {
+/// 64-bit lanes, two words each, low word first: 8 x 64 bits, signed (64 bytes).
 class qv_vecN_4x64_ {
  public:
-  qv_vecN_4x64_() = default;
-  inline qv_vecN_4x64_(long long from);
-  explicit inline qv_vecN_4x64_(const qv_int64_space::qv_int64_& from);
-  inline qv_vecN_4x64_& operator=(long long from);
-  inline qv_vecN_4x64_& operator=(const qv_int64_space::qv_int64_& from);
-  inline operator qv_int64_space::qv_int64_() const;
+  qv_vecN_4x64_() = default;  ///< uninitialised
+  inline qv_vecN_4x64_(long long from);  ///< every lane = the source
+  explicit inline qv_vecN_4x64_(const qv_int64_space::qv_int64_& from);  ///< every lane = the source
+  inline qv_vecN_4x64_& operator=(long long from);  ///< every lane = the source
+  inline qv_vecN_4x64_& operator=(const qv_int64_space::qv_int64_& from);  ///< every lane = the source
+  inline operator qv_int64_space::qv_int64_() const;  ///< lane 0 of the source
 
   unsigned int _[16];
 };
 }
 
-/// 128-bit lanes, four words each: 4 x 128 bits (64 bytes).
 namespace qv_vecN_8x128_space {
+/// 128-bit lanes, four words each: 4 x 128 bits (64 bytes).
 class qv_vecN_8x128_ {
  public:
-  qv_vecN_8x128_() = default;
-  inline operator qv_int128_space::qv_int128_() const;
+  qv_vecN_8x128_() = default;  ///< uninitialised
+  inline operator qv_int128_space::qv_int128_() const;  ///< lane 0 of the source
 
   unsigned int _[16];
 };
 }
 
-/// 256-bit lanes, eight words each: 2 x 256 bits (64 bytes).
 namespace qv_vecN_16x256_space {
+/// 256-bit lanes, eight words each: 2 x 256 bits (64 bytes).
 class qv_vecN_16x256_ {
  public:
-  qv_vecN_16x256_() = default;
-  inline operator qv_int256_space::qv_int256_() const;
+  qv_vecN_16x256_() = default;  ///< uninitialised
+  inline operator qv_int256_space::qv_int256_() const;  ///< lane 0 of the source
 
   unsigned int _[16];
 };
 }
 
-/// IEEE binary16 bit patterns: 32 x 16 bits, floating point (64 bytes).
 namespace qv_vecNxf16_space {
+/// IEEE binary16 bit patterns: 32 x 16 bits, floating point (64 bytes).
 class qv_vecNxf16_ {
  public:
-  qv_vecNxf16_() = default;
-  explicit inline qv_vecNxf16_(const qv_f16_space::qv_f16_& from);
-  inline qv_vecNxf16_(short from);
-  inline qv_vecNxf16_(unsigned short from);
-  inline qv_vecNxf16_(int from);
-  inline qv_vecNxf16_(unsigned int from);
-  inline qv_vecNxf16_(float from);
-  explicit inline qv_vecNxf16_(const qv_vecNx16_space::qv_vecNx16_& from);
-  explicit inline qv_vecNxf16_(const qv_vecNx16U_space::qv_vecNx16U_& from);
-  explicit inline qv_vecNxf16_(const rkfloat_space::rkfloat_& from);
-  inline qv_vecNxf16_& operator=(const qv_f16_space::qv_f16_& from);
-  inline qv_vecNxf16_& operator=(short from);
-  inline qv_vecNxf16_& operator=(unsigned short from);
-  inline qv_vecNxf16_& operator=(int from);
-  inline qv_vecNxf16_& operator=(unsigned int from);
-  inline qv_vecNxf16_& operator=(float from);
-  inline qv_vecNxf16_& operator=(const qv_vecNx16_space::qv_vecNx16_& from);
-  inline qv_vecNxf16_& operator=(const qv_vecNx16U_space::qv_vecNx16U_& from);
-  inline qv_vecNxf16_& operator=(const rkfloat_space::rkfloat_& from);
-  inline operator qv_f16_space::qv_f16_() const;
-  inline operator qv_vecNx16_space::qv_vecNx16_() const;
-  inline operator qv_vecNx16U_space::qv_vecNx16U_() const;
-  inline operator rkfloat_space::rkfloat_() const;
+  qv_vecNxf16_() = default;  ///< uninitialised
+  explicit inline qv_vecNxf16_(const qv_f16_space::qv_f16_& from);  ///< every lane = the source
+  inline qv_vecNxf16_(short from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_vecNxf16_(unsigned short from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_vecNxf16_(int from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_vecNxf16_(unsigned int from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_vecNxf16_(float from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  explicit inline qv_vecNxf16_(const qv_vecNx16_space::qv_vecNx16_& from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  explicit inline qv_vecNxf16_(const qv_vecNx16U_space::qv_vecNx16U_& from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  explicit inline qv_vecNxf16_(const rkfloat_space::rkfloat_& from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_vecNxf16_& operator=(const qv_f16_space::qv_f16_& from);  ///< every lane = the source
+  inline qv_vecNxf16_& operator=(short from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_vecNxf16_& operator=(unsigned short from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_vecNxf16_& operator=(int from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_vecNxf16_& operator=(unsigned int from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_vecNxf16_& operator=(float from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_vecNxf16_& operator=(const qv_vecNx16_space::qv_vecNx16_& from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_vecNxf16_& operator=(const qv_vecNx16U_space::qv_vecNx16U_& from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_vecNxf16_& operator=(const rkfloat_space::rkfloat_& from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline operator qv_f16_space::qv_f16_() const;  ///< lane 0 of the source
+  inline operator qv_vecNx16_space::qv_vecNx16_() const;  ///< the source's value truncated toward zero and saturated to the target, with flags
+  inline operator qv_vecNx16U_space::qv_vecNx16U_() const;  ///< the source's value truncated toward zero and saturated to the target, with flags
+  inline operator rkfloat_space::rkfloat_() const;  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecNxf16_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecNxf16_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[16];
 };
 }
 
-/// IEEE binary32 bit patterns: 16 x 32 bits, floating point (64 bytes).
 namespace qv_vecN_2xf32_space {
+/// IEEE binary32 bit patterns: 16 x 32 bits, floating point (64 bytes).
 class qv_vecN_2xf32_ {
  public:
-  qv_vecN_2xf32_() = default;
-  inline qv_vecN_2xf32_(float from);
-  explicit inline qv_vecN_2xf32_(const rkfloat_space::rkfloat_& from);
-  inline qv_vecN_2xf32_(int from);
-  inline qv_vecN_2xf32_(unsigned int from);
-  explicit inline qv_vecN_2xf32_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);
-  explicit inline qv_vecN_2xf32_(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from);
-  explicit inline qv_vecN_2xf32_(const qv_vecN_2xf16_space::qv_vecN_2xf16_& from);
-  inline qv_vecN_2xf32_& operator=(float from);
-  inline qv_vecN_2xf32_& operator=(const rkfloat_space::rkfloat_& from);
-  inline qv_vecN_2xf32_& operator=(int from);
-  inline qv_vecN_2xf32_& operator=(unsigned int from);
-  inline qv_vecN_2xf32_& operator=(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);
-  inline qv_vecN_2xf32_& operator=(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from);
-  inline qv_vecN_2xf32_& operator=(const qv_vecN_2xf16_space::qv_vecN_2xf16_& from);
-  inline operator rkfloat_space::rkfloat_() const;
-  inline operator qv_vecN_2x32v_space::qv_vecN_2x32v_() const;
-  inline operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_() const;
-  inline operator qv_vecN_2xf16_space::qv_vecN_2xf16_() const;
+  qv_vecN_2xf32_() = default;  ///< uninitialised
+  inline qv_vecN_2xf32_(float from);  ///< every lane = the source
+  explicit inline qv_vecN_2xf32_(const rkfloat_space::rkfloat_& from);  ///< every lane = the source
+  inline qv_vecN_2xf32_(int from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_vecN_2xf32_(unsigned int from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  explicit inline qv_vecN_2xf32_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  explicit inline qv_vecN_2xf32_(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  explicit inline qv_vecN_2xf32_(const qv_vecN_2xf16_space::qv_vecN_2xf16_& from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_vecN_2xf32_& operator=(float from);  ///< every lane = the source
+  inline qv_vecN_2xf32_& operator=(const rkfloat_space::rkfloat_& from);  ///< every lane = the source
+  inline qv_vecN_2xf32_& operator=(int from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_vecN_2xf32_& operator=(unsigned int from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_vecN_2xf32_& operator=(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_vecN_2xf32_& operator=(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_vecN_2xf32_& operator=(const qv_vecN_2xf16_space::qv_vecN_2xf16_& from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline operator rkfloat_space::rkfloat_() const;  ///< lane 0 of the source
+  inline operator qv_vecN_2x32v_space::qv_vecN_2x32v_() const;  ///< the source's value truncated toward zero and saturated to the target, with flags
+  inline operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_() const;  ///< the source's value truncated toward zero and saturated to the target, with flags
+  inline operator qv_vecN_2xf16_space::qv_vecN_2xf16_() const;  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecN_2xf32_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecN_2xf32_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[16];
 };
 }
 
-/// half-width vector: 8-bit data in memory for 16-bit lanes: 32 x 8 bits, signed (32 bytes).
 namespace qv_vecNx8_space {
+/// half-width vector: 8-bit data in memory for 16-bit lanes: 32 x 8 bits, signed (32 bytes).
 class qv_vecNx8_ {
  public:
-  qv_vecNx8_() = default;
-  inline qv_vecNx8_(signed char from);
-  inline qv_vecNx8_(int from);
-  inline qv_vecNx8_(unsigned int from);
-  explicit inline qv_vecNx8_(const qv_vecNx16_space::qv_vecNx16_& from);
-  inline qv_vecNx8_& operator=(signed char from);
-  inline qv_vecNx8_& operator=(int from);
-  inline qv_vecNx8_& operator=(unsigned int from);
-  inline qv_vecNx8_& operator=(const qv_vecNx16_space::qv_vecNx16_& from);
-  inline operator qv_vecNx16_space::qv_vecNx16_() const;
-  inline operator qv_vecNx16U_space::qv_vecNx16U_() const;
-  inline operator qv_int8_space::qv_int8_() const;
+  qv_vecNx8_() = default;  ///< uninitialised
+  inline qv_vecNx8_(signed char from);  ///< every lane = the source
+  inline qv_vecNx8_(int from);  ///< every lane = the source, its low 8 bits
+  inline qv_vecNx8_(unsigned int from);  ///< every lane = the source, its low 8 bits
+  explicit inline qv_vecNx8_(const qv_vecNx16_space::qv_vecNx16_& from);  ///< lane i = lane i of the source, its low 8 bits
+  inline qv_vecNx8_& operator=(signed char from);  ///< every lane = the source
+  inline qv_vecNx8_& operator=(int from);  ///< every lane = the source, its low 8 bits
+  inline qv_vecNx8_& operator=(unsigned int from);  ///< every lane = the source, its low 8 bits
+  inline qv_vecNx8_& operator=(const qv_vecNx16_space::qv_vecNx16_& from);  ///< lane i = lane i of the source, its low 8 bits
+  inline operator qv_vecNx16_space::qv_vecNx16_() const;  ///< lane i = lane i of the source, sign-extended
+  inline operator qv_vecNx16U_space::qv_vecNx16U_() const;  ///< lane i = lane i of the source, sign-extended
+  inline operator qv_int8_space::qv_int8_() const;  ///< lane 0 of the source
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecNx8_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecNx8_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[8];
 };
 }
 
-/// half-width vector: 8-bit data in memory for 16-bit lanes: 32 x 8 bits, unsigned (32 bytes).
 namespace qv_vecNx8U_space {
+/// half-width vector: 8-bit data in memory for 16-bit lanes: 32 x 8 bits, unsigned (32 bytes).
 class qv_vecNx8U_ {
  public:
-  qv_vecNx8U_() = default;
-  inline qv_vecNx8U_(unsigned char from);
-  inline qv_vecNx8U_(int from);
-  inline qv_vecNx8U_(unsigned int from);
-  explicit inline qv_vecNx8U_(const qv_vecNx16_space::qv_vecNx16_& from);
-  explicit inline qv_vecNx8U_(const qv_vecNx16U_space::qv_vecNx16U_& from);
-  explicit inline qv_vecNx8U_(const qv_int8U_space::qv_int8U_& from);
-  inline qv_vecNx8U_& operator=(unsigned char from);
-  inline qv_vecNx8U_& operator=(int from);
-  inline qv_vecNx8U_& operator=(unsigned int from);
-  inline qv_vecNx8U_& operator=(const qv_vecNx16_space::qv_vecNx16_& from);
-  inline qv_vecNx8U_& operator=(const qv_vecNx16U_space::qv_vecNx16U_& from);
-  inline qv_vecNx8U_& operator=(const qv_int8U_space::qv_int8U_& from);
-  inline operator qv_vecNx16_space::qv_vecNx16_() const;
-  inline operator qv_vecNx16U_space::qv_vecNx16U_() const;
-  inline operator qv_int8U_space::qv_int8U_() const;
+  qv_vecNx8U_() = default;  ///< uninitialised
+  inline qv_vecNx8U_(unsigned char from);  ///< every lane = the source
+  inline qv_vecNx8U_(int from);  ///< every lane = the source, its low 8 bits
+  inline qv_vecNx8U_(unsigned int from);  ///< every lane = the source, its low 8 bits
+  explicit inline qv_vecNx8U_(const qv_vecNx16_space::qv_vecNx16_& from);  ///< lane i = lane i of the source, its low 8 bits
+  explicit inline qv_vecNx8U_(const qv_vecNx16U_space::qv_vecNx16U_& from);  ///< lane i = lane i of the source, its low 8 bits
+  explicit inline qv_vecNx8U_(const qv_int8U_space::qv_int8U_& from);  ///< every lane = the source
+  inline qv_vecNx8U_& operator=(unsigned char from);  ///< every lane = the source
+  inline qv_vecNx8U_& operator=(int from);  ///< every lane = the source, its low 8 bits
+  inline qv_vecNx8U_& operator=(unsigned int from);  ///< every lane = the source, its low 8 bits
+  inline qv_vecNx8U_& operator=(const qv_vecNx16_space::qv_vecNx16_& from);  ///< lane i = lane i of the source, its low 8 bits
+  inline qv_vecNx8U_& operator=(const qv_vecNx16U_space::qv_vecNx16U_& from);  ///< lane i = lane i of the source, its low 8 bits
+  inline qv_vecNx8U_& operator=(const qv_int8U_space::qv_int8U_& from);  ///< every lane = the source
+  inline operator qv_vecNx16_space::qv_vecNx16_() const;  ///< lane i = lane i of the source, zero-extended
+  inline operator qv_vecNx16U_space::qv_vecNx16U_() const;  ///< lane i = lane i of the source, zero-extended
+  inline operator qv_int8U_space::qv_int8U_() const;  ///< lane 0 of the source
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecNx8U_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecNx8U_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[8];
 };
 }
 
-/// half-width vector: 16-bit data in memory for 32-bit lanes: 16 x 16 bits, signed (32 bytes).
 namespace qv_vecN_2x16_space {
+/// half-width vector: 16-bit data in memory for 32-bit lanes: 16 x 16 bits, signed (32 bytes).
 class qv_vecN_2x16_ {
  public:
-  qv_vecN_2x16_() = default;
-  inline qv_vecN_2x16_(short from);
-  inline qv_vecN_2x16_(int from);
-  inline qv_vecN_2x16_(unsigned int from);
-  explicit inline qv_vecN_2x16_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);
-  inline qv_vecN_2x16_& operator=(short from);
-  inline qv_vecN_2x16_& operator=(int from);
-  inline qv_vecN_2x16_& operator=(unsigned int from);
-  inline qv_vecN_2x16_& operator=(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);
-  inline operator qv_vecN_2x32v_space::qv_vecN_2x32v_() const;
-  inline operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_() const;
-  inline operator qv_int16_space::qv_int16_() const;
+  qv_vecN_2x16_() = default;  ///< uninitialised
+  inline qv_vecN_2x16_(short from);  ///< every lane = the source
+  inline qv_vecN_2x16_(int from);  ///< every lane = the source, its low 16 bits
+  inline qv_vecN_2x16_(unsigned int from);  ///< every lane = the source, its low 16 bits
+  explicit inline qv_vecN_2x16_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);  ///< lane i = lane i of the source, its low 16 bits
+  inline qv_vecN_2x16_& operator=(short from);  ///< every lane = the source
+  inline qv_vecN_2x16_& operator=(int from);  ///< every lane = the source, its low 16 bits
+  inline qv_vecN_2x16_& operator=(unsigned int from);  ///< every lane = the source, its low 16 bits
+  inline qv_vecN_2x16_& operator=(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);  ///< lane i = lane i of the source, its low 16 bits
+  inline operator qv_vecN_2x32v_space::qv_vecN_2x32v_() const;  ///< lane i = lane i of the source, sign-extended
+  inline operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_() const;  ///< lane i = lane i of the source, sign-extended
+  inline operator qv_int16_space::qv_int16_() const;  ///< lane 0 of the source
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecN_2x16_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecN_2x16_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[8];
 };
 }
 
-/// half-width vector: 16-bit data in memory for 32-bit lanes: 16 x 16 bits, unsigned (32 bytes).
 namespace qv_vecN_2x16U_space {
+/// half-width vector: 16-bit data in memory for 32-bit lanes: 16 x 16 bits, unsigned (32 bytes).
 class qv_vecN_2x16U_ {
  public:
-  qv_vecN_2x16U_() = default;
-  inline qv_vecN_2x16U_(unsigned short from);
-  inline qv_vecN_2x16U_(int from);
-  inline qv_vecN_2x16U_(unsigned int from);
-  explicit inline qv_vecN_2x16U_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);
-  explicit inline qv_vecN_2x16U_(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from);
-  explicit inline qv_vecN_2x16U_(const qv_int16U_space::qv_int16U_& from);
-  inline qv_vecN_2x16U_& operator=(unsigned short from);
-  inline qv_vecN_2x16U_& operator=(int from);
-  inline qv_vecN_2x16U_& operator=(unsigned int from);
-  inline qv_vecN_2x16U_& operator=(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);
-  inline qv_vecN_2x16U_& operator=(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from);
-  inline qv_vecN_2x16U_& operator=(const qv_int16U_space::qv_int16U_& from);
-  inline operator qv_vecN_2x32v_space::qv_vecN_2x32v_() const;
-  inline operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_() const;
-  inline operator qv_int16U_space::qv_int16U_() const;
+  qv_vecN_2x16U_() = default;  ///< uninitialised
+  inline qv_vecN_2x16U_(unsigned short from);  ///< every lane = the source
+  inline qv_vecN_2x16U_(int from);  ///< every lane = the source, its low 16 bits
+  inline qv_vecN_2x16U_(unsigned int from);  ///< every lane = the source, its low 16 bits
+  explicit inline qv_vecN_2x16U_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);  ///< lane i = lane i of the source, its low 16 bits
+  explicit inline qv_vecN_2x16U_(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from);  ///< lane i = lane i of the source, its low 16 bits
+  explicit inline qv_vecN_2x16U_(const qv_int16U_space::qv_int16U_& from);  ///< every lane = the source
+  inline qv_vecN_2x16U_& operator=(unsigned short from);  ///< every lane = the source
+  inline qv_vecN_2x16U_& operator=(int from);  ///< every lane = the source, its low 16 bits
+  inline qv_vecN_2x16U_& operator=(unsigned int from);  ///< every lane = the source, its low 16 bits
+  inline qv_vecN_2x16U_& operator=(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);  ///< lane i = lane i of the source, its low 16 bits
+  inline qv_vecN_2x16U_& operator=(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from);  ///< lane i = lane i of the source, its low 16 bits
+  inline qv_vecN_2x16U_& operator=(const qv_int16U_space::qv_int16U_& from);  ///< every lane = the source
+  inline operator qv_vecN_2x32v_space::qv_vecN_2x32v_() const;  ///< lane i = lane i of the source, zero-extended
+  inline operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_() const;  ///< lane i = lane i of the source, zero-extended
+  inline operator qv_int16U_space::qv_int16U_() const;  ///< lane 0 of the source
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecN_2x16U_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecN_2x16U_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[8];
 };
 }
 
-/// half-width vector of IEEE binary16 bit patterns: 16 x 16 bits, floating point (32 bytes).
 namespace qv_vecN_2xf16_space {
+/// half-width vector of IEEE binary16 bit patterns: 16 x 16 bits, floating point (32 bytes).
 class qv_vecN_2xf16_ {
  public:
-  qv_vecN_2xf16_() = default;
-  explicit inline qv_vecN_2xf16_(const qv_f16_space::qv_f16_& from);
-  explicit inline qv_vecN_2xf16_(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from);
-  inline qv_vecN_2xf16_& operator=(const qv_f16_space::qv_f16_& from);
-  inline qv_vecN_2xf16_& operator=(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from);
-  inline operator qv_f16_space::qv_f16_() const;
-  inline operator qv_vecN_2xf32_space::qv_vecN_2xf32_() const;
+  qv_vecN_2xf16_() = default;  ///< uninitialised
+  explicit inline qv_vecN_2xf16_(const qv_f16_space::qv_f16_& from);  ///< every lane = the source
+  explicit inline qv_vecN_2xf16_(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_vecN_2xf16_& operator=(const qv_f16_space::qv_f16_& from);  ///< every lane = the source
+  inline qv_vecN_2xf16_& operator=(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline operator qv_f16_space::qv_f16_() const;  ///< lane 0 of the source
+  inline operator qv_vecN_2xf32_space::qv_vecN_2xf32_() const;  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
 
   unsigned int _[8];
 };
 }
 
-/// wide accumulator: one lane a word, sign-extended from bit 23: 64 x 24 bits, signed (256 bytes).
 namespace qv_vec2Nx24_space {
+/// wide accumulator: one lane a word, sign-extended from bit 23: 64 x 24 bits, signed (256 bytes).
 class qv_vec2Nx24_ {
  public:
-  qv_vec2Nx24_() = default;
-  inline qv_vec2Nx24_(short from);
-  inline qv_vec2Nx24_(unsigned short from);
-  inline qv_vec2Nx24_(int from);
-  inline qv_vec2Nx24_(unsigned int from);
-  explicit inline qv_vec2Nx24_(const qv_vec2Nx16w_space::qv_vec2Nx16w_& from);
-  explicit inline qv_vec2Nx24_(const qv_vec2Nx16Uw_space::qv_vec2Nx16Uw_& from);
-  explicit inline qv_vec2Nx24_(const qv_wvecspill_space::qv_wvecspill_& from);
-  inline qv_vec2Nx24_& operator=(short from);
-  inline qv_vec2Nx24_& operator=(unsigned short from);
-  inline qv_vec2Nx24_& operator=(int from);
-  inline qv_vec2Nx24_& operator=(unsigned int from);
-  inline qv_vec2Nx24_& operator=(const qv_vec2Nx16w_space::qv_vec2Nx16w_& from);
-  inline qv_vec2Nx24_& operator=(const qv_vec2Nx16Uw_space::qv_vec2Nx16Uw_& from);
-  inline qv_vec2Nx24_& operator=(const qv_wvecspill_space::qv_wvecspill_& from);
-  inline operator qv_vec2Nx8U_space::qv_vec2Nx8U_() const;
-  inline operator qv_vec2Nx16w_space::qv_vec2Nx16w_() const;
-  inline operator qv_vec2Nx16Uw_space::qv_vec2Nx16Uw_() const;
-  inline operator qv_wvecspill_space::qv_wvecspill_() const;
+  qv_vec2Nx24_() = default;  ///< uninitialised
+  inline qv_vec2Nx24_(short from);  ///< every lane = the source, sign-extended
+  inline qv_vec2Nx24_(unsigned short from);  ///< every lane = the source, zero-extended
+  inline qv_vec2Nx24_(int from);  ///< every lane = the source, its low 24 bits
+  inline qv_vec2Nx24_(unsigned int from);  ///< every lane = the source, its low 24 bits
+  explicit inline qv_vec2Nx24_(const qv_vec2Nx16w_space::qv_vec2Nx16w_& from);  ///< lane i = lane i of the source, sign-extended
+  explicit inline qv_vec2Nx24_(const qv_vec2Nx16Uw_space::qv_vec2Nx16Uw_& from);  ///< lane i = lane i of the source, zero-extended
+  explicit inline qv_vec2Nx24_(const qv_wvecspill_space::qv_wvecspill_& from);  ///< lane i = bits 24 i to 24 i + 23 of the source, sign-extended
+  inline qv_vec2Nx24_& operator=(short from);  ///< every lane = the source, sign-extended
+  inline qv_vec2Nx24_& operator=(unsigned short from);  ///< every lane = the source, zero-extended
+  inline qv_vec2Nx24_& operator=(int from);  ///< every lane = the source, its low 24 bits
+  inline qv_vec2Nx24_& operator=(unsigned int from);  ///< every lane = the source, its low 24 bits
+  inline qv_vec2Nx24_& operator=(const qv_vec2Nx16w_space::qv_vec2Nx16w_& from);  ///< lane i = lane i of the source, sign-extended
+  inline qv_vec2Nx24_& operator=(const qv_vec2Nx16Uw_space::qv_vec2Nx16Uw_& from);  ///< lane i = lane i of the source, zero-extended
+  inline qv_vec2Nx24_& operator=(const qv_wvecspill_space::qv_wvecspill_& from);  ///< lane i = bits 24 i to 24 i + 23 of the source, sign-extended
+  inline operator qv_vec2Nx8U_space::qv_vec2Nx8U_() const;  ///< lane i = lane i of the source, its low 8 bits
+  inline operator qv_vec2Nx16w_space::qv_vec2Nx16w_() const;  ///< lane i = lane i of the source, its low 16 bits
+  inline operator qv_vec2Nx16Uw_space::qv_vec2Nx16Uw_() const;  ///< lane i = lane i of the source, its low 16 bits
+  inline operator qv_wvecspill_space::qv_wvecspill_() const;  ///< lane i of the source in bits 24 i to 24 i + 23, without gaps
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vec2Nx24_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vec2Nx24_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[64];
 };
 }
 
-/// wide accumulator: one lane a pair of words, low word first, sign-extended from bit 47: 32 x 48 bits, signed (256 bytes).
 namespace qv_vecNx48_space {
+/// wide accumulator: one lane a pair of words, low word first, sign-extended from bit 47: 32 x 48 bits, signed (256 bytes).
 class qv_vecNx48_ {
  public:
-  qv_vecNx48_() = default;
-  inline qv_vecNx48_(int from);
-  inline qv_vecNx48_(unsigned int from);
-  explicit inline qv_vecNx48_(const qv_vecNx32_space::qv_vecNx32_& from);
-  explicit inline qv_vecNx48_(const qv_vecNx32U_space::qv_vecNx32U_& from);
-  explicit inline qv_vecNx48_(const qv_wvecspill_space::qv_wvecspill_& from);
-  inline qv_vecNx48_& operator=(int from);
-  inline qv_vecNx48_& operator=(unsigned int from);
-  inline qv_vecNx48_& operator=(const qv_vecNx32_space::qv_vecNx32_& from);
-  inline qv_vecNx48_& operator=(const qv_vecNx32U_space::qv_vecNx32U_& from);
-  inline qv_vecNx48_& operator=(const qv_wvecspill_space::qv_wvecspill_& from);
-  inline operator qv_vecNx16U_space::qv_vecNx16U_() const;
-  inline operator qv_vecNx32_space::qv_vecNx32_() const;
-  inline operator qv_vecNx32U_space::qv_vecNx32U_() const;
-  inline operator qv_wvecspill_space::qv_wvecspill_() const;
+  qv_vecNx48_() = default;  ///< uninitialised
+  inline qv_vecNx48_(int from);  ///< every lane = the source, sign-extended
+  inline qv_vecNx48_(unsigned int from);  ///< every lane = the source, zero-extended
+  explicit inline qv_vecNx48_(const qv_vecNx32_space::qv_vecNx32_& from);  ///< lane i = lane i of the source, sign-extended
+  explicit inline qv_vecNx48_(const qv_vecNx32U_space::qv_vecNx32U_& from);  ///< lane i = lane i of the source, zero-extended
+  explicit inline qv_vecNx48_(const qv_wvecspill_space::qv_wvecspill_& from);  ///< lane i = bits 48 i to 48 i + 47 of the source, sign-extended
+  inline qv_vecNx48_& operator=(int from);  ///< every lane = the source, sign-extended
+  inline qv_vecNx48_& operator=(unsigned int from);  ///< every lane = the source, zero-extended
+  inline qv_vecNx48_& operator=(const qv_vecNx32_space::qv_vecNx32_& from);  ///< lane i = lane i of the source, sign-extended
+  inline qv_vecNx48_& operator=(const qv_vecNx32U_space::qv_vecNx32U_& from);  ///< lane i = lane i of the source, zero-extended
+  inline qv_vecNx48_& operator=(const qv_wvecspill_space::qv_wvecspill_& from);  ///< lane i = bits 48 i to 48 i + 47 of the source, sign-extended
+  inline operator qv_vecNx16U_space::qv_vecNx16U_() const;  ///< lane i = lane i of the source, its low 16 bits
+  inline operator qv_vecNx32_space::qv_vecNx32_() const;  ///< lane i = lane i of the source, its low 32 bits
+  inline operator qv_vecNx32U_space::qv_vecNx32U_() const;  ///< lane i = lane i of the source, its low 32 bits
+  inline operator qv_wvecspill_space::qv_wvecspill_() const;  ///< lane i of the source in bits 48 i to 48 i + 47, without gaps
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecNx48_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_vecNx48_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[64];
 };
 }
 
-/// wide accumulator: one lane a pair of words, low word first: 16 x 64 bits, signed (128 bytes).
 namespace qv_vecN_2x64w_space {
+/// wide accumulator: one lane a pair of words, low word first: 16 x 64 bits, signed (128 bytes).
 class qv_vecN_2x64w_ {
  public:
-  qv_vecN_2x64w_() = default;
-  inline operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_() const;
+  qv_vecN_2x64w_() = default;  ///< uninitialised
+  inline operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_() const;  ///< lane i = lane i of the source, its low 32 bits
 
   unsigned int _[32];
 };
 }
 
-/// 16-bit image of a qv_vec2Nx24: 64 x 16 bits, signed (128 bytes).
 namespace qv_vec2Nx16w_space {
+/// 16-bit image of a qv_vec2Nx24: 64 x 16 bits, signed (128 bytes).
 class qv_vec2Nx16w_ {
  public:
-  qv_vec2Nx16w_() = default;
-  explicit inline qv_vec2Nx16w_(const qv_vec2Nx24_space::qv_vec2Nx24_& from);
-  inline qv_vec2Nx16w_& operator=(const qv_vec2Nx24_space::qv_vec2Nx24_& from);
-  inline operator qv_vec2Nx24_space::qv_vec2Nx24_() const;
+  qv_vec2Nx16w_() = default;  ///< uninitialised
+  explicit inline qv_vec2Nx16w_(const qv_vec2Nx24_space::qv_vec2Nx24_& from);  ///< lane i = lane i of the source, its low 16 bits
+  inline qv_vec2Nx16w_& operator=(const qv_vec2Nx24_space::qv_vec2Nx24_& from);  ///< lane i = lane i of the source, its low 16 bits
+  inline operator qv_vec2Nx24_space::qv_vec2Nx24_() const;  ///< lane i = lane i of the source, sign-extended
 
   unsigned int _[32];
 };
 }
 
-/// 16-bit image of a qv_vec2Nx24: 64 x 16 bits, unsigned (128 bytes).
 namespace qv_vec2Nx16Uw_space {
+/// 16-bit image of a qv_vec2Nx24: 64 x 16 bits, unsigned (128 bytes).
 class qv_vec2Nx16Uw_ {
  public:
-  qv_vec2Nx16Uw_() = default;
-  explicit inline qv_vec2Nx16Uw_(const qv_vec2Nx24_space::qv_vec2Nx24_& from);
-  inline qv_vec2Nx16Uw_& operator=(const qv_vec2Nx24_space::qv_vec2Nx24_& from);
-  inline operator qv_vec2Nx24_space::qv_vec2Nx24_() const;
+  qv_vec2Nx16Uw_() = default;  ///< uninitialised
+  explicit inline qv_vec2Nx16Uw_(const qv_vec2Nx24_space::qv_vec2Nx24_& from);  ///< lane i = lane i of the source, its low 16 bits
+  inline qv_vec2Nx16Uw_& operator=(const qv_vec2Nx24_space::qv_vec2Nx24_& from);  ///< lane i = lane i of the source, its low 16 bits
+  inline operator qv_vec2Nx24_space::qv_vec2Nx24_() const;  ///< lane i = lane i of the source, zero-extended
 
   unsigned int _[32];
 };
 }
 
-/// 32-bit image of a qv_vecNx48: 32 x 32 bits, signed (128 bytes).
 namespace qv_vecNx32_space {
+/// 32-bit image of a qv_vecNx48: 32 x 32 bits, signed (128 bytes).
 class qv_vecNx32_ {
  public:
-  qv_vecNx32_() = default;
-  explicit inline qv_vecNx32_(const qv_vecNx48_space::qv_vecNx48_& from);
-  inline qv_vecNx32_& operator=(const qv_vecNx48_space::qv_vecNx48_& from);
-  inline operator qv_vecNx48_space::qv_vecNx48_() const;
+  qv_vecNx32_() = default;  ///< uninitialised
+  explicit inline qv_vecNx32_(const qv_vecNx48_space::qv_vecNx48_& from);  ///< lane i = lane i of the source, its low 32 bits
+  inline qv_vecNx32_& operator=(const qv_vecNx48_space::qv_vecNx48_& from);  ///< lane i = lane i of the source, its low 32 bits
+  inline operator qv_vecNx48_space::qv_vecNx48_() const;  ///< lane i = lane i of the source, sign-extended
 
   unsigned int _[32];
 };
 }
 
-/// 32-bit image of a qv_vecNx48: 32 x 32 bits, unsigned (128 bytes).
 namespace qv_vecNx32U_space {
+/// 32-bit image of a qv_vecNx48: 32 x 32 bits, unsigned (128 bytes).
 class qv_vecNx32U_ {
  public:
-  qv_vecNx32U_() = default;
-  explicit inline qv_vecNx32U_(const qv_vecNx48_space::qv_vecNx48_& from);
-  inline qv_vecNx32U_& operator=(const qv_vecNx48_space::qv_vecNx48_& from);
-  inline operator qv_vecNx48_space::qv_vecNx48_() const;
+  qv_vecNx32U_() = default;  ///< uninitialised
+  explicit inline qv_vecNx32U_(const qv_vecNx48_space::qv_vecNx48_& from);  ///< lane i = lane i of the source, its low 32 bits
+  inline qv_vecNx32U_& operator=(const qv_vecNx48_space::qv_vecNx48_& from);  ///< lane i = lane i of the source, its low 32 bits
+  inline operator qv_vecNx48_space::qv_vecNx48_() const;  ///< lane i = lane i of the source, zero-extended
 
   unsigned int _[32];
 };
 }
 
-/// spill image of a wide vector: 1536 bits of lanes, packed without padding: 1536 bits (192 bytes).
 namespace qv_wvecspill_space {
+/// spill image of a wide vector: 1536 bits of lanes, packed without padding: 1536 bits (192 bytes).
 class qv_wvecspill_ {
  public:
-  qv_wvecspill_() = default;
-  explicit inline qv_wvecspill_(const qv_vec2Nx24_space::qv_vec2Nx24_& from);
-  explicit inline qv_wvecspill_(const qv_vecNx48_space::qv_vecNx48_& from);
-  inline qv_wvecspill_& operator=(const qv_vec2Nx24_space::qv_vec2Nx24_& from);
-  inline qv_wvecspill_& operator=(const qv_vecNx48_space::qv_vecNx48_& from);
-  inline operator qv_vec2Nx24_space::qv_vec2Nx24_() const;
-  inline operator qv_vecNx48_space::qv_vecNx48_() const;
+  qv_wvecspill_() = default;  ///< uninitialised
+  explicit inline qv_wvecspill_(const qv_vec2Nx24_space::qv_vec2Nx24_& from);  ///< lane i of the source in bits 24 i to 24 i + 23, without gaps
+  explicit inline qv_wvecspill_(const qv_vecNx48_space::qv_vecNx48_& from);  ///< lane i of the source in bits 48 i to 48 i + 47, without gaps
+  inline qv_wvecspill_& operator=(const qv_vec2Nx24_space::qv_vec2Nx24_& from);  ///< lane i of the source in bits 24 i to 24 i + 23, without gaps
+  inline qv_wvecspill_& operator=(const qv_vecNx48_space::qv_vecNx48_& from);  ///< lane i of the source in bits 48 i to 48 i + 47, without gaps
+  inline operator qv_vec2Nx24_space::qv_vec2Nx24_() const;  ///< lane i = bits 24 i to 24 i + 23 of the source, sign-extended
+  inline operator qv_vecNx48_space::qv_vecNx48_() const;  ///< lane i = bits 48 i to 48 i + 47 of the source, sign-extended
 
   unsigned int _[48];
 };
 }
 
-/// alignment register: 512 bits: 512 bits (64 bytes).
 namespace valign_space {
+/// alignment register: 512 bits: 512 bits (64 bytes).
 class valign_ {
  public:
-  valign_() = default;
+  valign_() = default;  ///< uninitialised
 
   unsigned int _[16];
 };
 }
 
-/// gather/scatter register: 512 bits: 512 bits (64 bytes).
 namespace qv_gsr_space {
+/// gather/scatter register: 512 bits: 512 bits (64 bytes).
 class qv_gsr_ {
  public:
-  qv_gsr_() = default;
+  qv_gsr_() = default;  ///< uninitialised
 
   unsigned int _[16];
 };
 }
 
-/// predicate: bit i governs lane i of 32: 32 x 1 bit (4 bytes).
 namespace vboolN_space {
+/// predicate: bit i governs lane i of 32: 32 x 1 bit (4 bytes).
 class vboolN_ {
  public:
-  vboolN_() = default;
-  explicit inline vboolN_(const vbool1_space::vbool1_& from);
-  inline vboolN_& operator=(const vbool1_space::vbool1_& from);
+  vboolN_() = default;  ///< uninitialised
+  explicit inline vboolN_(const vbool1_space::vbool1_& from);  ///< every bit = the source
+  inline vboolN_& operator=(const vbool1_space::vbool1_& from);  ///< every bit = the source
 
   unsigned int _[1];
 };
 }
 
-/// predicate: bit i governs lane i of 64: 64 x 1 bit (8 bytes).
 namespace vbool2N_space {
+/// predicate: bit i governs lane i of 64: 64 x 1 bit (8 bytes).
 class vbool2N_ {
  public:
-  vbool2N_() = default;
-  explicit inline vbool2N_(const vbool1_space::vbool1_& from);
-  inline vbool2N_& operator=(const vbool1_space::vbool1_& from);
+  vbool2N_() = default;  ///< uninitialised
+  explicit inline vbool2N_(const vbool1_space::vbool1_& from);  ///< every bit = the source
+  inline vbool2N_& operator=(const vbool1_space::vbool1_& from);  ///< every bit = the source
 
   unsigned int _[2];
 };
 }
 
-/// predicate: bit i governs lane i of 16: 16 x 1 bit (2 bytes).
 namespace vboolN_2_space {
+/// predicate: bit i governs lane i of 16: 16 x 1 bit (2 bytes).
 class vboolN_2_ {
  public:
-  vboolN_2_() = default;
-  explicit inline vboolN_2_(const vbool1_space::vbool1_& from);
-  inline vboolN_2_& operator=(const vbool1_space::vbool1_& from);
+  vboolN_2_() = default;  ///< uninitialised
+  explicit inline vboolN_2_(const vbool1_space::vbool1_& from);  ///< every bit = the source
+  inline vboolN_2_& operator=(const vbool1_space::vbool1_& from);  ///< every bit = the source
 
   unsigned short _[1];
 };
 }
 
-/// predicate of a scalar: bit 0: 1 x 1 bit (1 byte).
 namespace vbool1_space {
+/// predicate of a scalar: bit 0: 1 x 1 bit (1 byte).
 class vbool1_ {
  public:
-  vbool1_() = default;
-  inline vbool1_(int from);
-  inline vbool1_(unsigned int from);
-  inline vbool1_& operator=(int from);
-  inline vbool1_& operator=(unsigned int from);
-  inline operator vboolN_space::vboolN_() const;
-  inline operator vbool2N_space::vbool2N_() const;
-  inline operator vboolN_2_space::vboolN_2_() const;
+  vbool1_() = default;  ///< uninitialised
+  inline vbool1_(int from);  ///< the source, its lowest bit
+  inline vbool1_(unsigned int from);  ///< the source, its lowest bit
+  inline vbool1_& operator=(int from);  ///< the source, its lowest bit
+  inline vbool1_& operator=(unsigned int from);  ///< the source, its lowest bit
+  inline operator vboolN_space::vboolN_() const;  ///< every bit = the source
+  inline operator vbool2N_space::vbool2N_() const;  ///< every bit = the source
+  inline operator vboolN_2_space::vboolN_2_() const;  ///< every bit = the source
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  vbool1_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  vbool1_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned char _[1];
 };
 }
 
-/// boolean of the scalar core: bit 0: 1 x 1 bit, unsigned (1 byte).
 namespace rkbool_space {
+/// boolean of the scalar core: bit 0: 1 x 1 bit, unsigned (1 byte).
 class rkbool_ {
  public:
-  rkbool_() = default;
-  inline rkbool_(char from);
-  inline rkbool_(unsigned char from);
-  inline rkbool_(short from);
-  inline rkbool_(unsigned short from);
-  inline rkbool_(int from);
-  inline rkbool_(unsigned int from);
-  inline rkbool_(bool from);
-  inline rkbool_& operator=(char from);
-  inline rkbool_& operator=(unsigned char from);
-  inline rkbool_& operator=(short from);
-  inline rkbool_& operator=(unsigned short from);
-  inline rkbool_& operator=(int from);
-  inline rkbool_& operator=(unsigned int from);
-  inline rkbool_& operator=(bool from);
-  inline operator char() const;
-  inline operator unsigned char() const;
-  inline operator short() const;
-  inline operator unsigned short() const;
-  inline operator int() const;
-  inline operator unsigned int() const;
-  inline operator bool() const;
+  rkbool_() = default;  ///< uninitialised
+  inline rkbool_(char from);  ///< the source, its lowest bit
+  inline rkbool_(unsigned char from);  ///< the source, its lowest bit
+  inline rkbool_(short from);  ///< the source, its lowest bit
+  inline rkbool_(unsigned short from);  ///< the source, its lowest bit
+  inline rkbool_(int from);  ///< the source, its lowest bit
+  inline rkbool_(unsigned int from);  ///< the source, its lowest bit
+  inline rkbool_(bool from);  ///< the source
+  inline rkbool_& operator=(char from);  ///< the source, its lowest bit
+  inline rkbool_& operator=(unsigned char from);  ///< the source, its lowest bit
+  inline rkbool_& operator=(short from);  ///< the source, its lowest bit
+  inline rkbool_& operator=(unsigned short from);  ///< the source, its lowest bit
+  inline rkbool_& operator=(int from);  ///< the source, its lowest bit
+  inline rkbool_& operator=(unsigned int from);  ///< the source, its lowest bit
+  inline rkbool_& operator=(bool from);  ///< the source
+  inline operator char() const;  ///< the source, zero-extended
+  inline operator unsigned char() const;  ///< the source, zero-extended
+  inline operator short() const;  ///< the source, zero-extended
+  inline operator unsigned short() const;  ///< the source, zero-extended
+  inline operator int() const;  ///< the source, zero-extended
+  inline operator unsigned int() const;  ///< the source, zero-extended
+  inline operator bool() const;  ///< the source
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  rkbool_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  rkbool_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned char _[1];
 };
 }
 
-/// four booleans of the scalar core: bits 0 to 3: 1 x 4 bits, unsigned (1 byte).
 namespace rkbool4_space {
+/// four booleans of the scalar core: bits 0 to 3: 1 x 4 bits, unsigned (1 byte).
 class rkbool4_ {
  public:
-  rkbool4_() = default;
-  inline rkbool4_(char from);
-  inline rkbool4_(unsigned char from);
-  inline rkbool4_(short from);
-  inline rkbool4_(unsigned short from);
-  inline rkbool4_(int from);
-  inline rkbool4_(unsigned int from);
-  inline rkbool4_& operator=(char from);
-  inline rkbool4_& operator=(unsigned char from);
-  inline rkbool4_& operator=(short from);
-  inline rkbool4_& operator=(unsigned short from);
-  inline rkbool4_& operator=(int from);
-  inline rkbool4_& operator=(unsigned int from);
-  inline operator char() const;
-  inline operator unsigned char() const;
-  inline operator short() const;
-  inline operator unsigned short() const;
-  inline operator int() const;
-  inline operator unsigned int() const;
+  rkbool4_() = default;  ///< uninitialised
+  inline rkbool4_(char from);  ///< the source, its low 4 bits
+  inline rkbool4_(unsigned char from);  ///< the source, its low 4 bits
+  inline rkbool4_(short from);  ///< the source, its low 4 bits
+  inline rkbool4_(unsigned short from);  ///< the source, its low 4 bits
+  inline rkbool4_(int from);  ///< the source, its low 4 bits
+  inline rkbool4_(unsigned int from);  ///< the source, its low 4 bits
+  inline rkbool4_& operator=(char from);  ///< the source, its low 4 bits
+  inline rkbool4_& operator=(unsigned char from);  ///< the source, its low 4 bits
+  inline rkbool4_& operator=(short from);  ///< the source, its low 4 bits
+  inline rkbool4_& operator=(unsigned short from);  ///< the source, its low 4 bits
+  inline rkbool4_& operator=(int from);  ///< the source, its low 4 bits
+  inline rkbool4_& operator=(unsigned int from);  ///< the source, its low 4 bits
+  inline operator char() const;  ///< the source, zero-extended
+  inline operator unsigned char() const;  ///< the source, zero-extended
+  inline operator short() const;  ///< the source, zero-extended
+  inline operator unsigned short() const;  ///< the source, zero-extended
+  inline operator int() const;  ///< the source, zero-extended
+  inline operator unsigned int() const;  ///< the source, zero-extended
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  rkbool4_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  rkbool4_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned char _[1];
 };
 }
 
-/// eight booleans of the scalar core: bits 0 to 7: 1 x 8 bits, unsigned (1 byte).
 namespace rkbool8_space {
+/// eight booleans of the scalar core: bits 0 to 7: 1 x 8 bits, unsigned (1 byte).
 class rkbool8_ {
  public:
-  rkbool8_() = default;
-  inline rkbool8_(char from);
-  inline rkbool8_(unsigned char from);
-  inline rkbool8_(short from);
-  inline rkbool8_(unsigned short from);
-  inline rkbool8_(int from);
-  inline rkbool8_(unsigned int from);
-  inline rkbool8_& operator=(char from);
-  inline rkbool8_& operator=(unsigned char from);
-  inline rkbool8_& operator=(short from);
-  inline rkbool8_& operator=(unsigned short from);
-  inline rkbool8_& operator=(int from);
-  inline rkbool8_& operator=(unsigned int from);
-  inline operator char() const;
-  inline operator unsigned char() const;
-  inline operator short() const;
-  inline operator unsigned short() const;
-  inline operator int() const;
-  inline operator unsigned int() const;
+  rkbool8_() = default;  ///< uninitialised
+  inline rkbool8_(char from);  ///< the source
+  inline rkbool8_(unsigned char from);  ///< the source
+  inline rkbool8_(short from);  ///< the source, its low 8 bits
+  inline rkbool8_(unsigned short from);  ///< the source, its low 8 bits
+  inline rkbool8_(int from);  ///< the source, its low 8 bits
+  inline rkbool8_(unsigned int from);  ///< the source, its low 8 bits
+  inline rkbool8_& operator=(char from);  ///< the source
+  inline rkbool8_& operator=(unsigned char from);  ///< the source
+  inline rkbool8_& operator=(short from);  ///< the source, its low 8 bits
+  inline rkbool8_& operator=(unsigned short from);  ///< the source, its low 8 bits
+  inline rkbool8_& operator=(int from);  ///< the source, its low 8 bits
+  inline rkbool8_& operator=(unsigned int from);  ///< the source, its low 8 bits
+  inline operator char() const;  ///< the source
+  inline operator unsigned char() const;  ///< the source
+  inline operator short() const;  ///< the source, zero-extended
+  inline operator unsigned short() const;  ///< the source, zero-extended
+  inline operator int() const;  ///< the source, zero-extended
+  inline operator unsigned int() const;  ///< the source, zero-extended
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  rkbool8_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  rkbool8_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned char _[1];
 };
 }
 
-/// scalar of the vector unit: 1 x 8 bits, signed (1 byte).
 namespace qv_int8_space {
+/// scalar of the vector unit: 1 x 8 bits, signed (1 byte).
 class qv_int8_ {
  public:
-  qv_int8_() = default;
-  inline qv_int8_(signed char from);
-  inline qv_int8_(unsigned char from);
-  inline qv_int8_(int from);
-  inline qv_int8_(unsigned int from);
-  explicit inline qv_int8_(const qv_vec2Nx8_space::qv_vec2Nx8_& from);
-  explicit inline qv_int8_(const qv_vecNx16_space::qv_vecNx16_& from);
-  explicit inline qv_int8_(const qv_vecNx8_space::qv_vecNx8_& from);
-  explicit inline qv_int8_(const qv_int8U_space::qv_int8U_& from);
-  explicit inline qv_int8_(const qv_int16_space::qv_int16_& from);
-  inline qv_int8_& operator=(signed char from);
-  inline qv_int8_& operator=(unsigned char from);
-  inline qv_int8_& operator=(int from);
-  inline qv_int8_& operator=(unsigned int from);
-  inline qv_int8_& operator=(const qv_vec2Nx8_space::qv_vec2Nx8_& from);
-  inline qv_int8_& operator=(const qv_vecNx16_space::qv_vecNx16_& from);
-  inline qv_int8_& operator=(const qv_vecNx8_space::qv_vecNx8_& from);
-  inline qv_int8_& operator=(const qv_int8U_space::qv_int8U_& from);
-  inline qv_int8_& operator=(const qv_int16_space::qv_int16_& from);
-  inline operator qv_vec2Nx8_space::qv_vec2Nx8_() const;
-  inline operator qv_int8U_space::qv_int8U_() const;
-  inline operator qv_int16_space::qv_int16_() const;
-  inline operator qv_int32pr_space::qv_int32pr_() const;
+  qv_int8_() = default;  ///< uninitialised
+  inline qv_int8_(signed char from);  ///< the source
+  inline qv_int8_(unsigned char from);  ///< the source
+  inline qv_int8_(int from);  ///< the source, its low 8 bits
+  inline qv_int8_(unsigned int from);  ///< the source, its low 8 bits
+  explicit inline qv_int8_(const qv_vec2Nx8_space::qv_vec2Nx8_& from);  ///< lane 0 of the source
+  explicit inline qv_int8_(const qv_vecNx16_space::qv_vecNx16_& from);  ///< lane 0 of the source, its low 8 bits
+  explicit inline qv_int8_(const qv_vecNx8_space::qv_vecNx8_& from);  ///< lane 0 of the source
+  explicit inline qv_int8_(const qv_int8U_space::qv_int8U_& from);  ///< the source
+  explicit inline qv_int8_(const qv_int16_space::qv_int16_& from);  ///< the source, its low 8 bits
+  inline qv_int8_& operator=(signed char from);  ///< the source
+  inline qv_int8_& operator=(unsigned char from);  ///< the source
+  inline qv_int8_& operator=(int from);  ///< the source, its low 8 bits
+  inline qv_int8_& operator=(unsigned int from);  ///< the source, its low 8 bits
+  inline qv_int8_& operator=(const qv_vec2Nx8_space::qv_vec2Nx8_& from);  ///< lane 0 of the source
+  inline qv_int8_& operator=(const qv_vecNx16_space::qv_vecNx16_& from);  ///< lane 0 of the source, its low 8 bits
+  inline qv_int8_& operator=(const qv_vecNx8_space::qv_vecNx8_& from);  ///< lane 0 of the source
+  inline qv_int8_& operator=(const qv_int8U_space::qv_int8U_& from);  ///< the source
+  inline qv_int8_& operator=(const qv_int16_space::qv_int16_& from);  ///< the source, its low 8 bits
+  inline operator qv_vec2Nx8_space::qv_vec2Nx8_() const;  ///< every lane = the source
+  inline operator qv_int8U_space::qv_int8U_() const;  ///< the source
+  inline operator qv_int16_space::qv_int16_() const;  ///< the source, sign-extended
+  inline operator qv_int32pr_space::qv_int32pr_() const;  ///< the source, sign-extended
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int8_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int8_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned char _[1];
 };
 }
 
-/// scalar of the vector unit: 1 x 8 bits, unsigned (1 byte).
 namespace qv_int8U_space {
+/// scalar of the vector unit: 1 x 8 bits, unsigned (1 byte).
 class qv_int8U_ {
  public:
-  qv_int8U_() = default;
-  inline qv_int8U_(signed char from);
-  inline qv_int8U_(unsigned char from);
-  inline qv_int8U_(int from);
-  inline qv_int8U_(unsigned int from);
-  explicit inline qv_int8U_(const qv_vec2Nx8U_space::qv_vec2Nx8U_& from);
-  explicit inline qv_int8U_(const qv_vecNx16U_space::qv_vecNx16U_& from);
-  explicit inline qv_int8U_(const qv_vecNx8U_space::qv_vecNx8U_& from);
-  explicit inline qv_int8U_(const qv_int8_space::qv_int8_& from);
-  explicit inline qv_int8U_(const qv_int16U_space::qv_int16U_& from);
-  inline qv_int8U_& operator=(signed char from);
-  inline qv_int8U_& operator=(unsigned char from);
-  inline qv_int8U_& operator=(int from);
-  inline qv_int8U_& operator=(unsigned int from);
-  inline qv_int8U_& operator=(const qv_vec2Nx8U_space::qv_vec2Nx8U_& from);
-  inline qv_int8U_& operator=(const qv_vecNx16U_space::qv_vecNx16U_& from);
-  inline qv_int8U_& operator=(const qv_vecNx8U_space::qv_vecNx8U_& from);
-  inline qv_int8U_& operator=(const qv_int8_space::qv_int8_& from);
-  inline qv_int8U_& operator=(const qv_int16U_space::qv_int16U_& from);
-  inline operator qv_vec2Nx8U_space::qv_vec2Nx8U_() const;
-  inline operator qv_vecNx8U_space::qv_vecNx8U_() const;
-  inline operator qv_int8_space::qv_int8_() const;
-  inline operator qv_int16_space::qv_int16_() const;
-  inline operator qv_int16U_space::qv_int16U_() const;
-  inline operator qv_int32pr_space::qv_int32pr_() const;
+  qv_int8U_() = default;  ///< uninitialised
+  inline qv_int8U_(signed char from);  ///< the source
+  inline qv_int8U_(unsigned char from);  ///< the source
+  inline qv_int8U_(int from);  ///< the source, its low 8 bits
+  inline qv_int8U_(unsigned int from);  ///< the source, its low 8 bits
+  explicit inline qv_int8U_(const qv_vec2Nx8U_space::qv_vec2Nx8U_& from);  ///< lane 0 of the source
+  explicit inline qv_int8U_(const qv_vecNx16U_space::qv_vecNx16U_& from);  ///< lane 0 of the source, its low 8 bits
+  explicit inline qv_int8U_(const qv_vecNx8U_space::qv_vecNx8U_& from);  ///< lane 0 of the source
+  explicit inline qv_int8U_(const qv_int8_space::qv_int8_& from);  ///< the source
+  explicit inline qv_int8U_(const qv_int16U_space::qv_int16U_& from);  ///< the source, its low 8 bits
+  inline qv_int8U_& operator=(signed char from);  ///< the source
+  inline qv_int8U_& operator=(unsigned char from);  ///< the source
+  inline qv_int8U_& operator=(int from);  ///< the source, its low 8 bits
+  inline qv_int8U_& operator=(unsigned int from);  ///< the source, its low 8 bits
+  inline qv_int8U_& operator=(const qv_vec2Nx8U_space::qv_vec2Nx8U_& from);  ///< lane 0 of the source
+  inline qv_int8U_& operator=(const qv_vecNx16U_space::qv_vecNx16U_& from);  ///< lane 0 of the source, its low 8 bits
+  inline qv_int8U_& operator=(const qv_vecNx8U_space::qv_vecNx8U_& from);  ///< lane 0 of the source
+  inline qv_int8U_& operator=(const qv_int8_space::qv_int8_& from);  ///< the source
+  inline qv_int8U_& operator=(const qv_int16U_space::qv_int16U_& from);  ///< the source, its low 8 bits
+  inline operator qv_vec2Nx8U_space::qv_vec2Nx8U_() const;  ///< every lane = the source
+  inline operator qv_vecNx8U_space::qv_vecNx8U_() const;  ///< every lane = the source
+  inline operator qv_int8_space::qv_int8_() const;  ///< the source
+  inline operator qv_int16_space::qv_int16_() const;  ///< the source, zero-extended
+  inline operator qv_int16U_space::qv_int16U_() const;  ///< the source, zero-extended
+  inline operator qv_int32pr_space::qv_int32pr_() const;  ///< the source, zero-extended
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int8U_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int8U_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned char _[1];
 };
 }
 
-/// scalar of the vector unit: 1 x 16 bits, signed (2 bytes).
 namespace qv_int16_space {
+/// scalar of the vector unit: 1 x 16 bits, signed (2 bytes).
 class qv_int16_ {
  public:
-  qv_int16_() = default;
-  inline qv_int16_(signed char from);
-  inline qv_int16_(unsigned char from);
-  inline qv_int16_(short from);
-  inline qv_int16_(unsigned short from);
-  inline qv_int16_(int from);
-  inline qv_int16_(unsigned int from);
-  explicit inline qv_int16_(const qv_vecNx16_space::qv_vecNx16_& from);
-  explicit inline qv_int16_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);
-  explicit inline qv_int16_(const qv_vecN_2x16_space::qv_vecN_2x16_& from);
-  explicit inline qv_int16_(const qv_int8_space::qv_int8_& from);
-  explicit inline qv_int16_(const qv_int8U_space::qv_int8U_& from);
-  explicit inline qv_int16_(const qv_int16U_space::qv_int16U_& from);
-  explicit inline qv_int16_(const qv_f16_space::qv_f16_& from);
-  inline qv_int16_& operator=(signed char from);
-  inline qv_int16_& operator=(unsigned char from);
-  inline qv_int16_& operator=(short from);
-  inline qv_int16_& operator=(unsigned short from);
-  inline qv_int16_& operator=(int from);
-  inline qv_int16_& operator=(unsigned int from);
-  inline qv_int16_& operator=(const qv_vecNx16_space::qv_vecNx16_& from);
-  inline qv_int16_& operator=(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);
-  inline qv_int16_& operator=(const qv_vecN_2x16_space::qv_vecN_2x16_& from);
-  inline qv_int16_& operator=(const qv_int8_space::qv_int8_& from);
-  inline qv_int16_& operator=(const qv_int8U_space::qv_int8U_& from);
-  inline qv_int16_& operator=(const qv_int16U_space::qv_int16U_& from);
-  inline qv_int16_& operator=(const qv_f16_space::qv_f16_& from);
-  inline operator qv_vecNx16_space::qv_vecNx16_() const;
-  inline operator qv_int8_space::qv_int8_() const;
-  inline operator qv_int16U_space::qv_int16U_() const;
-  inline operator qv_int32pr_space::qv_int32pr_() const;
-  inline operator qv_f16_space::qv_f16_() const;
+  qv_int16_() = default;  ///< uninitialised
+  inline qv_int16_(signed char from);  ///< the source, sign-extended
+  inline qv_int16_(unsigned char from);  ///< the source, zero-extended
+  inline qv_int16_(short from);  ///< the source
+  inline qv_int16_(unsigned short from);  ///< the source
+  inline qv_int16_(int from);  ///< the source, its low 16 bits
+  inline qv_int16_(unsigned int from);  ///< the source, its low 16 bits
+  explicit inline qv_int16_(const qv_vecNx16_space::qv_vecNx16_& from);  ///< lane 0 of the source
+  explicit inline qv_int16_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);  ///< lane 0 of the source, its low 16 bits
+  explicit inline qv_int16_(const qv_vecN_2x16_space::qv_vecN_2x16_& from);  ///< lane 0 of the source
+  explicit inline qv_int16_(const qv_int8_space::qv_int8_& from);  ///< the source, sign-extended
+  explicit inline qv_int16_(const qv_int8U_space::qv_int8U_& from);  ///< the source, zero-extended
+  explicit inline qv_int16_(const qv_int16U_space::qv_int16U_& from);  ///< the source
+  explicit inline qv_int16_(const qv_f16_space::qv_f16_& from);  ///< the source's value truncated toward zero and saturated to the target, with flags
+  inline qv_int16_& operator=(signed char from);  ///< the source, sign-extended
+  inline qv_int16_& operator=(unsigned char from);  ///< the source, zero-extended
+  inline qv_int16_& operator=(short from);  ///< the source
+  inline qv_int16_& operator=(unsigned short from);  ///< the source
+  inline qv_int16_& operator=(int from);  ///< the source, its low 16 bits
+  inline qv_int16_& operator=(unsigned int from);  ///< the source, its low 16 bits
+  inline qv_int16_& operator=(const qv_vecNx16_space::qv_vecNx16_& from);  ///< lane 0 of the source
+  inline qv_int16_& operator=(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);  ///< lane 0 of the source, its low 16 bits
+  inline qv_int16_& operator=(const qv_vecN_2x16_space::qv_vecN_2x16_& from);  ///< lane 0 of the source
+  inline qv_int16_& operator=(const qv_int8_space::qv_int8_& from);  ///< the source, sign-extended
+  inline qv_int16_& operator=(const qv_int8U_space::qv_int8U_& from);  ///< the source, zero-extended
+  inline qv_int16_& operator=(const qv_int16U_space::qv_int16U_& from);  ///< the source
+  inline qv_int16_& operator=(const qv_f16_space::qv_f16_& from);  ///< the source's value truncated toward zero and saturated to the target, with flags
+  inline operator qv_vecNx16_space::qv_vecNx16_() const;  ///< every lane = the source
+  inline operator qv_int8_space::qv_int8_() const;  ///< the source, its low 8 bits
+  inline operator qv_int16U_space::qv_int16U_() const;  ///< the source
+  inline operator qv_int32pr_space::qv_int32pr_() const;  ///< the source, sign-extended
+  inline operator qv_f16_space::qv_f16_() const;  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int16_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int16_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned short _[1];
 };
 }
 
-/// scalar of the vector unit: 1 x 16 bits, unsigned (2 bytes).
 namespace qv_int16U_space {
+/// scalar of the vector unit: 1 x 16 bits, unsigned (2 bytes).
 class qv_int16U_ {
  public:
-  qv_int16U_() = default;
-  inline qv_int16U_(signed char from);
-  inline qv_int16U_(unsigned char from);
-  inline qv_int16U_(short from);
-  inline qv_int16U_(unsigned short from);
-  inline qv_int16U_(int from);
-  inline qv_int16U_(unsigned int from);
-  explicit inline qv_int16U_(const qv_vecNx16U_space::qv_vecNx16U_& from);
-  explicit inline qv_int16U_(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from);
-  explicit inline qv_int16U_(const qv_vecN_2x16U_space::qv_vecN_2x16U_& from);
-  explicit inline qv_int16U_(const qv_int8U_space::qv_int8U_& from);
-  explicit inline qv_int16U_(const qv_int16_space::qv_int16_& from);
-  explicit inline qv_int16U_(const qv_int48_space::qv_int48_& from);
-  explicit inline qv_int16U_(const qv_f16_space::qv_f16_& from);
-  inline qv_int16U_& operator=(signed char from);
-  inline qv_int16U_& operator=(unsigned char from);
-  inline qv_int16U_& operator=(short from);
-  inline qv_int16U_& operator=(unsigned short from);
-  inline qv_int16U_& operator=(int from);
-  inline qv_int16U_& operator=(unsigned int from);
-  inline qv_int16U_& operator=(const qv_vecNx16U_space::qv_vecNx16U_& from);
-  inline qv_int16U_& operator=(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from);
-  inline qv_int16U_& operator=(const qv_vecN_2x16U_space::qv_vecN_2x16U_& from);
-  inline qv_int16U_& operator=(const qv_int8U_space::qv_int8U_& from);
-  inline qv_int16U_& operator=(const qv_int16_space::qv_int16_& from);
-  inline qv_int16U_& operator=(const qv_int48_space::qv_int48_& from);
-  inline qv_int16U_& operator=(const qv_f16_space::qv_f16_& from);
-  inline operator qv_vecNx16U_space::qv_vecNx16U_() const;
-  inline operator qv_vecN_2x16U_space::qv_vecN_2x16U_() const;
-  inline operator qv_int8U_space::qv_int8U_() const;
-  inline operator qv_int16_space::qv_int16_() const;
-  inline operator qv_int32pr_space::qv_int32pr_() const;
-  inline operator qv_f16_space::qv_f16_() const;
+  qv_int16U_() = default;  ///< uninitialised
+  inline qv_int16U_(signed char from);  ///< the source, sign-extended
+  inline qv_int16U_(unsigned char from);  ///< the source, zero-extended
+  inline qv_int16U_(short from);  ///< the source
+  inline qv_int16U_(unsigned short from);  ///< the source
+  inline qv_int16U_(int from);  ///< the source, its low 16 bits
+  inline qv_int16U_(unsigned int from);  ///< the source, its low 16 bits
+  explicit inline qv_int16U_(const qv_vecNx16U_space::qv_vecNx16U_& from);  ///< lane 0 of the source
+  explicit inline qv_int16U_(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from);  ///< lane 0 of the source, its low 16 bits
+  explicit inline qv_int16U_(const qv_vecN_2x16U_space::qv_vecN_2x16U_& from);  ///< lane 0 of the source
+  explicit inline qv_int16U_(const qv_int8U_space::qv_int8U_& from);  ///< the source, zero-extended
+  explicit inline qv_int16U_(const qv_int16_space::qv_int16_& from);  ///< the source
+  explicit inline qv_int16U_(const qv_int48_space::qv_int48_& from);  ///< the source, its low 16 bits
+  explicit inline qv_int16U_(const qv_f16_space::qv_f16_& from);  ///< the source's value truncated toward zero and saturated to the target, with flags
+  inline qv_int16U_& operator=(signed char from);  ///< the source, sign-extended
+  inline qv_int16U_& operator=(unsigned char from);  ///< the source, zero-extended
+  inline qv_int16U_& operator=(short from);  ///< the source
+  inline qv_int16U_& operator=(unsigned short from);  ///< the source
+  inline qv_int16U_& operator=(int from);  ///< the source, its low 16 bits
+  inline qv_int16U_& operator=(unsigned int from);  ///< the source, its low 16 bits
+  inline qv_int16U_& operator=(const qv_vecNx16U_space::qv_vecNx16U_& from);  ///< lane 0 of the source
+  inline qv_int16U_& operator=(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from);  ///< lane 0 of the source, its low 16 bits
+  inline qv_int16U_& operator=(const qv_vecN_2x16U_space::qv_vecN_2x16U_& from);  ///< lane 0 of the source
+  inline qv_int16U_& operator=(const qv_int8U_space::qv_int8U_& from);  ///< the source, zero-extended
+  inline qv_int16U_& operator=(const qv_int16_space::qv_int16_& from);  ///< the source
+  inline qv_int16U_& operator=(const qv_int48_space::qv_int48_& from);  ///< the source, its low 16 bits
+  inline qv_int16U_& operator=(const qv_f16_space::qv_f16_& from);  ///< the source's value truncated toward zero and saturated to the target, with flags
+  inline operator qv_vecNx16U_space::qv_vecNx16U_() const;  ///< every lane = the source
+  inline operator qv_vecN_2x16U_space::qv_vecN_2x16U_() const;  ///< every lane = the source
+  inline operator qv_int8U_space::qv_int8U_() const;  ///< the source, its low 8 bits
+  inline operator qv_int16_space::qv_int16_() const;  ///< the source
+  inline operator qv_int32pr_space::qv_int32pr_() const;  ///< the source, zero-extended
+  inline operator qv_f16_space::qv_f16_() const;  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int16U_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int16U_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned short _[1];
 };
 }
 
-/// half-precision scalar: an IEEE binary16 bit pattern: 1 x 16 bits, floating point (2 bytes).
 namespace qv_f16_space {
+/// half-precision scalar: an IEEE binary16 bit pattern: 1 x 16 bits, floating point (2 bytes).
 class qv_f16_ {
  public:
-  qv_f16_() = default;
-  explicit inline qv_f16_(const qv_vecNxf16_space::qv_vecNxf16_& from);
-  explicit inline qv_f16_(const qv_vecN_2xf16_space::qv_vecN_2xf16_& from);
-  inline qv_f16_(signed char from);
-  inline qv_f16_(unsigned char from);
-  inline qv_f16_(short from);
-  inline qv_f16_(unsigned short from);
-  inline qv_f16_(int from);
-  inline qv_f16_(unsigned int from);
-  inline qv_f16_(float from);
-  explicit inline qv_f16_(const qv_int16_space::qv_int16_& from);
-  explicit inline qv_f16_(const qv_int16U_space::qv_int16U_& from);
-  explicit inline qv_f16_(const rkfloat_space::rkfloat_& from);
-  explicit inline qv_f16_(const qv_int32v_space::qv_int32v_& from);
-  explicit inline qv_f16_(const qv_int32Uv_space::qv_int32Uv_& from);
-  inline qv_f16_& operator=(const qv_vecNxf16_space::qv_vecNxf16_& from);
-  inline qv_f16_& operator=(const qv_vecN_2xf16_space::qv_vecN_2xf16_& from);
-  inline qv_f16_& operator=(signed char from);
-  inline qv_f16_& operator=(unsigned char from);
-  inline qv_f16_& operator=(short from);
-  inline qv_f16_& operator=(unsigned short from);
-  inline qv_f16_& operator=(int from);
-  inline qv_f16_& operator=(unsigned int from);
-  inline qv_f16_& operator=(float from);
-  inline qv_f16_& operator=(const qv_int16_space::qv_int16_& from);
-  inline qv_f16_& operator=(const qv_int16U_space::qv_int16U_& from);
-  inline qv_f16_& operator=(const rkfloat_space::rkfloat_& from);
-  inline qv_f16_& operator=(const qv_int32v_space::qv_int32v_& from);
-  inline qv_f16_& operator=(const qv_int32Uv_space::qv_int32Uv_& from);
-  inline operator qv_vecNxf16_space::qv_vecNxf16_() const;
-  inline operator qv_vecN_2xf16_space::qv_vecN_2xf16_() const;
-  inline operator qv_int16_space::qv_int16_() const;
-  inline operator qv_int16U_space::qv_int16U_() const;
-  inline operator rkfloat_space::rkfloat_() const;
-  inline operator qv_int32v_space::qv_int32v_() const;
-  inline operator qv_int32Uv_space::qv_int32Uv_() const;
+  qv_f16_() = default;  ///< uninitialised
+  explicit inline qv_f16_(const qv_vecNxf16_space::qv_vecNxf16_& from);  ///< lane 0 of the source
+  explicit inline qv_f16_(const qv_vecN_2xf16_space::qv_vecN_2xf16_& from);  ///< lane 0 of the source
+  inline qv_f16_(signed char from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_f16_(unsigned char from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_f16_(short from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_f16_(unsigned short from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_f16_(int from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_f16_(unsigned int from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_f16_(float from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  explicit inline qv_f16_(const qv_int16_space::qv_int16_& from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  explicit inline qv_f16_(const qv_int16U_space::qv_int16U_& from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  explicit inline qv_f16_(const rkfloat_space::rkfloat_& from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  explicit inline qv_f16_(const qv_int32v_space::qv_int32v_& from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  explicit inline qv_f16_(const qv_int32Uv_space::qv_int32Uv_& from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_f16_& operator=(const qv_vecNxf16_space::qv_vecNxf16_& from);  ///< lane 0 of the source
+  inline qv_f16_& operator=(const qv_vecN_2xf16_space::qv_vecN_2xf16_& from);  ///< lane 0 of the source
+  inline qv_f16_& operator=(signed char from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_f16_& operator=(unsigned char from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_f16_& operator=(short from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_f16_& operator=(unsigned short from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_f16_& operator=(int from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_f16_& operator=(unsigned int from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_f16_& operator=(float from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_f16_& operator=(const qv_int16_space::qv_int16_& from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_f16_& operator=(const qv_int16U_space::qv_int16U_& from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_f16_& operator=(const rkfloat_space::rkfloat_& from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_f16_& operator=(const qv_int32v_space::qv_int32v_& from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline qv_f16_& operator=(const qv_int32Uv_space::qv_int32Uv_& from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline operator qv_vecNxf16_space::qv_vecNxf16_() const;  ///< every lane = the source
+  inline operator qv_vecN_2xf16_space::qv_vecN_2xf16_() const;  ///< every lane = the source
+  inline operator qv_int16_space::qv_int16_() const;  ///< the source's value truncated toward zero and saturated to the target, with flags
+  inline operator qv_int16U_space::qv_int16U_() const;  ///< the source's value truncated toward zero and saturated to the target, with flags
+  inline operator rkfloat_space::rkfloat_() const;  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline operator qv_int32v_space::qv_int32v_() const;  ///< the source's value truncated toward zero and saturated to the target, with flags
+  inline operator qv_int32Uv_space::qv_int32Uv_() const;  ///< the source's value truncated toward zero and saturated to the target, with flags
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_f16_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_f16_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned short _[1];
 };
 }
 
-/// single-precision scalar: an IEEE binary32 bit pattern: 1 x 32 bits, floating point (4 bytes).
 namespace rkfloat_space {
+/// single-precision scalar: an IEEE binary32 bit pattern: 1 x 32 bits, floating point (4 bytes).
 class rkfloat_ {
  public:
-  rkfloat_() = default;
-  inline rkfloat_(float from);
-  explicit inline rkfloat_(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from);
-  explicit inline rkfloat_(const qv_vecNxf16_space::qv_vecNxf16_& from);
-  explicit inline rkfloat_(const qv_f16_space::qv_f16_& from);
-  inline rkfloat_& operator=(float from);
-  inline rkfloat_& operator=(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from);
-  inline rkfloat_& operator=(const qv_vecNxf16_space::qv_vecNxf16_& from);
-  inline rkfloat_& operator=(const qv_f16_space::qv_f16_& from);
-  inline operator qv_vecN_2xf32_space::qv_vecN_2xf32_() const;
-  inline operator qv_vecNxf16_space::qv_vecNxf16_() const;
-  inline operator qv_f16_space::qv_f16_() const;
+  rkfloat_() = default;  ///< uninitialised
+  inline rkfloat_(float from);  ///< the source
+  explicit inline rkfloat_(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from);  ///< lane 0 of the source
+  explicit inline rkfloat_(const qv_vecNxf16_space::qv_vecNxf16_& from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  explicit inline rkfloat_(const qv_f16_space::qv_f16_& from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline rkfloat_& operator=(float from);  ///< the source
+  inline rkfloat_& operator=(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from);  ///< lane 0 of the source
+  inline rkfloat_& operator=(const qv_vecNxf16_space::qv_vecNxf16_& from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline rkfloat_& operator=(const qv_f16_space::qv_f16_& from);  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline operator qv_vecN_2xf32_space::qv_vecN_2xf32_() const;  ///< every lane = the source
+  inline operator qv_vecNxf16_space::qv_vecNxf16_() const;  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  inline operator qv_f16_space::qv_f16_() const;  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
 
   unsigned int _[1];
 };
 }
 
-/// scalar of the vector unit, sign-extended into the word: 1 x 24 bits, signed (4 bytes).
 namespace qv_int24_space {
+/// scalar of the vector unit, sign-extended into the word: 1 x 24 bits, signed (4 bytes).
 class qv_int24_ {
  public:
-  qv_int24_() = default;
-  inline qv_int24_(short from);
-  inline qv_int24_(unsigned short from);
-  inline qv_int24_(int from);
-  inline qv_int24_(unsigned int from);
-  inline qv_int24_& operator=(short from);
-  inline qv_int24_& operator=(unsigned short from);
-  inline qv_int24_& operator=(int from);
-  inline qv_int24_& operator=(unsigned int from);
+  qv_int24_() = default;  ///< uninitialised
+  inline qv_int24_(short from);  ///< the source, sign-extended
+  inline qv_int24_(unsigned short from);  ///< the source, zero-extended
+  inline qv_int24_(int from);  ///< the source, its low 24 bits
+  inline qv_int24_(unsigned int from);  ///< the source, its low 24 bits
+  inline qv_int24_& operator=(short from);  ///< the source, sign-extended
+  inline qv_int24_& operator=(unsigned short from);  ///< the source, zero-extended
+  inline qv_int24_& operator=(int from);  ///< the source, its low 24 bits
+  inline qv_int24_& operator=(unsigned int from);  ///< the source, its low 24 bits
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int24_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int24_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[1];
 };
 }
 
-/// scalar of the vector unit: 1 x 32 bits, signed (4 bytes).
 namespace qv_int32v_space {
+/// scalar of the vector unit: 1 x 32 bits, signed (4 bytes).
 class qv_int32v_ {
  public:
-  qv_int32v_() = default;
-  inline qv_int32v_(int from);
-  inline qv_int32v_(unsigned int from);
-  explicit inline qv_int32v_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);
-  explicit inline qv_int32v_(const qv_int32Uv_space::qv_int32Uv_& from);
-  explicit inline qv_int32v_(const qv_f16_space::qv_f16_& from);
-  inline qv_int32v_& operator=(int from);
-  inline qv_int32v_& operator=(unsigned int from);
-  inline qv_int32v_& operator=(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);
-  inline qv_int32v_& operator=(const qv_int32Uv_space::qv_int32Uv_& from);
-  inline qv_int32v_& operator=(const qv_f16_space::qv_f16_& from);
-  inline operator qv_vecN_2x32v_space::qv_vecN_2x32v_() const;
-  inline operator qv_int32Uv_space::qv_int32Uv_() const;
-  inline operator qv_int32pr_space::qv_int32pr_() const;
-  inline operator qv_f16_space::qv_f16_() const;
+  qv_int32v_() = default;  ///< uninitialised
+  inline qv_int32v_(int from);  ///< the source
+  inline qv_int32v_(unsigned int from);  ///< the source
+  explicit inline qv_int32v_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);  ///< lane 0 of the source
+  explicit inline qv_int32v_(const qv_int32Uv_space::qv_int32Uv_& from);  ///< the source
+  explicit inline qv_int32v_(const qv_f16_space::qv_f16_& from);  ///< the source's value truncated toward zero and saturated to the target, with flags
+  inline qv_int32v_& operator=(int from);  ///< the source
+  inline qv_int32v_& operator=(unsigned int from);  ///< the source
+  inline qv_int32v_& operator=(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from);  ///< lane 0 of the source
+  inline qv_int32v_& operator=(const qv_int32Uv_space::qv_int32Uv_& from);  ///< the source
+  inline qv_int32v_& operator=(const qv_f16_space::qv_f16_& from);  ///< the source's value truncated toward zero and saturated to the target, with flags
+  inline operator qv_vecN_2x32v_space::qv_vecN_2x32v_() const;  ///< every lane = the source
+  inline operator qv_int32Uv_space::qv_int32Uv_() const;  ///< the source
+  inline operator qv_int32pr_space::qv_int32pr_() const;  ///< the source
+  inline operator qv_f16_space::qv_f16_() const;  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int32v_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int32v_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[1];
 };
 }
 
-/// scalar of the vector unit: 1 x 32 bits, unsigned (4 bytes).
 namespace qv_int32Uv_space {
+/// scalar of the vector unit: 1 x 32 bits, unsigned (4 bytes).
 class qv_int32Uv_ {
  public:
-  qv_int32Uv_() = default;
-  inline qv_int32Uv_(int from);
-  inline qv_int32Uv_(unsigned int from);
-  explicit inline qv_int32Uv_(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from);
-  explicit inline qv_int32Uv_(const qv_int32v_space::qv_int32v_& from);
-  explicit inline qv_int32Uv_(const qv_f16_space::qv_f16_& from);
-  inline qv_int32Uv_& operator=(int from);
-  inline qv_int32Uv_& operator=(unsigned int from);
-  inline qv_int32Uv_& operator=(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from);
-  inline qv_int32Uv_& operator=(const qv_int32v_space::qv_int32v_& from);
-  inline qv_int32Uv_& operator=(const qv_f16_space::qv_f16_& from);
-  inline operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_() const;
-  inline operator qv_int32v_space::qv_int32v_() const;
-  inline operator qv_int32pr_space::qv_int32pr_() const;
-  inline operator qv_f16_space::qv_f16_() const;
+  qv_int32Uv_() = default;  ///< uninitialised
+  inline qv_int32Uv_(int from);  ///< the source
+  inline qv_int32Uv_(unsigned int from);  ///< the source
+  explicit inline qv_int32Uv_(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from);  ///< lane 0 of the source
+  explicit inline qv_int32Uv_(const qv_int32v_space::qv_int32v_& from);  ///< the source
+  explicit inline qv_int32Uv_(const qv_f16_space::qv_f16_& from);  ///< the source's value truncated toward zero and saturated to the target, with flags
+  inline qv_int32Uv_& operator=(int from);  ///< the source
+  inline qv_int32Uv_& operator=(unsigned int from);  ///< the source
+  inline qv_int32Uv_& operator=(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from);  ///< lane 0 of the source
+  inline qv_int32Uv_& operator=(const qv_int32v_space::qv_int32v_& from);  ///< the source
+  inline qv_int32Uv_& operator=(const qv_f16_space::qv_f16_& from);  ///< the source's value truncated toward zero and saturated to the target, with flags
+  inline operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_() const;  ///< every lane = the source
+  inline operator qv_int32v_space::qv_int32v_() const;  ///< the source
+  inline operator qv_int32pr_space::qv_int32pr_() const;  ///< the source
+  inline operator qv_f16_space::qv_f16_() const;  ///< the source's value as a number of the target's format, rounded by RoundMode, with flags
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int32Uv_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int32Uv_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[1];
 };
 }
 
-/// 32-bit register of the scalar core as the vector unit sees it: 1 x 32 bits, unsigned (4 bytes).
 namespace qv_int32pr_space {
+/// 32-bit register of the scalar core as the vector unit sees it: 1 x 32 bits, unsigned (4 bytes).
 class qv_int32pr_ {
  public:
-  qv_int32pr_() = default;
-  inline qv_int32pr_(signed char from);
-  inline qv_int32pr_(unsigned char from);
-  inline qv_int32pr_(short from);
-  inline qv_int32pr_(unsigned short from);
-  inline qv_int32pr_(int from);
-  inline qv_int32pr_(unsigned int from);
-  explicit inline qv_int32pr_(const qv_int8_space::qv_int8_& from);
-  explicit inline qv_int32pr_(const qv_int8U_space::qv_int8U_& from);
-  explicit inline qv_int32pr_(const qv_int16_space::qv_int16_& from);
-  explicit inline qv_int32pr_(const qv_int16U_space::qv_int16U_& from);
-  explicit inline qv_int32pr_(const qv_int32v_space::qv_int32v_& from);
-  explicit inline qv_int32pr_(const qv_int32Uv_space::qv_int32Uv_& from);
-  inline qv_int32pr_& operator=(signed char from);
-  inline qv_int32pr_& operator=(unsigned char from);
-  inline qv_int32pr_& operator=(short from);
-  inline qv_int32pr_& operator=(unsigned short from);
-  inline qv_int32pr_& operator=(int from);
-  inline qv_int32pr_& operator=(unsigned int from);
-  inline qv_int32pr_& operator=(const qv_int8_space::qv_int8_& from);
-  inline qv_int32pr_& operator=(const qv_int8U_space::qv_int8U_& from);
-  inline qv_int32pr_& operator=(const qv_int16_space::qv_int16_& from);
-  inline qv_int32pr_& operator=(const qv_int16U_space::qv_int16U_& from);
-  inline qv_int32pr_& operator=(const qv_int32v_space::qv_int32v_& from);
-  inline qv_int32pr_& operator=(const qv_int32Uv_space::qv_int32Uv_& from);
+  qv_int32pr_() = default;  ///< uninitialised
+  inline qv_int32pr_(signed char from);  ///< the source, sign-extended
+  inline qv_int32pr_(unsigned char from);  ///< the source, zero-extended
+  inline qv_int32pr_(short from);  ///< the source, sign-extended
+  inline qv_int32pr_(unsigned short from);  ///< the source, zero-extended
+  inline qv_int32pr_(int from);  ///< the source
+  inline qv_int32pr_(unsigned int from);  ///< the source
+  explicit inline qv_int32pr_(const qv_int8_space::qv_int8_& from);  ///< the source, sign-extended
+  explicit inline qv_int32pr_(const qv_int8U_space::qv_int8U_& from);  ///< the source, zero-extended
+  explicit inline qv_int32pr_(const qv_int16_space::qv_int16_& from);  ///< the source, sign-extended
+  explicit inline qv_int32pr_(const qv_int16U_space::qv_int16U_& from);  ///< the source, zero-extended
+  explicit inline qv_int32pr_(const qv_int32v_space::qv_int32v_& from);  ///< the source
+  explicit inline qv_int32pr_(const qv_int32Uv_space::qv_int32Uv_& from);  ///< the source
+  inline qv_int32pr_& operator=(signed char from);  ///< the source, sign-extended
+  inline qv_int32pr_& operator=(unsigned char from);  ///< the source, zero-extended
+  inline qv_int32pr_& operator=(short from);  ///< the source, sign-extended
+  inline qv_int32pr_& operator=(unsigned short from);  ///< the source, zero-extended
+  inline qv_int32pr_& operator=(int from);  ///< the source
+  inline qv_int32pr_& operator=(unsigned int from);  ///< the source
+  inline qv_int32pr_& operator=(const qv_int8_space::qv_int8_& from);  ///< the source, sign-extended
+  inline qv_int32pr_& operator=(const qv_int8U_space::qv_int8U_& from);  ///< the source, zero-extended
+  inline qv_int32pr_& operator=(const qv_int16_space::qv_int16_& from);  ///< the source, sign-extended
+  inline qv_int32pr_& operator=(const qv_int16U_space::qv_int16U_& from);  ///< the source, zero-extended
+  inline qv_int32pr_& operator=(const qv_int32v_space::qv_int32v_& from);  ///< the source
+  inline qv_int32pr_& operator=(const qv_int32Uv_space::qv_int32Uv_& from);  ///< the source
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int32pr_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int32pr_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[1];
 };
 }
 
-/// scalar of the vector unit, sign-extended to 64 bits, low word first: 1 x 48 bits, signed (8 bytes).
 namespace qv_int48_space {
+/// scalar of the vector unit, sign-extended to 64 bits, low word first: 1 x 48 bits, signed (8 bytes).
 class qv_int48_ {
  public:
-  qv_int48_() = default;
-  inline qv_int48_(int from);
-  inline qv_int48_(unsigned int from);
-  inline qv_int48_(long long from);
-  inline qv_int48_& operator=(int from);
-  inline qv_int48_& operator=(unsigned int from);
-  inline qv_int48_& operator=(long long from);
-  inline operator qv_int16U_space::qv_int16U_() const;
+  qv_int48_() = default;  ///< uninitialised
+  inline qv_int48_(int from);  ///< the source, sign-extended
+  inline qv_int48_(unsigned int from);  ///< the source, zero-extended
+  inline qv_int48_(long long from);  ///< the source, its low 48 bits
+  inline qv_int48_& operator=(int from);  ///< the source, sign-extended
+  inline qv_int48_& operator=(unsigned int from);  ///< the source, zero-extended
+  inline qv_int48_& operator=(long long from);  ///< the source, its low 48 bits
+  inline operator qv_int16U_space::qv_int16U_() const;  ///< the source, its low 16 bits
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int48_(Other) = delete;  // cast a wider number, or one with a fraction, to one of the types above
+  template <class Other, class = typename kastarri::not_taken<Other>::type>
+  qv_int48_& operator=(Other) = delete;  // cast it; and what returns void changes its first operand itself
 
   unsigned int _[2];
 };
 }
 
-/// scalar of the vector unit, low word first: 1 x 64 bits, signed (8 bytes).
 namespace qv_int64_space {
+/// scalar of the vector unit, low word first: 1 x 64 bits, signed (8 bytes).
 class qv_int64_ {
  public:
-  qv_int64_() = default;
-  inline qv_int64_(long long from);
-  explicit inline qv_int64_(const qv_vecN_4x64_space::qv_vecN_4x64_& from);
-  inline qv_int64_& operator=(long long from);
-  inline qv_int64_& operator=(const qv_vecN_4x64_space::qv_vecN_4x64_& from);
-  inline operator qv_vecN_4x64_space::qv_vecN_4x64_() const;
+  qv_int64_() = default;  ///< uninitialised
+  inline qv_int64_(long long from);  ///< the source
+  explicit inline qv_int64_(const qv_vecN_4x64_space::qv_vecN_4x64_& from);  ///< lane 0 of the source
+  inline qv_int64_& operator=(long long from);  ///< the source
+  inline qv_int64_& operator=(const qv_vecN_4x64_space::qv_vecN_4x64_& from);  ///< lane 0 of the source
+  inline operator qv_vecN_4x64_space::qv_vecN_4x64_() const;  ///< every lane = the source
 
   unsigned int _[2];
 };
 }
 
-/// pair of 32-bit registers of the scalar core, low word first: 1 x 64 bits, signed (8 bytes).
 namespace qv_int64pr_space {
+/// pair of 32-bit registers of the scalar core, low word first: 1 x 64 bits, signed (8 bytes).
 class qv_int64pr_ {
  public:
-  qv_int64pr_() = default;
+  qv_int64pr_() = default;  ///< uninitialised
 
   unsigned int _[2];
 };
 }
 
-/// scalar form of a 64-bit accumulator lane, low word first: 1 x 64 bits, signed (8 bytes).
 namespace qv_int64w_space {
+/// scalar form of a 64-bit accumulator lane, low word first: 1 x 64 bits, signed (8 bytes).
 class qv_int64w_ {
  public:
-  qv_int64w_() = default;
+  qv_int64w_() = default;  ///< uninitialised
 
   unsigned int _[2];
 };
 }
 
-/// scalar form of a 128-bit lane, low word first: 1 x 128 bits (16 bytes).
 namespace qv_int128_space {
+/// scalar form of a 128-bit lane, low word first: 1 x 128 bits (16 bytes).
 class qv_int128_ {
  public:
-  qv_int128_() = default;
-  explicit inline qv_int128_(const qv_vecN_8x128_space::qv_vecN_8x128_& from);
-  inline qv_int128_& operator=(const qv_vecN_8x128_space::qv_vecN_8x128_& from);
+  qv_int128_() = default;  ///< uninitialised
+  explicit inline qv_int128_(const qv_vecN_8x128_space::qv_vecN_8x128_& from);  ///< lane 0 of the source
+  inline qv_int128_& operator=(const qv_vecN_8x128_space::qv_vecN_8x128_& from);  ///< lane 0 of the source
 
   unsigned int _[4];
 };
 }
 
-/// scalar form of a 256-bit lane, low word first: 1 x 256 bits (32 bytes).
 namespace qv_int256_space {
+/// scalar form of a 256-bit lane, low word first: 1 x 256 bits (32 bytes).
 class qv_int256_ {
  public:
-  qv_int256_() = default;
-  explicit inline qv_int256_(const qv_vecN_16x256_space::qv_vecN_16x256_& from);
-  inline qv_int256_& operator=(const qv_vecN_16x256_space::qv_vecN_16x256_& from);
+  qv_int256_() = default;  ///< uninitialised
+  explicit inline qv_int256_(const qv_vecN_16x256_space::qv_vecN_16x256_& from);  ///< lane 0 of the source
+  inline qv_int256_& operator=(const qv_vecN_16x256_space::qv_vecN_16x256_& from);  ///< lane 0 of the source
 
   unsigned int _[8];
 };

@@ -16,6 +16,7 @@ import unittest
 ROOT = os.path.dirname(os.path.dirname(os.path.dirname(os.path.abspath(__file__))))
 sys.path.insert(0, os.path.join(ROOT, "tools"))
 import generate_headers  # noqa: E402
+import rules  # noqa: E402
 
 COMPILERS = ["g++", "clang++"]
 USER_FLAGS = ["-std=c++11", "-Wall", "-Wextra", "-Wpedantic", "-Wconversion", "-Wshadow", "-Werror",
@@ -61,9 +62,23 @@ def declared():
     """The names that the public headers declare as exported."""
     names = set()
     for path in glob.glob(os.path.join(ROOT, "include", "kastarri", "*.h")):
-        for declaration in re.findall(r"^(?:extern |\[\[noreturn\]\] )*KASTARRI_API ([^;]*);", read(path), re.M):
+        for declaration in re.findall(r"^(?:extern )?KASTARRI_(?:API|RESULT) ([^;]*);", read(path), re.M):
             names.add(re.findall(r"\bcstub_\w+(?=\(|\[|$)", declaration)[0])
     return names
+
+
+def all_rows():
+    return [row for _, _, rows in generate_headers.all_rows().values() for row in rows]
+
+
+def run_program(program, compiler="g++", level="-O0"):
+    """What a program prints, to either stream, and its exit status."""
+    with tempfile.TemporaryDirectory() as directory:
+        binary = os.path.join(directory, "kernel")
+        subprocess.run([compiler, *USER_FLAGS, level, "-x", "c++", "-", "-x", "none", LIBRARY, "-o", binary,
+                        "-Wl,-rpath," + os.path.dirname(LIBRARY)], input=program, text=True, check=True)
+        run = subprocess.run([binary], stdout=subprocess.PIPE, stderr=subprocess.STDOUT, text=True, check=False)
+        return run.stdout, run.returncode
 
 
 class Library(unittest.TestCase):
@@ -71,7 +86,7 @@ class Library(unittest.TestCase):
         names = exported()
         self.assertEqual(len(names), len(set(names)), "an intrinsic is exported once")
         self.assertEqual([n for n in names if not n.startswith("cstub_")], [])
-        rows = {generate_headers.symbol(row.name) for _, _, family in generate_headers.all_rows().values() for row in family}
+        rows = {generate_headers.symbol(row.name) for row in all_rows()}
         self.assertEqual(rows - set(names), set(), "rows that are not exported")
         self.assertEqual(set(names) - declared(), set(), "exported but in no public header")
         self.assertEqual(declared() - set(names), set(), "in a public header but not exported")
@@ -108,17 +123,30 @@ class Headers(unittest.TestCase):
         self.assertEqual(stale, [], "run `make headers`")
 
     def test_rules_tell_what_becomes_of_lanes_under_a_predicate(self):
-        predicated = [row for _, _, rows in generate_headers.all_rows().values() for row in rows if "_T" in row.shape]
+        predicated = [row for row in all_rows() if "_T" in row.shape]
         self.assertGreater(len(predicated), 250)
-        silent = [row.name for row in predicated if "predicate bit" not in generate_headers.rule_text([row])]
-        self.assertEqual(silent, [])
+        types = generate_headers.read_types()
+        self.assertEqual([row.name for row in predicated if "predicate bit" not in rules.own(row, types)], [])
+
+    def test_every_declaration_has_its_documentation(self):
+        for path in self.headers():
+            lines = read(path).splitlines()
+            for above, line in zip(lines, lines[1:]):
+                with self.subTest(path=path, line=line):
+                    if re.match(r"(extern )?KASTARRI_(API|RESULT)\b|typedef.*\bcstub_|using.*_space::", line):
+                        self.assertRegex(above, "^//")
+                    if re.match(r"  (explicit )?inline.*;", line):
+                        self.assertRegex(line, "; +///< ")
+
+    def headers(self):
+        return sorted(glob.glob(os.path.join(ROOT, "include", "**", "*.h"), recursive=True))
 
     def test_each_header_compiles_alone(self):
-        headers = sorted(glob.glob(os.path.join(ROOT, "include", "kastarri", "*.h")))
         for compiler in COMPILERS:
-            for header in [os.path.join(ROOT, "include", "kastarri.h")] + headers:
+            for header in self.headers():
                 with self.subTest(compiler=compiler, header=os.path.basename(header)):
-                    self.compile(compiler, "-x", "c++", "-", text=f'#include "{header}"\n')
+                    for level in ("-O0", "-O2"):
+                        self.compile(compiler, level, "-x", "c++", "-", text=f'#include "{header}"\n')
 
     def test_every_conversion_compiles_in_every_form(self):
         for compiler in COMPILERS:
@@ -136,36 +164,40 @@ class Headers(unittest.TestCase):
         self.assertGreater(len(words), 100000)
         self.assertEqual(set(words) & self.short_names(), set())
 
-    def test_no_short_name_is_left_when_they_are_taken_back(self):
-        left = self.preprocessed("-dM", text='#include "kastarri/names.h"\n#include "kastarri/names_undo.h"\n')
-        self.assertGreater(len(self.short_names()), 2500)
-        self.assertEqual(set(re.findall(r"^#define (\w+)", left, re.M)) & self.short_names(), set())
-
     def preprocessed(self, *arguments, text):
         return subprocess.run(["g++", *USER_FLAGS, "-w", *arguments, "-E", "-x", "c++", "-"], input=text, capture_output=True,
                               text=True, check=True).stdout
 
     def short_names(self):
-        defined = self.preprocessed("-dM", text='#include "kastarri/names.h"\n')
-        return set(re.findall(r"^#define (\w+) cstub_", defined, re.M))
+        return {generate_headers.short_name(row.name) for row in all_rows()} | set(generate_headers.read_types())
 
-    def test_short_names_come_and_go(self):
+
+class ShortNames(unittest.TestCase):
+    def test_each_is_the_function_of_its_full_name(self):
+        pairs = [(generate_headers.short_name(row.name), generate_headers.symbol(row.name)) for row in all_rows()]
+        program = '#include <cstring>\n#include "kastarri/names.h"\ntemplate <class T> struct same { static void as(T, T) {} };\n'
+        program += "void types() {\n" + "".join(f"same<decltype(&{a})>::as(&{a}, &{b});\n" for a, b in pairs) + "}\n"
+        for table, names in zip(("short_names", "full_names"), zip(*pairs)):
+            program += f"void* {table}[] = {{" + ", ".join(f"reinterpret_cast<void*>(&{name})" for name in names) + "};\n"
+        program += "int main() { return std::memcmp(short_names, full_names, sizeof short_names) != 0; }\n"
+        self.assertGreater(len(pairs), 2500)
+        for compiler, level in (("g++", "-O0"), ("g++", "-O2"), ("clang++", "-O2")):
+            with self.subTest(compiler=compiler, level=level):
+                self.assertEqual(run_program(program, compiler, level), ("", 0))
+
+    def test_a_name_of_the_program_stands_beside_one_of_the_core(self):
         program = """
-            #include <algorithm>
+            #define valign valign_of_the_core
             #include "kastarri/names.h"
-            #include <cmath>
-            #include <vector>
-            #include <sys/param.h>
-            qv_vecNx16 twice(const qv_vecNx16& v) { return ZRA_ADDNX16(v, v); }
-            #include "kastarri/names_undo.h"
-            struct qv_vecNx16 { int ZRA_ADDNX16; };
-            int mine(const qv_vecNx16& v) { return v.ZRA_ADDNX16; }
-            #include "kastarri/names.h"
-            qv_vecNx16 again(const qv_vecNx16& v) { return ZRA_ADDNX16(v, v); }
+            #undef valign
+            struct valign { int left; };
+            namespace mine { struct qv_vecNx16 { int ZRA_ADDNX16; }; int take(qv_vecNx16 v) { return v.ZRA_ADDNX16; } }
+            valign_of_the_core of_the_core;
+            int main() { return valign{mine::take(mine::qv_vecNx16{0})}.left; }
         """
         for compiler in COMPILERS:
             with self.subTest(compiler=compiler):
-                self.compile(compiler, "-x", "c++", "-", text=program)
+                self.assertEqual(run_program(program, compiler), ("", 0))
 
 
 class Constants(unittest.TestCase):
@@ -191,15 +223,6 @@ class Documents(unittest.TestCase):
         check = subprocess.run([sys.executable, os.path.join(ROOT, "tools", "coverage.py"), "--check"], check=False)
         self.assertEqual(check.returncode, 0, "run `make headers`")
 
-    def run_program(self, program):
-        """What a program prints, to either stream, and its exit status."""
-        with tempfile.TemporaryDirectory() as directory:
-            binary = os.path.join(directory, "kernel")
-            subprocess.run(["g++", *USER_FLAGS, "-x", "c++", "-", "-x", "none", LIBRARY, "-o", binary,
-                            "-Wl,-rpath," + os.path.dirname(LIBRARY)], input=program, text=True, check=True)
-            run = subprocess.run([binary], stdout=subprocess.PIPE, stderr=subprocess.STDOUT, text=True, check=False)
-            return run.stdout, run.returncode
-
     def test_times_of_the_readme_are_those_that_were_measured(self):
         section = re.search(r"^## How fast$(.*?)^## ", read("README.md"), re.M | re.S)[1]
         measured = re.findall(r"^\|.*", section, re.M)
@@ -210,7 +233,7 @@ class Documents(unittest.TestCase):
         readme = read("README.md")
         program = re.search(r"```cpp\n(.*?)```", readme, re.S)[1]
         printed = re.search(r"It prints `(.*?)`", readme)[1]
-        self.assertEqual(self.run_program(program), (printed + "\n", 0))
+        self.assertEqual(run_program(program), (printed + "\n", 0))
 
     def test_every_line_that_compiles_a_kernel_has_the_flags_of_a_fast_one(self):
         pages = [os.path.join(ROOT, "README.md"), *glob.glob(os.path.join(ROOT, "docs", "*.md"))]
@@ -228,7 +251,7 @@ class Documents(unittest.TestCase):
             with self.subTest(program=program):
                 if "int main()" in program:
                     status = 1 if printed.startswith("Error: ") else 0
-                    self.assertEqual(self.run_program(program), (printed, status))
+                    self.assertEqual(run_program(program), (printed, status))
                 else:
                     subprocess.run(["g++", *USER_FLAGS, "-fsyntax-only", "-x", "c++", "-"], input=program, text=True, check=True)
 

@@ -14,7 +14,7 @@ import unittest
 sys.path.insert(0, os.path.dirname(os.path.abspath(__file__)))
 import rows as tables  # noqa: E402
 from grammar import expected_of, operation_of  # noqa: E402
-from rows import generate_headers  # noqa: E402
+from rows import read_tables  # noqa: E402
 from vocabulary import Unknown  # noqa: E402
 
 
@@ -49,7 +49,7 @@ def check(paths, root=tables.ROOT, twins=None):
 
 
 def all_tables():
-    return [table for family in generate_headers.tables_by_family().values() for table in family]
+    return [table for family in read_tables.tables_by_family().values() for table in family]
 
 
 class Names(unittest.TestCase):

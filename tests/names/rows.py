@@ -7,7 +7,7 @@ import sys
 
 ROOT = os.path.dirname(os.path.dirname(os.path.dirname(os.path.abspath(__file__))))
 sys.path.insert(0, os.path.join(ROOT, "tools"))
-import generate_headers  # noqa: E402
+import read_tables  # noqa: E402
 
 Row = collections.namedtuple("Row", "name prototype shape kernel")
 Table = collections.namedtuple("Table", "path rows kernels")
@@ -44,15 +44,15 @@ def columns(text):
 
 def read(paths, root=ROOT):
     """The tables at `paths`, which are relative to src/ below `root`."""
-    generate_headers.ROOT = root
-    text = generate_headers.READER + (
+    read_tables.ROOT = root
+    text = read_tables.READER + (
         "#define KERNEL(OP, ...) @kernel{OP@,__VA_ARGS__}@\n"
         "#define ENTRY(SYMBOL, SHAPE, ...) @row{SYMBOL@,SHAPE@,SIG_##SHAPE(SYMBOL, __VA_ARGS__)@,__VA_ARGS__}@\n"
         "#define HELPER ENTRY\n"
         '#include "frame/rows.h"\n')
     text += "".join(f'@table{{{path}}}@\n#include "{path}"\n' for path in paths)
     tables = []
-    for kind, fields in generate_headers.records(text):
+    for kind, fields in read_tables.records(text):
         if kind == "table":
             tables.append(Table(fields[0], [], {}))
         elif kind == "kernel":

@@ -175,8 +175,7 @@ class Header(unittest.TestCase):
               kastarri::print(stderr, x, form::decimal);
             }
         """
-        for compiler, headers in (("g++", ["print", "names"]), ("g++", ["names", "print"]),
-                                  ("clang++", ["names", "print", "names_undo", "names"])):
+        for compiler, headers in (("g++", ["print", "names"]), ("g++", ["names", "print"]), ("clang++", ["print", "names"])):
             with self.subTest(compiler=compiler, headers=headers):
                 result = subprocess.run([compiler, *FLAGS, "-fno-exceptions", "-fsyntax-only", "-x", "c++", "-"],
                                         input="".join(f'#include "kastarri/{h}.h"\n' for h in headers) + body,

@@ -166,7 +166,8 @@ class Page(unittest.TestCase):
 
     def test_an_entry_says_what_its_row_says(self):
         self.open("#LSNX16_IP")
-        for text in ("void ZRA_LSNX16_IP(qv_int16& r, const short** pointer, int increment);", "1 x 16 bits, signed",
+        for text in ("Cycles a call costs, operands in memory, measured on: ", "kastarri/names/memory.h",
+                     "void ZRA_LSNX16_IP(qv_int16& r, const short** pointer, int increment);", "1 x 16 bits, signed",
                      "The address of the destination r is tested", "Post-increment element loads test the address",
                      "src/memory/elements.def", "a choice of this library"):
             self.assertIn(text, self.entry())

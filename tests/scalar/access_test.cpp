@@ -131,9 +131,9 @@ TEST_F(AccessDeathTest, StoresNeedTheirAlignment) {
 }
 
 TEST_F(AccessDeathTest, ReportsTheAddressItIsGiven) {
-  expect_failure("low", 0x1002, [] { CORE(L32I)(reinterpret_cast<const int*>(0x1000), 2); });
+  expect_failure("low", 0x1002, [] { (void)CORE(L32I)(reinterpret_cast<const int*>(0x1000), 2); });
   expect_failure("high", 0xFFFFFFFF, [] { cstub_vaddr_not_aligned(0xFFFFFFFF); });
-  expect_failure("whole", UINTPTR_MAX - 1, [] { CORE(L32I)(reinterpret_cast<const int*>(UINTPTR_MAX), -1); });
+  expect_failure("whole", UINTPTR_MAX - 1, [] { (void)CORE(L32I)(reinterpret_cast<const int*>(UINTPTR_MAX), -1); });
 }
 
 }  // namespace

@@ -12,17 +12,17 @@ import sys
 
 ROOT = os.path.dirname(os.path.dirname(os.path.dirname(os.path.abspath(__file__))))
 sys.path[:0] = [os.path.join(ROOT, "tools"), os.path.join(ROOT, "tests", "names")]
-import generate_headers  # noqa: E402
+import read_tables  # noqa: E402
 import names_test  # noqa: E402
 
 
 def preprocess(text):
     """What the preprocessor makes of a text, errors and all: a fault may leave macros with the wrong arguments."""
-    return subprocess.run(["g++", "-E", "-P", "-x", "c++", "-I", os.path.join(generate_headers.ROOT, "src"), "-"],
+    return subprocess.run(["g++", "-E", "-P", "-x", "c++", "-I", os.path.join(read_tables.ROOT, "src"), "-"],
                           input=text, capture_output=True, text=True, check=False).stdout
 
 
-generate_headers.preprocess = preprocess
+read_tables.preprocess = preprocess
 
 
 class Tree:
@@ -65,10 +65,10 @@ class Tree:
 
     def records(self):
         """All that the tables say, in order: rows with their prototypes, semantic functions and marks."""
-        generate_headers.ROOT = self.directory
-        tables = generate_headers.tables_by_family().values()
-        return generate_headers.records(
-            generate_headers.READER + '#define DOC(...)\n'
+        read_tables.ROOT = self.directory
+        tables = read_tables.tables_by_family().values()
+        return read_tables.records(
+            read_tables.READER + '#define DOC(...)\n'
             '#define ENTRY(SYMBOL, SHAPE, ...) @row{SYMBOL@,SIG_##SHAPE(SYMBOL, __VA_ARGS__)@,__VA_ARGS__}@\n#define HELPER ENTRY\n'
             '#define KERNEL(OP, ...) @kernel{OP}@\n#include "frame/rows.h"\n'
             + "".join(f'#include "{table}"\n' for family in tables for table in family))
@@ -95,13 +95,13 @@ class Tree:
 
     def types(self):
         """Register type -> what the headers say of it, but for its conversions, which stand in other lines."""
-        generate_headers.ROOT = self.directory
-        return {name: (t.cls, t.unit, t.units, t.lanes, t.shape) for name, t in generate_headers.read_types().items()}
+        read_tables.ROOT = self.directory
+        return {name: (t.cls, t.unit, t.units, t.lanes, t.shape) for name, t in read_tables.read_types().items()}
 
     def conversions(self):
         """What the headers say of the conversions of all register types."""
-        generate_headers.ROOT = self.directory
-        return {"all": [(t.sources, t.targets) for t in generate_headers.read_types().values()]}
+        read_tables.ROOT = self.directory
+        return {"all": [(t.sources, t.targets) for t in read_tables.read_types().values()]}
 
 
 def by_path(mutants):

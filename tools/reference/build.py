@@ -3,10 +3,11 @@
 
     tools/reference/build.py EXAMPLES OUTPUT [--version VERSION]
 
-EXAMPLES is what kastarri_examples prints. All else comes from the tables of rows and from docs/choices.md.
+EXAMPLES is what kastarri_examples prints. All else comes from the tables of rows, docs/choices.md and bench/costs.csv.
 """
 
 import argparse
+import csv
 import json
 import os
 import re
@@ -74,7 +75,15 @@ def example_data(example, initial, entry, text):
                                  for table in (given, got)]
 
 
-def entry_data(entry, examples, text):
+def read_costs():
+    """What they are and where they were measured, the targets, and their cycles by intrinsic."""
+    with open(os.path.join(os.path.dirname(os.path.dirname(HERE)), "bench", "costs.csv"), encoding="utf-8") as file:
+        about = file.readline().strip("# \n")
+        (_, *targets), *rows = csv.reader(file)
+    return about, targets, {name: cycles for name, *cycles in rows}
+
+
+def entry_data(entry, examples, cycles, text):
     """An entry as the page reads it (page.js names the columns); $ stands for the prefix of all names."""
     row = entry.row
     prototype = row.prototype.replace(generate_headers.PREFIX, "$")
@@ -85,7 +94,8 @@ def entry_data(entry, examples, text):
             text(row.table), text(entry.rule), [text(t) for t in entry.context], prototype, operands, entry.lane_bits,
             entry.register_bits, int(entry.predicated), entry.facts, text(entry.alignment),
             entry.choices, example_data(examples["examples"][row.name], examples["initial"], entry, text),
-            [text(w) for w in words.words_of(entry)], round(100 * words.plainness(entry)), [text(t) for t in [stem, *axes]]]
+            [text(w) for w in words.words_of(entry)], round(100 * words.plainness(entry)), [text(t) for t in [stem, *axes]],
+            " ".join(cycles.get(entry.short, []))]
 
 
 def topic_data(topic):
@@ -96,11 +106,12 @@ def page_data(examples, version):
     text = Texts()
     all_choices = choices.read_choices()
     found = entries.read_entries(all_choices)
-    rows = [entry_data(entry, examples, text) for entry in found]
+    about_cycles, targets, cycles = read_costs()
+    rows = [entry_data(entry, examples, cycles, text) for entry in found]
     tables = {text(table): generate_headers.about_table(table) for table in dict.fromkeys(entry.row.table for entry in found)}
     return {"version": version, "prefix": generate_headers.PREFIX, "families": list(generate_headers.FAMILIES.items()),
             "choices": [choice.text for choice in all_choices], "topics": [topic_data(topic) for topic in not_built.TOPICS],
-            "tables": tables,
+            "tables": tables, "cycles": about_cycles, "targets": targets,
             "types": {name: [type.shape, type.units * type.unit_bits // 8, type.meaning]
                       for name, type in generate_headers.read_types().items()},
             "texts": text.all(), "entries": rows}

@@ -98,9 +98,8 @@ class Sentences:
 
     def context(self, text):
         """The rules without which this one cannot be read: that before it, or those of the operations it names."""
-        if re.match(r"the same\b", text) or "as above" in text:
-            before = self.texts[self.texts.index(text) - 1]
-            return self.context(before) + [before] if "the same" in before[:8] else [before]
+        if "as above" in text:
+            return [self.texts[self.texts.index(text) - 1]]
         named = re.search(r"\bas ([A-Z]\w+)(?: and ([A-Z]\w+))?", text)
         found = [row.doc for name in (named.groups() if named else ()) if name for row in self.rows
                  if re.match(rf"(\w+fp_|RK_)?{name}(?![A-Z])|{name}N", operation(row.name))]

@@ -92,6 +92,14 @@ function twins(entry) {
   return section('Twins', element('table', {class: 'twins'}, element('tbody', null, lines)));
 }
 
+function cost(entry) {
+  if (!entry.cycles) return [];
+  const row = (tag, texts) => element('tr', null, texts.map((text) => element(tag, tag === 'th' ? {scope: 'col'} : null, text)));
+  return section('Cost', element('table', {class: 'cost'}, element('thead', null, row('th', data.targets)),
+    element('tbody', null, row('td', entry.cycles.split(' ')))),
+  element('p', {class: 'aside'}, sentence(data.cycles[0].toUpperCase() + data.cycles.slice(1))));
+}
+
 function laneRow(kind, [name, values], columns, before) {
   const [label, first] = name.split('@');
   const title = label + (first ? `, lanes ${first} …` : kind === 'out' && before ? ' after' : '');
@@ -144,11 +152,11 @@ function show(entry) {
     rule(entry), callSection(entry), example(entry), operandTable(entry),
     entry.alignment ? section('Alignment', element('p', null, entry.alignment)) : [],
     choices.length ? section('Choices of this library', choices) : [],
-    twins(entry),
+    cost(entry), twins(entry),
     section('Full name', element('pre', null, entry.prototype + ';')),
     section('Where it stands', element('p', null, 'Row and rule: ', element('code', null, `src/${textOf(entry.table)}`),
-      '. Declared in ', element('code', null, `kastarri/${family}.h`), '; short name: ', element('code', null, entry.short),
-      ` (kastarri/names.h).`), element('p', {class: 'aside'}, data.tables[entry.table])),
+      '. Declared in ', element('code', null, `kastarri/${family}.h`), '; as ', element('code', null, entry.short), ' in ',
+      element('code', null, `kastarri/names/${family}.h`), '.'), element('p', {class: 'aside'}, data.tables[entry.table])),
   ].flat());
 }
 

@@ -9,7 +9,7 @@ function groups(list, size) {
 
 function entryOf(row) {
   const [short, symbol, family, table, rule, context, prototype, operands, lanes, register, predicated, facts,
-    alignment, choices, example, [operation, attributes], plainness, [stem, ...axes]] = row;
+    alignment, choices, example, [operation, attributes], plainness, [stem, ...axes], cycles] = row;
   const id = short.replace(/^ZRA_/, '');
   const types = groups(operands, 4).map(([name, type, role, shape]) => ({
     name: textOf(name), type: textOf(type), role: textOf(role), shape: textOf(shape),
@@ -28,7 +28,7 @@ function entryOf(row) {
       operation: textOf(operation), attributes: [textOf(attributes), ...typeNames].join(' '),
       rule: [textOf(rule), ...context.map(textOf), data.families[family][1]].join(' '),
     },
-    plainness: plainness / 100, stem: textOf(stem), axes: axes.map(textOf),
+    plainness: plainness / 100, stem: textOf(stem), axes: axes.map(textOf), cycles,
   };
 }
 

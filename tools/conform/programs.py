@@ -276,17 +276,22 @@ class Program:
         return "\n".join(parts)
 
 
+def reason(data):
+    """Why an intrinsic is left out; nothing if it is not."""
+    return LEFT_OUT.get(data["name"]) or LEFT_OUT.get(data["table"])
+
+
 def is_left_out(data):
-    return data["name"] in LEFT_OUT or data["table"] in LEFT_OUT
+    return reason(data) is not None
 
 
 def programs(library, names, most):
-    """The programs for these intrinsics (all: None): families apart, each in parts with at most so many bytes of calls. What passes the
+    """The programs for these intrinsics: families apart, each in parts with at most so many bytes of calls. What passes the
     PC's floats by value is apart, too."""
     core = registers.Registers(library["types"])
     groups = collections.defaultdict(list)
     for data in library["intrinsics"]:
-        if (names is None or data["name"] in names) and not is_left_out(data):
+        if data["name"] in names and not is_left_out(data):
             intrinsic = Intrinsic(data, core)
             groups[data["family"] + "_host" * intrinsic.is_quiet].append(intrinsic)
     for group, intrinsics in groups.items():

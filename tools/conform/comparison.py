@@ -4,12 +4,13 @@ import collections
 import csv
 import os
 import re
+import textwrap
 from xml.sax.saxutils import escape
 
 import registers
 
 RESULT = re.compile(r"(\w+(?:/spill)?) (\d+) ([0-9a-f]{16})")
-VALUE = re.compile(r"(\w+(?:/spill)?) (\d+) (\w+)((?: [0-9a-f]+)+)")
+VALUE = re.compile(r"(\w+(?:/spill)?) (\d+) (=?\w+)((?: [0-9a-f]+)+)")
 
 Result = collections.namedtuple("Result", "cases hash")
 Value = collections.namedtuple("Value", "name case operand lanes")
@@ -107,8 +108,9 @@ class Comparison:
             print("\nPrograms fill and read registers with these, so settle them first: " + ", ".join(self.foundations()), file=out)
         suspects, rest = self.suspects()
         for number, (choice, names, whole) in enumerate(suspects):
-            head = "\nThis speaks first against the choice" if number == 0 else "\nthen against"
-            print(f"{head}: {choice['text']}\n  ({self.families[choice['family']]}; {len(names)} of the {whole} that it touches)", file=out)
+            head = "This speaks first against the choice" if number == 0 else "then against"
+            print("", textwrap.fill(f"{head}: {choice['text']}", 112, break_on_hyphens=False),
+                  f"  ({self.families[choice['family']]}; {len(names)} of the {whole} that it touches)", sep="\n", file=out)
             write_names(out, names)
         if rest:
             print("\nNo choice: these should be as the core has them", file=out)
@@ -129,7 +131,7 @@ class Comparison:
     # --- The picture ---
 
     def write_svg(self, file):
-        width, left, right, step, top = 900, 330, 820, 34, 96
+        width, left, right, step, top = 900, 350, 720, 34, 106
         counts = collections.defaultdict(collections.Counter)
         for row in self.rows:
             counts[row.family][row.state if row.state in COLOURS else OTHER] += 1
@@ -137,8 +139,8 @@ class Comparison:
         body = [text(40, 40, "Intrinsics here and there", 20, weight=600), text(40, 62, self.summary(), 13)]
         x = 40
         for state, colour in COLOURS.items():
-            body += [f'<rect x="{x}" y="74" width="12" height="12" fill="{colour}"/>', text(x + 18, 85, state, 13)]
-            x += 50 + 8 * len(state)
+            body += [f'<rect x="{x}" y="78" width="12" height="12" fill="{colour}"/>', text(x + 18, 89, state, 13)]
+            x += 46 + 7 * len(state)
         for n, family in enumerate(f for f in [*self.families, "unknown"] if f in counts):
             x, y = left, top + n * step
             body.append(text(left - 10, y + 15, self.families.get(family, family), 13, anchor="end"))
@@ -171,9 +173,9 @@ def plural(number, noun):
     return f"{number} {noun}" + "s" * (number != 1)
 
 
-def write_names(out, names, width=110):
+def write_names(out, names, width=110, most=24):
     line = " "
-    for name in names:
+    for name in names[:most] + [f"and {len(names) - most} more"] * (len(names) > most):
         if len(line) + len(name) + 1 > width:
             print(line, file=out)
             line = " "
@@ -215,7 +217,7 @@ def write_values(out, a, b):
             print(f"{key[0]}, case {key[1]}: one list ends sooner", file=out)
             continue
         value, other, lane = found
-        print(f"{key[0]}, case {key[1]}: {value.operand} differs first in lane {lane}", file=out)
+        print(f"{key[0]}, case {key[1]}: {value.operand.removeprefix('=')} differs first in lane {lane}", file=out)
         for operand in mine[:mine.index(value)]:
             shown = operand.lanes[lane] if lane < len(operand.lanes) else operand.lanes[0]
             print(f"    {operand.operand:<10} {shown}" + f"  (lane 0 of {len(operand.lanes)})" * (lane >= len(operand.lanes) > 0), file=out)

@@ -91,7 +91,7 @@ class Intrinsic:
             self.puts.add(p.type)
         elif self.is_immediate(p):
             self.immediates.append(p.name)
-            self.before.append(f"shown_number(\"{p.name}\", {p.name});")
+            self.before.append(f"show_number(\"\", \"{p.name}\", (unsigned)({p.name}));")
         elif p.name == "p" and p.type in (*registers.PREDICATES, "vbool1"):
             self.before.append(f"const {p.type} p = get_where_{p.type}(\"p\");")
             self.predicates.add(p.type)

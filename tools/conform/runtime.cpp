@@ -262,10 +262,10 @@ static inline void write_lane(unsigned char* to, unsigned bits) {
   if (bits > 32) write_bytes(to + 4, high, (bits - 32) / 8);
 }
 
-static inline void show(const char* name, const unsigned char* from, unsigned lanes, unsigned bits) {
+static inline void show(const char* role, const char* name, const unsigned char* from, unsigned lanes, unsigned bits) {
   unsigned i, byte;
   if (!VALUES) return;
-  printf("%s%s %u %s", intrinsic, way(), cases, name);
+  printf("%s%s %u %s%s", intrinsic, way(), cases, role, name);
   for (i = 0; i < lanes; ++i) {
     printf(" ");
     for (byte = bits / 8; byte; --byte) printf("%02x", (unsigned)from[i * bits / 8 + byte - 1]);
@@ -281,7 +281,7 @@ static inline void operand(const char* name, unsigned lanes, unsigned bits, int 
     write_lane(staging + i * bits / 8, bits);
   }
   ++operands;
-  show(name, staging, lanes, bits);
+  show("", name, staging, lanes, bits);
 }
 
 static inline void result_at(const char* name, const unsigned char* from, unsigned lanes, unsigned bits) {
@@ -289,7 +289,7 @@ static inline void result_at(const char* name, const unsigned char* from, unsign
   const unsigned bytes = lanes * bits / 8;
   for (i = 0; i + 4 <= bytes; i += 4) add(read_bytes(from + i, 4));
   if (i < bytes) add(read_bytes(from + i, bytes - i));
-  show(name, from, lanes, bits);
+  show("=", name, from, lanes, bits);
 }
 
 static inline void result(const char* name, unsigned lanes, unsigned bits) { result_at(name, staging, lanes, bits); }
@@ -306,7 +306,7 @@ static inline void predicate(const char* name, unsigned bits) {
   if (pattern == 2 && odd) --low, high -= bits == 64 ? 1 : 0;
   write_bytes(staging, low, bits < 32 ? 2 : 4);
   write_bytes(staging + 4, high, 4);
-  show(name, staging, 1, bits);
+  show("", name, staging, 1, bits);
 }
 
 // --- Scalars ------------------------------------------------------------------------------------------
@@ -316,26 +316,26 @@ static inline unsigned scalar(const char* name, unsigned bits) {
   return read_bytes(staging, bits < 32 ? bits / 8 : 4);
 }
 
-static inline void shown_number(const char* name, int value) {
-  if (VALUES) printf("%s%s %u %s %08x\n", intrinsic, way(), cases, name, (unsigned)value & 0xFFFFFFFFu);
+static inline void show_number(const char* role, const char* name, unsigned value) {
+  if (VALUES) printf("%s%s %u %s%s %08x\n", intrinsic, way(), cases, role, name, value & 0xFFFFFFFFu);
 }
 
 static inline void result_number(const char* name, unsigned value) {
   add(value);
-  shown_number(name, (int)value);
+  show_number("=", name, value);
 }
 
 // An amount to shift by, a number of lanes: mostly within what has a meaning.
 static inline int count(const char* name) {
   const int value = (int)(any() % 76) - 6;
-  shown_number(name, value);
+  show_number("", name, (unsigned)value);
   return value;
 }
 
 // A multiple of size, small enough to stay within the memory.
 static inline int distance(const char* name, int size) {
   const int steps = 64 / size, value = ((int)(any() % (unsigned)(2 * steps + 1)) - steps) * size;
-  shown_number(name, value);
+  show_number("", name, (unsigned)value);
   return value;
 }
 
@@ -353,7 +353,7 @@ static inline void fill_memory(unsigned bits, int kind) {
   }
   place = memory + PLACE;
   ++operands;
-  show("memory", memory, MEMORY * 8 / bits, bits);
+  show("", "memory", memory, MEMORY * 8 / bits, bits);
 }
 
 static inline void move_place(unsigned size) {
@@ -375,5 +375,5 @@ static inline void offsets(const char* name, unsigned lanes, unsigned bits, unsi
     high = 0;
     write_lane(staging + i * bits / 8, bits);
   }
-  show(name, staging, lanes, bits);
+  show("", name, staging, lanes, bits);
 }

@@ -8,7 +8,7 @@ cmake_path(ABSOLUTE_PATH KASTARRI_CONFORM_FILES BASE_DIRECTORY ${programs} NORMA
 file(MAKE_DIRECTORY ${files})
 configure_file(${PROJECT_SOURCE_DIR}/tools/kastarri-conform.in ${programs}/kastarri-conform @ONLY
   FILE_PERMISSIONS OWNER_READ OWNER_WRITE OWNER_EXECUTE GROUP_READ GROUP_EXECUTE WORLD_READ WORLD_EXECUTE)
-set(parts comparison.py programs.py registers.py runtime.cpp)
+set(parts comparison.py programs.py register_access.py runtime.cpp)
 foreach(part IN LISTS parts)
   configure_file(${PROJECT_SOURCE_DIR}/tools/conform/${part} ${files}/${part} COPYONLY)
 endforeach()

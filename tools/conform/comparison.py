@@ -7,7 +7,7 @@ import re
 import textwrap
 from xml.sax.saxutils import escape
 
-import registers
+import register_access
 
 RESULT = re.compile(r"(\w+(?:/spill)?) (\d+) ([0-9a-f]{16})")
 VALUE = re.compile(r"(\w+(?:/spill)?) (\d+) (=?\w+)((?: [0-9a-f]+)+)")
@@ -96,7 +96,7 @@ class Comparison:
         return found, rest
 
     def foundations(self):
-        return [name for name in self.different if name in registers.FOUNDATIONS]
+        return [name for name in self.different if name in register_access.FOUNDATIONS]
 
     # --- Text ---
 

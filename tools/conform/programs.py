@@ -4,7 +4,7 @@ import collections
 import math
 import re
 
-import registers
+import register_access
 
 # Tables and intrinsics that no program calls, each with the reason.
 LEFT_OUT = {
@@ -92,7 +92,7 @@ class Intrinsic:
         elif self.is_immediate(p):
             self.immediates.append(p.name)
             self.before.append(f"show_number(\"\", \"{p.name}\", (unsigned)({p.name}));")
-        elif p.name == "p" and p.type in (*registers.PREDICATES, "vbool1"):
+        elif p.name == "p" and p.type in (*register_access.PREDICATES, "vbool1"):
             self.before.append(f"const {p.type} p = get_where_{p.type}(\"p\");")
             self.predicates.add(p.type)
         elif p.name == "offsets":
@@ -124,7 +124,7 @@ class Intrinsic:
     # --- Memory ---
 
     def is_opaque(self):
-        return self.memory.type in registers.OPAQUE
+        return self.memory.type in register_access.OPAQUE
 
     def write_memory(self):
         kind, size = self.memory.type, self.core.bytes(self.memory.type)
@@ -288,7 +288,7 @@ def is_left_out(data):
 def programs(library, names, most):
     """The programs for these intrinsics: families apart, each in parts with at most so many bytes of calls. What passes the
     PC's floats by value is apart, too."""
-    core = registers.Registers(library["types"])
+    core = register_access.Registers(library["types"])
     groups = collections.defaultdict(list)
     for data in library["intrinsics"]:
         if data["name"] in names and not is_left_out(data):

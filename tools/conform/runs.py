@@ -69,16 +69,23 @@ def compile_programs(sources, directory, compiler, flags, link):
     return in_parallel(compile_one, sources)
 
 
-def report(programs, library=None, preload=None):
-    """Intrinsic -> what the programs print of it. A program that ends badly prints less."""
+def run_program(program, library=None, preload=None, timeout=None):
+    """Intrinsic -> what the program prints of it: less where it ends badly, or not in time."""
     environment = dict(os.environ)
     if library:
         environment["LD_LIBRARY_PATH"] = library
     if preload:
         environment["LD_PRELOAD"] = preload
+    try:
+        printed = subprocess.run([program], env=environment, stdout=subprocess.PIPE, stderr=subprocess.DEVNULL, check=False,
+                                 timeout=timeout).stdout
+    except subprocess.TimeoutExpired as expired:
+        printed = expired.stdout or b""
+    lines = printed.decode(errors="replace").split("\n")[:-1]
+    return {line.split()[0]: line for line in lines if not line.startswith("#")}
 
-    def lines(program):
-        done = subprocess.run([program], env=environment, capture_output=True, text=True, errors="replace", check=False)
-        return [line for line in done.stdout.splitlines() if not line.startswith("#")]
 
-    return {line.split()[0]: line for printed in in_parallel(lines, programs) for line in printed}
+def report(programs, library=None, preload=None):
+    """Intrinsic -> what the programs print of it."""
+    parts = in_parallel(lambda program: run_program(program, library, preload), programs)
+    return {name: line for part in parts for name, line in part.items()}

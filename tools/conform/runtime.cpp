@@ -64,7 +64,11 @@ static inline void next_call() {
 
 static inline const char* way() { return by_spill ? "/spill" : ""; }
 
-static inline void end() { printf("%s%s %u %08x%08x\n", intrinsic, way(), cases, hash_high, hash_low); }
+// What ends a program early leaves the lines before.
+static inline void end() {
+  printf("%s%s %u %08x%08x\n", intrinsic, way(), cases, hash_high, hash_low);
+  fflush(stdout);
+}
 
 // --- Lanes --------------------------------------------------------------------------------------------
 
@@ -271,6 +275,7 @@ static inline void show(const char* role, const char* name, const unsigned char*
     for (byte = bits / 8; byte; --byte) printf("%02x", (unsigned)from[i * bits / 8 + byte - 1]);
   }
   printf("\n");
+  fflush(stdout);
 }
 
 // Lanes of 8, 16, 24, 32, 48 or 64 bits, one after the other.

@@ -9,8 +9,8 @@ from xml.sax.saxutils import escape
 
 import register_access
 
-RESULT = re.compile(r"(\w+(?:/spill)?) (\d+) ([0-9a-f]{16})")
-VALUE = re.compile(r"(\w+(?:/spill)?) (\d+) (=?\w+)((?: [0-9a-f]+)+)")
+RESULT = re.compile(r"(\w+(?:/(?:spill|any))?) (\d+) ([0-9a-f]{16})")
+VALUE = re.compile(r"(\w+(?:/(?:spill|any))?) (\d+) (=?\w+)((?: [0-9a-f]+)+)")
 
 Result = collections.namedtuple("Result", "cases hash")
 Value = collections.namedtuple("Value", "name case operand lanes")
@@ -53,7 +53,7 @@ class Report:
 
 
 def plain(name):
-    return name.removesuffix("/spill")
+    return name.partition("/")[0]
 
 
 class Comparison:
@@ -65,6 +65,7 @@ class Comparison:
         self.rows = [self.row(name, a.results.get(name), b.results.get(name))
                      for name in sorted({*a.results, *b.results}, key=lambda n: (self.order.get(plain(n), 1 << 30), n))]
         self.different = [row.name for row in self.rows if row.state == DIFFERENT]
+        self.differ = set(self.different)
 
     def row(self, name, a, b):
         state = (ONLY_A if not b else ONLY_B if not a else OTHER_CASES if a.cases != b.cases
@@ -72,12 +73,18 @@ class Comparison:
         return Row(name, self.family.get(plain(name), "unknown"), state, a, b)
 
     def touched(self, choice, names):
-        """The names that a choice touches. What only differs where wide registers come from spill images, speaks of these."""
-        of_spill = "qv_wvecspill_rtor_qv_vecNx48" in choice["names"]
+        """The names that a choice touches. What only differs where wide registers come from spill images may speak of those; where
+        memory lies at any address, of addresses alone."""
         listed = set(choice["names"])
-        different = set(self.different)
-        return [name for name in names if plain(name) in listed
-                or (of_spill and name.endswith("/spill") and plain(name) not in different)]
+        of_spill = "qv_wvecspill_rtor_qv_vecNx48" in listed
+        of_addresses = re.search("address|alignment", choice["text"])
+
+        def speaks(name):
+            base, _, way = name.partition("/")
+            only_this_way = way and base not in self.differ
+            return (base in listed and (way != "any" or not only_this_way or of_addresses)) or (of_spill and way == "spill" and only_this_way)
+
+        return [name for name in names if speaks(name)]
 
     def suspects(self):
         """Choices with the names that differ, the one that explains the most first: of many names that differ, and of few

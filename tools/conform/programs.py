@@ -133,7 +133,7 @@ class Intrinsic:
             self.write_opaque_memory()
             return
         self.before.append(f"fill_memory({bits}, {self.core.kind(kind)});")
-        if not self.tests_alignment and size > 1:
+        if self.is_movable():
             self.before.append(f"move_place({size});")
         if self.memory.stars == 2:
             const = "const " * self.memory.is_const
@@ -202,6 +202,10 @@ class Intrinsic:
     def is_wide(self):
         return bool({"qv_vec2Nx24", "qv_vecNx48"} & self.gets)
 
+    def is_movable(self):
+        """Whether memory may lie at any address."""
+        return bool(self.memory) and not self.is_opaque() and not self.tests_alignment and self.core.bytes(self.memory.type) > 1
+
     def lines(self):
         body = ["next_call();"]
         if self.is_float:
@@ -262,9 +266,8 @@ class Program:
     def main(self):
         lines = [f"printf(\"# {self.title}\\n\");"]
         lines += [f"run_{i.name}();" for i in self.intrinsics]
-        wide = [i for i in self.intrinsics if i.is_wide()]
-        if wide:
-            lines += ["by_spill = 1;", *(f"run_{i.name}();" for i in wide)]
+        lines += ["way = SPILL;", *(f"run_{i.name}();" for i in self.intrinsics if i.is_wide())]
+        lines += ["way = ANYWHERE;", "if (ANY_ADDRESS) {", *(f"  run_{i.name}();" for i in self.intrinsics if i.is_movable()), "}"]
         return "\n".join(["int main() {", *(f"  {line}" for line in lines), "  return 0;", "}", ""])
 
     def text(self, header, runtime, values):

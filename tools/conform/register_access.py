@@ -19,7 +19,7 @@ SPECIAL = {
     # The low bits by an image, extended by their sign; all of them by the spill image, of which nobody but this library
     # says how its lanes lie. Back by the image of the low bits, and the rest as a pack.
     "qv_vec2Nx24": Ways(
-        ["if (by_spill) {",
+        ["if (way == SPILL) {",
          "  operand(name, 64, 24, INTEGER);",
          "  return qv_wvecspill_mtor_qv_vec2Nx24((const qv_wvecspill*)staging, 0);",
          "}",
@@ -30,7 +30,7 @@ SPECIAL = {
          "*(qv_vec2Nx8*)staging = ZRA_PACKVRNR2NX24(value, 16);",
          "result(name, 64, 8);"]),
     "qv_vecNx48": Ways(
-        ["if (by_spill) {",
+        ["if (way == SPILL) {",
          "  operand(name, 32, 48, INTEGER);",
          "  return qv_wvecspill_mtor_qv_vecNx48((const qv_wvecspill*)staging, 0);",
          "}",

@@ -6,7 +6,7 @@
 #define VALUES 0  // 1: operands and results are printed, too
 #endif
 #ifndef ANY_ADDRESS
-#define ANY_ADDRESS 0  // 1: accesses that test no address have any
+#define ANY_ADDRESS 0  // 1: accesses that test no address are made at any, too
 #endif
 
 // --- The case -----------------------------------------------------------------------------------------
@@ -17,7 +17,12 @@ static unsigned cases;             // calls so far
 static unsigned modes, patterns;   // rounding modes and patterns of predicates, each with each, take turns
 static unsigned crossed, meeting;  // lanes that go on through the corners; operands whose corners meet: 1 or 2
 static unsigned operands;          // of the call so far
-static int by_spill;               // wide registers are filled from spill images, their lanes full
+
+// How the cases go: as plainly as can be; with wide registers filled from spill images, their lanes full; with memory
+// at any address.
+enum { PLAIN, SPILL, ANYWHERE };
+static int way = PLAIN;
+static const char* const ways[] = {"", "/spill", "/any"};
 static unsigned seed, hash_low, hash_high;
 
 // An xorshift generator; the product spreads its low bits.
@@ -51,7 +56,7 @@ static inline void begin(const char* name, unsigned all_loops, unsigned all_mode
   hash_low = 0x811C9DC5u;
   hash_high = 0x050C5D1Fu;
   for (letter = name; *letter; ++letter) add((unsigned)*letter);
-  add((unsigned)by_spill);
+  add((unsigned)way);
   seed = hash_high | 1;
 }
 
@@ -62,11 +67,9 @@ static inline void next_call() {
   operands = 0;
 }
 
-static inline const char* way() { return by_spill ? "/spill" : ""; }
-
 // What ends a program early leaves the lines before.
 static inline void end() {
-  printf("%s%s %u %08x%08x\n", intrinsic, way(), cases, hash_high, hash_low);
+  printf("%s%s %u %08x%08x\n", intrinsic, ways[way], cases, hash_high, hash_low);
   fflush(stdout);
 }
 
@@ -269,7 +272,7 @@ static inline void write_lane(unsigned char* to, unsigned bits) {
 static inline void show(const char* role, const char* name, const unsigned char* from, unsigned lanes, unsigned bits) {
   unsigned i, byte;
   if (!VALUES) return;
-  printf("%s%s %u %s%s", intrinsic, way(), cases, role, name);
+  printf("%s%s %u %s%s", intrinsic, ways[way], cases, role, name);
   for (i = 0; i < lanes; ++i) {
     printf(" ");
     for (byte = bits / 8; byte; --byte) printf("%02x", (unsigned)from[i * bits / 8 + byte - 1]);
@@ -322,7 +325,7 @@ static inline unsigned scalar(const char* name, unsigned bits) {
 }
 
 static inline void show_number(const char* role, const char* name, unsigned value) {
-  if (VALUES) printf("%s%s %u %s%s %08x\n", intrinsic, way(), cases, role, name, value & 0xFFFFFFFFu);
+  if (VALUES) printf("%s%s %u %s%s %08x\n", intrinsic, ways[way], cases, role, name, value & 0xFFFFFFFFu);
 }
 
 static inline void result_number(const char* name, unsigned value) {
@@ -362,7 +365,7 @@ static inline void fill_memory(unsigned bits, int kind) {
 }
 
 static inline void move_place(unsigned size) {
-  if (ANY_ADDRESS) place += any() % size;
+  if (way == ANYWHERE) place += any() % size;
 }
 
 static inline void result_memory(unsigned bits) { result_at("memory", memory, MEMORY * 8 / bits, bits); }

@@ -19,6 +19,7 @@ sys.path.insert(0, os.path.dirname(os.path.abspath(__file__)))
 import build as building  # noqa: E402
 import cells  # noqa: E402
 import mutants as planting  # noqa: E402
+import rules  # noqa: E402
 import static  # noqa: E402
 
 sys.path[:0] = [os.path.join(static.ROOT, "tools"), os.path.join(static.ROOT, "tools", "conform")]
@@ -53,8 +54,12 @@ class Reports:
             changed.update(name for name in right if name in found and found[name] != right[name])
             changed.update(missing[:1])
             unknown.update(missing[1:])
-        plain = {name.removesuffix("/spill") for name in changed}
-        return plain, {name.removesuffix("/spill") for name in unknown} - plain
+        plain = {name.partition("/")[0] for name in changed}
+        return plain, {name.partition("/")[0] for name in unknown} - plain
+
+
+def place(mutant):
+    return mutant.path, mutant.number
 
 
 def names_of(rows):
@@ -80,7 +85,7 @@ def judge(reports, builder, group, touched):
             else:
                 changed, unknown = reports.changed(scratch)
                 for mutant in group:
-                    names = names_of(touched[static.place(mutant)])
+                    names = names_of(touched[place(mutant)])
                     if names & changed:
                         found[mutant] = "report"
                     elif not names & unknown:
@@ -91,21 +96,30 @@ def judge(reports, builder, group, touched):
 
 def is_called(mutant, touched):
     """Whether the programs call a row that the fault is in."""
-    rows = names_of(touched[static.place(mutant)])
+    rows = names_of(touched[place(mutant)])
     return mutant.path not in programs.LEFT_OUT and any(name not in programs.LEFT_OUT for name in rows)
 
 
 def plant(arguments):
     """Of each line some faults that the headers do not tell; and the rows that each touches."""
     lines = cells.read_lines(planting.SOURCES)
-    everything = [m for m in cells.all_mutants(lines) if re.search(arguments.only, m.path) and m.line.kind != "TYPE"]
+    in_cells = [m for m in cells.all_mutants(lines) if re.search(arguments.only, m.path) and m.line.kind != "TYPE"]
     with tempfile.TemporaryDirectory() as directory:
-        found, touched = static.judge(directory, lines, everything, lambda _: None, by_names=False)
+        found, touched = static.judge(directory, lines, in_cells, lambda _: None, by_names=False)
+    in_expressions = [m for m in rules.all_mutants(planting.SOURCES) if m.path.endswith(".def") and re.search(arguments.only, m.path)]
     by_line = collections.defaultdict(list)
-    for mutant in planting.in_order(everything, arguments.seed):
-        if mutant not in found and is_called(mutant, touched) and len(by_line[static.place(mutant)]) < arguments.faults:
-            by_line[static.place(mutant)].append(mutant)
+    for mutant in planting.in_order(in_cells + in_expressions, arguments.seed):
+        if mutant not in found and is_called(mutant, touched) and len(by_line[place(mutant)]) < arguments.faults:
+            by_line[place(mutant)].append(mutant)
     return [mutant for group in by_line.values() for mutant in group], touched
+
+
+def groups_of(mutants):
+    """Groups that can be built together: expressions of the scalar core's rows, which are all there is of them, one a line."""
+    turns = collections.defaultdict(list)
+    for mutant in (m for m in mutants if isinstance(m, rules.Mutant)):
+        turns[sum(place(m) == place(mutant) for group in turns.values() for m in group)].append(mutant)
+    return [*turns.values(), *static.passes([m for m in mutants if isinstance(m, cells.Mutant)])]
 
 
 def main():
@@ -129,8 +143,8 @@ def main():
             else:
                 left.append(mutant)
         # What programs fill and read registers with changes all reports: alone.
-        single = [m for m in left if names_of(touched[static.place(m)]) & register_access.FOUNDATIONS]
-        groups = [[m] for m in single] + list(static.passes([m for m in left if m not in single]))
+        single = [m for m in left if names_of(touched[place(m)]) & register_access.FOUNDATIONS]
+        groups = [[m] for m in single] + groups_of([m for m in left if m not in single])
         for number, group in enumerate(groups, 1):
             planting.progress(f"batch {number} of {len(groups)}, {len(group)} faults")
             found.update(judge(reports, builder, group, touched))

@@ -6,6 +6,7 @@
 #   make try           build for one target; test and time one intrinsic (NAME=ADDSNX16)
 #   make mutants       plant faults in all rows and in some rules, and list those that no test finds (MUTANTS=40, SEED=1,
 #                      ONLY= a regular expression of tables and sources)
+#   make conform       run the programs of kastarri-conform in every form that this machine has: the same report from all
 #   make bench         time every intrinsic and write docs/performance.md, a summary, and build/performance.md
 #   make bench-kernels time whole kernels: scalar C, loops that compilers vectorise, calls, inlined
 #   make docs          write build/docs/reference.html, all intrinsics on one page
@@ -38,7 +39,7 @@ else
 $(error BITS is $(BITS); known are 32 and 64)
 endif
 
-.PHONY: help demo test try mutants bench bench-kernels docs picture install package headers format clean
+.PHONY: help demo test try mutants conform bench bench-kernels docs picture install package headers format clean
 
 help:
 	@sed -n 's/^#   //p' Makefile
@@ -64,6 +65,13 @@ mutants:
 	cmake --preset mutants
 	$(CMAKE_BUILD) mutants --target kastarri_tests
 	tools/mutants/mutants.py build/mutants --rules $(MUTANTS) --seed $(SEED) --only '$(ONLY)'
+
+conform:
+	tools/packages.sh build test test-64
+	for preset in test test-64 clang clang-64; do \
+	  cmake --preset $$preset && $(CMAKE_BUILD) $$preset --target only_sse2 only_avx2 only_avx512 kastarri_static kastarri-conform || exit; \
+	done
+	tools/conform/check.py $(addprefix build/,test test-64 clang clang-64)
 
 bench:
 	tools/packages.sh build test$(WIDTH)

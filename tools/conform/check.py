@@ -9,6 +9,7 @@ another way, and have the static library inlined. --sample takes fewer of these 
 """
 
 import argparse
+import itertools
 import os
 import sys
 import tempfile
@@ -68,17 +69,17 @@ class Check:
         return self.path(name)
 
     def targets(self, build):
-        """The libraries whose target this processor runs."""
+        """Form -> the library, of the shared ones whose target this processor runs."""
         libraries = build.libraries()
-        link = ["-L", next(iter(libraries.values())), "-lkastarri"]
-        probe, = runs.compile_programs([self.write("probe.cpp", PROBE)], self.path("probe" + build.bits), "g++", [build.width], link)
+        probe, = runs.compile_programs([self.write("probe.cpp", PROBE)], self.path("probe" + build.bits), "g++", [build.width],
+                                       ["-L", next(iter(libraries.values())), "-lkastarri"])
         found = {}
         for target, library in libraries.items():
-            said = runs.run([probe], env=dict(os.environ, LD_LIBRARY_PATH=library)).strip()
-            if said == "none":
+            form = f"library by {os.path.basename(build.compiler)} for {target}"
+            if runs.run([probe], env=dict(os.environ, LD_LIBRARY_PATH=library)).strip() == "none":
                 print(f"this processor does not run {target}")
             else:
-                found[target] = library
+                found[form] = library
         return found
 
     def hosts(self, build):
@@ -89,20 +90,21 @@ class Check:
             runs.run(["gcc", build.width, "-shared", "-fPIC", source, "-o", library])
             yield name, library
 
-    def shared(self, build, sources):
-        targets = self.targets(build)
-        link = ["-L", next(iter(targets.values())), "-lkastarri"]
-        forms = [(compiler, level) for compiler in COMPILERS for level in LEVELS]
+    def shared(self, builds, sources):
+        """The libraries of builds for one width."""
+        bits, width = builds[0].bits, builds[0].width
+        libraries = {form: library for build in builds for form, library in self.targets(build).items()}
+        link = ["-L", next(iter(libraries.values())), "-lkastarri"]
+        forms = list(itertools.product(COMPILERS, LEVELS))
         if self.sample:
-            forms = [("g++", "-O1")] if build.bits == "32" else [("clang++", "-O2")]
+            forms = [("g++", "-O1")] if bits == "32" else [("clang++", "-O2")]
         for compiler, level in forms:
-            programs = runs.compile_programs(sources, self.path("shared"), compiler, [build.width, level, *runs.USER_FLAGS], link)
-            for target, library in targets.items():
-                self.take(f"{build.bits} bits, library by {build.compiler} for {target}, programs by {compiler} {level}",
-                          runs.report(programs, library))
-        for host, preload in self.hosts(build):
-            for target, library in targets.items():
-                self.take(f"{build.bits} bits, library by {build.compiler} for {target}, {host}", runs.report(programs, library, preload))
+            programs = runs.compile_programs(sources, self.path("shared"), compiler, [width, level, *runs.USER_FLAGS], link)
+            for form, library in libraries.items():
+                self.take(f"{bits} bits, {form}, programs by {compiler} {level}", runs.report(programs, library))
+        for host, preload in self.hosts(builds[0]):
+            for form, library in libraries.items():
+                self.take(f"{bits} bits, {form}, {host}", runs.report(programs, library, preload))
 
     def inlined(self, build, sources):
         if not build.archive():
@@ -112,11 +114,13 @@ class Check:
         flags = [build.width, *STATIC_FLAGS[target], "-mfpmath=sse", lto]
         for level in LEVELS[1:]:
             programs = runs.compile_programs(sources, self.path("static"), build.compiler, [*flags, level], [archive])
-            self.take(f"{build.bits} bits, inlined for {target} by {build.compiler} {level}", runs.report(programs))
+            self.take(f"{build.bits} bits, inlined for {target} by {os.path.basename(build.compiler)} {level}", runs.report(programs))
 
-    def check(self, build, sources):
-        self.shared(build, sources)
-        if not self.sample:
+    def check(self, builds):
+        sources = runs.write_programs(builds[0], self.path("sources"))
+        for bits in sorted({build.bits for build in builds}):
+            self.shared([build for build in builds if build.bits == bits], sources)
+        for build in [] if self.sample else builds:
             self.inlined(build, sources)
 
 
@@ -128,10 +132,7 @@ def main():
     start = time.monotonic()
     with tempfile.TemporaryDirectory() as directory:
         check = Check(directory, arguments.sample)
-        builds = [runs.Build(build) for build in arguments.builds]
-        sources = runs.write_programs(builds[0], check.path("sources"))
-        for build in builds:
-            check.check(build, sources)
+        check.check([runs.Build(build) for build in arguments.builds])
     print(f"{check.forms} reports, {len(check.different)} different from the first, in {time.monotonic() - start:.0f} s")
     for form, names in check.different:
         print(f"{form}: {' '.join(names[:20])}{' ...' * (len(names) > 20)}")

@@ -33,7 +33,7 @@ class Build:
         self.directory = os.path.abspath(directory)
         self.bits = self.cached("KASTARRI_BITS") or "32"
         self.width = f"-m{self.bits}"
-        self.compiler = os.path.basename(self.cached("CMAKE_CXX_COMPILER"))
+        self.compiler = self.cached("CMAKE_CXX_COMPILER")
         self.tool = os.path.join(self.directory, "bin", "kastarri-conform")
 
     def cached(self, name):
@@ -48,7 +48,7 @@ class Build:
 
     def archive(self):
         """The static library and its target, if it was built."""
-        path = os.path.join(self.directory, "libkastarri.a")
+        path = os.path.join(self.directory, "libkastarri_static.a")
         return (path, self.cached("KASTARRI_STATIC_TARGET")) if os.path.exists(path) else None
 
 

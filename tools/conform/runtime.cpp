@@ -26,7 +26,7 @@ static const char* const ways[] = {"", "/spill", "/any"};
 static unsigned seed, hash_low, hash_high;
 
 // An xorshift generator; the product spreads its low bits.
-static inline unsigned any() {
+inline unsigned any() {
   seed ^= seed << 13;
   seed ^= seed >> 17;
   seed ^= seed << 5;
@@ -34,7 +34,7 @@ static inline unsigned any() {
 }
 
 // Every bit of the word reaches every bit of the hash, so that changed signs do not cancel each other.
-static inline void add(unsigned bits) {
+inline void add(unsigned bits) {
   hash_low = (hash_low ^ bits) * 0x01000193u;
   hash_low ^= hash_low >> 15;
   hash_high = (hash_high + hash_low) * 0x85EBCA6Bu;
@@ -42,7 +42,7 @@ static inline void add(unsigned bits) {
 }
 
 // An intrinsic's operands follow from its name alone.
-static inline void begin(const char* name, unsigned all_loops, unsigned all_modes, unsigned all_patterns,
+inline void begin(const char* name, unsigned all_loops, unsigned all_modes, unsigned all_patterns,
                          unsigned lanes, unsigned all_meeting) {
   const char* letter;
   intrinsic = name;
@@ -60,15 +60,15 @@ static inline void begin(const char* name, unsigned all_loops, unsigned all_mode
   seed = hash_high | 1;
 }
 
-static inline int more() { return ++number < loops; }
+inline int more() { return ++number < loops; }
 
-static inline void next_call() {
+inline void next_call() {
   ++cases;
   operands = 0;
 }
 
 // What ends a program early leaves the lines before.
-static inline void end() {
+inline void end() {
   printf("%s%s %u %08x%08x\n", intrinsic, ways[way], cases, hash_high, hash_low);
   fflush(stdout);
 }
@@ -81,12 +81,12 @@ static unsigned char* const staging = (unsigned char*)staged;
 
 static unsigned low, high;  // a lane of up to 64 bits
 
-static inline void negate_bits() {
+inline void negate_bits() {
   low = ~low;
   high = ~high;
 }
 
-static inline void set_bit(unsigned bit) {
+inline void set_bit(unsigned bit) {
   low = bit < 32 ? 1u << bit : 0;
   high = bit < 32 ? 0 : 1u << (bit - 32);
 }
@@ -95,7 +95,7 @@ static inline void set_bit(unsigned bit) {
 enum { INTEGER, FLOAT, QUIET };
 enum { INTEGER_CORNERS = 11, FLOAT_CORNERS = 17 };
 
-static inline void integer_corner(unsigned corner, unsigned bits) {
+inline void integer_corner(unsigned corner, unsigned bits) {
   low = high = 0;
   switch (corner) {
     case 0:
@@ -138,9 +138,9 @@ static inline void integer_corner(unsigned corner, unsigned bits) {
   }
 }
 
-static inline unsigned fraction_of(unsigned bits) { return bits == 16 ? 10 : 23; }
+inline unsigned fraction_of(unsigned bits) { return bits == 16 ? 10 : 23; }
 
-static inline void float_corner(unsigned corner, unsigned bits) {
+inline void float_corner(unsigned corner, unsigned bits) {
   const unsigned unit = 1u << fraction_of(bits), sign = 1u << (bits - 1), infinity = sign - unit;
   const unsigned one = ((sign >> 1) - 1) & ~(unit - 1);
   switch (corner) {
@@ -199,14 +199,14 @@ static inline void float_corner(unsigned corner, unsigned bits) {
 }
 
 // Of any magnitude, and about 1, so that sums cancel and round.
-static inline void any_float(unsigned bits) {
+inline void any_float(unsigned bits) {
   const unsigned unit = 1u << fraction_of(bits), sign = 1u << (bits - 1), one = ((sign >> 1) - 1) & ~(unit - 1);
   low = any();
   if (low & 1) low = (low & sign) + one + (low >> 4) % 9 * unit - 4 * unit + (low & 2 ? any() % unit : 0);
 }
 
 // Full ones and such as have leading copies of their sign.
-static inline void any_integer() {
+inline void any_integer() {
   unsigned shift;
   low = any();
   high = any();
@@ -218,25 +218,25 @@ static inline void any_integer() {
 }
 
 // How far a lane has come in the corners of the first two operands, which meet each with each.
-static inline unsigned place_of(unsigned lane) { return number / (modes * patterns) * crossed + lane; }
+inline unsigned place_of(unsigned lane) { return number / (modes * patterns) * crossed + lane; }
 
-static inline int is_crossed(unsigned lane, unsigned corners) {
+inline int is_crossed(unsigned lane, unsigned corners) {
   return place_of(lane) < (meeting > 1 ? corners * corners : corners);
 }
 
-static inline unsigned corner_of(unsigned lane, unsigned corners) {
+inline unsigned corner_of(unsigned lane, unsigned corners) {
   if (!is_crossed(lane, corners) || operands > 1) return any() % corners;
   return (operands == 0 ? place_of(lane) : place_of(lane) / corners) % corners;
 }
 
 // A signalling NaN may become quiet where the PC's floats are passed.
-static inline void quieten(unsigned bits) {
+inline void quieten(unsigned bits) {
   const unsigned unit = 1u << fraction_of(bits), sign = 1u << (bits - 1);
   if ((low & (sign - 1)) > sign - unit) low |= unit / 2;
 }
 
 // Into low and high: lane i of an operand.
-static inline void choose(unsigned lane, unsigned bits, int kind) {
+inline void choose(unsigned lane, unsigned bits, int kind) {
   const unsigned corners = kind == INTEGER ? INTEGER_CORNERS : FLOAT_CORNERS;
   const int at_corner = is_crossed(lane, corners) || any() % 4 == 0;
   high = 0;
@@ -254,22 +254,22 @@ static inline void choose(unsigned lane, unsigned bits, int kind) {
   }
 }
 
-static inline void write_bytes(unsigned char* to, unsigned bits, unsigned bytes) {
+inline void write_bytes(unsigned char* to, unsigned bits, unsigned bytes) {
   for (; bytes; --bytes, bits >>= 8) *to++ = (unsigned char)(bits & 255);
 }
 
-static inline unsigned read_bytes(const unsigned char* from, unsigned bytes) {
+inline unsigned read_bytes(const unsigned char* from, unsigned bytes) {
   unsigned bits = 0;
   while (bytes) bits = bits << 8 | from[--bytes];
   return bits;
 }
 
-static inline void write_lane(unsigned char* to, unsigned bits) {
+inline void write_lane(unsigned char* to, unsigned bits) {
   write_bytes(to, low, bits < 32 ? bits / 8 : 4);
   if (bits > 32) write_bytes(to + 4, high, (bits - 32) / 8);
 }
 
-static inline void show(const char* role, const char* name, const unsigned char* from, unsigned lanes, unsigned bits) {
+inline void show(const char* role, const char* name, const unsigned char* from, unsigned lanes, unsigned bits) {
   unsigned i, byte;
   if (!VALUES) return;
   printf("%s%s %u %s%s", intrinsic, ways[way], cases, role, name);
@@ -282,7 +282,7 @@ static inline void show(const char* role, const char* name, const unsigned char*
 }
 
 // Lanes of 8, 16, 24, 32, 48 or 64 bits, one after the other.
-static inline void operand(const char* name, unsigned lanes, unsigned bits, int kind) {
+inline void operand(const char* name, unsigned lanes, unsigned bits, int kind) {
   unsigned i;
   for (i = 0; i < lanes; ++i) {
     choose(i, bits, kind);
@@ -292,7 +292,7 @@ static inline void operand(const char* name, unsigned lanes, unsigned bits, int 
   show("", name, staging, lanes, bits);
 }
 
-static inline void result_at(const char* name, const unsigned char* from, unsigned lanes, unsigned bits) {
+inline void result_at(const char* name, const unsigned char* from, unsigned lanes, unsigned bits) {
   unsigned i;
   const unsigned bytes = lanes * bits / 8;
   for (i = 0; i + 4 <= bytes; i += 4) add(read_bytes(from + i, 4));
@@ -300,10 +300,10 @@ static inline void result_at(const char* name, const unsigned char* from, unsign
   show("=", name, from, lanes, bits);
 }
 
-static inline void result(const char* name, unsigned lanes, unsigned bits) { result_at(name, staging, lanes, bits); }
+inline void result(const char* name, unsigned lanes, unsigned bits) { result_at(name, staging, lanes, bits); }
 
 // What governs lanes: all of them, every other one, none or a half, as it comes.
-static inline void predicate(const char* name, unsigned bits) {
+inline void predicate(const char* name, unsigned bits) {
   const unsigned pattern = number / modes % patterns, odd = number / (modes * patterns) & 1;
   low = any();
   high = any();
@@ -319,29 +319,29 @@ static inline void predicate(const char* name, unsigned bits) {
 
 // --- Scalars ------------------------------------------------------------------------------------------
 
-static inline unsigned scalar(const char* name, unsigned bits) {
+inline unsigned scalar(const char* name, unsigned bits) {
   operand(name, 1, bits, INTEGER);
   return read_bytes(staging, bits < 32 ? bits / 8 : 4);
 }
 
-static inline void show_number(const char* role, const char* name, unsigned value) {
+inline void show_number(const char* role, const char* name, unsigned value) {
   if (VALUES) printf("%s%s %u %s%s %08x\n", intrinsic, ways[way], cases, role, name, value & 0xFFFFFFFFu);
 }
 
-static inline void result_number(const char* name, unsigned value) {
+inline void result_number(const char* name, unsigned value) {
   add(value);
   show_number("=", name, value);
 }
 
 // An amount to shift by, a number of lanes: mostly within what has a meaning.
-static inline int count(const char* name) {
+inline int count(const char* name) {
   const int value = (int)(any() % 76) - 6;
   show_number("", name, (unsigned)value);
   return value;
 }
 
 // A multiple of size, small enough to stay within the memory.
-static inline int distance(const char* name, int size) {
+inline int distance(const char* name, int size) {
   const int steps = 64 / size, value = ((int)(any() % (unsigned)(2 * steps + 1)) - steps) * size;
   show_number("", name, (unsigned)value);
   return value;
@@ -353,7 +353,7 @@ enum { MEMORY = 512, PLACE = 192 };  // bytes
 static unsigned char* const memory = (unsigned char*)stored;
 static unsigned char* place;  // what pointers lead to
 
-static inline void fill_memory(unsigned bits, int kind) {
+inline void fill_memory(unsigned bits, int kind) {
   unsigned i;
   for (i = 0; i < MEMORY * 8 / bits; ++i) {
     choose(i, bits, kind);
@@ -364,18 +364,18 @@ static inline void fill_memory(unsigned bits, int kind) {
   show("", "memory", memory, MEMORY * 8 / bits, bits);
 }
 
-static inline void move_place(unsigned size) {
+inline void move_place(unsigned size) {
   if (way == ANYWHERE) place += any() % size;
 }
 
-static inline void result_memory(unsigned bits) { result_at("memory", memory, MEMORY * 8 / bits, bits); }
+inline void result_memory(unsigned bits) { result_at("memory", memory, MEMORY * 8 / bits, bits); }
 
-static inline void result_pointer(const void* pointer) {
+inline void result_pointer(const void* pointer) {
   result_number("pointer", (unsigned)(int)((const unsigned char*)pointer - place));
 }
 
 // The elements of a gather or scatter: 256 bytes of different addresses in some order, from `first` on.
-static inline void offsets(const char* name, unsigned lanes, unsigned bits, unsigned size, int first) {
+inline void offsets(const char* name, unsigned lanes, unsigned bits, unsigned size, int first) {
   const unsigned slots = 256 / size, step = any() | 1, start = any();
   unsigned i;
   for (i = 0; i < lanes; ++i) {

@@ -227,9 +227,9 @@ def write_values(out, a, b):
         print(f"{key[0]}, case {key[1]}: {value.operand.removeprefix('=')} differs first in lane {lane}", file=out)
         for operand in mine[:mine.index(value)]:
             shown = operand.lanes[lane] if lane < len(operand.lanes) else operand.lanes[0]
-            print(f"    {operand.operand:<10} {shown}" + f"  (lane 0 of {len(operand.lanes)})" * (lane >= len(operand.lanes) > 0), file=out)
+            print(f"    {operand.operand.removeprefix('='):<10} {shown}" + f"  (lane 0 of {len(operand.lanes)})" * (lane >= len(operand.lanes) > 0), file=out)
         for side, side_value in (("A", value), ("B", other)):
-            print(f"    {side_value.operand:<10} {' '.join(side_value.lanes[lane:lane + 1]) or 'nothing'}  in {side}", file=out)
+            print(f"    {side_value.operand.removeprefix('='):<10} {' '.join(side_value.lanes[lane:lane + 1]) or 'nothing'}  in {side}", file=out)
     missing = sorted({f"{name}" for name, _ in ours.keys() ^ theirs.keys()} - told)
     if missing:
         print("cases that one list alone has: " + ", ".join(missing), file=out)

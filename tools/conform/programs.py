@@ -25,7 +25,7 @@ LISTED = {
     "RK_ADDMI": [-1024, -256, 256, 2048], "RK_ADDMI_A": [-1024, -256, 256, 2048],
     "RK_MOVI": [-1000, -1, 0, 1, 1000], "RK_MOVI_N": [-10, -1, 0, 1, 30],
     "RK_SLLI": range(32), "RK_SRAI": range(32), "RK_SRLI": SMALL, "RK_SSAI": range(32), "RK_SSAI_SRC": range(32),
-    "RK_CLAMPS": range(7, 23), "RK_SEXT": range(7, 23), "RK_CONST16": [0, 1, 0x1234, 0x7FFF, 0x8000, 0xFFFF],
+    "RK_CLAMPS": range(32), "RK_SEXT": range(32), "RK_CONST16": [0, 1, 0x1234, 0x7FFF, 0x8000, 0xFFFF],
     "RK_EXTUI": [(0, 1), (0, 8), (0, 16), (1, 2), (3, 5), (7, 9), (8, 8), (15, 16), (16, 16), (24, 8), (31, 1)],
     "RK_DEPBITS": [(0, 1), (0, 8), (0, 16), (1, 2), (3, 5), (7, 9), (8, 8), (15, 16), (16, 16), (24, 8), (31, 1)],
 }
@@ -189,9 +189,9 @@ class Intrinsic:
         patterns = 1 if not self.predicates else 2 if self.predicates == {"vbool1"} else 4
         meeting = min(2, max(1, len(types)))
         corners = FLOAT_CORNERS if any(self.core.is_float(kind) for kind in types) else INTEGER_CORNERS
-        seeded = 12 if lanes > 1 else 32
+        seeded = 18 if lanes > 1 else 32
         if len(self.values()) > 4:
-            seeded = 4
+            seeded = 6
         loops = math.ceil(corners ** meeting / lanes) + seeded if types else 1
         if self.memory:
             loops = 16 if not self.immediates else 6

@@ -363,11 +363,16 @@ enum { MEMORY = 512, PLACE = 192 };  // bytes
 static unsigned char* const memory = (unsigned char*)stored;
 static unsigned char* place;  // what pointers lead to
 
+// Integers as they come, for there are many; floats with their corners.
 inline void fill_memory(unsigned bits, int kind) {
+  const unsigned width = kind == INTEGER ? 32 : bits;
   unsigned i;
-  for (i = 0; i < MEMORY * 8 / bits; ++i) {
-    choose(i, bits, kind);
-    write_lane(memory + i * bits / 8, bits);
+  for (i = 0; i < MEMORY * 8 / width; ++i) {
+    if (kind == INTEGER)
+      low = any();
+    else
+      choose(i, bits, kind);
+    write_lane(memory + i * width / 8, width);
   }
   place = memory + PLACE;
   ++operands;

@@ -6,6 +6,7 @@
 #   make try           build for one target; test and time one intrinsic (NAME=ADDSNX16)
 #   make mutants       plant faults in all rows and in some rules, and list those that no test finds (MUTANTS=40, SEED=1,
 #                      ONLY= a regular expression of tables and sources)
+#   make conform       run the programs of kastarri-conform in every form that this machine has: the same report from all
 #   make fuzz          run random programs of intrinsics against every library (SECONDS=60, SEED=1, ALSO= other build
 #                      directories with the target `sequences`)
 #   make bench         time every intrinsic and write docs/performance.md, a summary, build/performance.md and
@@ -47,7 +48,7 @@ else
 $(error BITS is $(BITS); known are 32 and 64)
 endif
 
-.PHONY: help demo test try mutants fuzz bench bench-kernels docs picture install uninstall package release headers format clean
+.PHONY: help demo test try mutants conform fuzz bench bench-kernels docs picture install uninstall package release headers format clean
 
 help:
 	@sed -n 's/^#   //p' Makefile
@@ -79,6 +80,13 @@ fuzz:
 	cmake --preset test$(WIDTH)
 	$(CMAKE_BUILD) test$(WIDTH) --target sequences
 	tools/fuzz/fuzz.py build/test$(WIDTH) $(ALSO) --seconds $(SECONDS) --seed $(SEED)
+
+conform:
+	tools/packages.sh build test test-64
+	for preset in test test-64 clang clang-64; do \
+	  cmake --preset $$preset && $(CMAKE_BUILD) $$preset --target only_sse2 only_avx2 only_avx512 kastarri_static kastarri-conform || exit; \
+	done
+	tools/conform/check.py $(addprefix build/,test test-64 clang clang-64)
 
 bench:
 	tools/packages.sh build test$(WIDTH)

@@ -292,7 +292,9 @@ class DebianPackages(Installed):
         headers = {"usr/include/" + os.path.relpath(path, os.path.join(ROOT, "include"))
                    for path in glob.glob(os.path.join(ROOT, "include", "**", "*.h"), recursive=True)}
         links = {f"usr/{MULTIARCH}/libkastarri.so", f"usr/{MULTIARCH}/libkastarri_static.a",
-                 "usr/bin/kastarri-port", "usr/bin/kastarri-check", "usr/share/kastarri/port.json", f"usr/{CMAKE_DIRECTORY}/kastarri-config.cmake",
+                 "usr/bin/kastarri-port", "usr/bin/kastarri-check", "usr/share/kastarri/port.json",
+                 "usr/bin/kastarri-conform", *(f"usr/share/kastarri/conform/{name}" for name in (
+                     "conform.json", "comparison.py", "programs.py", "register_access.py", "runtime.cpp")), f"usr/{CMAKE_DIRECTORY}/kastarri-config.cmake",
                  *(f"usr/{directory}/kastarri.pc" for directory in PKGCONFIG_DIRECTORIES)}
         self.assertEqual((headers | links | documents["libkastarri-dev"]) - set(devel), set(), "missing")
         self.assertEqual(set(runtime) & set(devel), set(), "in both packages")

@@ -90,13 +90,19 @@ class Build:
         if result.returncode != 0:
             raise Failed(result.stderr)
 
-    def rebuild(self, scratch, paths):
-        """Library and test program of the sources in scratch that stand at the paths. False if the library is what it
-        was."""
+    def rebuild_library(self, scratch, paths):
+        """The library of the sources in scratch that stand at the paths. False if it is what it was."""
         library = self.compile_all(scratch, self.dependents(self.library, paths))
         if all(self.same(name, path) for name, path in library.items()):
             return False
         self.link(self.library, os.path.join(scratch, self.name_of(self.library)), library)
+        return True
+
+    def rebuild(self, scratch, paths):
+        """Library and test program of the sources in scratch that stand at the paths. False if the library is what it
+        was."""
+        if not self.rebuild_library(scratch, paths):
+            return False
         tests = self.compile_all(scratch, self.dependents(self.program, paths))
         if tests:
             self.link(self.program, os.path.join(scratch, self.name_of(self.program)), tests)

@@ -187,7 +187,7 @@ def judge_rules(arguments, equivalent, builder):
 
 def report(title, planted, found):
     """A table by family, and the survivors."""
-    verdicts = [v for v in ("prototype", "name", "compiler", "tests", "same code", "equivalent", "not built") if v in found.values()]
+    verdicts = [v for v in ("prototype", "name", "compiler", "tests", "report", "same code", "equivalent", "not built") if v in found.values()]
     counts = collections.defaultdict(collections.Counter)
     for mutant in planted:
         counts[mutant.path.split("/")[0]][found.get(mutant, "survive")] += 1

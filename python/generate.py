@@ -7,6 +7,7 @@ writes into DIRECTORY rows.inc, which the extension compiles into its table, and
 function for each intrinsic with its rule as the documentation.
 """
 
+import keyword
 import os
 import re
 import sys
@@ -47,6 +48,8 @@ class Parameter:
 
     def __init__(self, row, operand, number):
         self.operand, self.name, self.numbers = operand, operand.name or f"ignored{number}", (0, 0)
+        if keyword.iskeyword(self.name):
+            self.name += "_"
         gathers = re.match("gather|scatter|increment", row.shape) is not None
         if operand.role == "result":
             self.role = "result"

@@ -150,7 +150,7 @@ class Call {
     for (int i = 0; i < count_; ++i) {
       from[i] = operands_[i].data;
       strides[i] = loop.strides[i][loop.axes - 1];
-      is_direct_[i] = operands_[i].is_direct();
+      is_direct_[i] = operands_[i].data && operands_[i].is_direct();
       if (outputs_[i]) to_[i] = PyArray_BYTES(outputs_[i].array());
     }
     const npy_intp inner = loop.lengths[loop.axes - 1];

@@ -142,8 +142,9 @@ class Intrinsic:
         lines = [rule[0].upper() + rule[1:] + ".", ""]
         for p in self.parameters:
             if p.role in ("memory", "moving"):
-                size = 8 * p.operand.bytes
-                lines.append(f"memory: a buffer{', written' if p.numbers[1] & 1 else ''}; {size // 8} byte{'s' * (size > 8)} an access"
+                size = p.operand.bytes
+                lines.append(f"memory: a buffer{' that is written' if p.numbers[1] & 1 else ''}, of {p.operand.type}; "
+                             + f"{size} byte{'s' * (size > 1)} an access"
                              + (f", at a multiple of {p.numbers[0]}" if p.numbers[0] > 1 else ""))
                 if p.role == "moving":
                     lines.append("offset: bytes from the beginning of the buffer")

@@ -12,9 +12,10 @@ namespace kastarri_python {
 
 namespace {
 
-// Values that do not lie as the library has them are converted so many at a time.
-constexpr npy_intp block = 16;
-constexpr int most_bytes = 256;
+// Values that do not lie as the library has them are converted a block at a time: as many as have room, and few enough to
+// stay in the processor's nearest cache.
+constexpr npy_intp most_in_block = 64;
+constexpr int block_bytes = 8192;
 
 bool is_output(Role role) { return role == Role::result || role == Role::written || role == Role::kept; }
 
@@ -155,7 +156,7 @@ class Call {
     }
     const npy_intp inner = loop.lengths[loop.axes - 1];
     if (std::find(loop.lengths, loop.lengths + loop.axes, 0) != loop.lengths + loop.axes) return;
-    const npy_intp most = works_in_place() ? inner : block;
+    const npy_intp most = works_in_place() ? inner : block();
     for (;;) {
       for (npy_intp done = 0; done < inner; done += most) {
         const npy_intp n = std::min(most, inner - done);
@@ -183,16 +184,21 @@ class Call {
     for (int i = 0; i < count_; ++i) {
       const Role role = parameter(i).role;
       if (role == Role::kept || role == Role::memory || role == Role::moving || row_.divides) return false;
-      if (is_output(role) ? !lies_alike(i) : operands_[i].data && !is_direct_[i]) return false;
+      if (is_output(role) ? !lies_alike(i) : operands_[i].data && (!is_direct_[i] || has_range(i))) return false;
     }
     return true;
   }
 
-  // Whether results lie in arrays as the library writes them. Lanes of 48 bits are extended to 64.
-  bool lies_alike(int i) const {
-    const Way way = shape_of(type(i)).way;
-    return way == Way::same || way == Way::sum48;
+  npy_intp block() const {
+    int most_bytes = 1;
+    for (int i = 0; i < count_; ++i)
+      if (operands_[i].data || outputs_[i]) most_bytes = std::max(most_bytes, type(i).bytes);
+    return std::min(most_in_block, npy_intp{block_bytes} / most_bytes);
   }
+
+  bool lies_alike(int i) const { return shape_of(type(i)).lies_alike(); }
+  // Whether values lie alike, but numbers may be too large.
+  bool has_range(int i) const { return shape_of(type(i)).way == Way::sum48; }
 
   // --- A block --------------------------------------------------------------------------------------
 
@@ -212,6 +218,7 @@ class Call {
         set_image(i, operands_[i].value, 0);
       } else if (is_direct_[i]) {
         set_image(i, const_cast<char*>(from[i]), strides[i]);
+        if (!fit(type(i), from[i], strides[i], n)) does_not_fit(i);
       } else {
         read_images(i, type(i), from[i], strides[i], n, scratch_[i]);
         set_image(i, scratch_[i], type(i).bytes);
@@ -236,9 +243,13 @@ class Call {
   }
 
   void read_images(int i, const Type& type, const char* from, npy_intp stride, npy_intp n, char* images) {
-    if (from == images) return;  // what is kept already lies where it will be written
-    if (!to_images(type, from, stride, n, images))
-      raise(PyExc_ValueError, "%s: %s has a number that does not fit into %d bits", row_.name, parameter(i).name, type.bits);
+    // What is kept may already lie where it will be written.
+    const bool fits = from == images ? fit(type, from, stride, n) : to_images(type, from, stride, n, images);
+    if (!fits) does_not_fit(i);
+  }
+
+  [[noreturn]] void does_not_fit(int i) const {
+    raise(PyExc_ValueError, "%s: %s has a number that does not fit into %d bits", row_.name, parameter(i).name, type(i).bits);
   }
 
   void take_outputs(npy_intp n) {
@@ -336,7 +347,7 @@ class Call {
   char* to_[most_parameters];
   char* images_[most_parameters];
   npy_intp image_strides_[most_parameters];
-  alignas(64) char scratch_[most_parameters][block * most_bytes];
+  alignas(64) char scratch_[most_parameters][block_bytes];
 };
 
 }  // namespace

@@ -43,10 +43,10 @@ class Memory {
  private:
   void expect(std::int64_t offset, int size) const {
     const auto address = reinterpret_cast<std::intptr_t>(buffer_.buf) + offset;
-    if (address % alignment_ != 0)
+    if (address & (alignment_ - 1))
       raise(PyExc_ValueError, "%s: the address at offset %lld is not a multiple of %d", row_, static_cast<long long>(offset),
             alignment_);
-    const std::int64_t first = offset - address % rounding_;
+    const std::int64_t first = offset - (address & (rounding_ - 1));
     if (first < 0 || first + size > buffer_.len)
       raise(PyExc_ValueError, "%s: %d bytes at offset %lld are not within the memory of %zd bytes", row_, size,
             static_cast<long long>(first), buffer_.len);
@@ -54,7 +54,8 @@ class Memory {
 
   Py_buffer buffer_ = {};
   const char* row_ = nullptr;
-  int alignment_ = 1, rounding_ = 1, size_ = 0;
+  int alignment_ = 1, rounding_ = 1;  // powers of 2
+  int size_ = 0;
 };
 
 }  // namespace kastarri_python

@@ -60,7 +60,7 @@ void read_number(Operand& operand, const Row& row, const Parameter& parameter, P
 }  // namespace
 
 bool Operand::is_direct() const {
-  if (shape.way != Way::same) return false;
+  if (!shape.lies_alike()) return false;
   auto alike = reinterpret_cast<std::uintptr_t>(data);
   for (int i = 0; i < axes; ++i) alike |= static_cast<std::uintptr_t>(strides[i]);
   return alike % static_cast<unsigned>(type->unit) == 0;

@@ -7,7 +7,6 @@ prints nanoseconds a register, the least of many runs that alternate. Python run
 which is the operand that the intrinsic changes, as in C++, or else the same array every time.
 """
 
-import inspect
 import subprocess
 import sys
 import time
@@ -49,7 +48,7 @@ def main():
         for _ in range(ROUNDS):
             for name, least in best.items():
                 function, arguments = getattr(kastarri, name), operands(name)
-                changes = next(iter(inspect.signature(function).parameters)) in ("acc", "r")
+                changes = "Returns acc," in function.__doc__ or "Returns r," in function.__doc__
                 out = arguments[0].copy() if changes else function(*arguments)
                 loops.stdin.write(name + "\n")
                 loops.stdin.flush()

@@ -36,7 +36,7 @@ bool suits(PyObject* object, const Shape& shape) {
   const int axes = PyArray_NDIM(array);
   if (!has_lanes(shape)) return axes <= most_axes;
   return axes > 0 && axes <= most_axes + 1 && PyArray_DIM(array, axes - 1) == shape.elements &&
-         PyArray_STRIDE(array, axes - 1) == shape.element_bytes;
+         (PyArray_STRIDE(array, axes - 1) == shape.element_bytes || PyArray_SIZE(array) == 0);
 }
 
 // Numbers that stand alone are read without an array.

@@ -2,14 +2,16 @@
 # Installs the Debian packages that are missing for the named purposes, as root or through sudo; where
 # neither works, prints the commands that do it and fails. On a system that is not Debian it names them and goes on.
 #
-#   tools/packages.sh PURPOSE...     build, demo, test, test-64, picture, check
+#   tools/packages.sh PURPOSE...     build, demo, test, test-64, picture, python, check
 set -euo pipefail
 
 declare -A packages=(
   [build]="g++-multilib cmake ninja-build python3"
   [demo]="librsvg2-bin"
   [test]="clang gdb pkg-config chromium chromium-driver libgtest-dev:i386 libbenchmark-dev:i386 libmpfr-dev:i386"
-  [test-64]="clang gdb pkg-config chromium chromium-driver libgtest-dev:amd64 libbenchmark-dev:amd64 libmpfr-dev:amd64"
+  [test-64]="clang gdb pkg-config chromium chromium-driver libgtest-dev:amd64 libbenchmark-dev:amd64 libmpfr-dev:amd64
+    python3-numpy python3-dev python3-pip python3-setuptools python3-wheel"
+  [python]="python3-numpy python3-dev python3-pip python3-setuptools python3-wheel python3-matplotlib"
   [picture]="chromium chromium-driver"
   [check]="clang-format valgrind libc6-dbg:i386"
 )

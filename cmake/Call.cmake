@@ -29,6 +29,8 @@ add_executable(kastarri-call ${tools}/call/run.cpp ${tools}/reference/calls.cpp 
 target_include_directories(kastarri-call PRIVATE ${tools}/reference ${PROJECT_SOURCE_DIR}/tests ${PROJECT_SOURCE_DIR}/src)
 target_compile_options(kastarri-call PRIVATE -msse2 -mfpmath=sse -O0)
 target_link_libraries(kastarri-call PRIVATE kastarri)
+# It needs what the library needs, and no C++ library of its width.
+target_link_options(kastarri-call PRIVATE -static-libstdc++ -static-libgcc)
 file(RELATIVE_PATH to_library ${CMAKE_INSTALL_PREFIX}/${runner_dir}/${KASTARRI_BITS} ${CMAKE_INSTALL_FULL_LIBDIR})
 set_target_properties(kastarri-call PROPERTIES OUTPUT_NAME run RUNTIME_OUTPUT_DIRECTORY ${runners}/${KASTARRI_BITS}
   INSTALL_RPATH "$ORIGIN/${to_library}")

@@ -1,5 +1,5 @@
-// What loops of calls in C++ cost: for each intrinsic named on the standard input nanoseconds a call, on blocks of 1,000
-// registers, the least of many runs. bench.py compares calls from Python with them.
+// What loops of calls in C++ cost: for each intrinsic named on the standard input nanoseconds a call, on blocks of
+// 1,000 registers, the least of many runs. bench.py compares calls from Python with them.
 #include <chrono>
 #include <cstdio>
 #include <cstring>
@@ -84,10 +84,11 @@ double time_of_load(R (*f)(const M*, int)) {
 double time_by_name(const std::string& name) {
 #define LOOP(NAME) \
   if (name == #NAME) return time_of(ZRA_##NAME);
-  LOOP(ADDNX16) LOOP(ADDSNX16) LOOP(ADDSNX16T) LOOP(LTNX16) LOOP(MULNX16) LOOP(MULANX16) LOOP(MULA2NX8) LOOP(ADDN_2XF32)
-  LOOP(MULAN_2XF32) LOOP(RADDNX16)
+  LOOP(ADDNX16)
+  LOOP(ADDSNX16) LOOP(ADDSNX16T) LOOP(LTNX16) LOOP(MULNX16) LOOP(MULANX16) LOOP(MULA2NX8) LOOP(ADDN_2XF32)
+      LOOP(MULAN_2XF32) LOOP(RADDNX16)
 #undef LOOP
-  if (name == "SRAINX16") return time_of(ZRA_SRAINX16, 3);
+          if (name == "SRAINX16") return time_of(ZRA_SRAINX16, 3);
   if (name == "PACKVRNX48") return time_of(ZRA_PACKVRNX48, 4);
   if (name == "LVNX16_I") return time_of_load(ZRA_LVNX16_I);
   return 0;

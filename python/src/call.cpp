@@ -12,8 +12,8 @@ namespace kastarri_python {
 
 namespace {
 
-// Values that do not lie as the library has them are converted a block at a time: as many as have room, and few enough to
-// stay in the processor's nearest cache.
+// Values that do not lie as the library has them are converted a block at a time: as many as have room, and few enough
+// to stay in the processor's nearest cache.
 constexpr npy_intp most_in_block = 64;
 constexpr int block_bytes = 8192;
 
@@ -249,7 +249,8 @@ class Call {
   }
 
   [[noreturn]] void does_not_fit(int i) const {
-    raise(PyExc_ValueError, "%s: %s has a number that does not fit into %d bits", row_.name, parameter(i).name, type(i).bits);
+    raise(PyExc_ValueError, "%s: %s has a number that does not fit into %d bits", row_.name, parameter(i).name,
+          type(i).bits);
   }
 
   void take_outputs(npy_intp n) {

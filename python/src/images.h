@@ -1,6 +1,7 @@
 // Registers in arrays of NumPy, and as the library has them.
 //
-// Most lanes lie in both alike. In arrays a lane of 24 or 48 bits is a number of 64, and a bit of a predicate is a byte.
+// Most lanes lie in both alike. In arrays a lane of 24 or 48 bits is a number of 64, and a bit of a predicate is a
+// byte.
 #ifndef KASTARRI_PYTHON_IMAGES_H
 #define KASTARRI_PYTHON_IMAGES_H
 
@@ -15,9 +16,9 @@ enum class Way { same, sum24, sum48, predicate };
 // How values of a type lie in arrays: bytes of a value, and what it is made of.
 struct Shape {
   Way way;
-  char kind;          // i, u, f, b as in Type
+  char kind;  // i, u, f, b as in Type
   int element_bytes;
-  int elements;       // one: no axis of its own
+  int elements;  // one: no axis of its own
   int bytes() const { return element_bytes * elements; }
   // Whether images lie in arrays. Lanes of 48 bits are extended to 64.
   bool lies_alike() const { return way == Way::same || way == Way::sum48; }

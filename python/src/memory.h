@@ -24,8 +24,8 @@ class Memory {
     const bool writes = parameter.second & 1;
     if (PyObject_GetBuffer(object, &buffer_, writes ? PyBUF_WRITABLE : PyBUF_SIMPLE) < 0) {
       PyErr_Clear();
-      raise(PyExc_TypeError, "%s: memory is an array or another buffer whose bytes lie one behind the other%s", row.name,
-            writes ? ", and may be written" : "");
+      raise(PyExc_TypeError, "%s: memory is an array or another buffer whose bytes lie one behind the other%s",
+            row.name, writes ? ", and may be written" : "");
     }
     row_ = row.name;
     alignment_ = parameter.first;
@@ -44,8 +44,8 @@ class Memory {
   void expect(std::int64_t offset, int size) const {
     const auto address = reinterpret_cast<std::intptr_t>(buffer_.buf) + offset;
     if (address & (alignment_ - 1))
-      raise(PyExc_ValueError, "%s: the address at offset %lld is not a multiple of %d", row_, static_cast<long long>(offset),
-            alignment_);
+      raise(PyExc_ValueError, "%s: the address at offset %lld is not a multiple of %d", row_,
+            static_cast<long long>(offset), alignment_);
     const std::int64_t first = offset - (address & (rounding_ - 1));
     if (first < 0 || first + size > buffer_.len)
       raise(PyExc_ValueError, "%s: %d bytes at offset %lld are not within the memory of %zd bytes", row_, size,

@@ -19,9 +19,9 @@ constexpr const Type* register_types[] = {KASTARRI_REGISTER_TYPES(KASTARRI_LISTE
 #undef KASTARRI_LISTED
 
 constexpr const Type* host_types[] = {
-    &TypeOf<signed char>::value, &TypeOf<unsigned char>::value, &TypeOf<short>::value,     &TypeOf<unsigned short>::value,
-    &TypeOf<int>::value,         &TypeOf<unsigned>::value,      &TypeOf<long long>::value, &TypeOf<float>::value,
-    &TypeOf<bool>::value};
+    &TypeOf<signed char>::value,    &TypeOf<unsigned char>::value, &TypeOf<short>::value,
+    &TypeOf<unsigned short>::value, &TypeOf<int>::value,           &TypeOf<unsigned>::value,
+    &TypeOf<long long>::value,      &TypeOf<float>::value,         &TypeOf<bool>::value};
 
 // {name: (is a register, kind, bits, lanes, type of arrays, elements of the last axis)}
 Ref types() {
@@ -29,8 +29,8 @@ Ref types() {
   const auto add = [&all](const Type& type, bool is_register) {
     const Shape shape = shape_of(type);
     Ref dtype = Ref::checked(reinterpret_cast<PyObject*>(PyArray_DescrFromType(number_of(shape))));
-    const Ref row = Ref::checked(Py_BuildValue("OCiiOi", is_register ? Py_True : Py_False, type.kind, type.bits, type.count,
-                                               dtype.get(), shape.elements));
+    const Ref row = Ref::checked(Py_BuildValue("OCiiOi", is_register ? Py_True : Py_False, type.kind, type.bits,
+                                               type.count, dtype.get(), shape.elements));
     if (PyDict_SetItemString(all.get(), type.name, row.get()) < 0) throw Raised();
   };
   for (const Type* type : register_types) add(*type, true);
@@ -68,8 +68,8 @@ PyObject* text(PyObject*, PyObject* arguments) {
     alignas(64) char image[256];
     if (operand.axes != 0 || !to_images(type, operand.data, 0, 1, image))
       raise(PyExc_ValueError, "text: not the values of one %s", name);
-    const kastarri::print_detail::Register shown = {reinterpret_cast<unsigned char*>(image), type.bytes, type.kind, type.bits,
-                                                    type.count};
+    const kastarri::print_detail::Register shown = {reinterpret_cast<unsigned char*>(image), type.bytes, type.kind,
+                                                    type.bits, type.count};
     const kastarri::Form form = {static_cast<kastarri::Form::Kind>(kind), fraction_bits};
     return PyUnicode_FromString(kastarri::print_detail::text_of(shown, form).c_str());
   });

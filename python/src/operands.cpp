@@ -51,8 +51,8 @@ void read_number(Operand& operand, const Row& row, const Parameter& parameter, P
   const int bits = shape.kind == 'b' ? 1 : 8 * shape.element_bytes - (shape.kind == 'i');
   const long long highest = bits >= 63 ? INT64_MAX : (1ll << bits) - 1, lowest = shape.kind == 'i' ? -highest - 1 : 0;
   if (overflow || number < lowest || number > highest)
-    raise(PyExc_ValueError, "%s: %s is %S; %s is from %lld to %lld", row.name, parameter.name, object, operand.type->name,
-          lowest, highest);
+    raise(PyExc_ValueError, "%s: %s is %S; %s is from %lld to %lld", row.name, parameter.name, object,
+          operand.type->name, lowest, highest);
   std::memcpy(operand.value, &number, sizeof number);
   operand.data = operand.value;
 }
@@ -70,9 +70,10 @@ void read_operand(Operand& operand, const Row& row, const Parameter& parameter, 
   operand.type = &type;
   operand.shape = shape_of(type);
   if (is_number(argument, operand.shape)) return read_number(operand, row, parameter, argument);
-  operand.array = suits(argument, operand.shape)
-                      ? Ref::to(argument)
-                      : Ref::checked(PyObject_CallFunction(coerce, "Osss", argument, type.name, row.name, parameter.name));
+  operand.array =
+      suits(argument, operand.shape)
+          ? Ref::to(argument)
+          : Ref::checked(PyObject_CallFunction(coerce, "Osss", argument, type.name, row.name, parameter.name));
   if (!suits(operand.array.get(), operand.shape))
     raise(PyExc_ValueError, "%s: %s has too many axes", row.name, parameter.name);
   PyArrayObject* array = operand.array.array();
@@ -113,8 +114,8 @@ Ref given_array(PyObject* out, const Row& row, const Type& type, int axes, const
   for (int i = 0; fits && i < axes; ++i) fits = PyArray_DIM(array, i) == lengths[i];
   const Ref wanted = Ref::checked(fits ? PyTuple_New(0) : PyArray_IntTupleFromIntp(axes, lengths));
   if (!fits)
-    raise(PyExc_ValueError, "%s: out is a contiguous array of the result's type, with the axes %S before its lanes", row.name,
-          wanted.get());
+    raise(PyExc_ValueError, "%s: out is a contiguous array of the result's type, with the axes %S before its lanes",
+          row.name, wanted.get());
   return Ref::to(out);
 }
 

@@ -14,7 +14,7 @@ constexpr int most_axes = 16;  // before that of the lanes
 struct Operand {
   const Type* type = nullptr;
   Shape shape = {};
-  Ref array;                       // none: the value below
+  Ref array;  // none: the value below
   alignas(8) char value[8] = {};
   const char* data = nullptr;
   int axes = 0;
@@ -24,7 +24,8 @@ struct Operand {
   bool is_direct() const;
 };
 
-// What makes an array of the right kind of other arguments: a function of Python, coerce(argument, type, row, parameter).
+// What makes an array of the right kind of other arguments: a function of Python, coerce(argument, type, row,
+// parameter).
 extern PyObject* coerce;
 
 void read_operand(Operand& operand, const Row& row, const Parameter& parameter, const Type& type, PyObject* argument);

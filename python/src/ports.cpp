@@ -8,7 +8,17 @@ namespace kastarri_python {
 
 namespace {
 
-enum Handler { exported, input_ready, input_attempt, input_read, output_ready, output_attempt, output_write, wire, handlers };
+enum Handler {
+  exported,
+  input_ready,
+  input_attempt,
+  input_read,
+  output_ready,
+  output_attempt,
+  output_write,
+  wire,
+  handlers
+};
 
 constexpr const char* names[handlers] = {"exported",     "input_ready",    "input_attempt", "input_read",
                                          "output_ready", "output_attempt", "output_write",  "wire"};

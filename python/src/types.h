@@ -9,7 +9,8 @@
 
 namespace kastarri_python {
 
-// Kinds of lanes as in lanes.h: i signed, u unsigned, f floating point, b bits of a predicate, w words without a number.
+// Kinds of lanes as in lanes.h: i signed, u unsigned, f floating point, b bits of a predicate, w words without a
+// number.
 struct Type {
   const char* name;
   char kind;
@@ -35,11 +36,11 @@ struct TypeOf<T, std::enable_if_t<std::is_arithmetic_v<T>>> {
   static constexpr Type value = {name(), kind, kind == 'b' ? 1 : 8 * int{sizeof(T)}, 1, sizeof(T), alignof(T)};
 };
 
-#define KASTARRI_TYPE(T, KIND, BITS, COUNT)                                                    \
-  template <>                                                                                  \
-  struct TypeOf<T##_space::T##_> {                                                             \
-    using Class = T##_space::T##_;                                                             \
-    static constexpr Type value = {#T, #KIND[0], BITS, COUNT, sizeof(Class), alignof(Class)};  \
+#define KASTARRI_TYPE(T, KIND, BITS, COUNT)                                                   \
+  template <>                                                                                 \
+  struct TypeOf<T##_space::T##_> {                                                            \
+    using Class = T##_space::T##_;                                                            \
+    static constexpr Type value = {#T, #KIND[0], BITS, COUNT, sizeof(Class), alignof(Class)}; \
   };
 KASTARRI_REGISTER_TYPES(KASTARRI_TYPE)
 #undef KASTARRI_TYPE

@@ -2,9 +2,9 @@
 //
 //   run NAME FORM BITS [STATE=VALUE ...] -- OPERAND ...
 //
-// FORM and the BITS of its fraction are those of kastarri/print.h. There is an operand for each parameter, and one for the
-// result: KIND:BITS:LANES:IMAGE, as in kastarri/lanes.h and the bytes of the value, lowest first, in hexadecimal. What a call
-// gives is printed by names; of memory, states and ports what it changes.
+// FORM and the BITS of its fraction are those of kastarri/print.h. There is an operand for each parameter, and one for
+// the result: KIND:BITS:LANES:IMAGE, as in kastarri/lanes.h and the bytes of the value, lowest first, in hexadecimal.
+// What a call gives is printed by names; of memory, states and ports what it changes.
 #include <cstdio>
 #include <cstdlib>
 #include <stdexcept>
@@ -99,8 +99,7 @@ void show(const Operand& operand, const Value& value, kastarri::Form form) {
   const bool changed = std::memcmp(operand.image, value.image.data(), value.image.size()) != 0;
   if (operand.role != Role::memory || changed)
     std::printf("%s = %s\n", operand.name.c_str(), kastarri::print_detail::text_of(shown, form).c_str());
-  if (operand.pointer)
-    std::printf("the pointer moves by %td bytes\n", *operand.pointer - operand.image);
+  if (operand.pointer) std::printf("the pointer moves by %td bytes\n", *operand.pointer - operand.image);
 }
 
 void run(const std::vector<std::string>& arguments) {

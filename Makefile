@@ -12,6 +12,7 @@
 #   make picture       take docs/pictures/reference.png of that page
 #   make install       install libraries and headers (PREFIX=/usr/local, DESTDIR=, LIBDIR=lib or lib/x86_64-linux-gnu)
 #   make package       make Debian packages in build/packages
+#   make wheel         make a wheel of the Python package, with the 64-bit library, in build/wheels
 #   make headers       write the public headers, gdb's table of types, docs/coverage.md, docs/shapes.md and the README's
 #                      counts from the tables
 #   make format        format the sources
@@ -38,7 +39,7 @@ else
 $(error BITS is $(BITS); known are 32 and 64)
 endif
 
-.PHONY: help demo test try mutants bench bench-kernels docs picture install package headers format clean
+.PHONY: help demo test try mutants bench bench-kernels docs picture install package wheel headers format clean
 
 help:
 	@sed -n 's/^#   //p' Makefile
@@ -99,6 +100,10 @@ package:
 	cmake --preset install$(WIDTH) -DCMAKE_INSTALL_LIBDIR=lib/$(MULTIARCH)
 	$(CMAKE_BUILD) install$(WIDTH)
 	cpack --config build/install$(WIDTH)/CPackConfig.cmake -B build/packages
+
+wheel:
+	tools/packages.sh build python
+	/usr/bin/python3 -m pip wheel --no-build-isolation --no-deps -w build/wheels python/
 
 headers:
 	tools/packages.sh build

@@ -227,7 +227,8 @@ class DebianPackages(Directory):
         headers = {"usr/include/" + os.path.relpath(path, os.path.join(ROOT, "include"))
                    for path in glob.glob(os.path.join(ROOT, "include", "**", "*.h"), recursive=True)}
         links = {f"usr/{MULTIARCH}/libkastarri.so", f"usr/{MULTIARCH}/libkastarri_static.a",
-                 "usr/bin/kastarri-call", f"usr/lib/kastarri/call/{BITS}/run", "usr/bin/kastarri-port", "usr/share/kastarri/port.json", f"usr/{CMAKE_DIRECTORY}/kastarri-config.cmake",
+                 "usr/bin/kastarri-call", f"usr/lib/kastarri/call/{BITS}/run", "usr/bin/kastarri-port",
+                 "usr/share/kastarri/port.json", f"usr/{CMAKE_DIRECTORY}/kastarri-config.cmake",
                  *(f"usr/{directory}/kastarri.pc" for directory in PKGCONFIG_DIRECTORIES)}
         self.assertEqual((headers | links | documents["libkastarri-dev"]) - set(devel), set(), "missing")
         self.assertEqual(set(runtime) & set(devel), set(), "in both packages")

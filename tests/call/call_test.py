@@ -37,7 +37,7 @@ ANSWERS = [
     ("LVNX16_IP 5 64", ["r = 32 x int16 = {5, ", "the pointer moves by 64 bytes"]),
     ("SVNX16T_I ramp 7 0 first:2", ["memory = 32 x int16 = {0, 1, 7, 7, "]),
     ("LSNX16_I 3,4,5 0", ["result = 3"]),
-    ("GATHERANX16 10,20,30 4,2,0,0", ["result = 0x0014001e0000000a"]),
+    ("GATHERANX16 10,20,30 4,2,0,0", ["result = 16 x bits32 = {0x0014001e, 0x000a000a, "]),
     ("RK_ADDX4 3 -5", ["result = 7"]),
     ("RK_SSR 5", ["SAR = 5"]),
     ("--state SAR=8 RK_SRL 0x1234", ["result = 18"]),
@@ -89,6 +89,16 @@ class Calls(unittest.TestCase):
                 status, shown, errors = call(line)
                 self.assertEqual((status, shown), (2, []))
                 self.assertRegex(errors, words)
+
+
+class Documentation(unittest.TestCase):
+    def test_examples(self):
+        with open(os.path.join(ROOT, "docs", "calling.md"), encoding="utf-8") as file:
+            examples = re.findall(r"^    \$ kastarri-call (.*)\n((?:    [^$\n].*\n)*)", file.read(), re.M)
+        self.assertGreater(len(examples), 3)
+        for line, shown in examples:
+            expected = "".join(re.escape(part.strip()) + r"\n" for part in shown.splitlines()).replace(re.escape("..."), ".*")
+            self.assertRegex("\n".join(call(line)[1]) + "\n", f"^{expected}$")
 
 
 class Search(unittest.TestCase):

@@ -19,6 +19,7 @@
 #   make package       make Debian packages in build/packages
 #   make release       make all that a release consists of, in build/release: sources, archives and Debian packages of
 #                      both widths, the reference page, the performance tables, checksums; install and try each
+#   make wheel         make a wheel of the Python package, with the 64-bit library, in build/wheels
 #   make headers       write the public headers, gdb's table of types, docs/coverage.md, docs/shapes.md and the README's
 #                      counts from the tables
 #   make format        format the sources
@@ -48,7 +49,7 @@ else
 $(error BITS is $(BITS); known are 32 and 64)
 endif
 
-.PHONY: help demo test try mutants conform fuzz bench bench-kernels docs picture install uninstall package release headers format clean
+.PHONY: help demo test try mutants conform fuzz bench bench-kernels docs picture install uninstall package wheel release headers format clean
 
 help:
 	@sed -n 's/^#   //p' Makefile
@@ -130,6 +131,10 @@ uninstall:
 release:
 	tools/packages.sh build install release
 	tools/release.py
+
+wheel:
+	tools/packages.sh build python
+	/usr/bin/python3 -m pip wheel --no-build-isolation --no-deps -w build/wheels python/
 
 headers:
 	tools/packages.sh build

@@ -3,7 +3,7 @@
 # neither works, prints the commands that do it and fails. For Fedora and Arch it prints the command, by their names of
 # the packages, and goes on; so it does on other systems, by Debian's names.
 #
-#   tools/packages.sh PURPOSE...     build, install, release, demo, test, test-64, picture, check
+#   tools/packages.sh PURPOSE...     build, install, release, demo, test, test-64, picture, python, check
 #   tools/packages.sh --for debian|ubuntu|fedora|arch PURPOSE...     only print the command for that system
 set -euo pipefail
 
@@ -14,7 +14,9 @@ declare -A packages=(
   [release]="git clang gdb pkg-config"
   [demo]="librsvg2-bin"
   [test]="clang libclang-rt-dev valgrind gdb pkg-config help2man git chromium chromium-driver libc6-dbg:i386 libgtest-dev:i386 libbenchmark-dev:i386 libmpfr-dev:i386"
-  [test-64]="clang libclang-rt-dev valgrind gdb pkg-config help2man git chromium chromium-driver libgtest-dev:amd64 libbenchmark-dev:amd64 libmpfr-dev:amd64"
+  [test-64]="clang libclang-rt-dev valgrind gdb pkg-config help2man git chromium chromium-driver libgtest-dev:amd64 libbenchmark-dev:amd64 libmpfr-dev:amd64
+    python3-numpy python3-dev python3-pip python3-setuptools python3-wheel"
+  [python]="python3-numpy python3-dev python3-pip python3-setuptools python3-wheel python3-matplotlib"
   [picture]="chromium chromium-driver"
   [check]="clang-format valgrind libc6-dbg:i386"
 )
@@ -30,13 +32,16 @@ declare -A fedora=(
   [libmpfr-dev:i386]="mpfr-devel.i686 gmp-devel.i686" [libgtest-dev:amd64]="gtest-devel"
   [libbenchmark-dev:amd64]="google-benchmark-devel" [libmpfr-dev:amd64]="mpfr-devel gmp-devel"
   [clang-format]="clang-tools-extra" [libc6-dbg:i386]="glibc-debuginfo.i686" [libclang-rt-dev]="compiler-rt"
+  [python3-dev]="python3-devel"
 )
 declare -A arch=(
   [g++-multilib]="gcc lib32-gcc-libs lib32-glibc" [ninja-build]="ninja" [python3]="python"
   [librsvg2-bin]="librsvg" [pkg-config]="pkgconf" [chromium-driver]="chromium" [clang-format]="clang"
   [libgtest-dev:i386]="aur:lib32-gtest" [libbenchmark-dev:i386]="aur:lib32-benchmark" [libmpfr-dev:i386]="aur:lib32-mpfr lib32-gmp"
   [libgtest-dev:amd64]="gtest" [libbenchmark-dev:amd64]="benchmark" [libmpfr-dev:amd64]="mpfr gmp"
-  [libc6-dbg:i386]="debuginfod" [libclang-rt-dev]="compiler-rt"
+  [libc6-dbg:i386]="debuginfod" [libclang-rt-dev]="compiler-rt" [python3-numpy]="python-numpy"
+  [python3-dev]="python" [python3-pip]="python-pip" [python3-setuptools]="python-setuptools" [python3-wheel]="python-wheel"
+  [python3-matplotlib]="python-matplotlib"
 )
 
 system=

@@ -292,7 +292,8 @@ class DebianPackages(Installed):
         headers = {"usr/include/" + os.path.relpath(path, os.path.join(ROOT, "include"))
                    for path in glob.glob(os.path.join(ROOT, "include", "**", "*.h"), recursive=True)}
         links = {f"usr/{MULTIARCH}/libkastarri.so", f"usr/{MULTIARCH}/libkastarri_static.a",
-                 "usr/bin/kastarri-port", "usr/bin/kastarri-check", "usr/share/kastarri/port.json",
+                 "usr/bin/kastarri-port", "usr/bin/kastarri-call", f"usr/lib/kastarri/call/{BITS}/run",
+                 "usr/bin/kastarri-check", "usr/share/kastarri/port.json",
                  "usr/bin/kastarri-conform", *(f"usr/share/kastarri/conform/{name}" for name in (
                      "conform.json", "comparison.py", "programs.py", "register_access.py", "runtime.cpp")), f"usr/{CMAKE_DIRECTORY}/kastarri-config.cmake",
                  *(f"usr/{directory}/kastarri.pc" for directory in PKGCONFIG_DIRECTORIES)}
@@ -300,7 +301,7 @@ class DebianPackages(Installed):
         self.assertEqual(set(runtime) & set(devel), set(), "in both packages")
         for name, (mode, owner) in {**runtime, **devel}.items():
             self.assertEqual(owner, "root/root", name)
-            executable = name.startswith("usr/bin/")
+            executable = name.startswith(("usr/bin/", "usr/lib/kastarri/call/"))
             self.assertIn(mode, {"lrwxrwxrwx", "-rwxr-xr-x" if executable else "-rw-r--r--"}, name)
 
     def test_library_is_stripped_and_announced_to_the_loader(self):

@@ -1,0 +1,13 @@
+from typing import Any, Callable
+
+import numpy as np
+
+types: dict[str, tuple[bool, str, int, int, np.dtype[Any], int]]
+states: memoryview
+prid: memoryview
+version: str
+
+def call(number: int, out: Any, *operands: Any) -> Any: ...
+def text(type: str, values: Any, kind: int, fraction_bits: int) -> str: ...
+def set_coerce(function: Callable[..., Any]) -> None: ...
+def set_handler(name: str, function: Callable[..., Any] | None) -> None: ...

@@ -69,6 +69,12 @@ template <class V>
 inline V not_zero(V magnitudes) {
   return 0 - magnitudes;
 }
+template <class V>
+inline V lesser_of(V x, V y) {
+  using Signed = Vector<std::make_signed_t<std::remove_reference_t<decltype(x[0])>>>;
+  const auto u = in_bits<Signed>(x), v = in_bits<Signed>(y);
+  return in_bits<V>(u < v ? u : v);
+}
 // In the top bit: magnitudes that are greater.
 template <class F, class V>
 inline V above(V magnitudes, word bound) {
@@ -164,8 +170,7 @@ inline Words far_apart(Words x, Words y) {
 }
 // Or whether the sum may overflow.
 inline Halves far_apart(Halves x, Halves y) {
-  const Shorts u = in_bits<Shorts>(x), v = in_bits<Shorts>(y);
-  const auto lesser = in_bits<Halves>(u < v ? u : v), greater = in_bits<Halves>(u < v ? v : u);
+  const Halves lesser = lesser_of(x, y), greater = x ^ y ^ lesser;
   constexpr word limit = powers_of_two<Half>(room_for<Half>(digits<Half>));
   return ((lesser + static_cast<std::uint16_t>(limit) - greater) & ~(lesser - 1)) |
          above<Half>(greater, Half::largest - Half::unit);
@@ -218,6 +223,7 @@ template <class F, class V>
 inline V headroom(V acc, V a, V b) {
   return magnitudes<F>(acc) - magnitudes<F>(a) - magnitudes<F>(b) + static_cast<typename F::lane>(F::one);
 }
+// Up to so much, of either sign, there is room; more of singles, and c is the greater by 2^(digits + 2) at least.
 template <class F>
 constexpr int greatest_headroom = room_for<F>(digits<F>) - 1;
 
@@ -282,7 +288,8 @@ inline auto fused(const C& acc, const A& a, const B& b) {
     const auto c = acc.bits(), x = a.bits(), y = b.bits(), m = magnitudes<F>(x), n = magnitudes<F>(y);
     const auto k = magnitudes<F>(c), least = Vector<Lane>{} + static_cast<Lane>(F::unit);
     const auto apart = beyond(headroom<F>(c, x, y), powers_of_two<F>(greatest_headroom<F>)) & not_zero(k);
-    auto far = (apart | (m - least) | (n - least)) & not_zero(m) & not_zero(n);
+    const auto factor = lesser_of(m, n);
+    auto far = (apart | (factor - least)) & not_zero(factor);
     if constexpr (has_far_specials<F>) far |= specials<F>(m, n, k);
     return Measured<Lane>{far, (x ^ y) | c};
   } else if constexpr (F::bits == 16) {

@@ -1,17 +1,13 @@
 # kastarri-call: the program, what it knows, and for each width the program that calls (cmake/Profile.cmake says how these
 # find each other).
-find_package(Python3 REQUIRED COMPONENTS Interpreter)
-
 set(runner_dir lib/kastarri/call)
 file(RELATIVE_PATH KASTARRI_CALL_FILES ${CMAKE_INSTALL_FULL_BINDIR} ${CMAKE_INSTALL_FULL_DATADIR}/kastarri/call)
 file(RELATIVE_PATH KASTARRI_CALL_RUNNERS ${CMAKE_INSTALL_FULL_BINDIR} ${CMAKE_INSTALL_PREFIX}/${runner_dir})
-set(programs ${PROJECT_BINARY_DIR}/bin)
 set(tools ${PROJECT_SOURCE_DIR}/tools)
-cmake_path(ABSOLUTE_PATH KASTARRI_CALL_FILES BASE_DIRECTORY ${programs} NORMALIZE OUTPUT_VARIABLE files)
-cmake_path(ABSOLUTE_PATH KASTARRI_CALL_RUNNERS BASE_DIRECTORY ${programs} NORMALIZE OUTPUT_VARIABLE runners)
+cmake_path(ABSOLUTE_PATH KASTARRI_CALL_FILES BASE_DIRECTORY ${KASTARRI_BUILT_PROGRAMS} NORMALIZE OUTPUT_VARIABLE files)
+cmake_path(ABSOLUTE_PATH KASTARRI_CALL_RUNNERS BASE_DIRECTORY ${KASTARRI_BUILT_PROGRAMS} NORMALIZE OUTPUT_VARIABLE runners)
 file(MAKE_DIRECTORY ${files})
-configure_file(${tools}/kastarri-call.in ${programs}/kastarri-call @ONLY
-  FILE_PERMISSIONS OWNER_READ OWNER_WRITE OWNER_EXECUTE GROUP_READ GROUP_EXECUTE WORLD_READ WORLD_EXECUTE)
+kastarri_tool(kastarri-call)
 foreach(module IN ITEMS search.py values.py)
   configure_file(${tools}/call/${module} ${files}/${module} COPYONLY)
 endforeach()
@@ -35,7 +31,6 @@ file(RELATIVE_PATH to_library ${CMAKE_INSTALL_PREFIX}/${runner_dir}/${KASTARRI_B
 set_target_properties(kastarri-call PROPERTIES OUTPUT_NAME run RUNTIME_OUTPUT_DIRECTORY ${runners}/${KASTARRI_BITS}
   INSTALL_RPATH "$ORIGIN/${to_library}")
 
-install(PROGRAMS ${programs}/kastarri-call DESTINATION ${CMAKE_INSTALL_BINDIR})
-install(FILES ${files}/call.json ${tools}/call/search.py ${tools}/call/values.py
+kastarri_install(FILES ${files}/call.json ${tools}/call/search.py ${tools}/call/values.py
   DESTINATION ${CMAKE_INSTALL_DATADIR}/kastarri/call)
-install(TARGETS kastarri-call RUNTIME DESTINATION ${runner_dir}/${KASTARRI_BITS})
+kastarri_install(TARGETS kastarri-call RUNTIME DESTINATION ${runner_dir}/${KASTARRI_BITS})

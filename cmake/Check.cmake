@@ -2,10 +2,8 @@
 # list of intrinsics it has.
 set(KASTARRI_CHECK_DIR lib/kastarri/check)
 file(RELATIVE_PATH KASTARRI_CHECK_FILES ${CMAKE_INSTALL_FULL_BINDIR} ${CMAKE_INSTALL_PREFIX}/${KASTARRI_CHECK_DIR})
-set(programs ${PROJECT_BINARY_DIR}/bin)
-cmake_path(ABSOLUTE_PATH KASTARRI_CHECK_FILES BASE_DIRECTORY ${programs} NORMALIZE OUTPUT_VARIABLE files)
-configure_file(${PROJECT_SOURCE_DIR}/tools/kastarri-check.in ${programs}/kastarri-check @ONLY
-  FILE_PERMISSIONS OWNER_READ OWNER_WRITE OWNER_EXECUTE GROUP_READ GROUP_EXECUTE WORLD_READ WORLD_EXECUTE)
+cmake_path(ABSOLUTE_PATH KASTARRI_CHECK_FILES BASE_DIRECTORY ${KASTARRI_BUILT_PROGRAMS} NORMALIZE OUTPUT_VARIABLE files)
+kastarri_tool(kastarri-check)
 
 set(source ${PROJECT_SOURCE_DIR}/src/check)
 get_target_property(listed kastarri-profile LIBRARY_OUTPUT_DIRECTORY)
@@ -20,5 +18,4 @@ target_compile_options(kastarri-check PRIVATE -O1 -msse2 -mfpmath=sse -fno-excep
 target_link_options(kastarri-check PRIVATE -static-libgcc -Wl,-z,text -Wl,-z,noexecstack -Wl,--no-undefined)
 target_link_libraries(kastarri-check PRIVATE ${CMAKE_DL_LIBS})
 
-install(PROGRAMS ${programs}/kastarri-check DESTINATION ${CMAKE_INSTALL_BINDIR})
-install(TARGETS kastarri-check LIBRARY DESTINATION ${KASTARRI_CHECK_DIR}/${KASTARRI_BITS})
+kastarri_install(TARGETS kastarri-check LIBRARY DESTINATION ${KASTARRI_CHECK_DIR}/${KASTARRI_BITS})

@@ -1,13 +1,9 @@
 # kastarri-conform: the program, and what it knows and is made of, which it finds by its place relative to its own. Nothing
 # depends on the width, so packages of both widths may bring the same files.
-find_package(Python3 REQUIRED COMPONENTS Interpreter)
-
 file(RELATIVE_PATH KASTARRI_CONFORM_FILES ${CMAKE_INSTALL_FULL_BINDIR} ${CMAKE_INSTALL_FULL_DATADIR}/kastarri/conform)
-set(programs ${PROJECT_BINARY_DIR}/bin)
-cmake_path(ABSOLUTE_PATH KASTARRI_CONFORM_FILES BASE_DIRECTORY ${programs} NORMALIZE OUTPUT_VARIABLE files)
+cmake_path(ABSOLUTE_PATH KASTARRI_CONFORM_FILES BASE_DIRECTORY ${KASTARRI_BUILT_PROGRAMS} NORMALIZE OUTPUT_VARIABLE files)
 file(MAKE_DIRECTORY ${files})
-configure_file(${PROJECT_SOURCE_DIR}/tools/kastarri-conform.in ${programs}/kastarri-conform @ONLY
-  FILE_PERMISSIONS OWNER_READ OWNER_WRITE OWNER_EXECUTE GROUP_READ GROUP_EXECUTE WORLD_READ WORLD_EXECUTE)
+kastarri_tool(kastarri-conform)
 set(parts comparison.py programs.py register_access.py runtime.cpp)
 foreach(part IN LISTS parts)
   configure_file(${PROJECT_SOURCE_DIR}/tools/conform/${part} ${files}/${part} COPYONLY)
@@ -23,6 +19,5 @@ add_custom_command(OUTPUT ${files}/conform.json
   COMMENT "Listing the intrinsics for kastarri-conform" VERBATIM)
 add_custom_target(kastarri-conform ALL DEPENDS ${files}/conform.json)
 
-install(PROGRAMS ${programs}/kastarri-conform DESTINATION ${CMAKE_INSTALL_BINDIR})
 list(TRANSFORM parts PREPEND ${files}/ OUTPUT_VARIABLE installed)
-install(FILES ${files}/conform.json ${installed} DESTINATION ${CMAKE_INSTALL_DATADIR}/kastarri/conform)
+kastarri_install(FILES ${files}/conform.json ${installed} DESTINATION ${CMAKE_INSTALL_DATADIR}/kastarri/conform)

@@ -14,8 +14,7 @@ declare -A packages=(
   [release]="git clang gdb pkg-config"
   [demo]="librsvg2-bin"
   [test]="clang libclang-rt-dev valgrind gdb pkg-config help2man git chromium chromium-driver libc6-dbg:i386 libgtest-dev:i386 libbenchmark-dev:i386 libmpfr-dev:i386"
-  [test-64]="clang libclang-rt-dev valgrind gdb pkg-config help2man git chromium chromium-driver libgtest-dev:amd64 libbenchmark-dev:amd64 libmpfr-dev:amd64
-    python3-numpy python3-dev python3-pip python3-setuptools python3-wheel"
+  [test-64]="clang libclang-rt-dev valgrind gdb pkg-config help2man git chromium chromium-driver libgtest-dev:amd64 libbenchmark-dev:amd64 libmpfr-dev:amd64 python3-numpy python3-dev python3-pip python3-setuptools python3-wheel"
   [python]="python3-numpy python3-dev python3-pip python3-setuptools python3-wheel python3-matplotlib"
   [picture]="chromium chromium-driver"
   [check]="clang-format valgrind libc6-dbg:i386"

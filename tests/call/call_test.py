@@ -44,7 +44,7 @@ ANSWERS = [
     ("RK_READ_IPQ", ["the input queue gives 41", "result = 41"]),
     ("RK_WRITE_OPQ 9", ["the output queue takes 9"]),
     ("RK_NOP", []),
-    ("--version", ["kastarri "]),
+    ("--version", ["kastarri-call "]),
     ("--help MULANX16", ["void ZRA_MULANX16(qv_vecNx48& acc, const qv_vecNx16& a, const qv_vecNx16& b)", "lane i of acc = ",
                          "operands: acc (qv_vecNx48), a (qv_vecNx16), b (qv_vecNx16)"]),
     ("--list ADDSNX16", ["ADDSNX16 "]),

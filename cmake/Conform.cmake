@@ -3,7 +3,7 @@
 file(RELATIVE_PATH KASTARRI_CONFORM_FILES ${CMAKE_INSTALL_FULL_BINDIR} ${CMAKE_INSTALL_FULL_DATADIR}/kastarri/conform)
 cmake_path(ABSOLUTE_PATH KASTARRI_CONFORM_FILES BASE_DIRECTORY ${KASTARRI_BUILT_PROGRAMS} NORMALIZE OUTPUT_VARIABLE files)
 file(MAKE_DIRECTORY ${files})
-kastarri_tool(kastarri-conform)
+kastarri_tool(kastarri-conform ${files}/conform.json)
 set(parts comparison.py programs.py register_access.py runtime.cpp)
 foreach(part IN LISTS parts)
   configure_file(${PROJECT_SOURCE_DIR}/tools/conform/${part} ${files}/${part} COPYONLY)

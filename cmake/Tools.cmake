@@ -13,7 +13,7 @@ set(KASTARRI_BUILT_PROGRAMS ${PROJECT_BINARY_DIR}/bin)
 cmake_path(ABSOLUTE_PATH KASTARRI_DATA BASE_DIRECTORY ${KASTARRI_BUILT_PROGRAMS} NORMALIZE OUTPUT_VARIABLE KASTARRI_BUILT_DATA)
 file(MAKE_DIRECTORY ${KASTARRI_BUILT_DATA})
 
-# kastarri_tool(<name>)
+# kastarri_tool(<name> [<file that it reads for --help> ...])
 function(kastarri_tool name)
   set(source ${PROJECT_SOURCE_DIR}/tools/${name}.in)
   set(program ${KASTARRI_BUILT_PROGRAMS}/${name})
@@ -23,10 +23,10 @@ function(kastarri_tool name)
   # What it is for, in a line: the first of the text that --help shows.
   file(STRINGS ${source} summary REGEX "^\"\"\".*\\.$" LIMIT_COUNT 1)
   string(REGEX REPLACE "^\"\"\"(.*)\\.$" "\\1" summary "${summary}")
-  kastarri_man_page(${name} ${program} "${summary}")
+  kastarri_man_page(${name} ${program} "${summary}" ${ARGN})
 endfunction()
 
-# kastarri_man_page(<name> <program> <what it is for>)
+# kastarri_man_page(<name> <program> <what it is for> [<file that it reads for --help> ...])
 function(kastarri_man_page name program summary)
   if(NOT KASTARRI_HELP2MAN)
     return()
@@ -36,7 +36,7 @@ function(kastarri_man_page name program summary)
   add_custom_command(OUTPUT ${page}
     COMMAND ${CMAKE_COMMAND} -E env PROGRAM=${program} ${KASTARRI_HELP2MAN}
       --no-info --source=kastarri --name=${summary} --output=${page} ${PROJECT_SOURCE_DIR}/tools/for_help2man.sh
-    DEPENDS ${program} COMMENT "Writing the man page of ${name}" VERBATIM)
+    DEPENDS ${program} ${ARGN} COMMENT "Writing the man page of ${name}" VERBATIM)
   add_custom_target(${name}-man ALL DEPENDS ${page})
   kastarri_install(FILES ${page} DESTINATION ${CMAKE_INSTALL_MANDIR}/man1)
 endfunction()

@@ -20,19 +20,10 @@ struct ExactSingles {
 struct ExactDoubles {  // great and tiny ones are left
   Doubles lower, upper;
 };
-// Also bit 31 of the lanes for which it is neither.
-template <class Exact>
-struct ExactBut {
-  Exact value;
-  Words left;
-};
-
 // What measured operands of a sum yield.
 template <class Lane>
 struct Measured {
-  // In the top bit: lanes that cannot be computed as near, as exponents tell, and those of them without a 0, which is
-  // near to any number.
-  Vector<Lane> far, far_without_zero;
+  Vector<Lane> far;          // in the top bit: lanes that cannot be computed as near; a 0 is near to any number
   Vector<Lane> either_sign;  // there too: the signs of both terms together
 };
 template <class T>
@@ -46,10 +37,16 @@ constexpr bool measures = [] {
   return false;
 }();
 
-// Lanes beyond +-limit; no lane is as far off as to come round.
-template <class Lane>
-inline Vector<Lane> beyond(Vector<Lane> x, word limit) {
-  return (static_cast<Lane>(limit) - x) | (static_cast<Lane>(limit) + x);
+// Bits of a number of F, and of one in the format that sums are computed in.
+template <class F>
+constexpr int digits = F::fraction_bits + 1;
+template <class F>
+constexpr int wide_digits = F::bits == 16 ? 24 : 53;
+// By how many powers of two a term of so many bits may be the lesser: its last bit has room beside the first of the
+// greater one and a carry.
+template <class F>
+constexpr int room_for(int bits) {
+  return wide_digits<F> - bits - 1;
 }
 
 template <class F>
@@ -61,17 +58,22 @@ inline V magnitudes(V bits) {
   return bits & static_cast<typename F::lane>(F::sign - 1);
 }
 
-// Singles that have been computed, as doubles.
-inline ExactDoubles as_doubles(Words singles) {
-  alignas(64) float each[step];
-  store_register(each, 0, singles);
-  return {doubles_at(each), doubles_at(each + half_a_step)};
+// In the top bit: lanes beyond +-limit; no lane is as far off as to come round.
+template <class V>
+inline V beyond(V x, word limit) {
+  using Lane = std::remove_reference_t<decltype(x[0])>;
+  return (static_cast<Lane>(limit) - x) | (static_cast<Lane>(limit) + x);
 }
-
 // In the top bit: magnitudes that are not 0.
 template <class V>
 inline V not_zero(V magnitudes) {
   return 0 - magnitudes;
+}
+template <class V>
+inline V lesser_of(V x, V y) {
+  using Signed = Vector<std::make_signed_t<std::remove_reference_t<decltype(x[0])>>>;
+  const auto u = in_bits<Signed>(x), v = in_bits<Signed>(y);
+  return in_bits<V>(u < v ? u : v);
 }
 // In the top bit: magnitudes that are greater.
 template <class F, class V>
@@ -92,85 +94,93 @@ template <class F>
 constexpr bool has_far_specials = F::bits == 16;
 #endif
 
-// Operands of the long way: 0 where they would raise flags of the host, in lanes that are left.
-struct Tame {
-  Words bits;
-  Words left;  // in the top bit
+// --- Sums ---------------------------------------------------------------------------------------------
+// Of the lesser of two terms far apart it counts between which of the numbers that decide the rounding the sum lies: it
+// may be any other term that leaves the sum there, one that has room. In decimal, rounded to whole numbers:
+// 1000 + 0.500000123 may be 1000 + 0.51.
+
+constexpr word powers = Single::infinity;
+
+inline Words ones_where(Integers mask) { return in_bits<Words>(mask); }
+inline Integers integers_of(Words x) { return in_bits<Integers>(x); }
+inline Words at_least(Words x, Words bound) {
+  return chosen(ones_where(integers_of(x) < integers_of(bound)), bound, x);
+}
+// A magnitude as that of x, whose sign it takes: 0 stays 0.
+inline Words in_place_of(Words x, Words magnitude) {
+  return (magnitude & ones_where((x & single_magnitude) != 0)) | (x & single_sign);
+}
+
+// x, but at least Below powers of two below the power of two in y.
+template <int Below>
+inline Words lifted(Words x, Words y) {
+  return in_place_of(x, at_least(x & single_magnitude, (y & powers) - powers_of_two<Single>(Below)));
+}
+
+// A magnitude rounded to odd (Boldo and Melquiond) at a power of two q: cut to a multiple of q and, where that cuts
+// anything, made an odd one, so that it lies between the same multiples of 2q as before. It is q, or 2q at least. (Of
+// subnormal numbers a bit more is cut.)
+inline Words odd_multiple(Words x, Words q) {
+  // 2^n for n bits to be cut off.
+  const Words excess = q - (x & powers) + (Single::one + powers_of_two<Single>(Single::fraction_bits));
+  const Words cut = integers_toward_zero(in_bits<Singles>(at_least(excess, Words{} + Single::one))) - 1;
+  return (x | ((x & cut) + cut)) & ~cut;
+}
+
+// Singles that have been computed, as an operand.
+struct NearSingles {
+  static constexpr Reach reach = Reach::near;
+  Words bits() const { return singles; }
+  Doubles lower() const { return doubles_of<0>(singles); }
+  Doubles upper() const { return doubles_of<1>(singles); }
+
+  Words singles;
 };
+
+// A sum whose greater term is 2^e or more is rounded at multiples of 2^(e - digits - 1), which are results or halfway
+// between two. A lesser term that is nearer to 0 than that may be half of it: 2 * digits + 2 bits, for nothing is
+// carried.
 template <class F>
-inline Tame tame(Words singles) {
-  const Words magnitude = singles & single_magnitude;
-  Words left = widened_largest<F> - magnitude;
-  if constexpr (F::bits == 32) left |= (magnitude - F::unit) & (0 - magnitude);  // subnormal
-  return {singles & ~sign_masks(left), left};
-}
-
-// x + y, or a number that rounds as it does to 24 bits (of doubles) or 11 (of singles), in every mode. x and y have at
-// most 48 bits, or 22. The arithmetic is exact, so it raises no flag.
-//
-// Let 2^e be the power of two in the greater number. Its bits, and the numbers halfway between two results, are all
-// multiples of 2^(e - 50), or 2^(e - 21). So the lesser number may be any other between the same two such multiples:
-// what it has below half of that is cut off, with the last bit that is kept as a sticky bit, which is set where that
-// cuts anything. Where nothing would be kept it is that half. The sum then has room in 53 bits, or 24. (Where something
-// is cut off the lesser is the lesser by far, and at least 2^(e - 1) is left of a difference.)
-//
-// Example, in decimal, rounded to whole numbers: 1000 + 0.500000123 may be 1000 + 0.51.
-template <class V, class Bits>
-inline V sum_with_room(V x, V y) {
-  using Bit = std::remove_reference_t<decltype(Bits{}[0])>;
-  constexpr int fraction_bits = sizeof(Bit) == 8 ? 52 : Single::fraction_bits;
-  constexpr Bit one = 1, sign = one << (8 * sizeof(Bit) - 1), unit = one << fraction_bits, powers = sign - unit;
-  constexpr Bit bits_of_one = (sign >> 1) - unit;
-  const auto bits = [](auto v) { return in_bits<Bits>(v); };
-  const auto number = [](Bits v) { return in_bits<V>(v); };
-
-  const Bits swapped = (bits(x) ^ bits(y)) & bits(number(bits(x) & ~sign) < number(bits(y) & ~sign));
-  const Bits greater = bits(x) ^ swapped, lesser = bits(y) ^ swapped, power = greater & powers;
-  const Bits magnitude = lesser & ~sign, half = power - (fraction_bits - 1) * unit;
-  const Bits lifted = chosen(bits(number(magnitude) < number(half + unit)), half, magnitude);
-  // For n bits to be cut off, 1 to fraction_bits: 2^n, and 2^n - 1 from the last bits of 2^fraction_bits + 2^n.
-  const V cut_power = number(power - (lifted & powers) + (bits_of_one + unit));
-  const V shift = V{} + static_cast<decltype(x[0] + 0)>(unit);
-  const Bits cut = bits(shift + cut_power) - (bits(shift) + 1);
-  const Bits kept = (lifted | ((lifted & cut) + cut)) & ~cut;
-  return number(greater) + number((kept & bits(number(magnitude) != 0)) | (lesser & sign));
-}
-inline ExactDoubles sum_with_room(const ExactDoubles& x, const ExactDoubles& y) {
-  return {sum_with_room<Doubles, DoubleBits>(x.lower, y.lower), sum_with_room<Doubles, DoubleBits>(x.upper, y.upper)};
-}
+constexpr int lift = digits<F> + 2;
 
 template <class A, class B>
 inline auto sum_of_halves(const A& a, const B& b) {
   if constexpr (A::reach == Reach::near) {
     return ExactSingles<Left::none>{a.value() + b.value()};
   } else {
-    const Tame x = tame<Half>(words_of(a.value())), y = tame<Half>(words_of(b.value()));
-    const Singles sum = sum_with_room<Singles, Words>(in_bits<Singles>(x.bits), in_bits<Singles>(y.bits));
-    return ExactBut<ExactSingles<Left::great>>{{sum}, x.left | y.left};
+    const Words x = words_of(a.value()), y = words_of(b.value());
+    const auto number = [](Words v) { return in_bits<Singles>(v); };
+    return ExactSingles<Left::great>{number(lifted<lift<Half>>(x, y)) + number(lifted<lift<Half>>(y, x))};
   }
 }
 
 template <class A, class B>
-inline auto sum_of_singles(const A& a, const B& b) {
+inline ExactDoubles sum_of_singles(const A& a, const B& b) {
   if constexpr (A::reach == Reach::near) {
     return ExactDoubles{a.lower() + b.lower(), a.upper() + b.upper()};
   } else {
-    const Tame x = tame<Single>(a.bits()), y = tame<Single>(b.bits());
-    return ExactBut<ExactDoubles>{sum_with_room(as_doubles(x.bits), as_doubles(y.bits)), x.left | y.left};
+    const Words x = a.bits(), y = b.bits();
+    return sum_of_singles(NearSingles{lifted<lift<Single>>(x, y)}, NearSingles{lifted<lift<Single>>(y, x)});
   }
+}
+
+// Whether magnitudes are so far apart that their sum has no room; with 0 it has always.
+inline Words far_apart(Words x, Words y) {
+  return beyond(x - y, powers_of_two<Single>(room_for<Single>(digits<Single>))) & not_zero(x) & not_zero(y);
+}
+// Or whether the sum may overflow.
+inline Halves far_apart(Halves x, Halves y) {
+  const Halves lesser = lesser_of(x, y), greater = x ^ y ^ lesser;
+  constexpr word limit = powers_of_two<Half>(room_for<Half>(digits<Half>));
+  return ((lesser + static_cast<std::uint16_t>(limit) - greater) & ~(lesser - 1)) |
+         above<Half>(greater, Half::largest - Half::unit);
 }
 
 template <class F, class A, class B>
 inline auto sum(const A& a, const B& b) {
   if constexpr (A::reach == Reach::measured) {
-    // In a format of n bits two numbers of m have room up to n - m - 1 powers of two apart, and with 0 always. Halves
-    // are also so small that their sum does not overflow.
-    using Lane = typename F::lane;
-    const auto x = magnitudes<F>(a.bits()), y = magnitudes<F>(b.bits());
-    const auto far = beyond<Lane>(x - y, powers_of_two<F>(F::bits == 16 ? 12 : 28));
-    Vector<Lane> great = {};
-    if constexpr (F::bits == 16) great = above<F>(x, F::largest - F::unit) | above<F>(y, F::largest - F::unit);
-    return Measured<Lane>{far | great, (far & not_zero(x) & not_zero(y)) | great, a.bits() | b.bits()};
+    const auto far = far_apart(magnitudes<F>(a.bits()), magnitudes<F>(b.bits()));
+    return Measured<typename F::lane>{far, a.bits() | b.bits()};
   } else if constexpr (F::bits == 16) {
     return sum_of_halves(a, b);
   } else {
@@ -184,63 +194,89 @@ inline auto product(const A& a, const B& b) {
     return ExactDoubles{a.lower() * b.lower(), a.upper() * b.upper()};
   } else if constexpr (has_far_specials<F> && A::reach == Reach::measured) {
     const auto far = specials<F>(magnitudes<F>(a.bits()), magnitudes<F>(b.bits()));
-    return Measured<typename F::lane>{far, far, {}};
+    return Measured<typename F::lane>{far, {}};
   } else {
     return ExactSingles<Left::great_and_tiny>{a.value() * b.value()};
   }
 }
 
-// Numbers with the lowest Count bits cut off where the mask is set, and the last that is kept set where that cuts
-// anything. Beside a greater number, whose sum with it is rounded two places above at least, they count as before.
-template <int Count, class V>
-inline V cut_odd(V bits, V mask) {
-  const V cut = mask & ((decltype(bits[0] + 0u){1} << Count) - 1);
-  return (bits | ((bits & cut) + cut)) & ~cut;
+// --- Fused sums ---------------------------------------------------------------------------------------
+// c + p, of which the product p = a * b has twice the digits. With 2^e and 2^f the powers of two in c and p, the sum
+// has room
+//   for all of p where e - f <= room_for(2 * digits), which is 1 for halves, 4 for singles;
+//   for its first digits + 1 bits, the last a sticky bit, up to room_for(digits), 12 or 28. They will do from e - f = 2
+//     on: what decides the rounding are multiples of 2^(e - digits - 1), the last of these bits is half of that at
+//     most.
+//   where p is the greater, up to f - e = room_for(digits). Beyond, c may be rounded to odd at 2^(f - 2 * digits), half
+//     of p's last bit: 2 * digits + 2 bits with a carry.
+
+// Products with the lowest bits cut off where the mask is set, and the last that is kept set where that cuts anything.
+template <class F, class V>
+inline V cut_odd(V product, V mask) {
+  const V cut = mask & ((decltype(product[0] + 0u){1} << room_for<F>(digits<F>)) - 1);
+  return (product | ((product & cut) + cut)) & ~cut;
 }
 
-// Of acc + a * b, with normal factors: by how many powers of two acc is the greater, as exponents tell with fractions
-// for their logarithms. It is more than the difference of exponents less 1, and less than that plus 1.18.
+// e - f of numbers whose exponents say it, with fractions for their logarithms. It is more than e - f - 1, and less
+// than e - f + 1.18: fractions u and v of the factors count u + v, of which a product of 2 or more has at least 0.82.
 template <class F, class V>
 inline V headroom(V acc, V a, V b) {
   return magnitudes<F>(acc) - magnitudes<F>(a) - magnitudes<F>(b) + static_cast<typename F::lane>(F::one);
 }
+// Up to so much, of either sign, there is room; more of singles, and c is the greater by 2^(digits + 2) at least.
+template <class F>
+constexpr int greatest_headroom = room_for<F>(digits<F>) - 1;
 
-// acc + a * b for halves.
 template <class C, class A, class B>
 inline auto fused_halves(const C& acc, const A& a, const B& b) {
+  const Singles product = a.value() * b.value();
+  const Words c = words_of(acc.value()), p = words_of(product);
+  const auto sum_of = [](Words x, Words y) {
+    return ExactSingles<Left::great_and_tiny>{in_bits<Singles>(x) + in_bits<Singles>(y)};
+  };
   if constexpr (C::reach == Reach::near) {
-    // In singles there is room if p, of 22 bits, is at most twice below c; where it is lower, its first 12 do.
-    const Singles c = acc.value(), p = a.value() * b.value();
-    const auto bound = in_bits<Integers>((magnitudes<Single>(words_of(p)) | (Single::unit - 1)) + Single::unit);
-    const auto below = in_bits<Words>(in_bits<Integers>(magnitudes<Single>(words_of(c))) > bound);
-    return ExactSingles<Left::great_and_tiny>{c + in_bits<Singles>(cut_odd<12>(words_of(p), below))};
+    constexpr word room = powers_of_two<Single>(room_for<Half>(2 * digits<Half>));
+    const auto bound = integers_of((magnitudes<Single>(p) | (Single::unit - 1)) + room);
+    return sum_of(c, cut_odd<Half>(p, ones_where(integers_of(magnitudes<Single>(c)) > bound)));
   } else {
-    const Tame c = tame<Half>(words_of(acc.value()));
-    const Tame x = tame<Half>(words_of(a.value())), y = tame<Half>(words_of(b.value()));
-    const Singles p = in_bits<Singles>(x.bits) * in_bits<Singles>(y.bits);
-    const Singles sum = sum_with_room<Singles, Words>(in_bits<Singles>(c.bits), p);
-    return ExactBut<ExactSingles<Left::great_and_tiny>>{{sum}, c.left | x.left | y.left};
+    const auto is_less = integers_of(magnitudes<Single>(c)) < integers_of(magnitudes<Single>(p));
+    const Words swapped = (c ^ p) & ones_where(is_less), greater = c ^ swapped, lesser = p ^ swapped;
+    const Words m = magnitudes<Single>(lesser), q = (greater & powers) - powers_of_two<Single>(2 * digits<Half>);
+    const Words kept = chosen(ones_where(integers_of(m) < integers_of(q + Single::unit)), q, m);
+    return sum_of(greater, in_place_of(lesser, odd_multiple(kept, q)));
   }
 }
 
-// acc + a * b for singles.
 template <class C, class A, class B>
-inline auto fused_singles(const C& acc, const A& a, const B& b) {
+inline ExactDoubles fused_singles(const C& acc, const A& a, const B& b) {
+  const Words c = acc.bits(), x = a.bits(), y = b.bits();
   if constexpr (C::reach == Reach::near) {
-    // From 3 powers of two on the product may be cut; up to 4 there is room for all of it. (An acc of 0 is never ahead
-    // of a product that is a normal number.)
-    const auto ahead = in_bits<Integers>(headroom<Single>(acc.bits(), a.bits(), b.bits()));
-    const auto below = in_bits<Words>(ahead > static_cast<std::int32_t>(powers_of_two<Single>(7) / 2));
+    constexpr word room = powers_of_two<Single>(room_for<Single>(2 * digits<Single>));
+    const Words below = ones_where(integers_of(headroom<Single>(c, x, y)) > std::int32_t{room});
     const auto cut = [](Doubles p, DoubleBits masks) {
-      return in_bits<Doubles>(cut_odd<rest_bits>(in_bits<DoubleBits>(p), masks));
+      return in_bits<Doubles>(cut_odd<Single>(in_bits<DoubleBits>(p), masks));
     };
     return ExactDoubles{acc.lower() + cut(a.lower() * b.lower(), pair_masks<0>(below)),
                         acc.upper() + cut(a.upper() * b.upper(), pair_masks<1>(below))};
   } else {
-    const Tame c = tame<Single>(acc.bits()), x = tame<Single>(a.bits()), y = tame<Single>(b.bits());
-    const ExactDoubles u = as_doubles(x.bits), v = as_doubles(y.bits);
-    const ExactDoubles p = {u.lower * v.lower, u.upper * v.upper};
-    return ExactBut<ExactDoubles>{sum_with_room(as_doubles(c.bits), p), c.left | x.left | y.left};
+    const Words m = magnitudes<Single>(x), n = magnitudes<Single>(y), k = magnitudes<Single>(c);
+    // Unsigned words are compared with their top bits turned: m + n takes all 32, and v - 1 puts 0 above all numbers.
+    constexpr word top = Single::sign, ahead = Single::one - powers_of_two<Single>(greatest_headroom<Single>);
+    const auto is_less = [](Words v, Words bound) {
+      return ones_where(integers_of(v + top) < integers_of(bound + top));
+    };
+    const auto is_number = [&](Words v) { return is_less(v - 1, Words{} + (Single::infinity - 1)); };
+    const Words counts = is_number(m) & is_number(n);  // 0 and infinities stay what they are
+    // The power of two in p or the one below it, but none below the normal numbers, beside which c is whole.
+    const Words p = m + n - Single::one, power = p & powers & ~sign_masks(p) & counts;
+    // Where p is the lesser, 2^-lift of c's power of two, or half of that, in place of it.
+    const Words below = is_less(m + n, k + ahead) & counts;
+    const Words u = chosen(below, (x & single_sign) | (k & powers) | Single::unit, x);
+    const Words v = chosen(below, (y & single_sign) | single_bits_of_power(-lift<Single> - 1), y);
+    // (At 2^-50 of p's power of two, two places below 2^-48, as that power may be told too small, c too great.)
+    const Words q = power - powers_of_two<Single>(2 * digits<Single> + 2);
+    const Words near_c = in_place_of(c, odd_multiple(at_least(k, q + Single::unit), q));
+    return fused_singles(NearSingles{near_c}, NearSingles{u}, NearSingles{v});
   }
 }
 
@@ -251,12 +287,11 @@ inline auto fused(const C& acc, const A& a, const B& b) {
     using Lane = typename F::lane;
     const auto c = acc.bits(), x = a.bits(), y = b.bits(), m = magnitudes<F>(x), n = magnitudes<F>(y);
     const auto k = magnitudes<F>(c), least = Vector<Lane>{} + static_cast<Lane>(F::unit);
-    const auto apart = beyond<Lane>(headroom<F>(c, x, y), powers_of_two<F>(F::bits == 16 ? 11 : 26));
-    const auto subnormal = (m - least) | (n - least);
-    Vector<Lane> special = {};
-    if constexpr (has_far_specials<F>) special = specials<F>(m, n, k);
-    const auto without_zero = not_zero(m) & not_zero(n) & ((apart & not_zero(k)) | subnormal);
-    return Measured<Lane>{apart | subnormal | special, without_zero | special, (x ^ y) | c};
+    const auto apart = beyond(headroom<F>(c, x, y), powers_of_two<F>(greatest_headroom<F>)) & not_zero(k);
+    const auto factor = lesser_of(m, n);
+    auto far = (apart | (factor - least)) & not_zero(factor);
+    if constexpr (has_far_specials<F>) far |= specials<F>(m, n, k);
+    return Measured<Lane>{far, (x ^ y) | c};
   } else if constexpr (F::bits == 16) {
     return fused_halves(acc, a, b);
   } else {
@@ -296,9 +331,6 @@ struct WholeNumber {
   Words bits, magnitudes;  // the magnitudes are those of what has been rounded
   Words dropped;
 };
-
-inline Words ones_where(Integers mask) { return in_bits<Words>(mask); }
-inline Integers integers_of(Words x) { return in_bits<Integers>(x); }
 
 inline Words at_most(Words x, std::int32_t bound) {
   const auto bounds = Integers{} + bound;

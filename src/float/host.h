@@ -8,7 +8,7 @@
 //   halves    are computed as singles, 24 bits, in which every half is a number and the product of two exact;
 //   singles   as doubles, 53 bits, in which the product of two is exact;
 //   sums      have room there when the exponents of their terms are near, which is measured before; when a lane's are
-//             not, the vector is computed in the long way, in which the lesser term is made to fit (sum_with_room).
+//             not, the vector is computed by itself (Reach::any) with terms that have room in place of the lesser ones.
 //
 // Lanes for which this does not hold are left to the reference: operands or results that are infinite or
 // NaNs, results that overflow or come near, tiny ones that need not be exact. They, and subnormal operands, raise
@@ -137,14 +137,6 @@ inline auto settled(const ExactDoubles& x, const Mode& mode) {
   }
 }
 
-template <class F, class Exact, class Mode>
-inline auto settled(const ExactBut<Exact>& x, const Mode& mode) {
-  auto result = settled<F>(x.value, mode);
-  const Words masks = sign_masks(x.left), left = result.paired ? in_lane_order(masks) : masks;
-  result.magnitudes |= left & single_magnitude;
-  result.dropped &= ~left;
-  return result;
-}
 // A half that is rounded to an integer is a half.
 template <class F, class Mode>
 inline auto settled(const WholeNumber& x, const Mode&) {
@@ -186,16 +178,6 @@ template <class F, class... Ls, class Rule, class... Units>
     far |= rule(Lanes<Ls, Reach::measured>(operands, from)...).far;
   return any_sign<Lane>(far);
 }
-// The same of lanes without a 0.
-template <class F, class... Ls, class Rule, class... Units>
-[[gnu::noinline, gnu::flatten]] bool any_far_without_zero(Rule rule, const Units*... operands) {
-  using Lane = typename F::lane;
-  Vector<Lane> far = {};
-  for (int from = 0; from < std::min({Ls::count...}); from += lanes_in_register<Lane>)
-    far |= rule(Lanes<Ls, Reach::measured>(operands, from)...).far_without_zero;
-  return any_sign<Lane>(far);
-}
-
 // What a vector computed on the unit tells: the flags to raise, and whether a lane is left to the reference.
 struct HostResult {
   word flags;
@@ -325,7 +307,7 @@ template <class R, Reach Are, class... Ls, class Results, class Mode, class Rule
   return {any_bit(dropped) ? word{inexact} : 0, results.left != 0};
 }
 
-// The long way, by itself.
+// Terms far apart, by themselves.
 template <class R>
 struct FarResults {
   RegisterResults<R> results;
@@ -344,8 +326,7 @@ template <class R, class... Ls, class Mode, class Results, class Rule, class... 
                                                                   const Units*... operands) {
   if constexpr (measures<Rule, Lanes<Ls, Reach::measured>...>) {
     using F = format_of<R>;
-    if (__builtin_expect(any_far<F, Ls...>(rule, operands...), 0) &&
-        any_far_without_zero<F, Ls...>(rule, operands...)) {
+    if (__builtin_expect(any_far<F, Ls...>(rule, operands...), 0)) {
       const FarResults<R> far = far_on_host<R, Ls...>(mode, rule, operands...);
       for (int k = 0; k < registers_of<R>; ++k) results.number[k] = far.results.number[k];
       results.left = far.results.left;

@@ -47,7 +47,18 @@ inline Doubles doubles_at(const float* singles) {
   return in_bits<Doubles>(_mm_cvtps_pd(_mm_castpd_ps(_mm_load_sd(reinterpret_cast<const double*>(singles)))));
 #endif
 }
-// Of integers whose bits are the words with those of `turned` turned.
+// The same of singles in a register.
+template <int Half>
+inline Doubles doubles_of(Words singles) {
+  const auto v = in_bits<Register>(singles);
+#ifdef __AVX2__
+  return in_bits<Doubles>(_mm256_cvtps_pd(_mm_castsi128_ps(_mm256_extracti128_si256(v, Half))));
+#else
+  return in_bits<Doubles>(_mm_cvtps_pd(_mm_castsi128_ps(Half == 0 ? v : _mm_unpackhi_epi64(v, v))));
+#endif
+}
+
+// And of integers at an address whose bits are the words with those of `turned` turned.
 inline Doubles doubles_at(const in_memory<word>* words, word turned) {
   const auto* at = reinterpret_cast<const __m128i*>(words);
   const __m128i turn = _mm_set1_epi32(static_cast<int>(turned));

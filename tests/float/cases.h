@@ -76,13 +76,37 @@ inline Bits short_number(const exact::Format& f, Bits x, std::mt19937& random) {
 
 // The fractions of two numbers whose product, as one of integers, ends in many zeros and a one.
 inline std::pair<Bits, Bits> nearly_short_product(const exact::Format& f, std::mt19937& random) {
-  const Bits zeros = 16 * f.unit() - 1;
+  const Bits zeros = (f.width == 16 ? 16 : 64) * f.unit() - 1;
   for (;;) {
     const Bits x = f.unit() + (random() % f.unit() | 1);
     Bits inverse = 1;
     for (int bits = 1; bits < 32; bits *= 2) inverse *= 2 - x * inverse;
     const Bits y = f.unit() + inverse % f.unit();
     if ((x * y & zeros) == 1) return {x - f.unit(), y - f.unit()};
+  }
+}
+
+// acc, of few powers, and two factors whose product it takes to a tie but for its own last bit: what is lost of acc
+// beside the product, or of the product, makes a tie of the sum. The product is a little more than a power of two, acc
+// a little less than one, so that their exponents alone say least of how far they are apart.
+inline void add_near_ties(std::vector<Case>& all, const exact::Format& f, std::mt19937& random) {
+  const int p = f.precision;
+  const Bits one = static_cast<Bits>(1 - f.least) * f.unit();
+  for (int exponent = p - 3; exponent > p - 10 && exponent - 2 * p + 2 >= f.least; --exponent) {
+    for (int found = 0; found < 12;) {
+      const std::uint64_t x = f.unit() + f.unit() / 3 + random() % (f.unit() / 5);
+      const std::uint64_t y = (std::uint64_t{1} << (2 * p - 1)) / x + 1 + random() % (f.unit() >> 7);
+      const std::uint64_t tie = std::uint64_t{1} << (p - 1), rest = x * y % (2 * tie),
+                          beyond = std::uint64_t{1} << exponent;
+      const std::uint64_t apart = rest > tie ? rest - tie : tie - rest;
+      if (apart < beyond + beyond * 7 / 8 || apart >= 2 * beyond) continue;
+      const auto fraction = static_cast<Bits>((apart - beyond) << (p - 1 - exponent));
+      const Bits acc =
+          one + static_cast<Bits>(exponent - 2 * p + 2) * f.unit() + fraction + (rest > tie ? f.sign() : 0);
+      for (const Bits moved : {acc - 1, acc, acc + 1})
+        all.push_back({moved, one - f.unit() + static_cast<Bits>(x), one - f.unit() + static_cast<Bits>(y)});
+      ++found;
+    }
   }
 }
 
@@ -184,6 +208,7 @@ inline std::vector<Case> cases(const exact::Format& f, int operands) {
          x, y});
     all.push_back({x, short_number(f, any(), random), one - static_cast<Bits>(f.precision) * f.unit()});
   }
+  if (operands == 3) add_near_ties(all, f, random);
   if (operands > 1) add_registers_by_distance(all, f, operands, random);
   return all;
 }

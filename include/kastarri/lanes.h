@@ -16,6 +16,8 @@
 #ifndef KASTARRI_LANES_H
 #define KASTARRI_LANES_H
 
+#include "kastarri/library.h"
+
 #include <array>
 #include <cassert>
 #include <cstddef>

@@ -194,7 +194,7 @@ class Intrinsic:
             seeded = 6
         loops = math.ceil(corners ** meeting / lanes) + seeded if types else 1
         if self.memory:
-            loops = 16 if not self.immediates else 6
+            loops = 24 if not self.immediates else 14
         return loops * modes * patterns, modes, patterns, lanes, meeting
 
     # --- Text ---

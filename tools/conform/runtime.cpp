@@ -375,7 +375,6 @@ inline void fill_memory(unsigned bits, int kind) {
     write_lane(memory + i * width / 8, width);
   }
   place = memory + PLACE;
-  ++operands;
   show("", "memory", memory, MEMORY * 8 / bits, bits);
 }
 

@@ -27,7 +27,10 @@ class Programs(unittest.TestCase):
         # Inlined, program 24 of this seed once gathered what the stack held where a predicate was 0 (32 bits, g++).
         result = run(FUZZ, BUILD, "--programs", "2000", "--seed", "1", "--inlined", "30")
         self.assertEqual(result.returncode, 0, result.stdout)
-        self.assertRegex(result.stdout, r"seed 1: 2000 programs, \d+ calls of (\d+) of \1 intrinsics, .*: all the same\n")
+        self.assertTrue(result.stdout.endswith(": all the same\n"), result.stdout)
+        called, intrinsics = map(int, re.search(r"seed 1: 2000 programs, \d+ calls of (\d+) of (\d+) intrinsics", result.stdout).groups())
+        self.assertGreater(intrinsics, 2500)
+        self.assertGreater(called, 0.99 * intrinsics)
 
     def test_a_seed_gives_the_same_programs_wherever_they_begin(self):
         library = fuzz.called_of(BUILD)[0]

@@ -62,7 +62,7 @@ class Programs(unittest.TestCase):
 class Faults(unittest.TestCase):
     def found(self, fault, intrinsic, most_steps):
         """What is printed of a program that differs, and the program."""
-        result = run(FUZZ, BUILD, "--seconds", "100", "--inlined", "0", "--preload", WRONG, WRONG=fault)
+        result = run(FUZZ, BUILD, "--programs", "20000", "--inlined", "0", "--preload", WRONG, WRONG=fault)
         self.assertEqual(result.returncode, 1, result.stdout)
         said, _, program = result.stdout.partition("#include")
         program = "#include" + program[:program.rindex("\n}\n") + 3]

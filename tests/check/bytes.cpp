@@ -50,7 +50,10 @@ class Row {
 
   void check() {
     for (int round = 0; round < 40; ++round) check_once(round);
-    expect(2 * written_ >= named_written_ && 2 * read_ >= named_read_, "names bytes that it does not touch");
+    // Of an element that is incremented the lowest byte changes, and seldom another.
+    const bool increments = std::strstr(row_.name, "SCATTERINC") != nullptr;
+    expect(10 * written_ >= (increments ? 2 : 9) * named_written_, "writes less than it names");
+    expect(20 * read_ >= 11 * named_read_, "reads less than it names");  // 24 bits of a word, say
     expect(named_written_ + named_read_ > 0, "names no byte");
   }
 

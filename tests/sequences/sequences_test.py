@@ -27,7 +27,10 @@ class Programs(unittest.TestCase):
         # Inlined, program 24 of this seed once gathered what the stack held where a predicate was 0 (32 bits, g++).
         result = run(FUZZ, BUILD, "--programs", "2000", "--seed", "1", "--inlined", "30")
         self.assertEqual(result.returncode, 0, result.stdout)
-        self.assertRegex(result.stdout, r"seed 1: 2000 programs, \d+ calls of (\d+) of \1 intrinsics, .*: all the same\n")
+        self.assertTrue(result.stdout.endswith(": all the same\n"), result.stdout)
+        called, intrinsics = map(int, re.search(r"seed 1: 2000 programs, \d+ calls of (\d+) of (\d+) intrinsics", result.stdout).groups())
+        self.assertGreater(intrinsics, 2500)
+        self.assertGreater(called, 0.99 * intrinsics)
 
     def test_a_seed_gives_the_same_programs_wherever_they_begin(self):
         library = fuzz.called_of(BUILD)[0]
@@ -59,7 +62,7 @@ class Programs(unittest.TestCase):
 class Faults(unittest.TestCase):
     def found(self, fault, intrinsic, most_steps):
         """What is printed of a program that differs, and the program."""
-        result = run(FUZZ, BUILD, "--seconds", "100", "--inlined", "0", "--preload", WRONG, WRONG=fault)
+        result = run(FUZZ, BUILD, "--programs", "20000", "--inlined", "0", "--preload", WRONG, WRONG=fault)
         self.assertEqual(result.returncode, 1, result.stdout)
         said, _, program = result.stdout.partition("#include")
         program = "#include" + program[:program.rindex("\n}\n") + 3]

@@ -1,5 +1,8 @@
 # The package kastarri of Python, laid out in the build tree as it is installed: modules, the extension, the library.
 # KASTARRI_PYTHON is the Python that it is for, which has NumPy; that of the system goes before others.
+if(NOT KASTARRI_BITS EQUAL 64)
+  message(FATAL_ERROR "KASTARRI_BUILD_PYTHON needs KASTARRI_BITS=64, as wide as Python")
+endif()
 find_program(KASTARRI_PYTHON python3 PATHS /usr/bin NO_DEFAULT_PATH)
 find_program(KASTARRI_PYTHON python3 REQUIRED)
 set(Python_EXECUTABLE ${KASTARRI_PYTHON})

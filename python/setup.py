@@ -15,6 +15,10 @@ from setuptools.command.build_py import build_py
 ROOT = pathlib.Path(__file__).resolve().parent.parent
 
 
+if not (ROOT / "CMakeLists.txt").exists():
+    sys.exit("kastarri is built from its whole source tree, of which a source distribution has but a part: make wheels there")
+
+
 def version():
     header = (ROOT / "include" / "kastarri" / "library.h").read_text(encoding="utf-8")
     return ".".join(re.findall(r"^#define KASTARRI_VERSION_[A-Z]+ (\d+)$", header, re.M))

@@ -1,7 +1,8 @@
 #!/usr/bin/env python3
 """Compare calls from Python on blocks of 1,000 registers with loops of calls in C++.
 
-    python/bench/bench.py LOOPS      the program made of loops.cpp
+    g++ -O2 -march=native -Iinclude python/bench/loops.cpp -Lbuild/test-64 -lkastarri -Wl,-rpath,$PWD/build/test-64 -o build/loops
+    PYTHONPATH=build/test-64/python python/bench/bench.py build/loops
 
 prints nanoseconds a register, the least of many runs that alternate. Python runs twice: into new arrays, and with out=,
 which is the operand that the intrinsic changes, as in C++, or else the same array every time.

@@ -81,16 +81,33 @@ double time_of_load(R (*f)(const M*, int)) {
   });
 }
 
+struct Named {
+  const char* name;
+  double (*time)();
+};
+
+#define LOOP(NAME, ...)               \
+  Named {                             \
+#NAME, [] { return __VA_ARGS__; } \
+  }
+#define CALLED(NAME) LOOP(NAME, time_of(ZRA_##NAME))
+const Named loops[] = {CALLED(ADDNX16),
+                       CALLED(ADDSNX16),
+                       CALLED(ADDSNX16T),
+                       CALLED(LTNX16),
+                       CALLED(MULNX16),
+                       CALLED(MULANX16),
+                       CALLED(MULA2NX8),
+                       CALLED(ADDN_2XF32),
+                       CALLED(MULAN_2XF32),
+                       CALLED(RADDNX16),
+                       LOOP(SRAINX16, time_of(ZRA_SRAINX16, 3)),
+                       LOOP(PACKVRNX48, time_of(ZRA_PACKVRNX48, 4)),
+                       LOOP(LVNX16_I, time_of_load(ZRA_LVNX16_I))};
+
 double time_by_name(const std::string& name) {
-#define LOOP(NAME) \
-  if (name == #NAME) return time_of(ZRA_##NAME);
-  LOOP(ADDNX16)
-  LOOP(ADDSNX16) LOOP(ADDSNX16T) LOOP(LTNX16) LOOP(MULNX16) LOOP(MULANX16) LOOP(MULA2NX8) LOOP(ADDN_2XF32)
-      LOOP(MULAN_2XF32) LOOP(RADDNX16)
-#undef LOOP
-          if (name == "SRAINX16") return time_of(ZRA_SRAINX16, 3);
-  if (name == "PACKVRNX48") return time_of(ZRA_PACKVRNX48, 4);
-  if (name == "LVNX16_I") return time_of_load(ZRA_LVNX16_I);
+  for (const Named& loop : loops)
+    if (name == loop.name) return loop.time();
   return 0;
 }
 

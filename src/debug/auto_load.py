@@ -13,7 +13,11 @@ def _load_kastarri():
     modules = os.path.join(near, "kastarri", "gdb")
     if modules not in sys.path:
         sys.path.append(modules)
-    import kastarri_printers
+    writes, sys.dont_write_bytecode = sys.dont_write_bytecode, True  # who removes the library would not know of it
+    try:
+        import kastarri_printers
+    finally:
+        sys.dont_write_bytecode = writes
     kastarri_printers.register(library)
 
 

@@ -25,6 +25,8 @@ NOT_RUN = [
     (r"apt |dpkg ", "changes the system; package_test.py installs the packages in a root of their own"),
     (r"docker ", "needs docker and its images"),
     (r"add-auto-load-safe-path ", "a line for gdb, which print_test.py gives it"),
+    (r"pip ", "needs a wheel, of which tests/python make and install one"),
+    (r"for source in here|kastarri-conform .*(here.txt|errors.txt)", "takes minutes; conform_test.py does it with a part"),
 ]
 # What suits builds of some kind alone.
 SUITS = [
@@ -42,12 +44,17 @@ def read(path):
 
 
 def commands():
-    """(Page, command) for every line of an indented block, comments and continuations taken away."""
+    """(Page, command) for every line of an indented block, comments and continuations taken away. A loop is one command, and of
+    a session, whose commands have a prompt, what is printed is none."""
     for page in [os.path.join(ROOT, "README.md"), *sorted(glob.glob(os.path.join(ROOT, "docs", "*.md")))]:
         text = re.sub(r"^( *)```.*?^ *```", "", read(page), flags=re.M | re.S)
         text = re.sub(r" \\\n +", " ", text)
+        text = re.sub(r"; do\n +(.*)\n +done", r"; do \1; done", text)
         for block in re.findall(r"(?<=\n\n)((?: {4}.*\n)+)", text):
-            for command in re.findall(r"^ {4}(?! )(.*?)(?: +#.*)?$", block, re.M):
+            if "    >>> " in block:  # Python's, which tests/python run
+                continue
+            line = r"^ {4}\$ (.*)$" if re.search(r"^ {4}\$ ", block, re.M) else r"^ {4}(?! )(.*?)(?: +#.*)?$"
+            for command in re.findall(line, block, re.M):
                 yield os.path.relpath(page, ROOT), command
 
 
@@ -67,7 +74,8 @@ class Commands(unittest.TestCase):
             file.write(re.search(r"```cpp\n(.*?)```", read(os.path.join(ROOT, "README.md")), re.S)[1])
         places = glob.glob(path("kastarri", "lib", "**", "pkgconfig"), recursive=True)
         cls.environment = dict(os.environ, HOME=cls.directory, PKG_CONFIG_PATH=":".join(places),
-                               LD_LIBRARY_PATH=":".join(map(os.path.dirname, places)))
+                               LD_LIBRARY_PATH=":".join(map(os.path.dirname, places)),
+                               PATH=path("kastarri", "bin") + ":" + os.environ["PATH"])
 
     def run_here(self, command, **options):
         done = subprocess.run(["bash", "-c", command], stdout=subprocess.PIPE, stderr=subprocess.STDOUT, text=True, check=False,

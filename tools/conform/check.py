@@ -114,7 +114,8 @@ class Check:
         flags = [build.width, *STATIC_FLAGS[target], "-mfpmath=sse", lto]
         for level in LEVELS[1:]:
             programs = runs.compile_programs(sources, self.path("static"), build.compiler, [*flags, level], [archive])
-            self.take(f"{build.bits} bits, inlined for {target} by {os.path.basename(build.compiler)} {level}", runs.report(programs))
+            form = f"{build.bits} bits, inlined for {target} by {os.path.basename(build.compiler)} {level}"
+            self.take(form, runs.report(programs))
 
     def check(self, builds):
         sources = runs.write_programs(builds[0], self.path("sources"))

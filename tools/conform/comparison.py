@@ -82,7 +82,9 @@ class Comparison:
         def speaks(name):
             base, _, way = name.partition("/")
             only_this_way = way and base not in self.differ
-            return (base in listed and (way != "any" or not only_this_way or of_addresses)) or (of_spill and way == "spill" and only_this_way)
+            if only_this_way and way == "spill" and of_spill:
+                return True
+            return base in listed and (of_addresses or not (only_this_way and way == "any"))
 
         return [name for name in names if speaks(name)]
 
@@ -109,10 +111,10 @@ class Comparison:
 
     def write_text(self, out):
         states = collections.Counter(row.state for row in self.rows)
-        print(f"{plural(len(self.rows), 'result')}: " + ", ".join(f"{states[s]} {s}" for s in (SAME, DIFFERENT, OTHER_CASES, ONLY_A, ONLY_B)
-                                                                if states[s] or s == SAME), file=out)
+        counts = [f"{states[s]} {s}" for s in (SAME, DIFFERENT, OTHER_CASES, ONLY_A, ONLY_B) if states[s] or s == SAME]
+        print(f"{plural(len(self.rows), 'result')}: {', '.join(counts)}", file=out)
         if self.foundations():
-            print("\nPrograms fill and read registers with these, so settle them first: " + ", ".join(self.foundations()), file=out)
+            print(f"\nPrograms fill and read registers with these, so settle them first: {', '.join(self.foundations())}", file=out)
         suspects, rest = self.suspects()
         for number, (choice, names, whole) in enumerate(suspects):
             head = "This speaks first against the choice" if number == 0 else "then against"
@@ -133,7 +135,8 @@ class Comparison:
         writer = csv.writer(file, lineterminator="\n")
         writer.writerow(["name", "family", "state", "cases_a", "hash_a", "cases_b", "hash_b", "choice"])
         for row in self.rows:
-            writer.writerow([row.name, row.family, row.state, *(row.a or ("", "")), *(row.b or ("", "")), choice_of.get(row.name, "")])
+            nothing = ("", "")
+            writer.writerow([row.name, row.family, row.state, *(row.a or nothing), *(row.b or nothing), choice_of.get(row.name, "")])
 
     # --- The picture ---
 
@@ -157,7 +160,8 @@ class Comparison:
                 body.append(f'<rect x="{x:.1f}" y="{y}" width="{length:.1f}" height="20" fill="{colour}"/>')
                 x += length
             not_same = sum(counts[family].values()) - counts[family][SAME]
-            body.append(text(x + 8, y + 15, f"{sum(counts[family].values())}" + f", {not_same} not the same" * bool(not_same), 12))
+            all_of_it = f"{sum(counts[family].values())}" + f", {not_same} not the same" * bool(not_same)
+            body.append(text(x + 8, y + 15, all_of_it, 12))
         height = top + step * len(counts) + 16
         print(f'<svg xmlns="http://www.w3.org/2000/svg" viewBox="0 0 {width} {height}" width="{width}" height="{height}" '
               f'font-family="{FONT}">\n<rect width="{width}" height="{height}" fill="#ffffff"/>', *body, "</svg>", sep="\n", file=file)
@@ -210,6 +214,10 @@ def first_difference(a, b):
     return None
 
 
+def write_lane(out, name, text_of_lane):
+    print(f"    {name.removeprefix('='):<10} {text_of_lane}", file=out)
+
+
 def write_values(out, a, b):
     """Tells of the first difference of each intrinsic. Returns whether there is any."""
     ours, theirs, told = cases(a), cases(b), set()
@@ -226,10 +234,11 @@ def write_values(out, a, b):
         value, other, lane = found
         print(f"{key[0]}, case {key[1]}: {value.operand.removeprefix('=')} differs first in lane {lane}", file=out)
         for operand in mine[:mine.index(value)]:
-            shown = operand.lanes[lane] if lane < len(operand.lanes) else operand.lanes[0]
-            print(f"    {operand.operand.removeprefix('='):<10} {shown}" + f"  (lane 0 of {len(operand.lanes)})" * (lane >= len(operand.lanes) > 0), file=out)
-        for side, side_value in (("A", value), ("B", other)):
-            print(f"    {side_value.operand.removeprefix('='):<10} {' '.join(side_value.lanes[lane:lane + 1]) or 'nothing'}  in {side}", file=out)
+            has_lane = lane < len(operand.lanes)
+            note = "" if has_lane else f"  (lane 0 of {len(operand.lanes)})"
+            write_lane(out, operand.operand, operand.lanes[lane if has_lane else 0] + note)
+        for side, lanes in (("A", value.lanes), ("B", other.lanes)):
+            write_lane(out, value.operand, f"{' '.join(lanes[lane:lane + 1]) or 'nothing'}  in {side}")
     missing = sorted({f"{name}" for name, _ in ours.keys() ^ theirs.keys()} - told)
     if missing:
         print("cases that one list alone has: " + ", ".join(missing), file=out)

@@ -75,9 +75,13 @@ inline void end() {
 
 // --- Lanes --------------------------------------------------------------------------------------------
 
-// Registers are filled and read here, at addresses that suit every type.
-static qv_vecN_2x32v staged[6], stored[10];
-static unsigned char* const staging = (unsigned char*)staged;
+static qv_vecN_2x32v staged[7], stored[11];
+
+// At a multiple of 64 bytes, which suits every type and access: a compiler may align registers to less.
+inline unsigned char* aligned(void* from) { return (unsigned char*)from + (64 - (unsigned long)from % 64) % 64; }
+
+// Registers are filled and read here.
+static unsigned char* const staging = aligned(staged);
 
 static unsigned low, high;  // a lane of up to 64 bits
 
@@ -360,7 +364,7 @@ inline int distance(const char* name, int size) {
 // --- Memory -------------------------------------------------------------------------------------------
 
 enum { MEMORY = 512, PLACE = 192 };  // bytes
-static unsigned char* const memory = (unsigned char*)stored;
+static unsigned char* const memory = aligned(stored);
 static unsigned char* place;  // what pointers lead to
 
 // Integers as they come, for there are many; floats with their corners.

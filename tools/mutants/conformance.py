@@ -3,9 +3,10 @@
 
     tools/mutants/conformance.py BUILD [--faults N] [--seed N] [--only REGEX] [--target T]
 
-Planted are, in each line of a table, N faults that leave all prototypes as they are: what else would keep the programs from compiling. A fault is found
-if the line of an intrinsic whose row it is in changes, or the program ends badly. indistinguishable.txt lists those that no
-program can tell, with the reason. BUILD has a library for TARGET alone. Exit status 1 if another fault is not found.
+Planted are, in each line of a table and each expression of the scalar core, N faults that leave all prototypes as they are:
+others do not compile. A fault is found if the report's line of an intrinsic that it touches changes, or is the first that is
+missing. indistinguishable.txt lists faults that no program can tell, with the reason. BUILD has a library for TARGET alone.
+Exit status 1 if another fault is not found.
 """
 
 import argparse
@@ -106,7 +107,8 @@ def plant(arguments):
     in_cells = [m for m in cells.all_mutants(lines) if re.search(arguments.only, m.path) and m.line.kind != "TYPE"]
     with tempfile.TemporaryDirectory() as directory:
         found, touched = static.judge(directory, lines, in_cells, lambda _: None, by_names=False)
-    in_expressions = [m for m in rules.all_mutants(planting.SOURCES) if m.path.endswith(".def") and re.search(arguments.only, m.path)]
+    in_expressions = [m for m in rules.all_mutants(planting.SOURCES)
+                      if m.path.endswith(".def") and re.search(arguments.only, m.path)]
     by_line = collections.defaultdict(list)
     for mutant in planting.in_order(in_cells + in_expressions, arguments.seed):
         if mutant not in found and is_called(mutant, touched) and len(by_line[place(mutant)]) < arguments.faults:

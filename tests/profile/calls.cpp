@@ -20,7 +20,8 @@ namespace {
 const qv_vecNx16 ones =
     int32_rtor_qv_vecNx16(RK_CLAMPS(1, 7));  // called before main: CLAMPS and int32_rtor_qv_vecNx16, once each
 
-void add(int times) {
+// Not inlined, so that it is who calls.
+__attribute__((noinline)) void add(int times) {
   alignas(64) qv_vecNx16 sum = ones;
   for (int i = 0; i < times; ++i) sum = ZRA_ADDNX16(sum, ones);
   if (static_cast<short>(sum._[15] >> 16) != static_cast<short>(times + 1)) std::abort();

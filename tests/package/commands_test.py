@@ -13,12 +13,9 @@ import sys
 import tempfile
 import unittest
 
-ROOT = os.path.dirname(os.path.dirname(os.path.dirname(os.path.abspath(__file__))))
-BUILD = os.path.abspath(sys.argv.pop(1))
+from support import BITS, BUILD, CLANG, ROOT
 
-with open(os.path.join(BUILD, "CMakeCache.txt"), encoding="utf-8") as cache_file:
-    CACHE = dict(re.findall(r"^(\w+):\w+=(.*)$", cache_file.read(), re.M))
-IS_64 = CACHE["KASTARRI_BITS"] == "64"
+IS_64 = BITS == "64"
 
 # What is not run, and why. `make` is asked what it would do, and presets are looked up: CI builds what they build.
 NOT_RUN = [
@@ -33,8 +30,8 @@ SUITS = [
     (r"-m32|build/demo/|\./kernel", lambda: not IS_64, "builds for 32 bits"),
     (r"build/demo-64", lambda: IS_64, "builds for 64 bits"),
     (r"build/sanitize-64", lambda: False, "the build with sanitizers, which CI makes"),
-    (r"^clang.*-static", lambda: "clang" in CACHE["CMAKE_CXX_COMPILER"], "builds by clang"),
-    (r"^g.*-static", lambda: "clang" not in CACHE["CMAKE_CXX_COMPILER"], "builds by g++"),
+    (r"^clang.*-static", lambda: CLANG, "builds by clang"),
+    (r"^g.*-static", lambda: not CLANG, "builds by g++"),
 ]
 
 

@@ -50,9 +50,7 @@ class Write {
     lanes_[i] = canonical<L>(value);
   }
 
-  auto writer() const {
-    return [to = lanes_](int i, auto value) { to[i] = canonical<L>(value); };
-  }
+  const Write& writer() const { return *this; }
 
   void* image() const { return lanes_; }
 
@@ -64,6 +62,10 @@ class Write {
 // clearing form, which loads use, it becomes 0.
 template <class L, bool Clear>
 class Predicated {
+  // Bits come to lanes of a whole register quickest, even where the result has half of one.
+  static constexpr int bits = 8 * sizeof(typename L::container);
+  static constexpr int mask_bits = bits * L::count == 256 ? 2 * bits : bits;
+
  public:
   template <class PredicateUnit>
   Predicated(void* register_image, const PredicateUnit* predicate)
@@ -71,32 +73,35 @@ class Predicated {
     enabled_.expand(predicate);
   }
 
-  template <class V>
-  void put(int i, V value) const {
-    writer()(i, value);
-  }
+  // What a loop over lanes writes with. Beside the mask, an array, compilers would take the pointer for something that
+  // a store of lanes may change.
+  struct Writer {
+    using C = typename L::container;
+    in_memory<C>* lanes;
+    const mask_lane<mask_bits>* enabled;
 
-  // For loops: beside the mask, an array, the pointer would be taken for something that a store of lanes may change.
-  auto writer() const {
-    return [to = lanes_, enabled = enabled_.lane](int i, auto value) {
-      using C = typename L::container;
+    template <class V>
+    void put(int i, V value) const {
       const C given = canonical<L>(value), mask = static_cast<C>(enabled[i]);
       if constexpr (Clear) {
-        to[i] = static_cast<C>(given & mask);
+        lanes[i] = static_cast<C>(given & mask);
       } else if constexpr (L::count == 1) {
-        if (mask) to[i] = given;
+        if (mask) lanes[i] = given;
       } else {
-        const C kept = to[i];
-        to[i] = static_cast<C>(kept ^ ((kept ^ given) & mask));
+        const C kept = lanes[i];
+        lanes[i] = static_cast<C>(kept ^ ((kept ^ given) & mask));
       }
-    };
+    }
+  };
+
+  Writer writer() const { return {lanes_, enabled_.lane}; }
+
+  template <class V>
+  void put(int i, V value) const {
+    writer().put(i, value);
   }
 
  private:
-  // Bits come to lanes of a whole register quickest, even where the result has half of one.
-  static constexpr int bits = 8 * sizeof(typename L::container);
-  static constexpr int mask_bits = bits * L::count == 256 ? 2 * bits : bits;
-
   in_memory<typename L::container>* lanes_;
   LaneMask<mask_bits, L::count> enabled_;
 };
@@ -131,9 +136,9 @@ inline Predicated<L, Clear> result(UnitsUnder<Unit, PredicateUnit, Clear> out) {
 // result lane i = rule(operand lanes i ...), for i = 0 .. Count - 1.
 template <int Count, class Out, class Rule, class... Operands>
 inline void lanes(const Out& out, Rule rule, const Operands&... operands) {
-  const auto put = out.writer();
+  const auto writer = out.writer();
   KASTARRI_LANES_INDEPENDENT
-  for (int i = 0; i < Count; ++i) put(i, rule(operands[i]...));
+  for (int i = 0; i < Count; ++i) writer.put(i, rule(operands[i]...));
 }
 
 // Bit i of the result = rule(operand lanes i ...): comparisons. The lanes are LaneBits wide.

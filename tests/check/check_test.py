@@ -100,10 +100,11 @@ class Uninitialised(unittest.TestCase):
         return run("valgrind", "--track-origins=yes", "--error-exitcode=9", UNINITIALISED, *arguments)
 
     def test_valgrind_tells_where_a_register_matters_that_was_not_set(self):
+        # Valgrind shows a file as the compiler wrote it down: by its name, or with directories before it.
         result = self.valgrind()
         self.assertEqual(result.returncode, 9, result.stderr)
         self.assertIn("depends on uninitialised value", result.stderr)
-        self.assertRegex(result.stderr, r"created by a stack allocation\n.*main \(uninitialised\.cpp:\d+\)")
+        self.assertRegex(result.stderr, r"created by a stack allocation\n.*main \(\S*\buninitialised\.cpp:\d+\)")
         with open(os.path.join(HERE, "uninitialised.cpp"), encoding="utf-8") as file:
             line = next(number for number, text in enumerate(file, 1) if "matters here" in text)
         self.assertIn(f"uninitialised.cpp:{line})", result.stderr)

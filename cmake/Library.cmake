@@ -40,14 +40,16 @@ if(KASTARRI_SANITIZE AND KASTARRI_TARGET_COUNT GREATER 1)
 endif()
 
 # What every source of the library is compiled with. clang unrolls a loop over few lanes before it looks for vectors, and
-# then finds none: it is to unroll what has been made of vectors, up to the four of 128 bits that a register takes.
+# then finds none: it is to unroll what has been made of vectors, up to the four of 128 bits that a register takes. And
+# where the first lane that a loop loads has just been stored it takes that load out of the loop, whose other lanes then
+# fill no vectors.
 function(kastarri_compile_library target)
   target_include_directories(${target} PRIVATE ${PROJECT_SOURCE_DIR}/src)
   target_include_directories(${target} PUBLIC $<BUILD_INTERFACE:${PROJECT_SOURCE_DIR}/include>)
   target_compile_options(${target} PRIVATE
     -O3 -mfpmath=sse -ffp-contract=off -fno-exceptions -fno-rtti -fno-threadsafe-statics
     -fvisibility=hidden -mno-mmx ${KASTARRI_STACK} -Wconversion -Wmissing-declarations -Wno-psabi
-    "$<$<CXX_COMPILER_ID:Clang>:-Wmissing-prototypes;SHELL:-mllvm -unroll-full-max-count=4>")
+    "$<$<CXX_COMPILER_ID:Clang>:-Wmissing-prototypes;SHELL:-mllvm -unroll-full-max-count=4;SHELL:-mllvm -enable-load-in-loop-pre=false>")
   target_compile_options(${target} INTERFACE ${KASTARRI_WIDTH} ${KASTARRI_USER_FLAGS})
   target_link_options(${target} INTERFACE ${KASTARRI_WIDTH})
   set_target_properties(${target} PROPERTIES POSITION_INDEPENDENT_CODE ON)

@@ -33,7 +33,7 @@ constexpr auto SATURATE16 = [](std::int32_t lane) {
 #define KERNEL_store_where(OP, M, RULE, A)                                                       \
   template <class Units, class PredicateUnit, class Memory>                                      \
   static inline void KASTARRI_SEMANTIC(OP)(const Units* v, const PredicateUnit* p, Memory* to) { \
-    store_where<M>(Read<A>(v), RULE, p, to);                                                     \
+    store_where<M, A>(v, RULE, p, to);                                                           \
   }
 
 #endif

@@ -4,15 +4,15 @@
 
 #include "frame/intrinsics.h"
 #include "frame/lanes.h"
+#include "frame/registers.h"
 #include "kastarri/state.h"
 #include "kastarri/tables.h"
 
 namespace {
 
 // How the words of a merging store are governed by a predicate, lanes_a_word bits each: 4 lanes of 8 bits, 2 of 16, 1
-// of
-// 32. Of 16-bit lanes, word 3 is governed by bits 6 and 7 (first_lane[3] = 6), and the lanes 01, the lower one, are the
-// bytes 0011 (bytes[1] = 3).
+// of 32. Of 16-bit lanes, word 3 is governed by bits 6 and 7 (first_lane[3] = 6), and the lanes 01, the lower one, are
+// the bytes 0011 (bytes[1] = 3).
 template <int lanes_a_word>
 struct MergeStep {
   alignas(64) word first_lane[16] = {};  // of word w, within the predicate's unit
@@ -88,10 +88,9 @@ class MergeMask {
 };
 
 // Whether the table is as the library came with it, so that a byte is stored where its lane is enabled and no entry
-// need be looked up. Asked on SSE2 alone, whose registers cannot look up the table; and not of clang, which does not
-// vectorise two merges in one function.
+// need be looked up. Asked on SSE2 alone, whose registers cannot look up the table.
 inline bool merges_plainly() {
-#if defined __AVX2__ || defined __clang__
+#ifdef __AVX2__
   return false;
 #else
   __m128i inverse = _mm_set1_epi32(-1);
@@ -104,10 +103,47 @@ inline bool merges_plainly() {
 #endif
 }
 
-// Stores lane i of v by the rule where the predicate enables it. Memory is not touched when no lane is
-// enabled; else, unless all are, every word of it is read and written back.
-template <class M, class Rule, class Operand, class PredicateUnit>
-inline void store_where(const Operand& v, Rule rule, const PredicateUnit* predicate, void* to) {
+// Bytes that go to memory, all of them or where a mask's bits are 1: new = old ^ ((given ^ old) & mask). They are
+// loaded before any is stored: what they are loaded from may overlap what they go to.
+template <int Size>
+class Outgoing {
+  typedef word Chunk __attribute__((vector_size(Size < register_bytes ? Size : register_bytes)));
+  static constexpr int chunks = Size / static_cast<int>(sizeof(Chunk));
+
+ public:
+  explicit Outgoing(const void* from) {
+    for (int k = 0; k < chunks; ++k) chunk_[k] = load(from, k);
+  }
+
+  void store(void* to) const {
+    for (int k = 0; k < chunks; ++k) store(to, k, chunk_[k]);
+  }
+  void store_where(const void* mask, void* to) const {
+    for (int k = 0; k < chunks; ++k) {
+      const Chunk old = load(to, k);
+      store(to, k, old ^ ((chunk_[k] ^ old) & load(mask, k)));
+    }
+  }
+
+ private:
+  static Chunk load(const void* from, int k) {
+    Chunk chunk;
+    std::memcpy(&chunk, static_cast<const unsigned char*>(from) + k * sizeof chunk, sizeof chunk);
+    return chunk;
+  }
+  static void store(void* to, int k, Chunk chunk) {
+    std::memcpy(static_cast<unsigned char*>(to) + k * sizeof chunk, &chunk, sizeof chunk);
+  }
+
+  Chunk chunk_[chunks];
+};
+
+// Stores the lanes of v, of layout A, by the rule as lanes of layout M where the predicate enables them. Memory is not
+// touched when no lane is enabled; else, unless all are, every word of it is read and written back.
+template <class M, class A, class Rule, class PredicateUnit>
+inline void store_where(const void* v, Rule rule, const PredicateUnit* predicate, void* to) {
+  constexpr int lane_bytes = sizeof(typename M::container), bytes = M::count * lane_bytes;
+  static_assert(M::bits == 8 * lane_bytes);
   bool any = false;
   bool all = true;
   for (int bit = 0; bit < M::count; bit += 8 * sizeof(PredicateUnit)) {
@@ -116,26 +152,21 @@ inline void store_where(const Operand& v, Rule rule, const PredicateUnit* predic
     all = all && unit == static_cast<PredicateUnit>(-1);
   }
   if (!any) return;
-  if (all) {
-    lanes<M::count>(Write<M>(to), rule, v);
-    return;
+  alignas(64) unsigned char image[std::is_same_v<M, A> ? 1 : bytes];
+  if constexpr (!std::is_same_v<M, A>) {
+    lanes<M::count>(Write<M>(image), rule, Read<A>(v));
+    v = image;
   }
-  using Bits = std::make_unsigned_t<typename M::container>;
-  using MaskLanes = Layout<Bits, M::bits, M::count>;
-  const auto merge = [&](const void* mask) {
-    const auto rule_where = [rule](auto lane, Bits old, Bits enabled) {
-      return static_cast<Bits>(old ^ ((static_cast<Bits>(rule(lane)) ^ old) & enabled));
-    };
-    lanes<M::count>(Write<MaskLanes>(to), rule_where, v, Read<MaskLanes>(to), Read<MaskLanes>(mask));
-  };
-  if (sizeof(Bits) * M::count == 64 && merges_plainly()) {
+  const Outgoing<bytes> given(v);
+  if (all) return given.store(to);
+  if (bytes == 64 && merges_plainly()) {
     LaneMask<M::bits, M::count> enabled;
     enabled.expand(predicate);
-    return merge(enabled.lane);
+    return given.store_where(enabled.lane, to);
   }
-  MergeMask<sizeof(Bits), M::count * sizeof(Bits) / 4> mask;
+  MergeMask<lane_bytes, bytes / 4> mask;
   mask.look_up(predicate);
-  merge(mask.of_word);
+  given.store_where(mask.of_word, to);
 }
 
 }  // namespace

@@ -4,16 +4,8 @@
 
 // Elements of 16 bits and more: loads test the destination object, and only when they move the pointer;
 // stores test the address of the access.
-#define ELEMENT_LOAD_ROWS(OP, ...)                       \
-  ROW(OP##_I, load_I, __VA_ARGS__)                       \
-  ROW(OP##_X, load_I, __VA_ARGS__)                       \
-  ROW(OP##_IP, load_IP_aligned_destination, __VA_ARGS__) \
-  ROW(OP##_XP, load_IP_aligned_destination, __VA_ARGS__)
-#define ELEMENT_STORE_ROWS(OP, ...)           \
-  ROW(OP##_I, store_I_aligned, __VA_ARGS__)   \
-  ROW(OP##_X, store_I_aligned, __VA_ARGS__)   \
-  ROW(OP##_IP, store_IP_aligned, __VA_ARGS__) \
-  ROW(OP##_XP, store_IP_aligned, __VA_ARGS__)
+#define ELEMENT_LOAD_ROWS(OP, ...) ADDRESSED_ROWS(OP, load_I, load_IP_aligned_destination, __VA_ARGS__)
+#define ELEMENT_STORE_ROWS(OP, ...) ADDRESSED_ROWS(OP, store_I_aligned, store_IP_aligned, __VA_ARGS__)
 
 // Predicates have two modes. All but the plain load test the address of the access.
 #define PREDICATE_LOAD_ROWS(OP, P) \

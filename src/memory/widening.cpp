@@ -55,7 +55,7 @@ inline void store_saturated(const void* vector, void* to) {
   static inline void KASTARRI_SEMANTIC(OP)(const Units* v, const PredicateUnit* p, Memory* to) { \
     alignas(32) L::container packed[L::count];                                                   \
     store_saturated<L::container>(v, packed);                                                    \
-    store_where<L>(Read<L>(packed), SAME, p, to);                                                \
+    store_where<L, L>(packed, SAME, p, to);                                                      \
   }
 
 #include "memory/widening.def"

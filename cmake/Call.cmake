@@ -12,12 +12,10 @@ foreach(module IN ITEMS search.py values.py)
   configure_file(${tools}/call/${module} ${files}/${module} COPYONLY)
 endforeach()
 
-file(GLOB tables CONFIGURE_DEPENDS ${PROJECT_SOURCE_DIR}/src/*.def ${PROJECT_SOURCE_DIR}/src/*/*.def
-  ${PROJECT_SOURCE_DIR}/src/*/*shapes.h ${PROJECT_SOURCE_DIR}/src/*/row_kinds.h)
 add_custom_command(OUTPUT ${files}/call.json
   COMMAND Python3::Interpreter ${tools}/call/data.py ${files}/call.json
-  DEPENDS ${tools}/call/data.py ${tools}/generate_headers.py ${tools}/rules.py ${tools}/not_built.py
-    ${tools}/reference/entries.py ${tools}/reference/words.py ${tables}
+  DEPENDS ${tools}/call/data.py ${tools}/rules.py ${tools}/not_built.py
+    ${tools}/reference/entries.py ${tools}/reference/words.py ${KASTARRI_TABLES}
   COMMENT "Listing the intrinsics for kastarri-call" VERBATIM)
 
 add_executable(kastarri-call ${tools}/call/run.cpp ${tools}/reference/calls.cpp ${tools}/reference/operands.cpp

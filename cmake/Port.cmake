@@ -3,11 +3,9 @@
 kastarri_tool(kastarri-port)
 
 set(tools ${PROJECT_SOURCE_DIR}/tools)
-file(GLOB tables CONFIGURE_DEPENDS ${PROJECT_SOURCE_DIR}/src/*.def ${PROJECT_SOURCE_DIR}/src/*/*.def
-  ${PROJECT_SOURCE_DIR}/src/*/*shapes.h ${PROJECT_SOURCE_DIR}/src/*/row_kinds.h)
 add_custom_command(OUTPUT ${KASTARRI_BUILT_DATA}/port.json
   COMMAND Python3::Interpreter ${tools}/port_data.py ${KASTARRI_BUILT_DATA}/port.json
-  DEPENDS ${tools}/port_data.py ${tools}/not_built.py ${tools}/generate_headers.py ${tools}/read_tables.py ${tables}
+  DEPENDS ${tools}/port_data.py ${tools}/not_built.py ${KASTARRI_TABLES}
   COMMENT "Listing the intrinsics for kastarri-port" VERBATIM)
 add_custom_target(kastarri-port ALL DEPENDS ${KASTARRI_BUILT_DATA}/port.json)
 

@@ -14,12 +14,10 @@ set(package ${KASTARRI_PYTHON_DIR}/kastarri)
 set(tools ${PROJECT_SOURCE_DIR}/tools)
 
 set(generated ${KASTARRI_PYTHON_DIR}/rows.inc ${package}/intrinsics.py ${package}/intrinsics.pyi ${package}/__init__.pyi)
-file(GLOB tables CONFIGURE_DEPENDS ${PROJECT_SOURCE_DIR}/src/*.def ${PROJECT_SOURCE_DIR}/src/*/*.def
-  ${PROJECT_SOURCE_DIR}/src/*/*shapes.h ${PROJECT_SOURCE_DIR}/src/*/row_kinds.h)
 add_custom_command(OUTPUT ${generated}
   COMMAND Python::Interpreter ${source}/generate.py ${KASTARRI_PYTHON_DIR}
-  DEPENDS ${source}/generate.py ${tools}/generate_headers.py ${tools}/rules.py ${tools}/reference/entries.py
-    ${PROJECT_SOURCE_DIR}/include/kastarri/state.h ${tables}
+  DEPENDS ${source}/generate.py ${tools}/rules.py ${tools}/reference/entries.py
+    ${PROJECT_SOURCE_DIR}/include/kastarri/state.h ${KASTARRI_TABLES}
   COMMENT "Writing the Python package" VERBATIM)
 
 file(GLOB sources CONFIGURE_DEPENDS ${source}/src/*.cpp)

@@ -110,10 +110,7 @@ def read_types():
                     '#define REGISTER(FROM, TO) @register{FROM@,TO}@\n'
                     '#define HOST(NAME, TYPE, TO) @host{NAME@,TYPE@,TO}@\n'
                     '#define HOST_BOTH(NAME, TYPE, TO) @both{NAME@,TYPE@,TO}@\n'
-                    '#define HOST_INTS(TO) ' + " ".join(
-                        f"HOST({n}, {t}, TO)" for n, t in (
-                            ("int8", "signed char"), ("uint8", "unsigned char"), ("int16", "short"),
-                            ("uint16", "unsigned short"), ("int32", "int"), ("uint32", "unsigned int"))) + "\n"
+                    '#include "frame/host_ints.h"\n'
                     + "".join(f'BITS({int(table == MOVES_OF_BITS)})\n#include "{table}"\n' for table in CONVERSION_TABLES))
     from_bits = False
     for kind, fields in kinds:

@@ -2,30 +2,24 @@
 #ifndef KASTARRI_FRAME_ROW_KINDS_H
 #define KASTARRI_FRAME_ROW_KINDS_H
 
+#include "frame/host_ints.h"
+
 #define ROW(OP, SHAPE, ...) ENTRY(rk_zra32_ZRA_##OP, SHAPE, __VA_ARGS__)
 #define PROTO(NAME, SHAPE, ...) ENTRY(rk_zra32_##NAME, SHAPE, __VA_ARGS__)
 
-// The four addressing modes of a load or store that tests no alignment.
-#define LOAD_ROWS(OP, ...)           \
-  ROW(OP##_I, load_I, __VA_ARGS__)   \
-  ROW(OP##_X, load_I, __VA_ARGS__)   \
-  ROW(OP##_IP, load_IP, __VA_ARGS__) \
-  ROW(OP##_XP, load_IP, __VA_ARGS__)
-#define LOAD_ROWS_T(OP, ...)           \
-  ROW(OP##_I, load_I_T, __VA_ARGS__)   \
-  ROW(OP##_X, load_I_T, __VA_ARGS__)   \
-  ROW(OP##_IP, load_IP_T, __VA_ARGS__) \
-  ROW(OP##_XP, load_IP_T, __VA_ARGS__)
-#define STORE_ROWS(OP, ...)           \
-  ROW(OP##_I, store_I, __VA_ARGS__)   \
-  ROW(OP##_X, store_I, __VA_ARGS__)   \
-  ROW(OP##_IP, store_IP, __VA_ARGS__) \
-  ROW(OP##_XP, store_IP, __VA_ARGS__)
-#define STORE_ROWS_T(OP, ...)           \
-  ROW(OP##_I, store_I_T, __VA_ARGS__)   \
-  ROW(OP##_X, store_I_T, __VA_ARGS__)   \
-  ROW(OP##_IP, store_IP_T, __VA_ARGS__) \
-  ROW(OP##_XP, store_IP_T, __VA_ARGS__)
+// The addressing modes of a load or store, of the shapes of those that leave the pointer where it is and of those that
+// move it.
+#define ADDRESSED_ROWS(OP, PLAIN, UPDATING, ...) \
+  ROW(OP##_I, PLAIN, __VA_ARGS__)                \
+  ROW(OP##_X, PLAIN, __VA_ARGS__)                \
+  ROW(OP##_IP, UPDATING, __VA_ARGS__)            \
+  ROW(OP##_XP, UPDATING, __VA_ARGS__)
+
+// Accesses that test no alignment.
+#define LOAD_ROWS(OP, ...) ADDRESSED_ROWS(OP, load_I, load_IP, __VA_ARGS__)
+#define LOAD_ROWS_T(OP, ...) ADDRESSED_ROWS(OP, load_I_T, load_IP_T, __VA_ARGS__)
+#define STORE_ROWS(OP, ...) ADDRESSED_ROWS(OP, store_I, store_IP, __VA_ARGS__)
+#define STORE_ROWS_T(OP, ...) ADDRESSED_ROWS(OP, store_I_T, store_IP_T, __VA_ARGS__)
 
 // Conversions between registers and from and to host scalars.
 #define REGISTER(FROM, TO) PROTO(FROM##_rtor_##TO, rtor, FROM, TO)
@@ -33,13 +27,6 @@
   PROTO(NAME##_rtor_##TO, from_host, TYPE, TO) \
   PROTO(TO##_rtor_##NAME, to_host, TO, TYPE)
 #define HOST_BOTH HOST
-#define HOST_INTS(TO)              \
-  HOST(int8, signed char, TO)      \
-  HOST(uint8, unsigned char, TO)   \
-  HOST(int16, short, TO)           \
-  HOST(uint16, unsigned short, TO) \
-  HOST(int32, int, TO)             \
-  HOST(uint32, unsigned int, TO)
 
 // Whole-register copies: a type and the kinds of copy that it has.
 #define COPIED(T)                                  \

@@ -10,6 +10,8 @@
 #define TYPE(T, UNIT, UNITS, LAYOUT, MEANING) typedef cstub_Km_ZNB_Orbis_R5_64k_##T T;
 #include "frame/types.def"
 
+#include "frame/host_ints.h"
+
 namespace {
 
 int failures = 0;
@@ -54,13 +56,6 @@ void compare_corners(const char* name, To (*exported)(float)) {
 #define NAMED(NAME) cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_##NAME
 #define HOST(NAME, HOST_TYPE, TO) compare_corners<TO>(#NAME "_rtor_" #TO, &NAMED(NAME##_rtor_##TO));
 #define HOST_BOTH HOST
-#define HOST_INTS(TO)              \
-  HOST(int8, signed char, TO)      \
-  HOST(uint8, unsigned char, TO)   \
-  HOST(int16, short, TO)           \
-  HOST(uint16, unsigned short, TO) \
-  HOST(int32, int, TO)             \
-  HOST(uint32, unsigned int, TO)
 #define REGISTER(FROM, TO)
 #define DOC(TEXT)
 

@@ -5,6 +5,8 @@
 #define TYPE(T, UNIT, UNITS, LAYOUT, MEANING) typedef cstub_Km_ZNB_Orbis_R5_64k_##T T;
 #include "frame/types.def"
 
+#include "frame/host_ints.h"
+
 template <class T>
 T make();
 
@@ -43,13 +45,6 @@ void from_temporary() {
   HOST(NAME, HOST_TYPE, TO)                 \
   template void forms<HOST_TYPE, TO&>(TO&); \
   template void forms<HOST_TYPE, const TO&>(const TO&);
-#define HOST_INTS(TO)              \
-  HOST(int8, signed char, TO)      \
-  HOST(uint8, unsigned char, TO)   \
-  HOST(int16, short, TO)           \
-  HOST(uint16, unsigned short, TO) \
-  HOST(int32, int, TO)             \
-  HOST(uint32, unsigned int, TO)
 #define DOC(TEXT)
 
 #include "frame/conversions.def"

@@ -1,7 +1,7 @@
 """Faults in rows: one cell of a line of a table exchanged for another that stands in the same column elsewhere.
 
 A line is KIND(cell, cell, ...) in a table (src/**/*.def), or in the definition of a kind of row that stands for several
-(src/**/row_kinds.h). Its name is no cell: it is what the row is held to. Nor is the expression of a SCALAR row, which
+(src/**/row_kinds.h, src/frame/host_ints.h). Its name is no cell: it is what the row is held to. Nor is the expression of a SCALAR row, which
 is a rule (rules.py).
 """
 
@@ -49,10 +49,11 @@ def read_lines(src):
     """The lines of all tables and kinds of row."""
     lines = []
     paths = glob.glob(os.path.join(src, "*", "*.def")) + glob.glob(os.path.join(src, "*", "row_kinds.h"))
+    paths.append(os.path.join(src, "frame", "host_ints.h"))
     for path in sorted(paths):
         with open(path, encoding="utf-8") as file:
             for number, text in enumerate(file, 1):
-                match = re.match(r"\s*(?!DOC\b|ENTRY\b)([A-Za-z]\w*)\(", text)
+                match = re.match(r"\s*(?:#define \w+\([^)]*\) )?(?!DOC\b|ENTRY\b)([A-Za-z]\w*)\(", text)
                 spans = match and split(text, match.end())
                 if not spans:
                     continue

@@ -44,7 +44,7 @@ class Reports:
 
     def run(self, library):
         """Of each program, in order, what it prints of each intrinsic."""
-        return runs.in_parallel(lambda program: runs.run_program(program, library, timeout=60), self.programs)
+        return runs.in_parallel(lambda program: runs.run_program(program, library, timeout=300), self.programs)
 
     def changed(self, library):
         """The intrinsics of which something else is printed or that ended a program, and those behind them that were not

@@ -22,6 +22,7 @@ ROOT = os.path.dirname(os.path.dirname(os.path.abspath(__file__)))
 sys.path.insert(0, os.path.join(ROOT, "tools"))
 import generate_headers  # noqa: E402
 import kernels  # noqa: E402
+from cmake_cache import cached  # noqa: E402
 
 TARGETS = ["avx512", "avx2", "sse2"]
 BASELINE = "rk_zra32_qv_vecNx16_move"
@@ -81,12 +82,6 @@ def limit_of(name, target, limits):
         if pattern.fullmatch(name):
             return cycles[target] * (SPECIAL if variant == "special" else 1)
     return None
-
-
-def width(build):
-    """Bits of the programs of a build directory: 32 or 64."""
-    with open(os.path.join(build, "CMakeCache.txt"), encoding="utf-8") as cache:
-        return int(re.search(r"^KASTARRI_BITS:\w+=(\d+)$", cache.read(), re.M)[1])
 
 
 def processor():
@@ -256,7 +251,7 @@ def main():
         found = run(arguments.build, target, arguments.filter, arguments.repetitions, arguments.seconds)
         if found:
             times[target] = found
-    measured, (limited, limits) = Measured(times, processor(), width(arguments.build)), read_limits()
+    measured, (limited, limits) = Measured(times, processor(), int(cached(arguments.build, "KASTARRI_BITS"))), read_limits()
     if limited != measured.processor:
         print(f"the limits are of another processor: {limited}", file=sys.stderr)
     if arguments.summary:

@@ -125,7 +125,7 @@ class Installation(Installed):
             with self.subTest(tool=tool):
                 program = os.path.join(self.prefix, "bin", tool)
                 self.assertEqual(output(program, "--version"), f"{tool} {VERSION}\n")
-                if cached("KASTARRI_HELP2MAN").endswith("NOTFOUND"):
+                if cached(BUILD, "KASTARRI_HELP2MAN").endswith("NOTFOUND"):
                     continue
                 with open(os.path.join(self.prefix, "share/man/man1", tool + ".1"), encoding="utf-8") as file:
                     page = re.sub(r"\\f[BIR]", "", file.read().replace("\\-", "-"))
@@ -204,7 +204,7 @@ class Installation(Installed):
                 environment = self.environment(directory)
                 self.assertEqual(output("pkg-config", "--modversion", module, env=environment).strip(), VERSION)
                 # The shell takes apart what pkg-config prints, spaces in the prefix being quoted.
-                output("sh", "-c", f'eval "{compiler} -O2 {HERE}/consumer/main.cpp -o {self.path(module)} '
+                output("sh", "-c", f'eval "{compiler} -O2 \\"{HERE}/consumer/main.cpp\\" -o {self.path(module)} '
                        f'$(pkg-config --cflags --libs {module})"', env=environment)
                 if modules[module]:
                     self.check_answer(self.path(module), LD_LIBRARY_PATH=self.libraries)

@@ -8,28 +8,19 @@ import filecmp
 import glob
 import os
 import shutil
-import subprocess
 import sys
 import tempfile
 import unittest
 
-HERE = os.path.dirname(os.path.abspath(__file__))
-CONSUMER = os.path.join(os.path.dirname(HERE), "package", "consumer")
+TESTS = os.path.dirname(os.path.dirname(os.path.abspath(__file__)))
+sys.path.insert(0, os.path.join(TESTS, "support"))
+from commands import output, run  # noqa: E402
+
+CONSUMER = os.path.join(TESTS, "package", "consumer")
 BUILDS = {"32": os.path.abspath(sys.argv[1]), "64": os.path.abspath(sys.argv[2])}
 OTHERS = list(map(os.path.abspath, sys.argv[3:]))
 ARCHITECTURES = {"32": "i386", "64": "amd64"}
 TARGETS = ["avx512", "avx2", "sse2"]
-
-
-def run(*command, **options):
-    return subprocess.run(command, stdout=subprocess.PIPE, stderr=subprocess.STDOUT, text=True, check=False, **options)
-
-
-def output(*command, **options):
-    result = run(*command, **options)
-    if result.returncode != 0:
-        raise AssertionError(" ".join(command) + "\n" + result.stdout)
-    return result.stdout
 
 
 def width_of(program):

@@ -3,10 +3,13 @@
 import concurrent.futures
 import glob
 import os
-import re
 import subprocess
+import sys
 
 ROOT = os.path.dirname(os.path.dirname(os.path.dirname(os.path.abspath(__file__))))
+sys.path.insert(0, os.path.join(ROOT, "tools"))
+from cmake_cache import cached  # noqa: E402
+
 USER_FLAGS = ["-msse2", "-mfpmath=sse"]  # as cmake/Library.cmake has them
 
 
@@ -37,9 +40,7 @@ class Build:
         self.tool = os.path.join(self.directory, "bin", "kastarri-conform")
 
     def cached(self, name):
-        with open(os.path.join(self.directory, "CMakeCache.txt"), encoding="utf-8") as file:
-            found = re.search(rf"^{name}:\w+=(.*)$", file.read(), re.M)
-        return found[1] if found else ""
+        return cached(self.directory, name)
 
     def libraries(self):
         """Target -> the directory of the shared library for it alone; if there is none, that of the only one."""

@@ -144,6 +144,7 @@ def gdb(program, *commands, arguments=()):
     """What gdb prints for the commands, and its errors, having loaded the printers by itself."""
     result = subprocess.run(
         ["gdb", "-nx", "-q", "-batch", "-iex", "add-auto-load-safe-path " + os.path.dirname(LIBRARY), "-ex", "set width 0",
+         "-ex", "set disable-randomization off",  # which containers refuse, with a warning
          "-ex", "set debuginfod enabled off", "-ex", "break stop_here", "-ex", f"run {' '.join(arguments)} > {os.devnull}",
          *(word for command in commands for word in ("-ex", command)), path(program)],
         capture_output=True, text=True, timeout=600, check=False)

@@ -55,7 +55,7 @@ class ProfileTest(unittest.TestCase):
         return os.path.join(self.directory, name)
 
     def run_profiler(self, *arguments, profiler=PROFILER, **options):
-        return subprocess.run([profiler, *arguments], capture_output=True, text=True, check=False, timeout=60, **options)
+        return subprocess.run([profiler, *arguments], capture_output=True, text=True, check=False, timeout=600, **options)
 
     def counts(self, *command, status=0):
         """Name -> calls of a program's run, which has to end with `status`."""
@@ -161,7 +161,7 @@ class Transparency(ProfileTest):
                                       text=True) as running:
                     self.assertEqual(running.stdout.readline(), "ready\n")
                     running.send_signal(number)
-                    table = running.communicate(timeout=60)[1]
+                    table = running.communicate(timeout=600)[1]
                 self.assertEqual(running.returncode, -number)
                 self.assertRegex(table, r" 4 .* ZRA_ADDNX16\n")
 

@@ -13,7 +13,7 @@ ROOT = os.path.dirname(os.path.dirname(os.path.dirname(os.path.abspath(__file__)
 sys.path[:0] = [os.path.join(ROOT, "tools"), os.path.join(ROOT, "tools", "reference")]
 import generate_headers  # noqa: E402
 import not_built  # noqa: E402
-from browser import Browser  # noqa: E402
+from browser import START, Browser  # noqa: E402
 
 PAGE = pathlib.Path(sys.argv.pop(1)).resolve().as_uri()
 FAMILIES = generate_headers.all_rows()
@@ -75,7 +75,7 @@ class Page(unittest.TestCase):
 
     def until(self, expected, ask):
         """Waits for what the browser does in its own time."""
-        end = time.monotonic() + 20
+        end = time.monotonic() + START
         while ask() != expected and time.monotonic() < end:
             time.sleep(0.05)
         self.assertEqual(ask(), expected)

@@ -17,22 +17,31 @@ KEYS = {"Enter": "\ue007", "Escape": "\ue00c", "ArrowDown": "\ue015", "ArrowUp":
 class Browser:
     def __init__(self):
         self.driver = subprocess.Popen(["chromedriver", "--port=0"], stdout=subprocess.PIPE, text=True)
-        port = next(match[1] for line in self.driver.stdout if (match := re.search(r"successfully on port (\d+)", line)))
-        self.root = f"http://127.0.0.1:{port}/session"
-        options = {"args": ARGUMENTS}
-        asked = {"browserName": "chrome", "goog:chromeOptions": options, "goog:loggingPrefs": {"browser": "ALL"}}
-        self.root += "/" + self.post("", capabilities={"alwaysMatch": asked})["sessionId"]
-        self.post("/timeouts", script=1000 * START, pageLoad=1000 * START)
+        # To this machine, whatever proxy the environment names.
+        self.opener = urllib.request.build_opener(urllib.request.ProxyHandler({}))
+        try:
+            port = next(match[1] for line in self.driver.stdout if (match := re.search(r"successfully on port (\d+)", line)))
+            self.root = f"http://127.0.0.1:{port}/session"
+            options = {"args": ARGUMENTS}
+            asked = {"browserName": "chrome", "goog:chromeOptions": options, "goog:loggingPrefs": {"browser": "ALL"}}
+            self.root += "/" + self.post("", capabilities={"alwaysMatch": asked})["sessionId"]
+            self.post("/timeouts", script=1000 * START, pageLoad=1000 * START)
+        except BaseException:
+            self.end_driver()
+            raise
 
     def close(self):
         self.request("DELETE", "")
+        self.end_driver()
+
+    def end_driver(self):
         self.driver.terminate()
         self.driver.communicate()
 
     def request(self, method, path, body=None):
         data = json.dumps(body).encode() if method == "POST" else None
         request = urllib.request.Request(self.root + path, data, {"Content-Type": "application/json"}, method=method)
-        with urllib.request.urlopen(request, timeout=START) as answer:
+        with self.opener.open(request, timeout=START) as answer:
             return json.load(answer)["value"]
 
     def post(self, path, **body):

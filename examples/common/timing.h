@@ -1,5 +1,5 @@
-// How long a kernel and plain C take for the same: the shortest of several runs by turns. Whatever else the machine does
-// makes runs longer, and its slices of time may hit every run of one and none of the other.
+// How long a kernel and plain C take for the same: the shortest of several runs by turns. Whatever else the machine
+// does makes runs longer, and its slices of time may hit every run of one and none of the other.
 #ifndef KASTARRI_EXAMPLES_TIMING_H
 #define KASTARRI_EXAMPLES_TIMING_H
 

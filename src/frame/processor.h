@@ -3,6 +3,8 @@
 #ifndef KASTARRI_FRAME_PROCESSOR_H
 #define KASTARRI_FRAME_PROCESSOR_H
 
+#include <cpuid.h>
+
 #include "build_targets.h"
 
 namespace {
@@ -14,9 +16,15 @@ namespace {
          __builtin_cpu_supports("avx512dq") && __builtin_cpu_supports("avx512vl");
 }
 
+// F16C, which compilers do not all know by name. Processors with AVX2 have it; a virtual one may not tell.
+[[maybe_unused]] bool converts_halves() {
+  unsigned eax, ebx, ecx, edx;
+  return __get_cpuid(1, &eax, &ebx, &ecx, &edx) && (ecx & bit_F16C) != 0;
+}
+
 [[maybe_unused]] bool runs_avx2() {
   __builtin_cpu_init();
-  return __builtin_cpu_supports("avx2") && __builtin_cpu_supports("fma") && __builtin_cpu_supports("f16c");
+  return __builtin_cpu_supports("avx2") && __builtin_cpu_supports("fma") && converts_halves();
 }
 
 [[maybe_unused]] bool runs_sse2() { return true; }

@@ -108,7 +108,7 @@ inline bool merges_plainly() {
 template <int Size>
 class Outgoing {
   typedef word Chunk __attribute__((vector_size(Size < register_bytes ? Size : register_bytes)));
-  static constexpr int chunks = Size / static_cast<int>(sizeof(Chunk));
+  static constexpr int chunk_bytes = sizeof(Chunk), chunks = Size / chunk_bytes;
 
  public:
   explicit Outgoing(const void* from) {
@@ -128,11 +128,11 @@ class Outgoing {
  private:
   static Chunk load(const void* from, int k) {
     Chunk chunk;
-    std::memcpy(&chunk, static_cast<const unsigned char*>(from) + k * sizeof chunk, sizeof chunk);
+    std::memcpy(&chunk, static_cast<const unsigned char*>(from) + k * chunk_bytes, sizeof chunk);
     return chunk;
   }
   static void store(void* to, int k, Chunk chunk) {
-    std::memcpy(static_cast<unsigned char*>(to) + k * sizeof chunk, &chunk, sizeof chunk);
+    std::memcpy(static_cast<unsigned char*>(to) + k * chunk_bytes, &chunk, sizeof chunk);
   }
 
   Chunk chunk_[chunks];

@@ -29,7 +29,7 @@ class Memory {
       raise(PyExc_TypeError, "%s: memory is an array or another buffer whose bytes lie one behind the other%s",
             row.name, is_written_ ? ", and may be written" : "");
     }
-    if (has_objects(object)) raise(PyExc_TypeError, "%s: memory of objects of Python is none of numbers", row.name);
+    if (has_objects(object)) raise(PyExc_TypeError, "%s: memory that holds Python objects is not accessed", row.name);
     row_ = row.name;
     alignment_ = static_cast<unsigned>(parameter.first);
     rounding_ = parameter.second & 2 ? static_cast<unsigned>(type.bytes) : 1;
@@ -61,10 +61,10 @@ class Memory {
   void expect(std::int64_t offset, int size) const {
     const auto distance = static_cast<std::uintptr_t>(offset);
     const auto address = reinterpret_cast<std::uintptr_t>(buffer_.buf) + distance;
-    if (address % alignment_ != 0)
+    if (address & (alignment_ - 1))
       raise(PyExc_ValueError, "%s: the address at offset %lld is not a multiple of %u", row_,
             static_cast<long long>(offset), alignment_);
-    const auto first = static_cast<std::int64_t>(distance - address % rounding_);
+    const auto first = static_cast<std::int64_t>(distance - (address & (rounding_ - 1)));
     if (first < 0 || first > buffer_.len - size)
       raise(PyExc_ValueError, "%s: %d bytes at offset %lld are not within the memory of %zd bytes", row_, size,
             static_cast<long long>(first), buffer_.len);

@@ -94,7 +94,7 @@ class Arrays(unittest.TestCase):
             for array, call in ((a, lambda n: (n, k.ADDNX16, n, n[0])),
                                 (a, lambda n: (n[1:], k.ADDNX16, n[:-1], n[:-1])),
                                 (a, lambda n: (n, k.SUBNX16, n[::-1], n)),
-                                (a, lambda n: (n, k.ADDNX16T, a, n, n, p)),
+                                (a, lambda n: (n, k.ADDNX16T, a[::-1], n, n, p)),
                                 (a, lambda n: (n, k.ADDNX16T, n, n, n, p)),
                                 (a, lambda n: (n, k.ADDNX16T, n[::-1], a, n, p)),
                                 (a, lambda n: (n, k.LVNX16_I, n, down)),

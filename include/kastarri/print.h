@@ -255,9 +255,9 @@ Text text_of(const T& value, Form form) {
 }
 
 // The types of the scalar core's words are those whose names end so.
-template <std::size_t size>
-constexpr bool is_word(const char (&name)[size]) {
-  return name[size - 3] == 'p' && name[size - 2] == 'r';
+inline bool is_word(const char* name) {
+  const std::size_t length = __builtin_strlen(name);
+  return name[length - 2] == 'p' && name[length - 1] == 'r';
 }
 
 template <class T>

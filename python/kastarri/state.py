@@ -1,5 +1,7 @@
 """The state of the core outside its registers."""
 
+import operator
+
 import numpy as np
 
 from . import _core
@@ -30,7 +32,7 @@ class State:
             object.__setattr__(self, name, value)
             return
         at, count = _place(name)
-        words = (value,) if count == 1 else tuple(value)
+        words = tuple(map(operator.index, (value,) if count == 1 else value))
         if len(words) != count or not all(0 <= word < 2**32 for word in words):
             raise ValueError(f"state.{name} is {'a word' if count == 1 else f'{count} words'} of 32 bits")
         _words[at:at + count] = words
@@ -68,6 +70,8 @@ class State:
 
     @PRID.setter
     def PRID(self, number):
+        if not -2**31 <= operator.index(number) < 2**31:
+            raise ValueError("state.PRID is a number of 32 bits")
         _prid[0] = number
 
 

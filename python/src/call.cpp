@@ -4,6 +4,8 @@
 #include <cstdint>
 #include <cstring>
 #include <limits>
+#include <memory>
+#include <utility>
 
 #include "memory.h"
 #include "operands.h"
@@ -23,7 +25,8 @@ class Call {
  public:
   Call(const Row& row, PyObject* out, PyObject* const* arguments, Py_ssize_t count)
       : row_(row), count_(row.signature->count) {
-    read(arguments, count);
+    read(arguments, arguments + count);
+    keep_from_stores();
     broadcast();
     make_outputs(out);
   }
@@ -40,8 +43,11 @@ class Call {
 
   // --- Arguments ------------------------------------------------------------------------------------
 
-  void read(PyObject* const* arguments, Py_ssize_t count) {
-    PyObject* const* next = arguments;
+  void read(PyObject* const* arguments, PyObject* const* end) {
+    const auto next = [&] {
+      if (arguments == end) wrong_number();
+      return *arguments++;
+    };
     for (int i = 0; i < count_; ++i) {
       switch (const Parameter& p = parameter(i); p.role) {
         case Role::result:
@@ -49,36 +55,48 @@ class Call {
         case Role::ignored:
           break;
         case Role::immediate: {
-          const int number = read_immediate(row_, p, *next++);
+          const int number = read_immediate(row_, p, next());
           std::memcpy(operands_[i].value, &number, sizeof number);
           break;
         }
         case Role::memory:
-          memory_.open(row_, p, type(i), *next++);
+          memory_.open(row_, p, type(i), next());
           break;
         case Role::moving:
-          memory_.open(row_, p, type(i), *next++);
+          memory_.open(row_, p, type(i), next());
           moving_ = i;
-          read_operand(operands_[i], row_, {"offset", Role::offset, 0, 0}, TypeOf<std::int64_t>::value, *next++);
+          read_operand(operands_[i], row_, {"offset", Role::offset, 0, 0}, TypeOf<std::int64_t>::value, next());
           break;
         case Role::offset:
           offset_ = i;
-          read_operand(operands_[i], row_, p, type(i), *next++);
+          read_operand(operands_[i], row_, p, type(i), next());
           break;
         case Role::offsets:
           offsets_ = i;
-          read_operand(operands_[i], row_, p, type(i), *next++);
+          read_operand(operands_[i], row_, p, type(i), next());
           break;
         case Role::enabled:
           enabled_ = i;
           [[fallthrough]];
         case Role::input:
         case Role::kept:
-          read_operand(operands_[i], row_, p, type(i), *next++);
+          read_operand(operands_[i], row_, p, type(i), next());
           break;
       }
     }
-    if (next != arguments + count) raise(PyExc_SystemError, "%s: wrong number of arguments", row_.name);
+    if (arguments != end) wrong_number();
+  }
+
+  [[noreturn]] void wrong_number() const { raise(PyExc_SystemError, "%s: wrong number of arguments", row_.name); }
+
+  // Operands have the values that were there before the first store.
+  void keep_from_stores() {
+    if (!memory_.is_written()) return;
+    for (int i = 0; i < count_; ++i) {
+      Operand& operand = operands_[i];
+      if (operand.array && memory_.extent().meets(extent_of(operand.array.array())))
+        operand.take(Ref::checked(PyArray_NewCopy(operand.array.array(), NPY_CORDER)));
+    }
   }
 
   // The axes of all operands, aligned at the last one.
@@ -104,13 +122,39 @@ class Call {
         if (!is_output(role) || (role == Role::result) != (pass == 0)) continue;
         // What an intrinsic may leave as it is must not be what lay in memory before.
         const bool cleared = role == Role::written && shape_of(type(i)).elements == 1;
-        const bool given = out != Py_None;
-        outputs_[i] =
-            given ? given_array(out, row_, type(i), axes_, lengths_) : new_array(type(i), axes_, lengths_, cleared);
+        if (out != Py_None) {
+          given_ = given_array(out, row_, type(i), axes_, lengths_);
+          given_for_ = i;
+        }
         out = Py_None;
+        const bool is_direct = given_for_ == i && is_free(i, given_.array());
+        outputs_[i] = is_direct ? Ref::to(given_.get()) : new_array(type(i), axes_, lengths_, cleared);
       }
     }
     if (moving_ >= 0) outputs_[moving_] = new_array(TypeOf<std::int64_t>::value, axes_, lengths_, false);
+  }
+
+  // Whether results may go into the given array while the call goes on: nothing that it has yet to read is changed. An
+  // operand that lies there just as the results will is read before each of them, unless another is kept, which is
+  // copied there first.
+  bool is_free(int i, PyArrayObject* out) const {
+    if (lies_alike(i) && reinterpret_cast<std::uintptr_t>(PyArray_DATA(out)) % static_cast<unsigned>(type(i).unit) != 0)
+      return false;
+    const Extent extent = extent_of(out);
+    const bool is_copied = parameter(i).role == Role::kept && !lies_as(i, out, i);
+    for (int k = 0; k < count_; ++k) {
+      const Ref& array = operands_[k].array;
+      if (array && extent.meets(extent_of(array.array())) && (is_copied || !lies_as(i, out, k))) return false;
+    }
+    return !extent.meets(memory_.extent());
+  }
+
+  bool lies_as(int i, PyArrayObject* out, int k) const {
+    const Operand& operand = operands_[k];
+    if (operand.type != &type(i) || operand.data != PyArray_BYTES(out)) return false;
+    for (int axis = 0; axis < axes_; ++axis)
+      if (lengths_[axis] > 1 && stride(operand, axis) != PyArray_STRIDE(out, axis)) return false;
+    return true;
   }
 
   // --- Loops ----------------------------------------------------------------------------------------
@@ -151,12 +195,13 @@ class Call {
     for (int i = 0; i < count_; ++i) {
       from[i] = operands_[i].data;
       strides[i] = loop.strides[i][loop.axes - 1];
-      is_direct_[i] = operands_[i].data && operands_[i].is_direct();
+      is_direct_[i] = operands_[i].data && operands_[i].is_direct() && !(operands_[i].array && is_tested(i));
       if (outputs_[i]) to_[i] = PyArray_BYTES(outputs_[i].array());
     }
     const npy_intp inner = loop.lengths[loop.axes - 1];
     if (std::find(loop.lengths, loop.lengths + loop.axes, 0) != loop.lengths + loop.axes) return;
-    const npy_intp most = works_in_place() ? inner : block();
+    const npy_intp most = works_in_place() ? inner : std::min(inner, block());
+    make_scratch(most);
     for (;;) {
       for (npy_intp done = 0; done < inner; done += most) {
         const npy_intp n = std::min(most, inner - done);
@@ -199,6 +244,32 @@ class Call {
   bool lies_alike(int i) const { return shape_of(type(i)).lies_alike(); }
   // Whether values lie alike, but numbers may be too large.
   bool has_range(int i) const { return shape_of(type(i)).way == Way::sum48; }
+
+  // Whether wrong values would end the program. Those that are tested have to be those that are used, whoever else
+  // writes to where they lie.
+  bool is_tested(int i) const { return i == offset_ || i == offsets_ || i == enabled_ || row_.divides; }
+
+  // Bytes of a value that does not lie as the library has it.
+  int scratch_bytes(int i) const {
+    const Role role = parameter(i).role;
+    if (role == Role::moving) return sizeof(std::int64_t);
+    const bool lies_elsewhere = is_output(role) ? !lies_alike(i) : operands_[i].data && !is_direct_[i];
+    return lies_elsewhere ? type(i).bytes : 0;
+  }
+
+  // Not on the stack, which is small in some threads, and where calls are many deep if handlers of ports make them.
+  void make_scratch(npy_intp values) {
+    constexpr npy_intp line = 64;  // of the processor's cache
+    npy_intp at[most_parameters], bytes = 0;
+    for (int i = 0; i < count_; ++i) {
+      at[i] = bytes;
+      bytes += (values * scratch_bytes(i) + line - 1) / line * line;
+    }
+    if (bytes == 0) return;
+    room_.reset(new char[static_cast<std::size_t>(bytes + line)]);
+    char* const first = room_.get() + line - reinterpret_cast<std::uintptr_t>(room_.get()) % line;
+    for (int i = 0; i < count_; ++i) scratch_[i] = first + at[i];
+  }
 
   // --- A block --------------------------------------------------------------------------------------
 
@@ -328,6 +399,10 @@ class Call {
   // What has no axes is a number.
   Ref result(int i) {
     PyArrayObject* array = outputs_[i].array();
+    if (i == given_for_) {
+      if (array != given_.array() && PyArray_CopyInto(given_.array(), array) < 0) throw Raised();
+      return std::move(given_);
+    }
     if (parameter(i).role == Role::moving && axes_ == 0)
       return Ref::checked(PyLong_FromLongLong(*static_cast<std::int64_t*>(PyArray_DATA(array))));
     outputs_[i].release();
@@ -343,12 +418,15 @@ class Call {
   int axes_ = 0;
   npy_intp lengths_[most_axes];
   Ref outputs_[most_parameters];
+  Ref given_;  // the program's array for the result that is this parameter's
+  int given_for_ = -1;
 
   bool is_direct_[most_parameters];
   char* to_[most_parameters];
   char* images_[most_parameters];
   npy_intp image_strides_[most_parameters];
-  alignas(64) char scratch_[most_parameters][block_bytes];
+  char* scratch_[most_parameters];
+  std::unique_ptr<char[]> room_;
 };
 
 }  // namespace

@@ -68,8 +68,7 @@ PyObject* text(PyObject*, PyObject* arguments) {
     alignas(64) char image[256];
     if (operand.axes != 0 || !to_images(type, operand.data, 0, 1, image))
       raise(PyExc_ValueError, "text: not the values of one %s", name);
-    // The types of the scalar core's words are those whose names end so.
-    const bool is_word = std::strcmp(name + std::strlen(name) - 2, "pr") == 0;
+    const bool is_word = kastarri::print_detail::is_word(name);
     const kastarri::print_detail::Register shown = {
         reinterpret_cast<unsigned char*>(image), type.bytes, type.kind, type.bits, type.count, is_word};
     const kastarri::Form form = {static_cast<kastarri::Form::Kind>(kind), fraction_bits};

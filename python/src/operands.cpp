@@ -66,23 +66,25 @@ bool Operand::is_direct() const {
   return alike % static_cast<unsigned>(type->unit) == 0;
 }
 
+void Operand::take(Ref values) {
+  array = std::move(values);
+  data = PyArray_BYTES(array.array());
+  axes = PyArray_NDIM(array.array()) - has_lanes(shape);
+  for (int i = 0; i < axes; ++i) {
+    lengths[i] = PyArray_DIM(array.array(), i);
+    strides[i] = lengths[i] == 1 ? 0 : PyArray_STRIDE(array.array(), i);
+  }
+}
+
 void read_operand(Operand& operand, const Row& row, const Parameter& parameter, const Type& type, PyObject* argument) {
   operand.type = &type;
   operand.shape = shape_of(type);
   if (is_number(argument, operand.shape)) return read_number(operand, row, parameter, argument);
-  operand.array =
-      suits(argument, operand.shape)
-          ? Ref::to(argument)
-          : Ref::checked(PyObject_CallFunction(coerce, "Osss", argument, type.name, row.name, parameter.name));
-  if (!suits(operand.array.get(), operand.shape))
-    raise(PyExc_ValueError, "%s: %s has too many axes", row.name, parameter.name);
-  PyArrayObject* array = operand.array.array();
-  operand.data = PyArray_BYTES(array);
-  operand.axes = PyArray_NDIM(array) - has_lanes(operand.shape);
-  for (int i = 0; i < operand.axes; ++i) {
-    operand.lengths[i] = PyArray_DIM(array, i);
-    operand.strides[i] = operand.lengths[i] == 1 ? 0 : PyArray_STRIDE(array, i);
-  }
+  Ref array = suits(argument, operand.shape)
+                  ? Ref::to(argument)
+                  : Ref::checked(PyObject_CallFunction(coerce, "Osss", argument, type.name, row.name, parameter.name));
+  if (!suits(array.get(), operand.shape)) raise(PyExc_ValueError, "%s: %s has too many axes", row.name, parameter.name);
+  operand.take(std::move(array));
 }
 
 int read_immediate(const Row& row, const Parameter& parameter, PyObject* argument) {

@@ -22,6 +22,8 @@ struct Operand {
   npy_intp strides[most_axes];
   // Whether the library can read the values where they lie.
   bool is_direct() const;
+  // Has the values from now on in that array.
+  void take(Ref values);
 };
 
 // What makes an array of the right kind of other arguments: a function of Python, coerce(argument, type, row,

@@ -29,8 +29,8 @@ PyObject* functions[handlers];
 template <class... A>
 Ref ask(Handler handler, const char* format, A... arguments) {
   if (PyErr_Occurred()) return Ref();
-  PyObject* const function = functions[handler];
-  if (function) return Ref(PyObject_CallFunction(function, format, arguments...));
+  const Ref function = Ref::to(functions[handler]);  // the handler itself may put another in its place
+  if (function) return Ref(PyObject_CallFunction(function.get(), format, arguments...));
   if (handler != input_attempt && handler != output_attempt)
     PyErr_Format(PyExc_RuntimeError, "the port has no handler '%s': see kastarri.ports", names[handler]);
   return Ref();
@@ -40,7 +40,9 @@ unsigned truth(const Ref& answer) { return answer && PyObject_IsTrue(answer.get(
 
 unsigned word(const Ref& answer) {
   if (!answer) return 0;
-  const unsigned long value = PyLong_AsUnsignedLong(answer.get());
+  const Ref number(PyNumber_Index(answer.get()));
+  if (!number) return 0;
+  const unsigned long value = PyLong_AsUnsignedLong(number.get());
   if (!PyErr_Occurred() && value > 0xFFFFFFFF) PyErr_SetString(PyExc_ValueError, "a port has 32 bits");
   return PyErr_Occurred() ? 0 : static_cast<unsigned>(value);
 }

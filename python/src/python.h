@@ -12,6 +12,7 @@
 #endif
 #include <numpy/arrayobject.h>
 
+#include <new>
 #include <utility>
 
 namespace kastarri_python {
@@ -38,7 +39,7 @@ class Ref {
   ~Ref() { Py_XDECREF(object_); }
 
   static Ref to(PyObject* borrowed) {
-    Py_INCREF(borrowed);
+    Py_XINCREF(borrowed);
     return Ref(borrowed);
   }
   // Of what a function of Python returned, which is null if it raised.
@@ -63,6 +64,8 @@ PyObject* guarded(Body body) {
     return body();
   } catch (const Raised&) {
     return nullptr;
+  } catch (const std::bad_alloc&) {
+    return PyErr_NoMemory();
   }
 }
 

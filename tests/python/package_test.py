@@ -19,6 +19,7 @@ import zipfile
 import numpy as np
 
 import kastarri
+from kastarri import _core
 
 BUILD = os.path.abspath(sys.argv.pop(1))
 ROOT = os.path.dirname(os.path.dirname(os.path.dirname(os.path.abspath(__file__))))
@@ -81,6 +82,35 @@ class Arrays(unittest.TestCase):
         for out in (np.zeros((8, 32), bool), np.zeros((9, 32), np.uint8), np.zeros((32, 9), bool).T):
             self.assertRaisesRegex(ValueError, "out is a contiguous array", kastarri.LTNX16, a, 0, out=out)
 
+    def test_operands_are_read_before_they_are_overwritten(self):
+        """Each call with out= among its operands gives what it gives with new arrays."""
+        k = kastarri
+        for count in (5, 200):
+            a, flat = self.halves(count), np.arange(count + 31, dtype=np.int16)
+            sums, narrow = (self.random.integers(-2**20, 2**20, (count, lanes)) for lanes in (32, 64))
+            divisors, p = np.arange(1, count + 1, dtype=np.int32), a > 0
+            down = 64 * np.arange(count, dtype=np.int32)[::-1]
+            quotients = np.arange(count, dtype=np.int32) % 3
+            for array, call in ((a, lambda n: (n, k.ADDNX16, n, n[0])),
+                                (a, lambda n: (n[1:], k.ADDNX16, n[:-1], n[:-1])),
+                                (a, lambda n: (n, k.SUBNX16, n[::-1], n)),
+                                (a, lambda n: (n, k.ADDNX16T, a[::-1], n, n, p)),
+                                (a, lambda n: (n, k.ADDNX16T, n, n, n, p)),
+                                (a, lambda n: (n, k.ADDNX16T, n[::-1], a, n, p)),
+                                (a, lambda n: (n, k.LVNX16_I, n, down)),
+                                (p, lambda n: (n[1:], k.NOTBN, n[:-1])),
+                                (flat, lambda n: (n[31:], k.RMINNX16, np.lib.stride_tricks.sliding_window_view(n, 32))),
+                                (sums, lambda n: (n[1:], k.MULANX16, n[:-1], a[1:], 3)),
+                                (narrow, lambda n: (n[:-1], k.MULA2NX8, n[1:], 2, 3)),
+                                (divisors, lambda n: (n[1:], k.RK_QUOS, quotients[1:], n[:-1]))):
+                _, function, *operands = call(array.copy())
+                wanted = function(*operands)
+                out, function, *operands = call(array.copy())
+                self.assertIs(function(*operands, out=out), out)
+                np.testing.assert_array_equal(out, wanted, f"{function.__name__}, {count} registers")
+        odd = np.zeros(32 * 2 + 2, np.int16)[1:33]  # not at an address that a register would have in C++
+        np.testing.assert_array_equal(k.ADDNX16(RAMP, 1, out=odd), RAMP + 1)
+
     def test_several_results(self):
         p, r = kastarri.BABSNX16(RAMP - 3)
         np.testing.assert_array_equal(p, RAMP < 3)
@@ -113,6 +143,8 @@ class Errors(unittest.TestCase):
         self.check(TypeError, "missing 1 required positional argument: 'b'", add, RAMP)
         self.check(TypeError, "is a qv_vecNx16, not a qv_vecNx16U", add, kastarri.qv_vecNx16U(1), 1)
         self.check(AttributeError, "has no 'ADDNX17'", getattr, kastarri, "ADDNX17")
+        self.check(SystemError, "wrong number", _core.call, kastarri.intrinsics.index("ADDNX16"), None)
+        self.check(SystemError, "wrong number", _core.call, kastarri.intrinsics.index("ADDNX16"), None, RAMP, RAMP, RAMP)
 
     def test_a_failed_call_changes_nothing_of_the_operands(self):
         acc = np.zeros((200, 32), np.int64)
@@ -129,6 +161,21 @@ class Errors(unittest.TestCase):
                 self.check(ValueError, f"the immediate is from 0 to {highest}", function, a, wrong)
             for wrong in (1.0, a, "1"):
                 self.check(TypeError, "an immediate, which is an int", function, a, wrong)
+
+    def test_failed_calls_leave_nothing_behind(self):
+        huge = np.full((2, 32), 2**50)
+        kastarri.ports.imported_wire(None)
+        calls = ((kastarri.MULANX16, huge, RAMP, RAMP), (kastarri.LVNX16_I, RAMP, 1), (kastarri.RK_QUOU, 1, 0),
+                 (kastarri.ADDNX16, RAMP, 1.5), (kastarri.SVNX16_X, RAMP, RAMP.copy(), [0, 2]), (kastarri.RK_READ_IMPWIRE,))
+
+        def pages():
+            for _ in range(5000):
+                for function, *arguments in calls:
+                    self.assertRaises(Exception, function, *arguments)
+            with open("/proc/self/statm", encoding="ascii") as file:
+                return int(file.read().split()[1])
+        before = pages()
+        self.assertLess(pages(), before + 100)  # 13 bytes a call
 
     def test_what_would_end_the_process(self):
         self.check(ZeroDivisionError, "RK_QUOU", kastarri.RK_QUOU, [4, 5], [1, 0])
@@ -159,8 +206,32 @@ class Memory(unittest.TestCase):
         below = np.zeros(16, np.uint32) - 4
         self.assertRaisesRegex(ValueError, "at offset -4", kastarri.GATHERAN_2X32, memory, below.astype(np.uint32))
 
+    def test_tested_offsets_are_those_that_are_used(self):
+        """Stores to where their own offsets lie, in the same array and in the same bytes at another address."""
+        with tempfile.TemporaryFile() as file:
+            file.truncate(4096)
+            two = [np.frombuffer(mmap.mmap(file.fileno(), 4096), np.uint8) for _ in range(2)]
+            for writable, readable in (two[:1] * 2, two):
+                memory, same = (bytes_[1024:1152] for bytes_ in (writable, readable))
+                writable[:] = 0
+                kastarri.SVNX16_X(np.full((2, 32), 99, np.int16), memory, same[:8].view(np.int32))
+                self.assertEqual(set(memory[:64:2]), {99})
+                writable[:] = 0
+                memory[:64] = (64 + 2 * RAMP).view(np.uint8)
+                offsets = same.view(np.uint16).reshape(2, 32)
+                kastarri.SCATTERNX16(np.full((2, 32), 2000, np.int16), memory, offsets)
+                self.assertEqual(np.count_nonzero(writable), np.count_nonzero(memory))
+        rows = np.arange(96, dtype=np.int16).reshape(3, 32)
+        kastarri.SVNX16_I(rows[:2], rows, [64, 128])  # operands are as they were before the first store
+        np.testing.assert_array_equal(rows, [RAMP, RAMP, RAMP + 32])
+
     def test_errors(self):
         memory = np.zeros(100, np.int16)
+        for offset in (2**63 - 1, 2**63 - 64, -2**63):
+            self.assertRaisesRegex(ValueError, "not within the memory of 200 bytes", kastarri.LVNX16_IP, memory, offset, 64)
+        for objects in (np.full(32, None), memoryview(np.full(32, None)), np.zeros(8, "i8,O")):
+            self.assertRaisesRegex(TypeError, "holds Python objects", kastarri.SVNX16_I, RAMP, objects, 0)
+        kastarri.SVNX16_I(RAMP, memoryview(bytearray(64)), 0)
         for offset in (-1, 137, 2**31 - 1):
             self.assertRaisesRegex(ValueError, "not within the memory of 200 bytes", kastarri.LVNX16_I, memory, offset)
         self.assertRaisesRegex(ValueError, "offset 2 is not a multiple of 4", kastarri.RK_L32I, memory, 2)
@@ -222,6 +293,8 @@ class Core(unittest.TestCase):
         self.assertEqual(kastarri.RK_RSR_PRID(), 7)
         self.assertRaises(AttributeError, setattr, state, "SARS", 1)
         self.assertRaises(ValueError, setattr, state, "SAR", 2**32)
+        self.assertRaises(TypeError, setattr, state, "SAR", 1.5)
+        self.assertRaises(ValueError, setattr, state, "PRID", 2**31)
         self.assertRaises(ValueError, setattr, state, "rounding", "off")
         self.assertRaises(ValueError, setattr, state, "flags", {"exact"})
 
@@ -244,6 +317,15 @@ class Core(unittest.TestCase):
         self.assertRaisesRegex(ValueError, "32 bits", kastarri.RK_READ_IMPWIRE)
         kastarri.ports.imported_wire(None)
         self.assertRaisesRegex(RuntimeError, "no handler 'wire'", kastarri.RK_READ_IMPWIRE)
+
+    def test_handlers_that_call_intrinsics(self):
+        wire = kastarri.ports.imported_wire
+        wire(lambda: np.max(kastarri.ADDNX16(RAMP, 1)))
+        self.assertEqual(kastarri.RK_READ_IMPWIRE(), 32)
+        wire(kastarri.RK_READ_IMPWIRE)
+        self.assertRaises(RecursionError, kastarri.RK_READ_IMPWIRE)
+        wire(lambda: wire(None) or 5)
+        self.assertEqual(kastarri.RK_READ_IMPWIRE(), 5)
 
 
 class Documentation(unittest.TestCase):

@@ -1,10 +1,17 @@
-"""Commands that tests run, their standard output and errors in one text."""
+"""Commands that tests run."""
 
+import os
 import subprocess
 
 
 def run(*command, **options):
+    """With standard output and errors in one text."""
     return subprocess.run(command, stdout=subprocess.PIPE, stderr=subprocess.STDOUT, text=True, check=False, **options)
+
+
+def run_apart(*command, **environment):
+    """With standard output and errors apart, and these variables in its environment."""
+    return subprocess.run(command, capture_output=True, text=True, check=False, env=dict(os.environ, **environment))
 
 
 def output(*command, **options):

@@ -1,4 +1,4 @@
-"""Commands that tests run."""
+"""Commands that tests run, and the width of programs."""
 
 import os
 import subprocess
@@ -20,3 +20,9 @@ def output(*command, **options):
     if result.returncode != 0:
         raise AssertionError(" ".join(command) + "\n" + result.stdout)
     return result.stdout
+
+
+def bits_of(program):
+    """32 or 64, by the class of the ELF file."""
+    with open(program, "rb") as file:
+        return 32 * file.read(5)[4]

@@ -118,7 +118,7 @@ class Installation(Installed):
             with self.subTest(tool=tool):
                 program = os.path.join(self.prefix, "bin", tool)
                 self.assertEqual(output(program, "--version"), f"{tool} {VERSION}\n")
-                if cached(BUILD, "KASTARRI_HELP2MAN").endswith("NOTFOUND"):
+                if cached(BUILD, "KASTARRI_HELP2MAN").endswith("NOTFOUND") and "CI" not in os.environ:
                     continue
                 with open(os.path.join(self.prefix, "share/man/man1", tool + ".1"), encoding="utf-8") as file:
                     page = re.sub(r"\\f[BIR]", "", file.read().replace("\\-", "-"))

@@ -4,6 +4,12 @@
 // A shape's name tells its operands: a, b, c vectors or scalars; r the result; w a wide vector;
 // p a predicate; _T predicated, with the destination first and the predicate last. Here are those that
 // several families have; <family>/shapes.h has those of one.
+//
+// Tools go by names. By those of shapes: _T; load.. and store.. with _I or _IP; ..aligned.. tests the address of
+// memory, ..aligned_destination.. that of the result; mtor and rtom round the address of a host scalar down;
+// gather.., scatter.., increment.. access an address for each lane. By those of parameters: a, b, c, d operands, p
+// the predicate; r and acc hold what the call reads before it writes them, but for loads (and second results, which
+// tools/reference/entries.py lists); bytes are added to an address by offset, increment, offsets.
 #ifndef KASTARRI_FRAME_SHAPES_H
 #define KASTARRI_FRAME_SHAPES_H
 

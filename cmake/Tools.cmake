@@ -32,9 +32,14 @@ function(kastarri_man_page name program summary)
     return()
   endif()
   set(page ${PROJECT_BINARY_DIR}/share/man/man1/${name}.1)
+  # A page bears the month of the source, not that of the build: all builds of one tree make the same page.
+  set(date $ENV{SOURCE_DATE_EPOCH})
+  if(NOT date)
+    file(TIMESTAMP ${PROJECT_SOURCE_DIR}/tools/${name}.in date %s UTC)
+  endif()
   file(MAKE_DIRECTORY ${PROJECT_BINARY_DIR}/share/man/man1)
   add_custom_command(OUTPUT ${page}
-    COMMAND ${CMAKE_COMMAND} -E env PROGRAM=${program} ${KASTARRI_HELP2MAN}
+    COMMAND ${CMAKE_COMMAND} -E env PROGRAM=${program} SOURCE_DATE_EPOCH=${date} ${KASTARRI_HELP2MAN}
       --no-info --source=kastarri --name=${summary} --output=${page} ${PROJECT_SOURCE_DIR}/tools/for_help2man.sh
     DEPENDS ${program} ${ARGN} COMMENT "Writing the man page of ${name}" VERBATIM)
   add_custom_target(${name}-man ALL DEPENDS ${page})

@@ -56,7 +56,7 @@ class Parameter:
         elif operand.in_memory:
             self.role = "moving" if operand.pointer else "memory"
         elif operand.role == "written":
-            self.role = "kept" if operand.keeps and row.shape != "a_pr" else "written"
+            self.role = "kept" if operand.keeps else "written"
         elif not operand.name:
             self.role = "ignored"
         elif gathers and operand.name == "offsets":

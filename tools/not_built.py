@@ -6,8 +6,8 @@ docs/coverage.md, the reference page and kastarri-port have it from here. Names 
 import collections
 import re
 
-# names: patterns of names that belong here. abbreviated: where no name is known to us, words that one may be short for;
-# it has at least their capitals. words: what else people look for.
+# title: what of the topic is built stands behind "but for". names: patterns of names that belong here. abbreviated: where
+# no name is known to us, words that one may be short for; it has at least their capitals. words: what else people look for.
 Topic = collections.namedtuple("Topic", "key title why instead names abbreviated words")
 
 TOPICS = [

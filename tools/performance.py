@@ -22,6 +22,7 @@ ROOT = os.path.dirname(os.path.dirname(os.path.abspath(__file__)))
 sys.path.insert(0, os.path.join(ROOT, "tools"))
 import generate_headers  # noqa: E402
 import kernels  # noqa: E402
+import processor  # noqa: E402
 from cmake_cache import cached  # noqa: E402
 
 TARGETS = ["avx512", "avx2", "sse2"]
@@ -82,13 +83,6 @@ def limit_of(name, target, limits):
         if pattern.fullmatch(name):
             return cycles[target] * (SPECIAL if variant == "special" else 1)
     return None
-
-
-def processor():
-    """Its name, with family and model, as many have the same name."""
-    with open("/proc/cpuinfo", encoding="utf-8") as file:
-        told = dict(re.findall(r"^(.+?)\s*: (.*)$", file.read(), re.M))
-    return f"{told['model name']} (family {told['cpu family']}, model {told['model']})"
 
 
 def cell(name, target, cycles, limits):
@@ -251,7 +245,7 @@ def main():
         found = run(arguments.build, target, arguments.filter, arguments.repetitions, arguments.seconds)
         if found:
             times[target] = found
-    measured, (limited, limits) = Measured(times, processor(), int(cached(arguments.build, "KASTARRI_BITS"))), read_limits()
+    measured, (limited, limits) = Measured(times, processor.name(), int(cached(arguments.build, "KASTARRI_BITS"))), read_limits()
     if limited != measured.processor:
         print(f"the limits are of another processor: {limited}", file=sys.stderr)
     if arguments.summary:

@@ -9,6 +9,7 @@
 import collections
 import os
 import re
+import shlex
 import subprocess
 import sys
 
@@ -34,11 +35,15 @@ READER = '#include "families.h"\n'
 UNITS = {"word": ("unsigned int", 32), "half": ("unsigned short", 16), "byte": ("unsigned char", 8)}
 
 
+def compiler():
+    """The command that compiles C++: CXX may have words before the compiler or behind it."""
+    return shlex.split(os.environ.get("CXX", "g++"))
+
+
 def preprocess(text):
     """The lines of `text` after the C++ preprocessor, which sees src/."""
-    result = subprocess.run(
-        [os.environ.get("CXX", "g++"), "-E", "-P", "-x", "c++", "-I", os.path.join(ROOT, "src"), "-"],
-        input=text, capture_output=True, text=True, check=False)
+    result = subprocess.run([*compiler(), "-E", "-P", "-x", "c++", "-I", os.path.join(ROOT, "src"), "-"],
+                            input=text, capture_output=True, text=True, check=False)
     if result.returncode != 0:
         sys.exit(result.stderr)
     return result.stdout

@@ -3,13 +3,12 @@
 ZRA_ADDNX16 is the function cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_ZRA_ADDNX16 under the name of the core's own sources.
 """
 
-import os
 import re
 import subprocess
 
 import rules
 from declarations import declaration, documentation, family_body, header_text, parts
-from read_tables import PREFIX, short_name, symbol
+from read_tables import PREFIX, compiler, short_name, symbol
 
 
 def exported(rows, types):
@@ -18,7 +17,7 @@ def exported(rows, types):
     text += "".join(f"namespace {t.name}_space {{ class {t.name}_; }} typedef {t.cls} {PREFIX}{t.name};\n" for t in types.values())
     text += "".join(f"{row.prototype};\n" for row in rows)
     text += "void* table[] = {" + ", ".join(f"(void*)&{symbol(row.name)}" for row in rows) + "};\n"
-    assembly = subprocess.run([os.environ.get("CXX", "g++"), "-S", "-o", "-", "-x", "c++", "-"],
+    assembly = subprocess.run([*compiler(), "-S", "-o", "-", "-x", "c++", "-"],
                               input=text, capture_output=True, text=True, check=True).stdout
     return dict(zip(rows, re.findall(r"^\s*\.(?:quad|long)\s+(_Z\w+)$", assembly, re.M)))
 

@@ -16,15 +16,9 @@ import sys
 ROOT = os.path.dirname(os.path.dirname(os.path.abspath(__file__)))
 sys.path.insert(0, os.path.join(ROOT, "tools"))
 import generate_headers  # noqa: E402
+import processor  # noqa: E402
 
 BUILD = os.path.join(ROOT, "build", "try")
-NEEDS = {"avx512": {"avx512f", "avx512bw", "avx512dq", "avx512vl"}, "avx2": {"avx2", "fma", "f16c"}, "sse2": {"sse2"}}
-
-
-def best_target():
-    with open("/proc/cpuinfo", encoding="utf-8") as file:
-        flags = set(re.search(r"^flags\s*: (.*)", file.read(), re.M)[1].split())
-    return next(target for target, needed in NEEDS.items() if needed <= flags)
 
 
 def operation(name):
@@ -48,7 +42,7 @@ def run(*command):
 def main():
     parser = argparse.ArgumentParser(description=__doc__, formatter_class=argparse.RawDescriptionHelpFormatter)
     parser.add_argument("name")
-    parser.add_argument("--target", default=best_target(), choices=NEEDS)
+    parser.add_argument("--target", default=processor.best_target(), choices=processor.NEEDS)
     arguments = parser.parse_args()
     rows = twins(re.sub(r"^(ZRA|RK)_", "", arguments.name))
     run("cmake", "--preset", "try", "-DKASTARRI_TARGETS=" + arguments.target)

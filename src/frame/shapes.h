@@ -4,6 +4,19 @@
 // A shape's name tells its operands: a, b, c vectors or scalars; r the result; w a wide vector;
 // p a predicate; _T predicated, with the destination first and the predicate last. Here are those that
 // several families have; <family>/shapes.h has those of one.
+//
+// Tools go by what a name has in it. That of a shape:
+//   _T                            predicated
+//   load_I, load_IP, store_I ...  base + offset, or a pointer that then moves by increment
+//   aligned, aligned_destination  the address of memory is tested, or that of the result
+//   mtor, rtom                    the address of a host scalar is rounded down
+//   gather, scatter, increment    each lane has an address of its own, base + offsets[i]
+// and that of a parameter:
+//   r, acc                        read before it is written, but by loads; entries.py of the reference
+//                                 lists second results, which are not
+//   a, b, c, d                    operands, each with numbers of its own in worked examples
+//   p                             the predicate
+//   offset, increment, offsets    distances in bytes
 #ifndef KASTARRI_FRAME_SHAPES_H
 #define KASTARRI_FRAME_SHAPES_H
 

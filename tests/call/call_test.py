@@ -12,6 +12,9 @@ import sys
 import unittest
 
 ROOT = os.path.dirname(os.path.dirname(os.path.dirname(os.path.abspath(__file__))))
+sys.path.insert(0, os.path.join(ROOT, "tests", "reference"))
+from queries import read_queries  # noqa: E402
+
 PROGRAM = sys.argv.pop(1)
 
 # A command, and how the lines of its answer begin.
@@ -103,20 +106,15 @@ class Documentation(unittest.TestCase):
 
 class Search(unittest.TestCase):
     def test_nine_of_ten_queries_of_the_reference_are_answered_among_the_first(self):
-        with open(os.path.join(ROOT, "tests", "reference", "queries.txt"), encoding="utf-8") as file:
-            queries = [line.rstrip("\n").split("\t") for line in file if line.strip() and line[0] != "#"]
+        queries = read_queries()
         loader = importlib.machinery.SourceFileLoader("kastarri_call", PROGRAM)
         program = importlib.util.module_from_spec(importlib.util.spec_from_loader("kastarri_call", loader))
         loader.exec_module(program)
         answers_of, missed = program.Answers(program.read_data()), []
-        for query, answers in queries:
-            for short, meant in {"{V}": "(2NX8|NX16|N_2X32)", "{F}": "(NXF16|N_2XF32)", "{M}": "(I|X|IP|XP)"}.items():
-                answers = answers.replace(short, meant)
-            first = answers_of.to(query)[:5]
-            topics = [a[1:] for a in re.findall(r"\?[^|]+", answers) if a[0] == "?" and not re.search(r"[()]", a)]
-            names = "|".join(a for a in re.findall(r"(?:\([^()]*\)|\[[^\]]*\]|[^|])+", answers) if a[0] != "?") or "(?!)"
-            if not any(re.fullmatch(names, a["id"]) if "name" in a else any(map(a["title"].startswith, topics)) for a in first):
-                missed.append(query)
+        for query in queries:
+            first = [a["id"] if "name" in a else "?" + a["title"] for a in answers_of.to(query.text)[:5]]
+            if not any(map(query.answered_by, first)):
+                missed.append(query.text)
         self.assertGreater(len(queries), 100)
         self.assertLessEqual(10 * len(missed), len(queries), missed)
 

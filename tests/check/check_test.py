@@ -7,12 +7,14 @@ import glob
 import os
 import re
 import shutil
-import subprocess
 import sys
 import unittest
 
-BUILD = sys.argv[1]
 HERE = os.path.dirname(os.path.abspath(__file__))
+sys.path.insert(0, os.path.join(os.path.dirname(HERE), "support"))
+from commands import run_apart as run  # noqa: E402
+
+BUILD = sys.argv[1]
 CHECKER = os.path.join(BUILD, "bin", "kastarri-check")
 SLIPS, UNINITIALISED, TOUCHED = (os.path.join(BUILD, "tests", "check", name)
                                  for name in ("slips", "uninitialised", "touched_bytes"))
@@ -36,10 +38,6 @@ EXPECTED = {
 def line_of(mode):
     with open(os.path.join(HERE, "slips.cpp"), encoding="utf-8") as file:
         return next(number for number, line in enumerate(file, 1) if line.rstrip().endswith("// slip: " + mode))
-
-
-def run(*command, **environment):
-    return subprocess.run(command, capture_output=True, text=True, check=False, env=dict(os.environ, **environment))
 
 
 class Slips(unittest.TestCase):
@@ -94,7 +92,7 @@ class Slips(unittest.TestCase):
             self.assertIn(message, result.stderr)
 
 
-@unittest.skipUnless(shutil.which("valgrind"), "valgrind is not installed")
+@unittest.skipUnless(shutil.which("valgrind") or "CI" in os.environ, "valgrind is not installed")
 class Uninitialised(unittest.TestCase):
     def valgrind(self, *arguments):
         return run("valgrind", "--track-origins=yes", "--error-exitcode=9", UNINITIALISED, *arguments)

@@ -9,23 +9,16 @@ import itertools
 import os
 import re
 import shutil
-import sys
 import unittest
 
-from support import BITS, BUILD, CLANG, COMPILER, HERE, OTHER, RELEASE, ROOT, STATIC_TARGET, VERSION, Directory, cached, output, run
+from support import (BITS, BUILD, CLANG, COMPILER, HERE, OTHER, RELEASE, ROOT, STATIC_TARGET, VERSION, Directory, cached, output,
+                     processor, run)
 
 ARCHITECTURE = {"32": "i386", "64": "amd64"}[BITS]
 MULTIARCH = {"32": "lib/i386-linux-gnu", "64": "lib/x86_64-linux-gnu"}[BITS]  # where the test presets install libraries
 # Where the files of CMake and pkg-config are found: those of 32 bits whatever a project says.
 CMAKE_DIRECTORY = {"32": "lib", "64": MULTIARCH}[BITS] + "/cmake/kastarri"
 PKGCONFIG_DIRECTORIES = {"32": ["lib/pkgconfig", MULTIARCH + "/pkgconfig"], "64": [MULTIARCH + "/pkgconfig"]}[BITS]
-
-
-def processor_runs_static():
-    with open("/proc/cpuinfo", encoding="utf-8") as file:
-        flags = set(re.search(r"^flags\s*:(.*)$", file.read(), re.M)[1].split())
-    return {"sse2": {"sse2"}, "avx2": {"avx2", "fma", "f16c"},
-            "avx512": {"avx512f", "avx512bw", "avx512dq", "avx512vl"}}[STATIC_TARGET] <= flags
 
 
 def cpack(generator, directory):
@@ -125,7 +118,7 @@ class Installation(Installed):
             with self.subTest(tool=tool):
                 program = os.path.join(self.prefix, "bin", tool)
                 self.assertEqual(output(program, "--version"), f"{tool} {VERSION}\n")
-                if cached(BUILD, "KASTARRI_HELP2MAN").endswith("NOTFOUND"):
+                if cached(BUILD, "KASTARRI_HELP2MAN").endswith("NOTFOUND") and "CI" not in os.environ:
                     continue
                 with open(os.path.join(self.prefix, "share/man/man1", tool + ".1"), encoding="utf-8") as file:
                     page = re.sub(r"\\f[BIR]", "", file.read().replace("\\-", "-"))
@@ -162,7 +155,7 @@ class Installation(Installed):
         calls = [line for line in output("objdump", "-d", "--no-show-raw-insn", program).splitlines()
                  if re.search(r"call .*ZRA_ADDNX16[^+]*$", line)]
         self.assertEqual(calls, [], "what is optimised when it is linked has the intrinsic inlined")
-        if processor_runs_static():
+        if processor.runs(STATIC_TARGET):
             self.assertEqual(self.check_answer(program), STATIC_TARGET)
 
     def test_a_component_or_version_that_is_not_there_is_named(self):
@@ -196,7 +189,7 @@ class Installation(Installed):
         self.assertEqual(told, BITS == "32")
 
     def test_pkg_config_has_all_that_a_compiler_needs(self):
-        modules = {"kastarri": True, "kastarri-static": processor_runs_static()}
+        modules = {"kastarri": True, "kastarri-static": processor.runs(STATIC_TARGET)}
         for module, directory, compiler in itertools.product(modules, PKGCONFIG_DIRECTORIES, ("g++", "clang++")):
             with self.subTest(module=module, directory=directory, compiler=compiler):
                 if CLANG and module == "kastarri-static" and compiler == "g++":

@@ -16,13 +16,13 @@ import unittest
 
 HERE = os.path.dirname(os.path.abspath(__file__))
 ROOT = os.path.dirname(os.path.dirname(HERE))
-sys.path.insert(0, os.path.join(ROOT, "tools"))
+sys.path[:0] = [os.path.join(ROOT, "tools"), os.path.join(ROOT, "tests", "support")]
 import generate_headers  # noqa: E402
+from commands import bits_of  # noqa: E402
 
 LIBRARY = os.path.abspath(sys.argv[1])
 COMPILERS = ["g++", "clang++"]
-with open(LIBRARY, "rb") as library_file:
-    BITS = 32 * library_file.read(5)[4]  # by the class of the ELF file
+BITS = bits_of(LIBRARY)
 FLAGS = [f"-m{BITS}", "-std=c++11", "-Wall", "-Wextra", "-Wpedantic", "-Wconversion", "-Wshadow", "-Werror",
          "-I", os.path.join(ROOT, "include")]
 FORMS = ["decimal", "hex", "float", "half", "halves", "bytes", "q0", "q7", "q8", "q15", "q16", "q31", "q63"]

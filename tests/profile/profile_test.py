@@ -15,15 +15,17 @@ import tempfile
 import unittest
 import xml.etree.ElementTree
 
+sys.path.insert(0, os.path.join(os.path.dirname(os.path.dirname(os.path.abspath(__file__))), "support"))
+from commands import bits_of  # noqa: E402
+
 BUILD, CMAKE = sys.argv[1:3]
 PROFILER = os.path.join(BUILD, "bin", "kastarri-profile")
 PROGRAMS = os.path.join(BUILD, "tests", "profile")
 CALLS = os.path.join(PROGRAMS, "calls_lazy")
+BITS = bits_of(CALLS)
 BUILDS = [os.path.join(PROGRAMS, name) for name in ("calls_lazy", "calls_now", "calls_no_plt", "calls_fixed")]
 HOST, PLUGIN = os.path.join(PROGRAMS, "host"), os.path.join(PROGRAMS, "libplugin.so")
 
-with open(CALLS, "rb") as program:
-    IS_64_BIT = program.read(5)[4] == 2  # the class of an ELF file
 
 BEFORE_MAIN = {"RK_CLAMPS": 1, "int32_rtor_qv_vecNx16": 1}
 RESULTS = {"RK_CLAMPS": 2, "int32_rtor_qv_vecNx16": 1, "ZRA_LVNX16_IP": 1, "ZRA_MULNX16": 1, "ZRA_MULANX16": 1,
@@ -260,8 +262,7 @@ class Errors(ProfileTest):
         arm = b"\x7fELF\x01\x01\x01" + bytes(9) + b"\x02\x00\x28\x00" + bytes(32)
         # A program of the other width that names its loader, where this build has the files of one width.
         self.assertEqual(len(os.listdir(os.path.join(BUILD, "lib", "kastarri", "profile"))), 1)
-        other = (x86 if IS_64_BIT else x86_64)
-        other = with_loader(other, b"/lib/ld.so\0")
+        other = with_loader(x86 if BITS == 64 else x86_64, b"/lib/ld.so\0")
         for command, status, message in (
                 (["no-such-program"], 127, "there is no program no-such-program"),
                 ([self.path("absent")], 127, "there is no program"),
@@ -270,7 +271,7 @@ class Errors(ProfileTest):
                 ([self.program("script", b"#!/bin/sh\n")], 126, "not a program but a script"),
                 ([self.program("empty", b"")], 126, "not a program"),
                 ([self.program("arm", arm)], 126, "not an x86 program"),
-                ([self.program("other", other)], 126, f"is a {32 if IS_64_BIT else 64}-bit program, and kastarri for those"),
+                ([self.program("other", other)], 126, f"is a {96 - BITS}-bit program, and kastarri for those"),
                 ([self.program("static", x86)], 126, "linked statically"),
                 ([self.program("static64", x86_64)], 126, "linked statically"),
                 ([HOST], 126, "not linked with libkastarri.so"),

@@ -5,21 +5,17 @@ Run as: sequences_test.py BUILD WRONG-LIBRARY COMPILER [FLAG...]
 
 import os
 import re
-import subprocess
 import sys
 import tempfile
 import unittest
 
 ROOT = os.path.dirname(os.path.dirname(os.path.dirname(os.path.abspath(__file__))))
-sys.path.insert(0, os.path.join(ROOT, "tools", "fuzz"))
+sys.path[:0] = [os.path.join(ROOT, "tools", "fuzz"), os.path.join(ROOT, "tests", "support")]
 import fuzz  # noqa: E402
+from commands import run_apart as run  # noqa: E402
 
 BUILD, WRONG, *COMPILER = sys.argv[1:]
 FUZZ = os.path.join(ROOT, "tools", "fuzz", "fuzz.py")
-
-
-def run(*command, **environment):
-    return subprocess.run(command, capture_output=True, text=True, check=False, env=dict(os.environ, **environment))
 
 
 class Programs(unittest.TestCase):

@@ -14,19 +14,13 @@ import unittest
 
 TESTS = os.path.dirname(os.path.dirname(os.path.abspath(__file__)))
 sys.path.insert(0, os.path.join(TESTS, "support"))
-from commands import output, run  # noqa: E402
+from commands import bits_of, output, run  # noqa: E402
 
 CONSUMER = os.path.join(TESTS, "package", "consumer")
 BUILDS = {"32": os.path.abspath(sys.argv[1]), "64": os.path.abspath(sys.argv[2])}
 OTHERS = list(map(os.path.abspath, sys.argv[3:]))
 ARCHITECTURES = {"32": "i386", "64": "amd64"}
 TARGETS = ["avx512", "avx2", "sse2"]
-
-
-def width_of(program):
-    """By the class of the ELF file."""
-    with open(program, "rb") as file:
-        return str(32 * file.read(5)[4])
 
 
 class SameBits(unittest.TestCase):
@@ -97,7 +91,7 @@ class SideBySide(unittest.TestCase):
                     build = self.path(linkage + "".join(flags))
                     output("cmake", "-S", CONSUMER, "-B", build, f"-DCMAKE_PREFIX_PATH={self.usr}", f"-DLINKAGE={linkage}", *flags)
                     output("cmake", "--build", build)
-                    self.assertEqual(width_of(os.path.join(build, "consumer")), bits)
+                    self.assertEqual(bits_of(os.path.join(build, "consumer")), int(bits))
 
     def test_pkg_config_gives_the_library_of_the_programs_width(self):
         # Where pkg-config looks on an amd64, and the one for i386 programs.
@@ -107,7 +101,7 @@ class SideBySide(unittest.TestCase):
                 flags = output("pkg-config", "--cflags", "--libs", "kastarri", env=dict(os.environ, PKG_CONFIG_LIBDIR=where))
                 program = os.path.join(self.directory, "pkg_config" + bits)
                 output("g++", os.path.join(CONSUMER, "main.cpp"), "-o", program, *flags.split())
-                self.assertEqual(width_of(program), bits)
+                self.assertEqual(bits_of(program), int(bits))
                 library = os.path.join(self.usr, places[0])
                 self.assertIn("255", output(program, env=dict(os.environ, LD_LIBRARY_PATH=library)).split())
 
@@ -115,7 +109,7 @@ class SideBySide(unittest.TestCase):
         for bits, build in BUILDS.items():
             with self.subTest(bits=bits):
                 program = os.path.join(build, "tests", "profile", "calls_lazy")
-                self.assertEqual(width_of(program), bits)
+                self.assertEqual(bits_of(program), int(bits))
                 self.assertIn("7 calls of 6 intrinsics",
                               output(os.path.join(self.usr, "bin", "kastarri-profile"), program, "results"))
 

@@ -26,12 +26,12 @@ def lanes(operand):
     return [kind, 1 if kind == "b" else 8 * operand.bytes, 1, operand.bytes]
 
 
-def part(row, operand):
+def part(operand):
     """What an operand is in a call: given, changed, written, memory, or ignored."""
     if operand.in_memory:
         return "memory"
     if operand.role in ("written", "result"):
-        return "changed" if operand.keeps and row.shape != "a_pr" else "written"
+        return "changed" if operand.keeps else "written"
     return "given" if operand.name else "ignored"
 
 
@@ -41,7 +41,7 @@ def entry_data(entry):
     rules = " ".join([entry.rule, *entry.context, generate_headers.FAMILIES[entry.family]])
     prototype = entry.row.prototype.replace(entry.symbol, entry.short).replace(generate_headers.PREFIX, "")
     return {"name": entry.short, "row": entry.row.name, "prototype": prototype, "rule": entry.rule,
-            "id": entry.id, "operands": [[o.name, o.type, part(entry.row, o), *lanes(o)] for o in entry.operands],
+            "id": entry.id, "operands": [[o.name, o.type, part(o), *lanes(o)] for o in entry.operands],
             "words": [operation, f"{attributes} {types}", rules], "plainness": round(words.plainness(entry), 2)}
 
 

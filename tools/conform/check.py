@@ -38,8 +38,6 @@ PROBE = """
 #include "kastarri/library.h"
 int main() { puts(cstub_Km_ZNB_Orbis_R5_64k_target()); }
 """
-STATIC_FLAGS = {"sse2": ["-msse2"], "avx2": ["-mavx2", "-mfma", "-mf16c"],
-                "avx512": ["-mavx512f", "-mavx512bw", "-mavx512dq", "-mavx512vl", "-mfma", "-mf16c", "-mprefer-vector-width=512"]}
 
 
 class Check:
@@ -107,14 +105,14 @@ class Check:
                 self.take(f"{bits} bits, {form}, {host}", runs.report(programs, library, preload))
 
     def inlined(self, build, sources):
-        if not build.archive():
+        settings = build.inlined()
+        if not settings:
             return
-        archive, target = build.archive()
-        lto = "-flto=thin" if "clang" in build.compiler else "-flto"
-        flags = [build.width, *STATIC_FLAGS[target], "-mfpmath=sse", lto]
+        compiler, link = settings["compiler"], [settings["library"], *settings["link_flags"]]
+        target = build.cached("KASTARRI_STATIC_TARGET")
         for level in LEVELS[1:]:
-            programs = runs.compile_programs(sources, self.path("static"), build.compiler, [*flags, level], [archive])
-            form = f"{build.bits} bits, inlined for {target} by {os.path.basename(build.compiler)} {level}"
+            programs = runs.compile_programs(sources, self.path("static"), compiler, [*settings["flags"], level], link)
+            form = f"{build.bits} bits, inlined for {target} by {os.path.basename(compiler)} {level}"
             self.take(form, runs.report(programs))
 
     def check(self, builds):

@@ -8,7 +8,7 @@ import sys
 
 ROOT = os.path.dirname(os.path.dirname(os.path.dirname(os.path.abspath(__file__))))
 sys.path.insert(0, os.path.join(ROOT, "tools"))
-from cmake_cache import cached  # noqa: E402
+from cmake_cache import cached, inlined  # noqa: E402
 
 USER_FLAGS = ["-msse2", "-mfpmath=sse"]  # as cmake/Library.cmake has them
 
@@ -47,10 +47,8 @@ class Build:
         found = {os.path.basename(path): path for path in sorted(glob.glob(os.path.join(self.directory, "tests", "only", "*")))}
         return found or {"shipped": self.directory}
 
-    def archive(self):
-        """The static library and its target, if it was built."""
-        path = os.path.join(self.directory, "libkastarri_static.a")
-        return (path, self.cached("KASTARRI_STATIC_TARGET")) if os.path.exists(path) else None
+    def inlined(self):
+        return inlined(self.directory)
 
 
 def write_programs(build, directory, *options):

@@ -20,8 +20,10 @@ import sys
 import tempfile
 import time
 
-sys.path.insert(0, os.path.dirname(os.path.abspath(__file__)))
+HERE = os.path.dirname(os.path.abspath(__file__))
+sys.path[:0] = [HERE, os.path.dirname(HERE)]
 import source  # noqa: E402
+from cmake_cache import inlined  # noqa: E402
 
 ROOT = source.ROOT
 IN_A_RUN = 2000  # programs
@@ -116,12 +118,10 @@ def called_of(build):
 
 def inlined_of(build, reference):
     """None or one."""
-    directory = os.path.join(build, "tests", "sequences")
-    program = os.path.join(directory, "kastarri_sequences_static")
+    program = os.path.join(build, "tests", "sequences", "kastarri_sequences_static")
     if not os.path.exists(program) or not Called("", program).is_runnable:
         return []
-    with open(os.path.join(directory, "inlined.json"), encoding="utf-8") as file:
-        return [Inlined(f"{os.path.basename(os.path.normpath(build))} inlined", json.load(file), reference)]
+    return [Inlined(f"{os.path.basename(os.path.normpath(build))} inlined", inlined(build), reference)]
 
 
 # --- A difference -------------------------------------------------------------------------------------

@@ -26,6 +26,10 @@ FACTS = {
 }
 
 
+# What an r or acc held before a call matters, but in shapes of loads and in these, whose r is a second result.
+SECOND_RESULT = {"a_pr"}
+
+
 class Operand:
     """A parameter, or the result, of a prototype."""
 
@@ -62,7 +66,8 @@ def operands_of(row, types):
     result, parameters = re.fullmatch(r"(.*?)\s*\bcstub\w+\((.*)\)", row.prototype).groups()
     operands = [Operand(text, types) for text in parameters.split(",") if text.strip()]
     for operand in operands:
-        operand.keeps = operand.role == "written" and operand.name in ("r", "acc") and not row.shape.startswith("load")
+        operand.keeps = (operand.role == "written" and operand.name in ("r", "acc") and row.shape not in SECOND_RESULT
+                         and not row.shape.startswith("load"))
     return operands if result == "void" else operands + [Operand(result, types, "result")]
 
 

@@ -17,10 +17,21 @@ constexpr auto bound_of = [](auto x) {
   return static_cast<T>(sign_fill(x) ^ std::numeric_limits<T>::max());
 };
 
+// clang knows the clamped sum or difference of lanes in twice their bits for the processor's own instruction. g++ would
+// compute it so.
+#ifdef __clang__
+template <class T>
+constexpr bool clamps_wider = sizeof(T) < sizeof(int);
+#else
+template <class T>
+constexpr bool clamps_wider = false;
+#endif
+
 // The wrapped sum has overflowed where its sign differs from that of both operands: of 8 bits, 100 + 100 = -56. No
 // wider type is needed, so that a register holds all its lanes throughout.
 constexpr auto ADDS = [](auto x, auto y) {
   using T = decltype(x);
+  if constexpr (clamps_wider<T>) return saturate<T>(x + y);
   const T sum = static_cast<T>(ADD(x, y));
   return ((sum ^ x) & (sum ^ y)) < 0 ? bound_of(x) : sum;
 };
@@ -28,6 +39,7 @@ constexpr auto ADDS = [](auto x, auto y) {
 // bits, 100 - -100 = -56.
 constexpr auto SUBS = [](auto x, auto y) {
   using T = decltype(x);
+  if constexpr (clamps_wider<T>) return saturate<T>(x - y);
   const T difference = static_cast<T>(SUB(x, y));
   return ((x ^ y) & (x ^ difference)) < 0 ? bound_of(x) : difference;
 };

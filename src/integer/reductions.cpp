@@ -108,7 +108,8 @@ constexpr auto CLAMPED = [](auto total) { return saturate<std::int16_t>(static_c
 #define KERNEL_combined_with(OP, OPERATION, L)                                         \
   template <class Units, class Unit>                                                   \
   static inline void KASTARRI_SEMANTIC(OP)(const Unit* acc, const Units* a, Unit* r) { \
-    Write<L>(r).put(0, combined<L>(OPERATION, Read<L>(acc)[0], a));                    \
+    const auto others = combined<L>(OPERATION, identity_of<L>(OPERATION), a);          \
+    Write<L>(r).put(0, OPERATION.rule(Read<L>(acc)[0], others));                       \
   }
 
 #include "integer/reductions.def"

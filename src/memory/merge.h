@@ -107,8 +107,10 @@ inline bool merges_plainly() {
 // loaded before any is stored: what they are loaded from may overlap what they go to.
 template <int Size>
 class Outgoing {
-  typedef word Chunk __attribute__((vector_size(Size < register_bytes ? Size : register_bytes)));
+  typedef word HalfRegister __attribute__((vector_size(register_bytes / 2)));
+  using Chunk = std::conditional_t<(Size < register_bytes), HalfRegister, Words>;
   static constexpr int chunk_bytes = sizeof(Chunk), chunks = Size / chunk_bytes;
+  static_assert(chunks * chunk_bytes == Size);
 
  public:
   explicit Outgoing(const void* from) {

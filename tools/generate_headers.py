@@ -93,10 +93,11 @@ def conversion_bodies(types):
                          f"KASTARRI_ALWAYS_INLINE {t.cls}& {t.cls}::operator=({source.type} from) {{ {fill} return *this; }}"]
                 continue
             call = f"*this = {symbol('rk_zra32_' + source.conversion)}(from);"
-            body += [f"inline {t.cls}::{t.name}_({source.type} from) {{ {call} }}",
-                     f"inline {t.cls}& {t.cls}::operator=({source.type} from) {{ return {call} }}"]
+            body += [f"KASTARRI_ALWAYS_INLINE {t.cls}::{t.name}_({source.type} from) {{ {call} }}",
+                     f"KASTARRI_ALWAYS_INLINE {t.cls}& {t.cls}::operator=({source.type} from) {{ return {call} }}"]
         for target, name in t.targets:
-            body.append(f"inline {t.cls}::operator {target}() const {{ return {symbol('rk_zra32_' + name)}(*this); }}")
+            call = f"return {symbol('rk_zra32_' + name)}(*this);"
+            body.append(f"KASTARRI_ALWAYS_INLINE {t.cls}::operator {target}() const {{ {call} }}")
     return body
 
 

@@ -4,14 +4,14 @@
 #include "kastarri/lanes.h"
 #include "kastarri/names.h"
 
-// The sum of x[n] * y[n]; count is a multiple of 32. Lanes are summed to the end in the accumulator, 2^17 products of
-// the greatest size without overflow, and added up once behind the loop.
+// The sum of x[n] * y[n]; count is a multiple of 32. Lanes are summed to the end in the accumulator, 2^17 - 1 products
+// of the greatest size without overflow, and added up once behind the loop.
 long long dot(const short* x, const short* y, int count) {
   const qv_vecNx16* a = reinterpret_cast<const qv_vecNx16*>(x);
   const qv_vecNx16* b = reinterpret_cast<const qv_vecNx16*>(y);
   qv_vecNx48 sums = ZRA_ZERONX48();
   for (int n = 0; n < count; n += 32, ++a, ++b) ZRA_MULANX16(sums, ZRA_LVNX16_I(a, 0), ZRA_LVNX16_I(b, 0));
-  // In a kernel the accumulator goes to words by PACKVRNX48_0 and _1, and those through RADDN_2X32.
+  // In a kernel the accumulator goes to words by PACKVRNX48_0 and _1, which saturate, and those through RADDN_2X32.
   long long sum = 0;
   for (const long long lane : kastarri::lanes(sums)) sum += lane;
   return sum;

@@ -3692,12 +3692,12 @@ KASTARRI_ALWAYS_INLINE qv_vec2Nx8_space::qv_vec2Nx8_::qv_vec2Nx8_(int from) { ka
 KASTARRI_ALWAYS_INLINE qv_vec2Nx8_space::qv_vec2Nx8_& qv_vec2Nx8_space::qv_vec2Nx8_::operator=(int from) { kastarri::replicate<8, 8, true>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_vec2Nx8_space::qv_vec2Nx8_::qv_vec2Nx8_(unsigned int from) { kastarri::replicate<8, 8, true>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_vec2Nx8_space::qv_vec2Nx8_& qv_vec2Nx8_space::qv_vec2Nx8_::operator=(unsigned int from) { kastarri::replicate<8, 8, true>(_, from); return *this; }
-inline qv_vec2Nx8_space::qv_vec2Nx8_::qv_vec2Nx8_(const qv_vec2Nx8U_space::qv_vec2Nx8U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_qv_vec2Nx8(from); }
-inline qv_vec2Nx8_space::qv_vec2Nx8_& qv_vec2Nx8_space::qv_vec2Nx8_::operator=(const qv_vec2Nx8U_space::qv_vec2Nx8U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_qv_vec2Nx8(from); }
-inline qv_vec2Nx8_space::qv_vec2Nx8_::qv_vec2Nx8_(const qv_int8_space::qv_int8_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_vec2Nx8(from); }
-inline qv_vec2Nx8_space::qv_vec2Nx8_& qv_vec2Nx8_space::qv_vec2Nx8_::operator=(const qv_int8_space::qv_int8_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_vec2Nx8(from); }
-inline qv_vec2Nx8_space::qv_vec2Nx8_::operator qv_vec2Nx8U_space::qv_vec2Nx8U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_qv_vec2Nx8U(*this); }
-inline qv_vec2Nx8_space::qv_vec2Nx8_::operator qv_int8_space::qv_int8_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_qv_int8(*this); }
+KASTARRI_ALWAYS_INLINE qv_vec2Nx8_space::qv_vec2Nx8_::qv_vec2Nx8_(const qv_vec2Nx8U_space::qv_vec2Nx8U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_qv_vec2Nx8(from); }
+KASTARRI_ALWAYS_INLINE qv_vec2Nx8_space::qv_vec2Nx8_& qv_vec2Nx8_space::qv_vec2Nx8_::operator=(const qv_vec2Nx8U_space::qv_vec2Nx8U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_qv_vec2Nx8(from); }
+KASTARRI_ALWAYS_INLINE qv_vec2Nx8_space::qv_vec2Nx8_::qv_vec2Nx8_(const qv_int8_space::qv_int8_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_vec2Nx8(from); }
+KASTARRI_ALWAYS_INLINE qv_vec2Nx8_space::qv_vec2Nx8_& qv_vec2Nx8_space::qv_vec2Nx8_::operator=(const qv_int8_space::qv_int8_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_vec2Nx8(from); }
+KASTARRI_ALWAYS_INLINE qv_vec2Nx8_space::qv_vec2Nx8_::operator qv_vec2Nx8U_space::qv_vec2Nx8U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_qv_vec2Nx8U(*this); }
+KASTARRI_ALWAYS_INLINE qv_vec2Nx8_space::qv_vec2Nx8_::operator qv_int8_space::qv_int8_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_qv_int8(*this); }
 KASTARRI_ALWAYS_INLINE qv_vec2Nx8U_space::qv_vec2Nx8U_::qv_vec2Nx8U_(signed char from) { kastarri::replicate<8, 8, false>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_vec2Nx8U_space::qv_vec2Nx8U_& qv_vec2Nx8U_space::qv_vec2Nx8U_::operator=(signed char from) { kastarri::replicate<8, 8, false>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_vec2Nx8U_space::qv_vec2Nx8U_::qv_vec2Nx8U_(unsigned char from) { kastarri::replicate<8, 8, false>(_, from); }
@@ -3710,14 +3710,14 @@ KASTARRI_ALWAYS_INLINE qv_vec2Nx8U_space::qv_vec2Nx8U_::qv_vec2Nx8U_(int from) {
 KASTARRI_ALWAYS_INLINE qv_vec2Nx8U_space::qv_vec2Nx8U_& qv_vec2Nx8U_space::qv_vec2Nx8U_::operator=(int from) { kastarri::replicate<8, 8, false>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_vec2Nx8U_space::qv_vec2Nx8U_::qv_vec2Nx8U_(unsigned int from) { kastarri::replicate<8, 8, false>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_vec2Nx8U_space::qv_vec2Nx8U_& qv_vec2Nx8U_space::qv_vec2Nx8U_::operator=(unsigned int from) { kastarri::replicate<8, 8, false>(_, from); return *this; }
-inline qv_vec2Nx8U_space::qv_vec2Nx8U_::qv_vec2Nx8U_(const qv_vec2Nx8_space::qv_vec2Nx8_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_qv_vec2Nx8U(from); }
-inline qv_vec2Nx8U_space::qv_vec2Nx8U_& qv_vec2Nx8U_space::qv_vec2Nx8U_::operator=(const qv_vec2Nx8_space::qv_vec2Nx8_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_qv_vec2Nx8U(from); }
-inline qv_vec2Nx8U_space::qv_vec2Nx8U_::qv_vec2Nx8U_(const qv_vec2Nx24_space::qv_vec2Nx24_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_vec2Nx8U(from); }
-inline qv_vec2Nx8U_space::qv_vec2Nx8U_& qv_vec2Nx8U_space::qv_vec2Nx8U_::operator=(const qv_vec2Nx24_space::qv_vec2Nx24_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_vec2Nx8U(from); }
-inline qv_vec2Nx8U_space::qv_vec2Nx8U_::qv_vec2Nx8U_(const qv_int8U_space::qv_int8U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_vec2Nx8U(from); }
-inline qv_vec2Nx8U_space::qv_vec2Nx8U_& qv_vec2Nx8U_space::qv_vec2Nx8U_::operator=(const qv_int8U_space::qv_int8U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_vec2Nx8U(from); }
-inline qv_vec2Nx8U_space::qv_vec2Nx8U_::operator qv_vec2Nx8_space::qv_vec2Nx8_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_qv_vec2Nx8(*this); }
-inline qv_vec2Nx8U_space::qv_vec2Nx8U_::operator qv_int8U_space::qv_int8U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_qv_int8U(*this); }
+KASTARRI_ALWAYS_INLINE qv_vec2Nx8U_space::qv_vec2Nx8U_::qv_vec2Nx8U_(const qv_vec2Nx8_space::qv_vec2Nx8_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_qv_vec2Nx8U(from); }
+KASTARRI_ALWAYS_INLINE qv_vec2Nx8U_space::qv_vec2Nx8U_& qv_vec2Nx8U_space::qv_vec2Nx8U_::operator=(const qv_vec2Nx8_space::qv_vec2Nx8_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_qv_vec2Nx8U(from); }
+KASTARRI_ALWAYS_INLINE qv_vec2Nx8U_space::qv_vec2Nx8U_::qv_vec2Nx8U_(const qv_vec2Nx24_space::qv_vec2Nx24_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_vec2Nx8U(from); }
+KASTARRI_ALWAYS_INLINE qv_vec2Nx8U_space::qv_vec2Nx8U_& qv_vec2Nx8U_space::qv_vec2Nx8U_::operator=(const qv_vec2Nx24_space::qv_vec2Nx24_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_vec2Nx8U(from); }
+KASTARRI_ALWAYS_INLINE qv_vec2Nx8U_space::qv_vec2Nx8U_::qv_vec2Nx8U_(const qv_int8U_space::qv_int8U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_vec2Nx8U(from); }
+KASTARRI_ALWAYS_INLINE qv_vec2Nx8U_space::qv_vec2Nx8U_& qv_vec2Nx8U_space::qv_vec2Nx8U_::operator=(const qv_int8U_space::qv_int8U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_vec2Nx8U(from); }
+KASTARRI_ALWAYS_INLINE qv_vec2Nx8U_space::qv_vec2Nx8U_::operator qv_vec2Nx8_space::qv_vec2Nx8_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_qv_vec2Nx8(*this); }
+KASTARRI_ALWAYS_INLINE qv_vec2Nx8U_space::qv_vec2Nx8U_::operator qv_int8U_space::qv_int8U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_qv_int8U(*this); }
 KASTARRI_ALWAYS_INLINE qv_vecNx16_space::qv_vecNx16_::qv_vecNx16_(signed char from) { kastarri::replicate<16, 16, true>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_vecNx16_space::qv_vecNx16_& qv_vecNx16_space::qv_vecNx16_::operator=(signed char from) { kastarri::replicate<16, 16, true>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_vecNx16_space::qv_vecNx16_::qv_vecNx16_(unsigned char from) { kastarri::replicate<16, 16, true>(_, from); }
@@ -3730,22 +3730,22 @@ KASTARRI_ALWAYS_INLINE qv_vecNx16_space::qv_vecNx16_::qv_vecNx16_(int from) { ka
 KASTARRI_ALWAYS_INLINE qv_vecNx16_space::qv_vecNx16_& qv_vecNx16_space::qv_vecNx16_::operator=(int from) { kastarri::replicate<16, 16, true>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_vecNx16_space::qv_vecNx16_::qv_vecNx16_(unsigned int from) { kastarri::replicate<16, 16, true>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_vecNx16_space::qv_vecNx16_& qv_vecNx16_space::qv_vecNx16_::operator=(unsigned int from) { kastarri::replicate<16, 16, true>(_, from); return *this; }
-inline qv_vecNx16_space::qv_vecNx16_::qv_vecNx16_(const qv_vecNx16U_space::qv_vecNx16U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_vecNx16(from); }
-inline qv_vecNx16_space::qv_vecNx16_& qv_vecNx16_space::qv_vecNx16_::operator=(const qv_vecNx16U_space::qv_vecNx16U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_vecNx16(from); }
-inline qv_vecNx16_space::qv_vecNx16_::qv_vecNx16_(const qv_vecNx8_space::qv_vecNx8_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_qv_vecNx16(from); }
-inline qv_vecNx16_space::qv_vecNx16_& qv_vecNx16_space::qv_vecNx16_::operator=(const qv_vecNx8_space::qv_vecNx8_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_qv_vecNx16(from); }
-inline qv_vecNx16_space::qv_vecNx16_::qv_vecNx16_(const qv_vecNx8U_space::qv_vecNx8U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_qv_vecNx16(from); }
-inline qv_vecNx16_space::qv_vecNx16_& qv_vecNx16_space::qv_vecNx16_::operator=(const qv_vecNx8U_space::qv_vecNx8U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_qv_vecNx16(from); }
-inline qv_vecNx16_space::qv_vecNx16_::qv_vecNx16_(const qv_int16_space::qv_int16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_vecNx16(from); }
-inline qv_vecNx16_space::qv_vecNx16_& qv_vecNx16_space::qv_vecNx16_::operator=(const qv_int16_space::qv_int16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_vecNx16(from); }
-inline qv_vecNx16_space::qv_vecNx16_::qv_vecNx16_(const qv_vecNxf16_space::qv_vecNxf16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_vecNx16(from); }
-inline qv_vecNx16_space::qv_vecNx16_& qv_vecNx16_space::qv_vecNx16_::operator=(const qv_vecNxf16_space::qv_vecNxf16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_vecNx16(from); }
-inline qv_vecNx16_space::qv_vecNx16_::operator qv_vecNx16U_space::qv_vecNx16U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNx16U(*this); }
-inline qv_vecNx16_space::qv_vecNx16_::operator qv_vecNx8_space::qv_vecNx8_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNx8(*this); }
-inline qv_vecNx16_space::qv_vecNx16_::operator qv_vecNx8U_space::qv_vecNx8U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNx8U(*this); }
-inline qv_vecNx16_space::qv_vecNx16_::operator qv_int8_space::qv_int8_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_int8(*this); }
-inline qv_vecNx16_space::qv_vecNx16_::operator qv_int16_space::qv_int16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_int16(*this); }
-inline qv_vecNx16_space::qv_vecNx16_::operator qv_vecNxf16_space::qv_vecNxf16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNxf16(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecNx16_space::qv_vecNx16_::qv_vecNx16_(const qv_vecNx16U_space::qv_vecNx16U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_vecNx16(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx16_space::qv_vecNx16_& qv_vecNx16_space::qv_vecNx16_::operator=(const qv_vecNx16U_space::qv_vecNx16U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_vecNx16(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx16_space::qv_vecNx16_::qv_vecNx16_(const qv_vecNx8_space::qv_vecNx8_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_qv_vecNx16(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx16_space::qv_vecNx16_& qv_vecNx16_space::qv_vecNx16_::operator=(const qv_vecNx8_space::qv_vecNx8_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_qv_vecNx16(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx16_space::qv_vecNx16_::qv_vecNx16_(const qv_vecNx8U_space::qv_vecNx8U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_qv_vecNx16(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx16_space::qv_vecNx16_& qv_vecNx16_space::qv_vecNx16_::operator=(const qv_vecNx8U_space::qv_vecNx8U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_qv_vecNx16(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx16_space::qv_vecNx16_::qv_vecNx16_(const qv_int16_space::qv_int16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_vecNx16(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx16_space::qv_vecNx16_& qv_vecNx16_space::qv_vecNx16_::operator=(const qv_int16_space::qv_int16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_vecNx16(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx16_space::qv_vecNx16_::qv_vecNx16_(const qv_vecNxf16_space::qv_vecNxf16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_vecNx16(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx16_space::qv_vecNx16_& qv_vecNx16_space::qv_vecNx16_::operator=(const qv_vecNxf16_space::qv_vecNxf16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_vecNx16(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx16_space::qv_vecNx16_::operator qv_vecNx16U_space::qv_vecNx16U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNx16U(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecNx16_space::qv_vecNx16_::operator qv_vecNx8_space::qv_vecNx8_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNx8(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecNx16_space::qv_vecNx16_::operator qv_vecNx8U_space::qv_vecNx8U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNx8U(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecNx16_space::qv_vecNx16_::operator qv_int8_space::qv_int8_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_int8(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecNx16_space::qv_vecNx16_::operator qv_int16_space::qv_int16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_int16(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecNx16_space::qv_vecNx16_::operator qv_vecNxf16_space::qv_vecNxf16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNxf16(*this); }
 KASTARRI_ALWAYS_INLINE qv_vecNx16U_space::qv_vecNx16U_::qv_vecNx16U_(signed char from) { kastarri::replicate<16, 16, false>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_vecNx16U_space::qv_vecNx16U_& qv_vecNx16U_space::qv_vecNx16U_::operator=(signed char from) { kastarri::replicate<16, 16, false>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_vecNx16U_space::qv_vecNx16U_::qv_vecNx16U_(unsigned char from) { kastarri::replicate<16, 16, false>(_, from); }
@@ -3758,23 +3758,23 @@ KASTARRI_ALWAYS_INLINE qv_vecNx16U_space::qv_vecNx16U_::qv_vecNx16U_(int from) {
 KASTARRI_ALWAYS_INLINE qv_vecNx16U_space::qv_vecNx16U_& qv_vecNx16U_space::qv_vecNx16U_::operator=(int from) { kastarri::replicate<16, 16, false>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_vecNx16U_space::qv_vecNx16U_::qv_vecNx16U_(unsigned int from) { kastarri::replicate<16, 16, false>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_vecNx16U_space::qv_vecNx16U_& qv_vecNx16U_space::qv_vecNx16U_::operator=(unsigned int from) { kastarri::replicate<16, 16, false>(_, from); return *this; }
-inline qv_vecNx16U_space::qv_vecNx16U_::qv_vecNx16U_(const qv_vecNx16_space::qv_vecNx16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNx16U(from); }
-inline qv_vecNx16U_space::qv_vecNx16U_& qv_vecNx16U_space::qv_vecNx16U_::operator=(const qv_vecNx16_space::qv_vecNx16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNx16U(from); }
-inline qv_vecNx16U_space::qv_vecNx16U_::qv_vecNx16U_(const qv_vecNx8_space::qv_vecNx8_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_qv_vecNx16U(from); }
-inline qv_vecNx16U_space::qv_vecNx16U_& qv_vecNx16U_space::qv_vecNx16U_::operator=(const qv_vecNx8_space::qv_vecNx8_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_qv_vecNx16U(from); }
-inline qv_vecNx16U_space::qv_vecNx16U_::qv_vecNx16U_(const qv_vecNx8U_space::qv_vecNx8U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_qv_vecNx16U(from); }
-inline qv_vecNx16U_space::qv_vecNx16U_& qv_vecNx16U_space::qv_vecNx16U_::operator=(const qv_vecNx8U_space::qv_vecNx8U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_qv_vecNx16U(from); }
-inline qv_vecNx16U_space::qv_vecNx16U_::qv_vecNx16U_(const qv_vecNx48_space::qv_vecNx48_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_vecNx16U(from); }
-inline qv_vecNx16U_space::qv_vecNx16U_& qv_vecNx16U_space::qv_vecNx16U_::operator=(const qv_vecNx48_space::qv_vecNx48_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_vecNx16U(from); }
-inline qv_vecNx16U_space::qv_vecNx16U_::qv_vecNx16U_(const qv_int16U_space::qv_int16U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_vecNx16U(from); }
-inline qv_vecNx16U_space::qv_vecNx16U_& qv_vecNx16U_space::qv_vecNx16U_::operator=(const qv_int16U_space::qv_int16U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_vecNx16U(from); }
-inline qv_vecNx16U_space::qv_vecNx16U_::qv_vecNx16U_(const qv_vecNxf16_space::qv_vecNxf16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_vecNx16U(from); }
-inline qv_vecNx16U_space::qv_vecNx16U_& qv_vecNx16U_space::qv_vecNx16U_::operator=(const qv_vecNxf16_space::qv_vecNxf16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_vecNx16U(from); }
-inline qv_vecNx16U_space::qv_vecNx16U_::operator qv_vecNx16_space::qv_vecNx16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_vecNx16(*this); }
-inline qv_vecNx16U_space::qv_vecNx16U_::operator qv_vecNx8U_space::qv_vecNx8U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_vecNx8U(*this); }
-inline qv_vecNx16U_space::qv_vecNx16U_::operator qv_int8U_space::qv_int8U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_int8U(*this); }
-inline qv_vecNx16U_space::qv_vecNx16U_::operator qv_int16U_space::qv_int16U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_int16U(*this); }
-inline qv_vecNx16U_space::qv_vecNx16U_::operator qv_vecNxf16_space::qv_vecNxf16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_vecNxf16(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecNx16U_space::qv_vecNx16U_::qv_vecNx16U_(const qv_vecNx16_space::qv_vecNx16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNx16U(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx16U_space::qv_vecNx16U_& qv_vecNx16U_space::qv_vecNx16U_::operator=(const qv_vecNx16_space::qv_vecNx16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNx16U(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx16U_space::qv_vecNx16U_::qv_vecNx16U_(const qv_vecNx8_space::qv_vecNx8_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_qv_vecNx16U(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx16U_space::qv_vecNx16U_& qv_vecNx16U_space::qv_vecNx16U_::operator=(const qv_vecNx8_space::qv_vecNx8_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_qv_vecNx16U(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx16U_space::qv_vecNx16U_::qv_vecNx16U_(const qv_vecNx8U_space::qv_vecNx8U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_qv_vecNx16U(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx16U_space::qv_vecNx16U_& qv_vecNx16U_space::qv_vecNx16U_::operator=(const qv_vecNx8U_space::qv_vecNx8U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_qv_vecNx16U(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx16U_space::qv_vecNx16U_::qv_vecNx16U_(const qv_vecNx48_space::qv_vecNx48_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_vecNx16U(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx16U_space::qv_vecNx16U_& qv_vecNx16U_space::qv_vecNx16U_::operator=(const qv_vecNx48_space::qv_vecNx48_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_vecNx16U(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx16U_space::qv_vecNx16U_::qv_vecNx16U_(const qv_int16U_space::qv_int16U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_vecNx16U(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx16U_space::qv_vecNx16U_& qv_vecNx16U_space::qv_vecNx16U_::operator=(const qv_int16U_space::qv_int16U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_vecNx16U(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx16U_space::qv_vecNx16U_::qv_vecNx16U_(const qv_vecNxf16_space::qv_vecNxf16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_vecNx16U(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx16U_space::qv_vecNx16U_& qv_vecNx16U_space::qv_vecNx16U_::operator=(const qv_vecNxf16_space::qv_vecNxf16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_vecNx16U(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx16U_space::qv_vecNx16U_::operator qv_vecNx16_space::qv_vecNx16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_vecNx16(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecNx16U_space::qv_vecNx16U_::operator qv_vecNx8U_space::qv_vecNx8U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_vecNx8U(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecNx16U_space::qv_vecNx16U_::operator qv_int8U_space::qv_int8U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_int8U(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecNx16U_space::qv_vecNx16U_::operator qv_int16U_space::qv_int16U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_int16U(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecNx16U_space::qv_vecNx16U_::operator qv_vecNxf16_space::qv_vecNxf16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_vecNxf16(*this); }
 KASTARRI_ALWAYS_INLINE qv_vecN_2x32v_space::qv_vecN_2x32v_::qv_vecN_2x32v_(signed char from) { kastarri::replicate<32, 32, true>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_vecN_2x32v_space::qv_vecN_2x32v_& qv_vecN_2x32v_space::qv_vecN_2x32v_::operator=(signed char from) { kastarri::replicate<32, 32, true>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_vecN_2x32v_space::qv_vecN_2x32v_::qv_vecN_2x32v_(unsigned char from) { kastarri::replicate<32, 32, true>(_, from); }
@@ -3787,22 +3787,22 @@ KASTARRI_ALWAYS_INLINE qv_vecN_2x32v_space::qv_vecN_2x32v_::qv_vecN_2x32v_(int f
 KASTARRI_ALWAYS_INLINE qv_vecN_2x32v_space::qv_vecN_2x32v_& qv_vecN_2x32v_space::qv_vecN_2x32v_::operator=(int from) { kastarri::replicate<32, 32, true>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_vecN_2x32v_space::qv_vecN_2x32v_::qv_vecN_2x32v_(unsigned int from) { kastarri::replicate<32, 32, true>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_vecN_2x32v_space::qv_vecN_2x32v_& qv_vecN_2x32v_space::qv_vecN_2x32v_::operator=(unsigned int from) { kastarri::replicate<32, 32, true>(_, from); return *this; }
-inline qv_vecN_2x32v_space::qv_vecN_2x32v_::qv_vecN_2x32v_(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_vecN_2x32v(from); }
-inline qv_vecN_2x32v_space::qv_vecN_2x32v_& qv_vecN_2x32v_space::qv_vecN_2x32v_::operator=(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_vecN_2x32v(from); }
-inline qv_vecN_2x32v_space::qv_vecN_2x32v_::qv_vecN_2x32v_(const qv_vecN_2x16_space::qv_vecN_2x16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_qv_vecN_2x32v(from); }
-inline qv_vecN_2x32v_space::qv_vecN_2x32v_& qv_vecN_2x32v_space::qv_vecN_2x32v_::operator=(const qv_vecN_2x16_space::qv_vecN_2x16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_qv_vecN_2x32v(from); }
-inline qv_vecN_2x32v_space::qv_vecN_2x32v_::qv_vecN_2x32v_(const qv_vecN_2x16U_space::qv_vecN_2x16U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_qv_vecN_2x32v(from); }
-inline qv_vecN_2x32v_space::qv_vecN_2x32v_& qv_vecN_2x32v_space::qv_vecN_2x32v_::operator=(const qv_vecN_2x16U_space::qv_vecN_2x16U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_qv_vecN_2x32v(from); }
-inline qv_vecN_2x32v_space::qv_vecN_2x32v_::qv_vecN_2x32v_(const qv_int32v_space::qv_int32v_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_vecN_2x32v(from); }
-inline qv_vecN_2x32v_space::qv_vecN_2x32v_& qv_vecN_2x32v_space::qv_vecN_2x32v_::operator=(const qv_int32v_space::qv_int32v_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_vecN_2x32v(from); }
-inline qv_vecN_2x32v_space::qv_vecN_2x32v_::qv_vecN_2x32v_(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2x32v(from); }
-inline qv_vecN_2x32v_space::qv_vecN_2x32v_& qv_vecN_2x32v_space::qv_vecN_2x32v_::operator=(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2x32v(from); }
-inline qv_vecN_2x32v_space::qv_vecN_2x32v_::operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2x32Uv(*this); }
-inline qv_vecN_2x32v_space::qv_vecN_2x32v_::operator qv_vecN_2x16_space::qv_vecN_2x16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2x16(*this); }
-inline qv_vecN_2x32v_space::qv_vecN_2x32v_::operator qv_vecN_2x16U_space::qv_vecN_2x16U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2x16U(*this); }
-inline qv_vecN_2x32v_space::qv_vecN_2x32v_::operator qv_int16_space::qv_int16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_int16(*this); }
-inline qv_vecN_2x32v_space::qv_vecN_2x32v_::operator qv_int32v_space::qv_int32v_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_int32v(*this); }
-inline qv_vecN_2x32v_space::qv_vecN_2x32v_::operator qv_vecN_2xf32_space::qv_vecN_2xf32_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2xf32(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x32v_space::qv_vecN_2x32v_::qv_vecN_2x32v_(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_vecN_2x32v(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x32v_space::qv_vecN_2x32v_& qv_vecN_2x32v_space::qv_vecN_2x32v_::operator=(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_vecN_2x32v(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x32v_space::qv_vecN_2x32v_::qv_vecN_2x32v_(const qv_vecN_2x16_space::qv_vecN_2x16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_qv_vecN_2x32v(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x32v_space::qv_vecN_2x32v_& qv_vecN_2x32v_space::qv_vecN_2x32v_::operator=(const qv_vecN_2x16_space::qv_vecN_2x16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_qv_vecN_2x32v(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x32v_space::qv_vecN_2x32v_::qv_vecN_2x32v_(const qv_vecN_2x16U_space::qv_vecN_2x16U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_qv_vecN_2x32v(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x32v_space::qv_vecN_2x32v_& qv_vecN_2x32v_space::qv_vecN_2x32v_::operator=(const qv_vecN_2x16U_space::qv_vecN_2x16U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_qv_vecN_2x32v(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x32v_space::qv_vecN_2x32v_::qv_vecN_2x32v_(const qv_int32v_space::qv_int32v_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_vecN_2x32v(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x32v_space::qv_vecN_2x32v_& qv_vecN_2x32v_space::qv_vecN_2x32v_::operator=(const qv_int32v_space::qv_int32v_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_vecN_2x32v(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x32v_space::qv_vecN_2x32v_::qv_vecN_2x32v_(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2x32v(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x32v_space::qv_vecN_2x32v_& qv_vecN_2x32v_space::qv_vecN_2x32v_::operator=(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2x32v(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x32v_space::qv_vecN_2x32v_::operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2x32Uv(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x32v_space::qv_vecN_2x32v_::operator qv_vecN_2x16_space::qv_vecN_2x16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2x16(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x32v_space::qv_vecN_2x32v_::operator qv_vecN_2x16U_space::qv_vecN_2x16U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2x16U(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x32v_space::qv_vecN_2x32v_::operator qv_int16_space::qv_int16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_int16(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x32v_space::qv_vecN_2x32v_::operator qv_int32v_space::qv_int32v_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_int32v(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x32v_space::qv_vecN_2x32v_::operator qv_vecN_2xf32_space::qv_vecN_2xf32_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2xf32(*this); }
 KASTARRI_ALWAYS_INLINE qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::qv_vecN_2x32Uv_(signed char from) { kastarri::replicate<32, 32, false>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::operator=(signed char from) { kastarri::replicate<32, 32, false>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::qv_vecN_2x32Uv_(unsigned char from) { kastarri::replicate<32, 32, false>(_, from); }
@@ -3815,128 +3815,128 @@ KASTARRI_ALWAYS_INLINE qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::qv_vecN_2x32Uv_(in
 KASTARRI_ALWAYS_INLINE qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::operator=(int from) { kastarri::replicate<32, 32, false>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::qv_vecN_2x32Uv_(unsigned int from) { kastarri::replicate<32, 32, false>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::operator=(unsigned int from) { kastarri::replicate<32, 32, false>(_, from); return *this; }
-inline qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::qv_vecN_2x32Uv_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2x32Uv(from); }
-inline qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::operator=(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2x32Uv(from); }
-inline qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::qv_vecN_2x32Uv_(const qv_vecN_2x16_space::qv_vecN_2x16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_qv_vecN_2x32Uv(from); }
-inline qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::operator=(const qv_vecN_2x16_space::qv_vecN_2x16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_qv_vecN_2x32Uv(from); }
-inline qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::qv_vecN_2x32Uv_(const qv_vecN_2x16U_space::qv_vecN_2x16U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_qv_vecN_2x32Uv(from); }
-inline qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::operator=(const qv_vecN_2x16U_space::qv_vecN_2x16U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_qv_vecN_2x32Uv(from); }
-inline qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::qv_vecN_2x32Uv_(const qv_vecN_2x64w_space::qv_vecN_2x64w_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x64w_rtor_qv_vecN_2x32Uv(from); }
-inline qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::operator=(const qv_vecN_2x64w_space::qv_vecN_2x64w_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x64w_rtor_qv_vecN_2x32Uv(from); }
-inline qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::qv_vecN_2x32Uv_(const qv_int32Uv_space::qv_int32Uv_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_vecN_2x32Uv(from); }
-inline qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::operator=(const qv_int32Uv_space::qv_int32Uv_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_vecN_2x32Uv(from); }
-inline qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::qv_vecN_2x32Uv_(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2x32Uv(from); }
-inline qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::operator=(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2x32Uv(from); }
-inline qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::operator qv_vecN_2x32v_space::qv_vecN_2x32v_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_vecN_2x32v(*this); }
-inline qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::operator qv_vecN_2x16U_space::qv_vecN_2x16U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_vecN_2x16U(*this); }
-inline qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::operator qv_int16U_space::qv_int16U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_int16U(*this); }
-inline qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::operator qv_int32Uv_space::qv_int32Uv_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_int32Uv(*this); }
-inline qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::operator qv_vecN_2xf32_space::qv_vecN_2xf32_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_vecN_2xf32(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::qv_vecN_2x32Uv_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2x32Uv(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::operator=(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2x32Uv(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::qv_vecN_2x32Uv_(const qv_vecN_2x16_space::qv_vecN_2x16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_qv_vecN_2x32Uv(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::operator=(const qv_vecN_2x16_space::qv_vecN_2x16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_qv_vecN_2x32Uv(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::qv_vecN_2x32Uv_(const qv_vecN_2x16U_space::qv_vecN_2x16U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_qv_vecN_2x32Uv(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::operator=(const qv_vecN_2x16U_space::qv_vecN_2x16U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_qv_vecN_2x32Uv(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::qv_vecN_2x32Uv_(const qv_vecN_2x64w_space::qv_vecN_2x64w_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x64w_rtor_qv_vecN_2x32Uv(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::operator=(const qv_vecN_2x64w_space::qv_vecN_2x64w_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x64w_rtor_qv_vecN_2x32Uv(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::qv_vecN_2x32Uv_(const qv_int32Uv_space::qv_int32Uv_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_vecN_2x32Uv(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::operator=(const qv_int32Uv_space::qv_int32Uv_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_vecN_2x32Uv(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::qv_vecN_2x32Uv_(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2x32Uv(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::operator=(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2x32Uv(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::operator qv_vecN_2x32v_space::qv_vecN_2x32v_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_vecN_2x32v(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::operator qv_vecN_2x16U_space::qv_vecN_2x16U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_vecN_2x16U(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::operator qv_int16U_space::qv_int16U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_int16U(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::operator qv_int32Uv_space::qv_int32Uv_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_int32Uv(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_::operator qv_vecN_2xf32_space::qv_vecN_2xf32_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_vecN_2xf32(*this); }
 KASTARRI_ALWAYS_INLINE qv_vecN_4x64_space::qv_vecN_4x64_::qv_vecN_4x64_(long long from) { kastarri::replicate<64, 64, true>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_vecN_4x64_space::qv_vecN_4x64_& qv_vecN_4x64_space::qv_vecN_4x64_::operator=(long long from) { kastarri::replicate<64, 64, true>(_, from); return *this; }
-inline qv_vecN_4x64_space::qv_vecN_4x64_::qv_vecN_4x64_(const qv_int64_space::qv_int64_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_rtor_qv_vecN_4x64(from); }
-inline qv_vecN_4x64_space::qv_vecN_4x64_& qv_vecN_4x64_space::qv_vecN_4x64_::operator=(const qv_int64_space::qv_int64_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_rtor_qv_vecN_4x64(from); }
-inline qv_vecN_4x64_space::qv_vecN_4x64_::operator qv_int64_space::qv_int64_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_rtor_qv_int64(*this); }
-inline qv_vecN_8x128_space::qv_vecN_8x128_::operator qv_int128_space::qv_int128_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_rtor_qv_int128(*this); }
-inline qv_vecN_16x256_space::qv_vecN_16x256_::operator qv_int256_space::qv_int256_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_rtor_qv_int256(*this); }
-inline qv_vecNxf16_space::qv_vecNxf16_::qv_vecNxf16_(const qv_f16_space::qv_f16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_vecNxf16(from); }
-inline qv_vecNxf16_space::qv_vecNxf16_& qv_vecNxf16_space::qv_vecNxf16_::operator=(const qv_f16_space::qv_f16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_vecNxf16(from); }
-inline qv_vecNxf16_space::qv_vecNxf16_::qv_vecNxf16_(short from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_vecNxf16(from); }
-inline qv_vecNxf16_space::qv_vecNxf16_& qv_vecNxf16_space::qv_vecNxf16_::operator=(short from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_vecNxf16(from); }
-inline qv_vecNxf16_space::qv_vecNxf16_::qv_vecNxf16_(unsigned short from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_vecNxf16(from); }
-inline qv_vecNxf16_space::qv_vecNxf16_& qv_vecNxf16_space::qv_vecNxf16_::operator=(unsigned short from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_vecNxf16(from); }
-inline qv_vecNxf16_space::qv_vecNxf16_::qv_vecNxf16_(int from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vecNxf16(from); }
-inline qv_vecNxf16_space::qv_vecNxf16_& qv_vecNxf16_space::qv_vecNxf16_::operator=(int from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vecNxf16(from); }
-inline qv_vecNxf16_space::qv_vecNxf16_::qv_vecNxf16_(unsigned int from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vecNxf16(from); }
-inline qv_vecNxf16_space::qv_vecNxf16_& qv_vecNxf16_space::qv_vecNxf16_::operator=(unsigned int from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vecNxf16(from); }
-inline qv_vecNxf16_space::qv_vecNxf16_::qv_vecNxf16_(float from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_float_rtor_qv_vecNxf16(from); }
-inline qv_vecNxf16_space::qv_vecNxf16_& qv_vecNxf16_space::qv_vecNxf16_::operator=(float from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_float_rtor_qv_vecNxf16(from); }
-inline qv_vecNxf16_space::qv_vecNxf16_::qv_vecNxf16_(const qv_vecNx16_space::qv_vecNx16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNxf16(from); }
-inline qv_vecNxf16_space::qv_vecNxf16_& qv_vecNxf16_space::qv_vecNxf16_::operator=(const qv_vecNx16_space::qv_vecNx16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNxf16(from); }
-inline qv_vecNxf16_space::qv_vecNxf16_::qv_vecNxf16_(const qv_vecNx16U_space::qv_vecNx16U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_vecNxf16(from); }
-inline qv_vecNxf16_space::qv_vecNxf16_& qv_vecNxf16_space::qv_vecNxf16_::operator=(const qv_vecNx16U_space::qv_vecNx16U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_vecNxf16(from); }
-inline qv_vecNxf16_space::qv_vecNxf16_::qv_vecNxf16_(const rkfloat_space::rkfloat_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_rtor_qv_vecNxf16(from); }
-inline qv_vecNxf16_space::qv_vecNxf16_& qv_vecNxf16_space::qv_vecNxf16_::operator=(const rkfloat_space::rkfloat_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_rtor_qv_vecNxf16(from); }
-inline qv_vecNxf16_space::qv_vecNxf16_::operator qv_f16_space::qv_f16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_f16(*this); }
-inline qv_vecNxf16_space::qv_vecNxf16_::operator qv_vecNx16_space::qv_vecNx16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_vecNx16(*this); }
-inline qv_vecNxf16_space::qv_vecNxf16_::operator qv_vecNx16U_space::qv_vecNx16U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_vecNx16U(*this); }
-inline qv_vecNxf16_space::qv_vecNxf16_::operator rkfloat_space::rkfloat_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_rkfloat(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecN_4x64_space::qv_vecN_4x64_::qv_vecN_4x64_(const qv_int64_space::qv_int64_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_rtor_qv_vecN_4x64(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_4x64_space::qv_vecN_4x64_& qv_vecN_4x64_space::qv_vecN_4x64_::operator=(const qv_int64_space::qv_int64_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_rtor_qv_vecN_4x64(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_4x64_space::qv_vecN_4x64_::operator qv_int64_space::qv_int64_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_rtor_qv_int64(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecN_8x128_space::qv_vecN_8x128_::operator qv_int128_space::qv_int128_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_rtor_qv_int128(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecN_16x256_space::qv_vecN_16x256_::operator qv_int256_space::qv_int256_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_rtor_qv_int256(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecNxf16_space::qv_vecNxf16_::qv_vecNxf16_(const qv_f16_space::qv_f16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_vecNxf16(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNxf16_space::qv_vecNxf16_& qv_vecNxf16_space::qv_vecNxf16_::operator=(const qv_f16_space::qv_f16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_vecNxf16(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNxf16_space::qv_vecNxf16_::qv_vecNxf16_(short from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_vecNxf16(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNxf16_space::qv_vecNxf16_& qv_vecNxf16_space::qv_vecNxf16_::operator=(short from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_vecNxf16(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNxf16_space::qv_vecNxf16_::qv_vecNxf16_(unsigned short from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_vecNxf16(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNxf16_space::qv_vecNxf16_& qv_vecNxf16_space::qv_vecNxf16_::operator=(unsigned short from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_vecNxf16(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNxf16_space::qv_vecNxf16_::qv_vecNxf16_(int from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vecNxf16(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNxf16_space::qv_vecNxf16_& qv_vecNxf16_space::qv_vecNxf16_::operator=(int from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vecNxf16(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNxf16_space::qv_vecNxf16_::qv_vecNxf16_(unsigned int from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vecNxf16(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNxf16_space::qv_vecNxf16_& qv_vecNxf16_space::qv_vecNxf16_::operator=(unsigned int from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vecNxf16(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNxf16_space::qv_vecNxf16_::qv_vecNxf16_(float from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_float_rtor_qv_vecNxf16(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNxf16_space::qv_vecNxf16_& qv_vecNxf16_space::qv_vecNxf16_::operator=(float from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_float_rtor_qv_vecNxf16(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNxf16_space::qv_vecNxf16_::qv_vecNxf16_(const qv_vecNx16_space::qv_vecNx16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNxf16(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNxf16_space::qv_vecNxf16_& qv_vecNxf16_space::qv_vecNxf16_::operator=(const qv_vecNx16_space::qv_vecNx16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNxf16(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNxf16_space::qv_vecNxf16_::qv_vecNxf16_(const qv_vecNx16U_space::qv_vecNx16U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_vecNxf16(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNxf16_space::qv_vecNxf16_& qv_vecNxf16_space::qv_vecNxf16_::operator=(const qv_vecNx16U_space::qv_vecNx16U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_vecNxf16(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNxf16_space::qv_vecNxf16_::qv_vecNxf16_(const rkfloat_space::rkfloat_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_rtor_qv_vecNxf16(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNxf16_space::qv_vecNxf16_& qv_vecNxf16_space::qv_vecNxf16_::operator=(const rkfloat_space::rkfloat_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_rtor_qv_vecNxf16(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNxf16_space::qv_vecNxf16_::operator qv_f16_space::qv_f16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_f16(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecNxf16_space::qv_vecNxf16_::operator qv_vecNx16_space::qv_vecNx16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_vecNx16(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecNxf16_space::qv_vecNxf16_::operator qv_vecNx16U_space::qv_vecNx16U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_vecNx16U(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecNxf16_space::qv_vecNxf16_::operator rkfloat_space::rkfloat_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_rkfloat(*this); }
 KASTARRI_ALWAYS_INLINE qv_vecN_2xf32_space::qv_vecN_2xf32_::qv_vecN_2xf32_(float from) { kastarri::replicate<32, 32, false>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_vecN_2xf32_space::qv_vecN_2xf32_& qv_vecN_2xf32_space::qv_vecN_2xf32_::operator=(float from) { kastarri::replicate<32, 32, false>(_, from); return *this; }
-inline qv_vecN_2xf32_space::qv_vecN_2xf32_::qv_vecN_2xf32_(const rkfloat_space::rkfloat_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_rtor_qv_vecN_2xf32(from); }
-inline qv_vecN_2xf32_space::qv_vecN_2xf32_& qv_vecN_2xf32_space::qv_vecN_2xf32_::operator=(const rkfloat_space::rkfloat_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_rtor_qv_vecN_2xf32(from); }
-inline qv_vecN_2xf32_space::qv_vecN_2xf32_::qv_vecN_2xf32_(int from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vecN_2xf32(from); }
-inline qv_vecN_2xf32_space::qv_vecN_2xf32_& qv_vecN_2xf32_space::qv_vecN_2xf32_::operator=(int from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vecN_2xf32(from); }
-inline qv_vecN_2xf32_space::qv_vecN_2xf32_::qv_vecN_2xf32_(unsigned int from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vecN_2xf32(from); }
-inline qv_vecN_2xf32_space::qv_vecN_2xf32_& qv_vecN_2xf32_space::qv_vecN_2xf32_::operator=(unsigned int from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vecN_2xf32(from); }
-inline qv_vecN_2xf32_space::qv_vecN_2xf32_::qv_vecN_2xf32_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2xf32(from); }
-inline qv_vecN_2xf32_space::qv_vecN_2xf32_& qv_vecN_2xf32_space::qv_vecN_2xf32_::operator=(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2xf32(from); }
-inline qv_vecN_2xf32_space::qv_vecN_2xf32_::qv_vecN_2xf32_(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_vecN_2xf32(from); }
-inline qv_vecN_2xf32_space::qv_vecN_2xf32_& qv_vecN_2xf32_space::qv_vecN_2xf32_::operator=(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_vecN_2xf32(from); }
-inline qv_vecN_2xf32_space::qv_vecN_2xf32_::qv_vecN_2xf32_(const qv_vecN_2xf16_space::qv_vecN_2xf16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_rtor_qv_vecN_2xf32(from); }
-inline qv_vecN_2xf32_space::qv_vecN_2xf32_& qv_vecN_2xf32_space::qv_vecN_2xf32_::operator=(const qv_vecN_2xf16_space::qv_vecN_2xf16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_rtor_qv_vecN_2xf32(from); }
-inline qv_vecN_2xf32_space::qv_vecN_2xf32_::operator rkfloat_space::rkfloat_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_rkfloat(*this); }
-inline qv_vecN_2xf32_space::qv_vecN_2xf32_::operator qv_vecN_2x32v_space::qv_vecN_2x32v_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2x32v(*this); }
-inline qv_vecN_2xf32_space::qv_vecN_2xf32_::operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2x32Uv(*this); }
-inline qv_vecN_2xf32_space::qv_vecN_2xf32_::operator qv_vecN_2xf16_space::qv_vecN_2xf16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2xf16(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2xf32_space::qv_vecN_2xf32_::qv_vecN_2xf32_(const rkfloat_space::rkfloat_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_rtor_qv_vecN_2xf32(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2xf32_space::qv_vecN_2xf32_& qv_vecN_2xf32_space::qv_vecN_2xf32_::operator=(const rkfloat_space::rkfloat_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_rtor_qv_vecN_2xf32(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2xf32_space::qv_vecN_2xf32_::qv_vecN_2xf32_(int from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vecN_2xf32(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2xf32_space::qv_vecN_2xf32_& qv_vecN_2xf32_space::qv_vecN_2xf32_::operator=(int from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_vecN_2xf32(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2xf32_space::qv_vecN_2xf32_::qv_vecN_2xf32_(unsigned int from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vecN_2xf32(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2xf32_space::qv_vecN_2xf32_& qv_vecN_2xf32_space::qv_vecN_2xf32_::operator=(unsigned int from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_vecN_2xf32(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2xf32_space::qv_vecN_2xf32_::qv_vecN_2xf32_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2xf32(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2xf32_space::qv_vecN_2xf32_& qv_vecN_2xf32_space::qv_vecN_2xf32_::operator=(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2xf32(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2xf32_space::qv_vecN_2xf32_::qv_vecN_2xf32_(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_vecN_2xf32(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2xf32_space::qv_vecN_2xf32_& qv_vecN_2xf32_space::qv_vecN_2xf32_::operator=(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_vecN_2xf32(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2xf32_space::qv_vecN_2xf32_::qv_vecN_2xf32_(const qv_vecN_2xf16_space::qv_vecN_2xf16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_rtor_qv_vecN_2xf32(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2xf32_space::qv_vecN_2xf32_& qv_vecN_2xf32_space::qv_vecN_2xf32_::operator=(const qv_vecN_2xf16_space::qv_vecN_2xf16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_rtor_qv_vecN_2xf32(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2xf32_space::qv_vecN_2xf32_::operator rkfloat_space::rkfloat_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_rkfloat(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2xf32_space::qv_vecN_2xf32_::operator qv_vecN_2x32v_space::qv_vecN_2x32v_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2x32v(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2xf32_space::qv_vecN_2xf32_::operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2x32Uv(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2xf32_space::qv_vecN_2xf32_::operator qv_vecN_2xf16_space::qv_vecN_2xf16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2xf16(*this); }
 KASTARRI_ALWAYS_INLINE qv_vecNx8_space::qv_vecNx8_::qv_vecNx8_(signed char from) { kastarri::replicate<8, 8, true>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_vecNx8_space::qv_vecNx8_& qv_vecNx8_space::qv_vecNx8_::operator=(signed char from) { kastarri::replicate<8, 8, true>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_vecNx8_space::qv_vecNx8_::qv_vecNx8_(int from) { kastarri::replicate<8, 8, true>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_vecNx8_space::qv_vecNx8_& qv_vecNx8_space::qv_vecNx8_::operator=(int from) { kastarri::replicate<8, 8, true>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_vecNx8_space::qv_vecNx8_::qv_vecNx8_(unsigned int from) { kastarri::replicate<8, 8, true>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_vecNx8_space::qv_vecNx8_& qv_vecNx8_space::qv_vecNx8_::operator=(unsigned int from) { kastarri::replicate<8, 8, true>(_, from); return *this; }
-inline qv_vecNx8_space::qv_vecNx8_::qv_vecNx8_(const qv_vecNx16_space::qv_vecNx16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNx8(from); }
-inline qv_vecNx8_space::qv_vecNx8_& qv_vecNx8_space::qv_vecNx8_::operator=(const qv_vecNx16_space::qv_vecNx16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNx8(from); }
-inline qv_vecNx8_space::qv_vecNx8_::operator qv_vecNx16_space::qv_vecNx16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_qv_vecNx16(*this); }
-inline qv_vecNx8_space::qv_vecNx8_::operator qv_vecNx16U_space::qv_vecNx16U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_qv_vecNx16U(*this); }
-inline qv_vecNx8_space::qv_vecNx8_::operator qv_int8_space::qv_int8_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_qv_int8(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecNx8_space::qv_vecNx8_::qv_vecNx8_(const qv_vecNx16_space::qv_vecNx16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNx8(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx8_space::qv_vecNx8_& qv_vecNx8_space::qv_vecNx8_::operator=(const qv_vecNx16_space::qv_vecNx16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNx8(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx8_space::qv_vecNx8_::operator qv_vecNx16_space::qv_vecNx16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_qv_vecNx16(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecNx8_space::qv_vecNx8_::operator qv_vecNx16U_space::qv_vecNx16U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_qv_vecNx16U(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecNx8_space::qv_vecNx8_::operator qv_int8_space::qv_int8_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_qv_int8(*this); }
 KASTARRI_ALWAYS_INLINE qv_vecNx8U_space::qv_vecNx8U_::qv_vecNx8U_(unsigned char from) { kastarri::replicate<8, 8, false>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_vecNx8U_space::qv_vecNx8U_& qv_vecNx8U_space::qv_vecNx8U_::operator=(unsigned char from) { kastarri::replicate<8, 8, false>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_vecNx8U_space::qv_vecNx8U_::qv_vecNx8U_(int from) { kastarri::replicate<8, 8, false>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_vecNx8U_space::qv_vecNx8U_& qv_vecNx8U_space::qv_vecNx8U_::operator=(int from) { kastarri::replicate<8, 8, false>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_vecNx8U_space::qv_vecNx8U_::qv_vecNx8U_(unsigned int from) { kastarri::replicate<8, 8, false>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_vecNx8U_space::qv_vecNx8U_& qv_vecNx8U_space::qv_vecNx8U_::operator=(unsigned int from) { kastarri::replicate<8, 8, false>(_, from); return *this; }
-inline qv_vecNx8U_space::qv_vecNx8U_::qv_vecNx8U_(const qv_vecNx16_space::qv_vecNx16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNx8U(from); }
-inline qv_vecNx8U_space::qv_vecNx8U_& qv_vecNx8U_space::qv_vecNx8U_::operator=(const qv_vecNx16_space::qv_vecNx16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNx8U(from); }
-inline qv_vecNx8U_space::qv_vecNx8U_::qv_vecNx8U_(const qv_vecNx16U_space::qv_vecNx16U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_vecNx8U(from); }
-inline qv_vecNx8U_space::qv_vecNx8U_& qv_vecNx8U_space::qv_vecNx8U_::operator=(const qv_vecNx16U_space::qv_vecNx16U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_vecNx8U(from); }
-inline qv_vecNx8U_space::qv_vecNx8U_::qv_vecNx8U_(const qv_int8U_space::qv_int8U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_vecNx8U(from); }
-inline qv_vecNx8U_space::qv_vecNx8U_& qv_vecNx8U_space::qv_vecNx8U_::operator=(const qv_int8U_space::qv_int8U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_vecNx8U(from); }
-inline qv_vecNx8U_space::qv_vecNx8U_::operator qv_vecNx16_space::qv_vecNx16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_qv_vecNx16(*this); }
-inline qv_vecNx8U_space::qv_vecNx8U_::operator qv_vecNx16U_space::qv_vecNx16U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_qv_vecNx16U(*this); }
-inline qv_vecNx8U_space::qv_vecNx8U_::operator qv_int8U_space::qv_int8U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_qv_int8U(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecNx8U_space::qv_vecNx8U_::qv_vecNx8U_(const qv_vecNx16_space::qv_vecNx16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNx8U(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx8U_space::qv_vecNx8U_& qv_vecNx8U_space::qv_vecNx8U_::operator=(const qv_vecNx16_space::qv_vecNx16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_vecNx8U(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx8U_space::qv_vecNx8U_::qv_vecNx8U_(const qv_vecNx16U_space::qv_vecNx16U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_vecNx8U(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx8U_space::qv_vecNx8U_& qv_vecNx8U_space::qv_vecNx8U_::operator=(const qv_vecNx16U_space::qv_vecNx16U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_vecNx8U(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx8U_space::qv_vecNx8U_::qv_vecNx8U_(const qv_int8U_space::qv_int8U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_vecNx8U(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx8U_space::qv_vecNx8U_& qv_vecNx8U_space::qv_vecNx8U_::operator=(const qv_int8U_space::qv_int8U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_vecNx8U(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx8U_space::qv_vecNx8U_::operator qv_vecNx16_space::qv_vecNx16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_qv_vecNx16(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecNx8U_space::qv_vecNx8U_::operator qv_vecNx16U_space::qv_vecNx16U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_qv_vecNx16U(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecNx8U_space::qv_vecNx8U_::operator qv_int8U_space::qv_int8U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_qv_int8U(*this); }
 KASTARRI_ALWAYS_INLINE qv_vecN_2x16_space::qv_vecN_2x16_::qv_vecN_2x16_(short from) { kastarri::replicate<16, 16, true>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_vecN_2x16_space::qv_vecN_2x16_& qv_vecN_2x16_space::qv_vecN_2x16_::operator=(short from) { kastarri::replicate<16, 16, true>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_vecN_2x16_space::qv_vecN_2x16_::qv_vecN_2x16_(int from) { kastarri::replicate<16, 16, true>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_vecN_2x16_space::qv_vecN_2x16_& qv_vecN_2x16_space::qv_vecN_2x16_::operator=(int from) { kastarri::replicate<16, 16, true>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_vecN_2x16_space::qv_vecN_2x16_::qv_vecN_2x16_(unsigned int from) { kastarri::replicate<16, 16, true>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_vecN_2x16_space::qv_vecN_2x16_& qv_vecN_2x16_space::qv_vecN_2x16_::operator=(unsigned int from) { kastarri::replicate<16, 16, true>(_, from); return *this; }
-inline qv_vecN_2x16_space::qv_vecN_2x16_::qv_vecN_2x16_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2x16(from); }
-inline qv_vecN_2x16_space::qv_vecN_2x16_& qv_vecN_2x16_space::qv_vecN_2x16_::operator=(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2x16(from); }
-inline qv_vecN_2x16_space::qv_vecN_2x16_::operator qv_vecN_2x32v_space::qv_vecN_2x32v_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_qv_vecN_2x32v(*this); }
-inline qv_vecN_2x16_space::qv_vecN_2x16_::operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_qv_vecN_2x32Uv(*this); }
-inline qv_vecN_2x16_space::qv_vecN_2x16_::operator qv_int16_space::qv_int16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_qv_int16(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x16_space::qv_vecN_2x16_::qv_vecN_2x16_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2x16(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x16_space::qv_vecN_2x16_& qv_vecN_2x16_space::qv_vecN_2x16_::operator=(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2x16(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x16_space::qv_vecN_2x16_::operator qv_vecN_2x32v_space::qv_vecN_2x32v_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_qv_vecN_2x32v(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x16_space::qv_vecN_2x16_::operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_qv_vecN_2x32Uv(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x16_space::qv_vecN_2x16_::operator qv_int16_space::qv_int16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_qv_int16(*this); }
 KASTARRI_ALWAYS_INLINE qv_vecN_2x16U_space::qv_vecN_2x16U_::qv_vecN_2x16U_(unsigned short from) { kastarri::replicate<16, 16, false>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_vecN_2x16U_space::qv_vecN_2x16U_& qv_vecN_2x16U_space::qv_vecN_2x16U_::operator=(unsigned short from) { kastarri::replicate<16, 16, false>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_vecN_2x16U_space::qv_vecN_2x16U_::qv_vecN_2x16U_(int from) { kastarri::replicate<16, 16, false>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_vecN_2x16U_space::qv_vecN_2x16U_& qv_vecN_2x16U_space::qv_vecN_2x16U_::operator=(int from) { kastarri::replicate<16, 16, false>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_vecN_2x16U_space::qv_vecN_2x16U_::qv_vecN_2x16U_(unsigned int from) { kastarri::replicate<16, 16, false>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_vecN_2x16U_space::qv_vecN_2x16U_& qv_vecN_2x16U_space::qv_vecN_2x16U_::operator=(unsigned int from) { kastarri::replicate<16, 16, false>(_, from); return *this; }
-inline qv_vecN_2x16U_space::qv_vecN_2x16U_::qv_vecN_2x16U_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2x16U(from); }
-inline qv_vecN_2x16U_space::qv_vecN_2x16U_& qv_vecN_2x16U_space::qv_vecN_2x16U_::operator=(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2x16U(from); }
-inline qv_vecN_2x16U_space::qv_vecN_2x16U_::qv_vecN_2x16U_(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_vecN_2x16U(from); }
-inline qv_vecN_2x16U_space::qv_vecN_2x16U_& qv_vecN_2x16U_space::qv_vecN_2x16U_::operator=(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_vecN_2x16U(from); }
-inline qv_vecN_2x16U_space::qv_vecN_2x16U_::qv_vecN_2x16U_(const qv_int16U_space::qv_int16U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_vecN_2x16U(from); }
-inline qv_vecN_2x16U_space::qv_vecN_2x16U_& qv_vecN_2x16U_space::qv_vecN_2x16U_::operator=(const qv_int16U_space::qv_int16U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_vecN_2x16U(from); }
-inline qv_vecN_2x16U_space::qv_vecN_2x16U_::operator qv_vecN_2x32v_space::qv_vecN_2x32v_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_qv_vecN_2x32v(*this); }
-inline qv_vecN_2x16U_space::qv_vecN_2x16U_::operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_qv_vecN_2x32Uv(*this); }
-inline qv_vecN_2x16U_space::qv_vecN_2x16U_::operator qv_int16U_space::qv_int16U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_qv_int16U(*this); }
-inline qv_vecN_2xf16_space::qv_vecN_2xf16_::qv_vecN_2xf16_(const qv_f16_space::qv_f16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_vecN_2xf16(from); }
-inline qv_vecN_2xf16_space::qv_vecN_2xf16_& qv_vecN_2xf16_space::qv_vecN_2xf16_::operator=(const qv_f16_space::qv_f16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_vecN_2xf16(from); }
-inline qv_vecN_2xf16_space::qv_vecN_2xf16_::qv_vecN_2xf16_(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2xf16(from); }
-inline qv_vecN_2xf16_space::qv_vecN_2xf16_& qv_vecN_2xf16_space::qv_vecN_2xf16_::operator=(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2xf16(from); }
-inline qv_vecN_2xf16_space::qv_vecN_2xf16_::operator qv_f16_space::qv_f16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_rtor_qv_f16(*this); }
-inline qv_vecN_2xf16_space::qv_vecN_2xf16_::operator qv_vecN_2xf32_space::qv_vecN_2xf32_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_rtor_qv_vecN_2xf32(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x16U_space::qv_vecN_2x16U_::qv_vecN_2x16U_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2x16U(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x16U_space::qv_vecN_2x16U_& qv_vecN_2x16U_space::qv_vecN_2x16U_::operator=(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_vecN_2x16U(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x16U_space::qv_vecN_2x16U_::qv_vecN_2x16U_(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_vecN_2x16U(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x16U_space::qv_vecN_2x16U_& qv_vecN_2x16U_space::qv_vecN_2x16U_::operator=(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_vecN_2x16U(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x16U_space::qv_vecN_2x16U_::qv_vecN_2x16U_(const qv_int16U_space::qv_int16U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_vecN_2x16U(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x16U_space::qv_vecN_2x16U_& qv_vecN_2x16U_space::qv_vecN_2x16U_::operator=(const qv_int16U_space::qv_int16U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_vecN_2x16U(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x16U_space::qv_vecN_2x16U_::operator qv_vecN_2x32v_space::qv_vecN_2x32v_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_qv_vecN_2x32v(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x16U_space::qv_vecN_2x16U_::operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_qv_vecN_2x32Uv(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x16U_space::qv_vecN_2x16U_::operator qv_int16U_space::qv_int16U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_qv_int16U(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2xf16_space::qv_vecN_2xf16_::qv_vecN_2xf16_(const qv_f16_space::qv_f16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_vecN_2xf16(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2xf16_space::qv_vecN_2xf16_& qv_vecN_2xf16_space::qv_vecN_2xf16_::operator=(const qv_f16_space::qv_f16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_vecN_2xf16(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2xf16_space::qv_vecN_2xf16_::qv_vecN_2xf16_(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2xf16(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2xf16_space::qv_vecN_2xf16_& qv_vecN_2xf16_space::qv_vecN_2xf16_::operator=(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_qv_vecN_2xf16(from); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2xf16_space::qv_vecN_2xf16_::operator qv_f16_space::qv_f16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_rtor_qv_f16(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2xf16_space::qv_vecN_2xf16_::operator qv_vecN_2xf32_space::qv_vecN_2xf32_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_rtor_qv_vecN_2xf32(*this); }
 KASTARRI_ALWAYS_INLINE qv_vec2Nx24_space::qv_vec2Nx24_::qv_vec2Nx24_(short from) { kastarri::replicate<24, 32, true>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_vec2Nx24_space::qv_vec2Nx24_& qv_vec2Nx24_space::qv_vec2Nx24_::operator=(short from) { kastarri::replicate<24, 32, true>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_vec2Nx24_space::qv_vec2Nx24_::qv_vec2Nx24_(unsigned short from) { kastarri::replicate<24, 32, true>(_, from); }
@@ -3945,62 +3945,62 @@ KASTARRI_ALWAYS_INLINE qv_vec2Nx24_space::qv_vec2Nx24_::qv_vec2Nx24_(int from) {
 KASTARRI_ALWAYS_INLINE qv_vec2Nx24_space::qv_vec2Nx24_& qv_vec2Nx24_space::qv_vec2Nx24_::operator=(int from) { kastarri::replicate<24, 32, true>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_vec2Nx24_space::qv_vec2Nx24_::qv_vec2Nx24_(unsigned int from) { kastarri::replicate<24, 32, true>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_vec2Nx24_space::qv_vec2Nx24_& qv_vec2Nx24_space::qv_vec2Nx24_::operator=(unsigned int from) { kastarri::replicate<24, 32, true>(_, from); return *this; }
-inline qv_vec2Nx24_space::qv_vec2Nx24_::qv_vec2Nx24_(const qv_vec2Nx16w_space::qv_vec2Nx16w_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16w_rtor_qv_vec2Nx24(from); }
-inline qv_vec2Nx24_space::qv_vec2Nx24_& qv_vec2Nx24_space::qv_vec2Nx24_::operator=(const qv_vec2Nx16w_space::qv_vec2Nx16w_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16w_rtor_qv_vec2Nx24(from); }
-inline qv_vec2Nx24_space::qv_vec2Nx24_::qv_vec2Nx24_(const qv_vec2Nx16Uw_space::qv_vec2Nx16Uw_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16Uw_rtor_qv_vec2Nx24(from); }
-inline qv_vec2Nx24_space::qv_vec2Nx24_& qv_vec2Nx24_space::qv_vec2Nx24_::operator=(const qv_vec2Nx16Uw_space::qv_vec2Nx16Uw_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16Uw_rtor_qv_vec2Nx24(from); }
-inline qv_vec2Nx24_space::qv_vec2Nx24_::qv_vec2Nx24_(const qv_wvecspill_space::qv_wvecspill_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_rtor_qv_vec2Nx24(from); }
-inline qv_vec2Nx24_space::qv_vec2Nx24_& qv_vec2Nx24_space::qv_vec2Nx24_::operator=(const qv_wvecspill_space::qv_wvecspill_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_rtor_qv_vec2Nx24(from); }
-inline qv_vec2Nx24_space::qv_vec2Nx24_::operator qv_vec2Nx8U_space::qv_vec2Nx8U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_vec2Nx8U(*this); }
-inline qv_vec2Nx24_space::qv_vec2Nx24_::operator qv_vec2Nx16w_space::qv_vec2Nx16w_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_vec2Nx16w(*this); }
-inline qv_vec2Nx24_space::qv_vec2Nx24_::operator qv_vec2Nx16Uw_space::qv_vec2Nx16Uw_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_vec2Nx16Uw(*this); }
-inline qv_vec2Nx24_space::qv_vec2Nx24_::operator qv_wvecspill_space::qv_wvecspill_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_wvecspill(*this); }
+KASTARRI_ALWAYS_INLINE qv_vec2Nx24_space::qv_vec2Nx24_::qv_vec2Nx24_(const qv_vec2Nx16w_space::qv_vec2Nx16w_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16w_rtor_qv_vec2Nx24(from); }
+KASTARRI_ALWAYS_INLINE qv_vec2Nx24_space::qv_vec2Nx24_& qv_vec2Nx24_space::qv_vec2Nx24_::operator=(const qv_vec2Nx16w_space::qv_vec2Nx16w_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16w_rtor_qv_vec2Nx24(from); }
+KASTARRI_ALWAYS_INLINE qv_vec2Nx24_space::qv_vec2Nx24_::qv_vec2Nx24_(const qv_vec2Nx16Uw_space::qv_vec2Nx16Uw_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16Uw_rtor_qv_vec2Nx24(from); }
+KASTARRI_ALWAYS_INLINE qv_vec2Nx24_space::qv_vec2Nx24_& qv_vec2Nx24_space::qv_vec2Nx24_::operator=(const qv_vec2Nx16Uw_space::qv_vec2Nx16Uw_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16Uw_rtor_qv_vec2Nx24(from); }
+KASTARRI_ALWAYS_INLINE qv_vec2Nx24_space::qv_vec2Nx24_::qv_vec2Nx24_(const qv_wvecspill_space::qv_wvecspill_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_rtor_qv_vec2Nx24(from); }
+KASTARRI_ALWAYS_INLINE qv_vec2Nx24_space::qv_vec2Nx24_& qv_vec2Nx24_space::qv_vec2Nx24_::operator=(const qv_wvecspill_space::qv_wvecspill_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_rtor_qv_vec2Nx24(from); }
+KASTARRI_ALWAYS_INLINE qv_vec2Nx24_space::qv_vec2Nx24_::operator qv_vec2Nx8U_space::qv_vec2Nx8U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_vec2Nx8U(*this); }
+KASTARRI_ALWAYS_INLINE qv_vec2Nx24_space::qv_vec2Nx24_::operator qv_vec2Nx16w_space::qv_vec2Nx16w_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_vec2Nx16w(*this); }
+KASTARRI_ALWAYS_INLINE qv_vec2Nx24_space::qv_vec2Nx24_::operator qv_vec2Nx16Uw_space::qv_vec2Nx16Uw_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_vec2Nx16Uw(*this); }
+KASTARRI_ALWAYS_INLINE qv_vec2Nx24_space::qv_vec2Nx24_::operator qv_wvecspill_space::qv_wvecspill_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_wvecspill(*this); }
 KASTARRI_ALWAYS_INLINE qv_vecNx48_space::qv_vecNx48_::qv_vecNx48_(int from) { kastarri::replicate<48, 64, true>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_vecNx48_space::qv_vecNx48_& qv_vecNx48_space::qv_vecNx48_::operator=(int from) { kastarri::replicate<48, 64, true>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_vecNx48_space::qv_vecNx48_::qv_vecNx48_(unsigned int from) { kastarri::replicate<48, 64, true>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_vecNx48_space::qv_vecNx48_& qv_vecNx48_space::qv_vecNx48_::operator=(unsigned int from) { kastarri::replicate<48, 64, true>(_, from); return *this; }
-inline qv_vecNx48_space::qv_vecNx48_::qv_vecNx48_(const qv_vecNx32_space::qv_vecNx32_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32_rtor_qv_vecNx48(from); }
-inline qv_vecNx48_space::qv_vecNx48_& qv_vecNx48_space::qv_vecNx48_::operator=(const qv_vecNx32_space::qv_vecNx32_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32_rtor_qv_vecNx48(from); }
-inline qv_vecNx48_space::qv_vecNx48_::qv_vecNx48_(const qv_vecNx32U_space::qv_vecNx32U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32U_rtor_qv_vecNx48(from); }
-inline qv_vecNx48_space::qv_vecNx48_& qv_vecNx48_space::qv_vecNx48_::operator=(const qv_vecNx32U_space::qv_vecNx32U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32U_rtor_qv_vecNx48(from); }
-inline qv_vecNx48_space::qv_vecNx48_::qv_vecNx48_(const qv_wvecspill_space::qv_wvecspill_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_rtor_qv_vecNx48(from); }
-inline qv_vecNx48_space::qv_vecNx48_& qv_vecNx48_space::qv_vecNx48_::operator=(const qv_wvecspill_space::qv_wvecspill_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_rtor_qv_vecNx48(from); }
-inline qv_vecNx48_space::qv_vecNx48_::operator qv_vecNx16U_space::qv_vecNx16U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_vecNx16U(*this); }
-inline qv_vecNx48_space::qv_vecNx48_::operator qv_vecNx32_space::qv_vecNx32_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_vecNx32(*this); }
-inline qv_vecNx48_space::qv_vecNx48_::operator qv_vecNx32U_space::qv_vecNx32U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_vecNx32U(*this); }
-inline qv_vecNx48_space::qv_vecNx48_::operator qv_wvecspill_space::qv_wvecspill_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_wvecspill(*this); }
-inline qv_vecN_2x64w_space::qv_vecN_2x64w_::operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x64w_rtor_qv_vecN_2x32Uv(*this); }
-inline qv_vec2Nx16w_space::qv_vec2Nx16w_::qv_vec2Nx16w_(const qv_vec2Nx24_space::qv_vec2Nx24_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_vec2Nx16w(from); }
-inline qv_vec2Nx16w_space::qv_vec2Nx16w_& qv_vec2Nx16w_space::qv_vec2Nx16w_::operator=(const qv_vec2Nx24_space::qv_vec2Nx24_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_vec2Nx16w(from); }
-inline qv_vec2Nx16w_space::qv_vec2Nx16w_::operator qv_vec2Nx24_space::qv_vec2Nx24_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16w_rtor_qv_vec2Nx24(*this); }
-inline qv_vec2Nx16Uw_space::qv_vec2Nx16Uw_::qv_vec2Nx16Uw_(const qv_vec2Nx24_space::qv_vec2Nx24_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_vec2Nx16Uw(from); }
-inline qv_vec2Nx16Uw_space::qv_vec2Nx16Uw_& qv_vec2Nx16Uw_space::qv_vec2Nx16Uw_::operator=(const qv_vec2Nx24_space::qv_vec2Nx24_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_vec2Nx16Uw(from); }
-inline qv_vec2Nx16Uw_space::qv_vec2Nx16Uw_::operator qv_vec2Nx24_space::qv_vec2Nx24_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16Uw_rtor_qv_vec2Nx24(*this); }
-inline qv_vecNx32_space::qv_vecNx32_::qv_vecNx32_(const qv_vecNx48_space::qv_vecNx48_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_vecNx32(from); }
-inline qv_vecNx32_space::qv_vecNx32_& qv_vecNx32_space::qv_vecNx32_::operator=(const qv_vecNx48_space::qv_vecNx48_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_vecNx32(from); }
-inline qv_vecNx32_space::qv_vecNx32_::operator qv_vecNx48_space::qv_vecNx48_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32_rtor_qv_vecNx48(*this); }
-inline qv_vecNx32U_space::qv_vecNx32U_::qv_vecNx32U_(const qv_vecNx48_space::qv_vecNx48_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_vecNx32U(from); }
-inline qv_vecNx32U_space::qv_vecNx32U_& qv_vecNx32U_space::qv_vecNx32U_::operator=(const qv_vecNx48_space::qv_vecNx48_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_vecNx32U(from); }
-inline qv_vecNx32U_space::qv_vecNx32U_::operator qv_vecNx48_space::qv_vecNx48_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32U_rtor_qv_vecNx48(*this); }
-inline qv_wvecspill_space::qv_wvecspill_::qv_wvecspill_(const qv_vec2Nx24_space::qv_vec2Nx24_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_wvecspill(from); }
-inline qv_wvecspill_space::qv_wvecspill_& qv_wvecspill_space::qv_wvecspill_::operator=(const qv_vec2Nx24_space::qv_vec2Nx24_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_wvecspill(from); }
-inline qv_wvecspill_space::qv_wvecspill_::qv_wvecspill_(const qv_vecNx48_space::qv_vecNx48_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_wvecspill(from); }
-inline qv_wvecspill_space::qv_wvecspill_& qv_wvecspill_space::qv_wvecspill_::operator=(const qv_vecNx48_space::qv_vecNx48_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_wvecspill(from); }
-inline qv_wvecspill_space::qv_wvecspill_::operator qv_vec2Nx24_space::qv_vec2Nx24_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_rtor_qv_vec2Nx24(*this); }
-inline qv_wvecspill_space::qv_wvecspill_::operator qv_vecNx48_space::qv_vecNx48_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_rtor_qv_vecNx48(*this); }
-inline vboolN_space::vboolN_::vboolN_(const vbool1_space::vbool1_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_rtor_vboolN(from); }
-inline vboolN_space::vboolN_& vboolN_space::vboolN_::operator=(const vbool1_space::vbool1_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_rtor_vboolN(from); }
-inline vbool2N_space::vbool2N_::vbool2N_(const vbool1_space::vbool1_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_rtor_vbool2N(from); }
-inline vbool2N_space::vbool2N_& vbool2N_space::vbool2N_::operator=(const vbool1_space::vbool1_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_rtor_vbool2N(from); }
-inline vboolN_2_space::vboolN_2_::vboolN_2_(const vbool1_space::vbool1_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_rtor_vboolN_2(from); }
-inline vboolN_2_space::vboolN_2_& vboolN_2_space::vboolN_2_::operator=(const vbool1_space::vbool1_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_rtor_vboolN_2(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx48_space::qv_vecNx48_::qv_vecNx48_(const qv_vecNx32_space::qv_vecNx32_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32_rtor_qv_vecNx48(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx48_space::qv_vecNx48_& qv_vecNx48_space::qv_vecNx48_::operator=(const qv_vecNx32_space::qv_vecNx32_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32_rtor_qv_vecNx48(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx48_space::qv_vecNx48_::qv_vecNx48_(const qv_vecNx32U_space::qv_vecNx32U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32U_rtor_qv_vecNx48(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx48_space::qv_vecNx48_& qv_vecNx48_space::qv_vecNx48_::operator=(const qv_vecNx32U_space::qv_vecNx32U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32U_rtor_qv_vecNx48(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx48_space::qv_vecNx48_::qv_vecNx48_(const qv_wvecspill_space::qv_wvecspill_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_rtor_qv_vecNx48(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx48_space::qv_vecNx48_& qv_vecNx48_space::qv_vecNx48_::operator=(const qv_wvecspill_space::qv_wvecspill_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_rtor_qv_vecNx48(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx48_space::qv_vecNx48_::operator qv_vecNx16U_space::qv_vecNx16U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_vecNx16U(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecNx48_space::qv_vecNx48_::operator qv_vecNx32_space::qv_vecNx32_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_vecNx32(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecNx48_space::qv_vecNx48_::operator qv_vecNx32U_space::qv_vecNx32U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_vecNx32U(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecNx48_space::qv_vecNx48_::operator qv_wvecspill_space::qv_wvecspill_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_wvecspill(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecN_2x64w_space::qv_vecN_2x64w_::operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x64w_rtor_qv_vecN_2x32Uv(*this); }
+KASTARRI_ALWAYS_INLINE qv_vec2Nx16w_space::qv_vec2Nx16w_::qv_vec2Nx16w_(const qv_vec2Nx24_space::qv_vec2Nx24_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_vec2Nx16w(from); }
+KASTARRI_ALWAYS_INLINE qv_vec2Nx16w_space::qv_vec2Nx16w_& qv_vec2Nx16w_space::qv_vec2Nx16w_::operator=(const qv_vec2Nx24_space::qv_vec2Nx24_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_vec2Nx16w(from); }
+KASTARRI_ALWAYS_INLINE qv_vec2Nx16w_space::qv_vec2Nx16w_::operator qv_vec2Nx24_space::qv_vec2Nx24_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16w_rtor_qv_vec2Nx24(*this); }
+KASTARRI_ALWAYS_INLINE qv_vec2Nx16Uw_space::qv_vec2Nx16Uw_::qv_vec2Nx16Uw_(const qv_vec2Nx24_space::qv_vec2Nx24_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_vec2Nx16Uw(from); }
+KASTARRI_ALWAYS_INLINE qv_vec2Nx16Uw_space::qv_vec2Nx16Uw_& qv_vec2Nx16Uw_space::qv_vec2Nx16Uw_::operator=(const qv_vec2Nx24_space::qv_vec2Nx24_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_vec2Nx16Uw(from); }
+KASTARRI_ALWAYS_INLINE qv_vec2Nx16Uw_space::qv_vec2Nx16Uw_::operator qv_vec2Nx24_space::qv_vec2Nx24_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx16Uw_rtor_qv_vec2Nx24(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecNx32_space::qv_vecNx32_::qv_vecNx32_(const qv_vecNx48_space::qv_vecNx48_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_vecNx32(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx32_space::qv_vecNx32_& qv_vecNx32_space::qv_vecNx32_::operator=(const qv_vecNx48_space::qv_vecNx48_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_vecNx32(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx32_space::qv_vecNx32_::operator qv_vecNx48_space::qv_vecNx48_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32_rtor_qv_vecNx48(*this); }
+KASTARRI_ALWAYS_INLINE qv_vecNx32U_space::qv_vecNx32U_::qv_vecNx32U_(const qv_vecNx48_space::qv_vecNx48_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_vecNx32U(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx32U_space::qv_vecNx32U_& qv_vecNx32U_space::qv_vecNx32U_::operator=(const qv_vecNx48_space::qv_vecNx48_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_vecNx32U(from); }
+KASTARRI_ALWAYS_INLINE qv_vecNx32U_space::qv_vecNx32U_::operator qv_vecNx48_space::qv_vecNx48_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx32U_rtor_qv_vecNx48(*this); }
+KASTARRI_ALWAYS_INLINE qv_wvecspill_space::qv_wvecspill_::qv_wvecspill_(const qv_vec2Nx24_space::qv_vec2Nx24_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_wvecspill(from); }
+KASTARRI_ALWAYS_INLINE qv_wvecspill_space::qv_wvecspill_& qv_wvecspill_space::qv_wvecspill_::operator=(const qv_vec2Nx24_space::qv_vec2Nx24_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx24_rtor_qv_wvecspill(from); }
+KASTARRI_ALWAYS_INLINE qv_wvecspill_space::qv_wvecspill_::qv_wvecspill_(const qv_vecNx48_space::qv_vecNx48_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_wvecspill(from); }
+KASTARRI_ALWAYS_INLINE qv_wvecspill_space::qv_wvecspill_& qv_wvecspill_space::qv_wvecspill_::operator=(const qv_vecNx48_space::qv_vecNx48_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx48_rtor_qv_wvecspill(from); }
+KASTARRI_ALWAYS_INLINE qv_wvecspill_space::qv_wvecspill_::operator qv_vec2Nx24_space::qv_vec2Nx24_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_rtor_qv_vec2Nx24(*this); }
+KASTARRI_ALWAYS_INLINE qv_wvecspill_space::qv_wvecspill_::operator qv_vecNx48_space::qv_vecNx48_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_wvecspill_rtor_qv_vecNx48(*this); }
+KASTARRI_ALWAYS_INLINE vboolN_space::vboolN_::vboolN_(const vbool1_space::vbool1_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_rtor_vboolN(from); }
+KASTARRI_ALWAYS_INLINE vboolN_space::vboolN_& vboolN_space::vboolN_::operator=(const vbool1_space::vbool1_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_rtor_vboolN(from); }
+KASTARRI_ALWAYS_INLINE vbool2N_space::vbool2N_::vbool2N_(const vbool1_space::vbool1_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_rtor_vbool2N(from); }
+KASTARRI_ALWAYS_INLINE vbool2N_space::vbool2N_& vbool2N_space::vbool2N_::operator=(const vbool1_space::vbool1_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_rtor_vbool2N(from); }
+KASTARRI_ALWAYS_INLINE vboolN_2_space::vboolN_2_::vboolN_2_(const vbool1_space::vbool1_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_rtor_vboolN_2(from); }
+KASTARRI_ALWAYS_INLINE vboolN_2_space::vboolN_2_& vboolN_2_space::vboolN_2_::operator=(const vbool1_space::vbool1_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_rtor_vboolN_2(from); }
 KASTARRI_ALWAYS_INLINE vbool1_space::vbool1_::vbool1_(int from) { kastarri::replicate<1, 8, false>(_, from); }
 KASTARRI_ALWAYS_INLINE vbool1_space::vbool1_& vbool1_space::vbool1_::operator=(int from) { kastarri::replicate<1, 8, false>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE vbool1_space::vbool1_::vbool1_(unsigned int from) { kastarri::replicate<1, 8, false>(_, from); }
 KASTARRI_ALWAYS_INLINE vbool1_space::vbool1_& vbool1_space::vbool1_::operator=(unsigned int from) { kastarri::replicate<1, 8, false>(_, from); return *this; }
-inline vbool1_space::vbool1_::operator vboolN_space::vboolN_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_rtor_vboolN(*this); }
-inline vbool1_space::vbool1_::operator vbool2N_space::vbool2N_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_rtor_vbool2N(*this); }
-inline vbool1_space::vbool1_::operator vboolN_2_space::vboolN_2_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_rtor_vboolN_2(*this); }
+KASTARRI_ALWAYS_INLINE vbool1_space::vbool1_::operator vboolN_space::vboolN_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_rtor_vboolN(*this); }
+KASTARRI_ALWAYS_INLINE vbool1_space::vbool1_::operator vbool2N_space::vbool2N_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_rtor_vbool2N(*this); }
+KASTARRI_ALWAYS_INLINE vbool1_space::vbool1_::operator vboolN_2_space::vboolN_2_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_vbool1_rtor_vboolN_2(*this); }
 KASTARRI_ALWAYS_INLINE rkbool_space::rkbool_::rkbool_(char from) { kastarri::replicate<1, 8, false>(_, from); }
 KASTARRI_ALWAYS_INLINE rkbool_space::rkbool_& rkbool_space::rkbool_::operator=(char from) { kastarri::replicate<1, 8, false>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE rkbool_space::rkbool_::rkbool_(unsigned char from) { kastarri::replicate<1, 8, false>(_, from); }
@@ -4015,13 +4015,13 @@ KASTARRI_ALWAYS_INLINE rkbool_space::rkbool_::rkbool_(unsigned int from) { kasta
 KASTARRI_ALWAYS_INLINE rkbool_space::rkbool_& rkbool_space::rkbool_::operator=(unsigned int from) { kastarri::replicate<1, 8, false>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE rkbool_space::rkbool_::rkbool_(bool from) { kastarri::replicate<1, 8, false>(_, from); }
 KASTARRI_ALWAYS_INLINE rkbool_space::rkbool_& rkbool_space::rkbool_::operator=(bool from) { kastarri::replicate<1, 8, false>(_, from); return *this; }
-inline rkbool_space::rkbool_::operator char() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_int8(*this); }
-inline rkbool_space::rkbool_::operator unsigned char() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_uint8(*this); }
-inline rkbool_space::rkbool_::operator short() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_int16(*this); }
-inline rkbool_space::rkbool_::operator unsigned short() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_uint16(*this); }
-inline rkbool_space::rkbool_::operator int() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_int32(*this); }
-inline rkbool_space::rkbool_::operator unsigned int() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_uint32(*this); }
-inline rkbool_space::rkbool_::operator bool() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_bool(*this); }
+KASTARRI_ALWAYS_INLINE rkbool_space::rkbool_::operator char() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_int8(*this); }
+KASTARRI_ALWAYS_INLINE rkbool_space::rkbool_::operator unsigned char() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_uint8(*this); }
+KASTARRI_ALWAYS_INLINE rkbool_space::rkbool_::operator short() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_int16(*this); }
+KASTARRI_ALWAYS_INLINE rkbool_space::rkbool_::operator unsigned short() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_uint16(*this); }
+KASTARRI_ALWAYS_INLINE rkbool_space::rkbool_::operator int() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_int32(*this); }
+KASTARRI_ALWAYS_INLINE rkbool_space::rkbool_::operator unsigned int() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_uint32(*this); }
+KASTARRI_ALWAYS_INLINE rkbool_space::rkbool_::operator bool() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool_rtor_bool(*this); }
 KASTARRI_ALWAYS_INLINE rkbool4_space::rkbool4_::rkbool4_(char from) { kastarri::replicate<4, 8, false>(_, from); }
 KASTARRI_ALWAYS_INLINE rkbool4_space::rkbool4_& rkbool4_space::rkbool4_::operator=(char from) { kastarri::replicate<4, 8, false>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE rkbool4_space::rkbool4_::rkbool4_(unsigned char from) { kastarri::replicate<4, 8, false>(_, from); }
@@ -4034,12 +4034,12 @@ KASTARRI_ALWAYS_INLINE rkbool4_space::rkbool4_::rkbool4_(int from) { kastarri::r
 KASTARRI_ALWAYS_INLINE rkbool4_space::rkbool4_& rkbool4_space::rkbool4_::operator=(int from) { kastarri::replicate<4, 8, false>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE rkbool4_space::rkbool4_::rkbool4_(unsigned int from) { kastarri::replicate<4, 8, false>(_, from); }
 KASTARRI_ALWAYS_INLINE rkbool4_space::rkbool4_& rkbool4_space::rkbool4_::operator=(unsigned int from) { kastarri::replicate<4, 8, false>(_, from); return *this; }
-inline rkbool4_space::rkbool4_::operator char() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool4_rtor_int8(*this); }
-inline rkbool4_space::rkbool4_::operator unsigned char() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool4_rtor_uint8(*this); }
-inline rkbool4_space::rkbool4_::operator short() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool4_rtor_int16(*this); }
-inline rkbool4_space::rkbool4_::operator unsigned short() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool4_rtor_uint16(*this); }
-inline rkbool4_space::rkbool4_::operator int() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool4_rtor_int32(*this); }
-inline rkbool4_space::rkbool4_::operator unsigned int() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool4_rtor_uint32(*this); }
+KASTARRI_ALWAYS_INLINE rkbool4_space::rkbool4_::operator char() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool4_rtor_int8(*this); }
+KASTARRI_ALWAYS_INLINE rkbool4_space::rkbool4_::operator unsigned char() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool4_rtor_uint8(*this); }
+KASTARRI_ALWAYS_INLINE rkbool4_space::rkbool4_::operator short() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool4_rtor_int16(*this); }
+KASTARRI_ALWAYS_INLINE rkbool4_space::rkbool4_::operator unsigned short() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool4_rtor_uint16(*this); }
+KASTARRI_ALWAYS_INLINE rkbool4_space::rkbool4_::operator int() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool4_rtor_int32(*this); }
+KASTARRI_ALWAYS_INLINE rkbool4_space::rkbool4_::operator unsigned int() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool4_rtor_uint32(*this); }
 KASTARRI_ALWAYS_INLINE rkbool8_space::rkbool8_::rkbool8_(char from) { kastarri::replicate<8, 8, false>(_, from); }
 KASTARRI_ALWAYS_INLINE rkbool8_space::rkbool8_& rkbool8_space::rkbool8_::operator=(char from) { kastarri::replicate<8, 8, false>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE rkbool8_space::rkbool8_::rkbool8_(unsigned char from) { kastarri::replicate<8, 8, false>(_, from); }
@@ -4052,12 +4052,12 @@ KASTARRI_ALWAYS_INLINE rkbool8_space::rkbool8_::rkbool8_(int from) { kastarri::r
 KASTARRI_ALWAYS_INLINE rkbool8_space::rkbool8_& rkbool8_space::rkbool8_::operator=(int from) { kastarri::replicate<8, 8, false>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE rkbool8_space::rkbool8_::rkbool8_(unsigned int from) { kastarri::replicate<8, 8, false>(_, from); }
 KASTARRI_ALWAYS_INLINE rkbool8_space::rkbool8_& rkbool8_space::rkbool8_::operator=(unsigned int from) { kastarri::replicate<8, 8, false>(_, from); return *this; }
-inline rkbool8_space::rkbool8_::operator char() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool8_rtor_int8(*this); }
-inline rkbool8_space::rkbool8_::operator unsigned char() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool8_rtor_uint8(*this); }
-inline rkbool8_space::rkbool8_::operator short() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool8_rtor_int16(*this); }
-inline rkbool8_space::rkbool8_::operator unsigned short() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool8_rtor_uint16(*this); }
-inline rkbool8_space::rkbool8_::operator int() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool8_rtor_int32(*this); }
-inline rkbool8_space::rkbool8_::operator unsigned int() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool8_rtor_uint32(*this); }
+KASTARRI_ALWAYS_INLINE rkbool8_space::rkbool8_::operator char() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool8_rtor_int8(*this); }
+KASTARRI_ALWAYS_INLINE rkbool8_space::rkbool8_::operator unsigned char() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool8_rtor_uint8(*this); }
+KASTARRI_ALWAYS_INLINE rkbool8_space::rkbool8_::operator short() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool8_rtor_int16(*this); }
+KASTARRI_ALWAYS_INLINE rkbool8_space::rkbool8_::operator unsigned short() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool8_rtor_uint16(*this); }
+KASTARRI_ALWAYS_INLINE rkbool8_space::rkbool8_::operator int() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool8_rtor_int32(*this); }
+KASTARRI_ALWAYS_INLINE rkbool8_space::rkbool8_::operator unsigned int() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkbool8_rtor_uint32(*this); }
 KASTARRI_ALWAYS_INLINE qv_int8_space::qv_int8_::qv_int8_(signed char from) { kastarri::replicate<8, 8, true>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_int8_space::qv_int8_& qv_int8_space::qv_int8_::operator=(signed char from) { kastarri::replicate<8, 8, true>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_int8_space::qv_int8_::qv_int8_(unsigned char from) { kastarri::replicate<8, 8, true>(_, from); }
@@ -4066,20 +4066,20 @@ KASTARRI_ALWAYS_INLINE qv_int8_space::qv_int8_::qv_int8_(int from) { kastarri::r
 KASTARRI_ALWAYS_INLINE qv_int8_space::qv_int8_& qv_int8_space::qv_int8_::operator=(int from) { kastarri::replicate<8, 8, true>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_int8_space::qv_int8_::qv_int8_(unsigned int from) { kastarri::replicate<8, 8, true>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_int8_space::qv_int8_& qv_int8_space::qv_int8_::operator=(unsigned int from) { kastarri::replicate<8, 8, true>(_, from); return *this; }
-inline qv_int8_space::qv_int8_::qv_int8_(const qv_vec2Nx8_space::qv_vec2Nx8_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_qv_int8(from); }
-inline qv_int8_space::qv_int8_& qv_int8_space::qv_int8_::operator=(const qv_vec2Nx8_space::qv_vec2Nx8_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_qv_int8(from); }
-inline qv_int8_space::qv_int8_::qv_int8_(const qv_vecNx16_space::qv_vecNx16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_int8(from); }
-inline qv_int8_space::qv_int8_& qv_int8_space::qv_int8_::operator=(const qv_vecNx16_space::qv_vecNx16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_int8(from); }
-inline qv_int8_space::qv_int8_::qv_int8_(const qv_vecNx8_space::qv_vecNx8_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_qv_int8(from); }
-inline qv_int8_space::qv_int8_& qv_int8_space::qv_int8_::operator=(const qv_vecNx8_space::qv_vecNx8_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_qv_int8(from); }
-inline qv_int8_space::qv_int8_::qv_int8_(const qv_int8U_space::qv_int8U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int8(from); }
-inline qv_int8_space::qv_int8_& qv_int8_space::qv_int8_::operator=(const qv_int8U_space::qv_int8U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int8(from); }
-inline qv_int8_space::qv_int8_::qv_int8_(const qv_int16_space::qv_int16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_int8(from); }
-inline qv_int8_space::qv_int8_& qv_int8_space::qv_int8_::operator=(const qv_int16_space::qv_int16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_int8(from); }
-inline qv_int8_space::qv_int8_::operator qv_vec2Nx8_space::qv_vec2Nx8_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_vec2Nx8(*this); }
-inline qv_int8_space::qv_int8_::operator qv_int8U_space::qv_int8U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_int8U(*this); }
-inline qv_int8_space::qv_int8_::operator qv_int16_space::qv_int16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_int16(*this); }
-inline qv_int8_space::qv_int8_::operator qv_int32pr_space::qv_int32pr_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_int32pr(*this); }
+KASTARRI_ALWAYS_INLINE qv_int8_space::qv_int8_::qv_int8_(const qv_vec2Nx8_space::qv_vec2Nx8_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_qv_int8(from); }
+KASTARRI_ALWAYS_INLINE qv_int8_space::qv_int8_& qv_int8_space::qv_int8_::operator=(const qv_vec2Nx8_space::qv_vec2Nx8_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8_rtor_qv_int8(from); }
+KASTARRI_ALWAYS_INLINE qv_int8_space::qv_int8_::qv_int8_(const qv_vecNx16_space::qv_vecNx16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_int8(from); }
+KASTARRI_ALWAYS_INLINE qv_int8_space::qv_int8_& qv_int8_space::qv_int8_::operator=(const qv_vecNx16_space::qv_vecNx16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_int8(from); }
+KASTARRI_ALWAYS_INLINE qv_int8_space::qv_int8_::qv_int8_(const qv_vecNx8_space::qv_vecNx8_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_qv_int8(from); }
+KASTARRI_ALWAYS_INLINE qv_int8_space::qv_int8_& qv_int8_space::qv_int8_::operator=(const qv_vecNx8_space::qv_vecNx8_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8_rtor_qv_int8(from); }
+KASTARRI_ALWAYS_INLINE qv_int8_space::qv_int8_::qv_int8_(const qv_int8U_space::qv_int8U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int8(from); }
+KASTARRI_ALWAYS_INLINE qv_int8_space::qv_int8_& qv_int8_space::qv_int8_::operator=(const qv_int8U_space::qv_int8U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int8(from); }
+KASTARRI_ALWAYS_INLINE qv_int8_space::qv_int8_::qv_int8_(const qv_int16_space::qv_int16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_int8(from); }
+KASTARRI_ALWAYS_INLINE qv_int8_space::qv_int8_& qv_int8_space::qv_int8_::operator=(const qv_int16_space::qv_int16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_int8(from); }
+KASTARRI_ALWAYS_INLINE qv_int8_space::qv_int8_::operator qv_vec2Nx8_space::qv_vec2Nx8_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_vec2Nx8(*this); }
+KASTARRI_ALWAYS_INLINE qv_int8_space::qv_int8_::operator qv_int8U_space::qv_int8U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_int8U(*this); }
+KASTARRI_ALWAYS_INLINE qv_int8_space::qv_int8_::operator qv_int16_space::qv_int16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_int16(*this); }
+KASTARRI_ALWAYS_INLINE qv_int8_space::qv_int8_::operator qv_int32pr_space::qv_int32pr_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_int32pr(*this); }
 KASTARRI_ALWAYS_INLINE qv_int8U_space::qv_int8U_::qv_int8U_(signed char from) { kastarri::replicate<8, 8, false>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_int8U_space::qv_int8U_& qv_int8U_space::qv_int8U_::operator=(signed char from) { kastarri::replicate<8, 8, false>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_int8U_space::qv_int8U_::qv_int8U_(unsigned char from) { kastarri::replicate<8, 8, false>(_, from); }
@@ -4088,22 +4088,22 @@ KASTARRI_ALWAYS_INLINE qv_int8U_space::qv_int8U_::qv_int8U_(int from) { kastarri
 KASTARRI_ALWAYS_INLINE qv_int8U_space::qv_int8U_& qv_int8U_space::qv_int8U_::operator=(int from) { kastarri::replicate<8, 8, false>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_int8U_space::qv_int8U_::qv_int8U_(unsigned int from) { kastarri::replicate<8, 8, false>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_int8U_space::qv_int8U_& qv_int8U_space::qv_int8U_::operator=(unsigned int from) { kastarri::replicate<8, 8, false>(_, from); return *this; }
-inline qv_int8U_space::qv_int8U_::qv_int8U_(const qv_vec2Nx8U_space::qv_vec2Nx8U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_qv_int8U(from); }
-inline qv_int8U_space::qv_int8U_& qv_int8U_space::qv_int8U_::operator=(const qv_vec2Nx8U_space::qv_vec2Nx8U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_qv_int8U(from); }
-inline qv_int8U_space::qv_int8U_::qv_int8U_(const qv_vecNx16U_space::qv_vecNx16U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_int8U(from); }
-inline qv_int8U_space::qv_int8U_& qv_int8U_space::qv_int8U_::operator=(const qv_vecNx16U_space::qv_vecNx16U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_int8U(from); }
-inline qv_int8U_space::qv_int8U_::qv_int8U_(const qv_vecNx8U_space::qv_vecNx8U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_qv_int8U(from); }
-inline qv_int8U_space::qv_int8U_& qv_int8U_space::qv_int8U_::operator=(const qv_vecNx8U_space::qv_vecNx8U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_qv_int8U(from); }
-inline qv_int8U_space::qv_int8U_::qv_int8U_(const qv_int8_space::qv_int8_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_int8U(from); }
-inline qv_int8U_space::qv_int8U_& qv_int8U_space::qv_int8U_::operator=(const qv_int8_space::qv_int8_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_int8U(from); }
-inline qv_int8U_space::qv_int8U_::qv_int8U_(const qv_int16U_space::qv_int16U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_int8U(from); }
-inline qv_int8U_space::qv_int8U_& qv_int8U_space::qv_int8U_::operator=(const qv_int16U_space::qv_int16U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_int8U(from); }
-inline qv_int8U_space::qv_int8U_::operator qv_vec2Nx8U_space::qv_vec2Nx8U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_vec2Nx8U(*this); }
-inline qv_int8U_space::qv_int8U_::operator qv_vecNx8U_space::qv_vecNx8U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_vecNx8U(*this); }
-inline qv_int8U_space::qv_int8U_::operator qv_int8_space::qv_int8_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int8(*this); }
-inline qv_int8U_space::qv_int8U_::operator qv_int16_space::qv_int16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int16(*this); }
-inline qv_int8U_space::qv_int8U_::operator qv_int16U_space::qv_int16U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int16U(*this); }
-inline qv_int8U_space::qv_int8U_::operator qv_int32pr_space::qv_int32pr_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int32pr(*this); }
+KASTARRI_ALWAYS_INLINE qv_int8U_space::qv_int8U_::qv_int8U_(const qv_vec2Nx8U_space::qv_vec2Nx8U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_qv_int8U(from); }
+KASTARRI_ALWAYS_INLINE qv_int8U_space::qv_int8U_& qv_int8U_space::qv_int8U_::operator=(const qv_vec2Nx8U_space::qv_vec2Nx8U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vec2Nx8U_rtor_qv_int8U(from); }
+KASTARRI_ALWAYS_INLINE qv_int8U_space::qv_int8U_::qv_int8U_(const qv_vecNx16U_space::qv_vecNx16U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_int8U(from); }
+KASTARRI_ALWAYS_INLINE qv_int8U_space::qv_int8U_& qv_int8U_space::qv_int8U_::operator=(const qv_vecNx16U_space::qv_vecNx16U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_int8U(from); }
+KASTARRI_ALWAYS_INLINE qv_int8U_space::qv_int8U_::qv_int8U_(const qv_vecNx8U_space::qv_vecNx8U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_qv_int8U(from); }
+KASTARRI_ALWAYS_INLINE qv_int8U_space::qv_int8U_& qv_int8U_space::qv_int8U_::operator=(const qv_vecNx8U_space::qv_vecNx8U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx8U_rtor_qv_int8U(from); }
+KASTARRI_ALWAYS_INLINE qv_int8U_space::qv_int8U_::qv_int8U_(const qv_int8_space::qv_int8_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_int8U(from); }
+KASTARRI_ALWAYS_INLINE qv_int8U_space::qv_int8U_& qv_int8U_space::qv_int8U_::operator=(const qv_int8_space::qv_int8_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_int8U(from); }
+KASTARRI_ALWAYS_INLINE qv_int8U_space::qv_int8U_::qv_int8U_(const qv_int16U_space::qv_int16U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_int8U(from); }
+KASTARRI_ALWAYS_INLINE qv_int8U_space::qv_int8U_& qv_int8U_space::qv_int8U_::operator=(const qv_int16U_space::qv_int16U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_int8U(from); }
+KASTARRI_ALWAYS_INLINE qv_int8U_space::qv_int8U_::operator qv_vec2Nx8U_space::qv_vec2Nx8U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_vec2Nx8U(*this); }
+KASTARRI_ALWAYS_INLINE qv_int8U_space::qv_int8U_::operator qv_vecNx8U_space::qv_vecNx8U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_vecNx8U(*this); }
+KASTARRI_ALWAYS_INLINE qv_int8U_space::qv_int8U_::operator qv_int8_space::qv_int8_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int8(*this); }
+KASTARRI_ALWAYS_INLINE qv_int8U_space::qv_int8U_::operator qv_int16_space::qv_int16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int16(*this); }
+KASTARRI_ALWAYS_INLINE qv_int8U_space::qv_int8U_::operator qv_int16U_space::qv_int16U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int16U(*this); }
+KASTARRI_ALWAYS_INLINE qv_int8U_space::qv_int8U_::operator qv_int32pr_space::qv_int32pr_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int32pr(*this); }
 KASTARRI_ALWAYS_INLINE qv_int16_space::qv_int16_::qv_int16_(signed char from) { kastarri::replicate<16, 16, true>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_int16_space::qv_int16_& qv_int16_space::qv_int16_::operator=(signed char from) { kastarri::replicate<16, 16, true>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_int16_space::qv_int16_::qv_int16_(unsigned char from) { kastarri::replicate<16, 16, true>(_, from); }
@@ -4116,25 +4116,25 @@ KASTARRI_ALWAYS_INLINE qv_int16_space::qv_int16_::qv_int16_(int from) { kastarri
 KASTARRI_ALWAYS_INLINE qv_int16_space::qv_int16_& qv_int16_space::qv_int16_::operator=(int from) { kastarri::replicate<16, 16, true>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_int16_space::qv_int16_::qv_int16_(unsigned int from) { kastarri::replicate<16, 16, true>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_int16_space::qv_int16_& qv_int16_space::qv_int16_::operator=(unsigned int from) { kastarri::replicate<16, 16, true>(_, from); return *this; }
-inline qv_int16_space::qv_int16_::qv_int16_(const qv_vecNx16_space::qv_vecNx16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_int16(from); }
-inline qv_int16_space::qv_int16_& qv_int16_space::qv_int16_::operator=(const qv_vecNx16_space::qv_vecNx16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_int16(from); }
-inline qv_int16_space::qv_int16_::qv_int16_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_int16(from); }
-inline qv_int16_space::qv_int16_& qv_int16_space::qv_int16_::operator=(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_int16(from); }
-inline qv_int16_space::qv_int16_::qv_int16_(const qv_vecN_2x16_space::qv_vecN_2x16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_qv_int16(from); }
-inline qv_int16_space::qv_int16_& qv_int16_space::qv_int16_::operator=(const qv_vecN_2x16_space::qv_vecN_2x16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_qv_int16(from); }
-inline qv_int16_space::qv_int16_::qv_int16_(const qv_int8_space::qv_int8_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_int16(from); }
-inline qv_int16_space::qv_int16_& qv_int16_space::qv_int16_::operator=(const qv_int8_space::qv_int8_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_int16(from); }
-inline qv_int16_space::qv_int16_::qv_int16_(const qv_int8U_space::qv_int8U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int16(from); }
-inline qv_int16_space::qv_int16_& qv_int16_space::qv_int16_::operator=(const qv_int8U_space::qv_int8U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int16(from); }
-inline qv_int16_space::qv_int16_::qv_int16_(const qv_int16U_space::qv_int16U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_int16(from); }
-inline qv_int16_space::qv_int16_& qv_int16_space::qv_int16_::operator=(const qv_int16U_space::qv_int16U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_int16(from); }
-inline qv_int16_space::qv_int16_::qv_int16_(const qv_f16_space::qv_f16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int16(from); }
-inline qv_int16_space::qv_int16_& qv_int16_space::qv_int16_::operator=(const qv_f16_space::qv_f16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int16(from); }
-inline qv_int16_space::qv_int16_::operator qv_vecNx16_space::qv_vecNx16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_vecNx16(*this); }
-inline qv_int16_space::qv_int16_::operator qv_int8_space::qv_int8_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_int8(*this); }
-inline qv_int16_space::qv_int16_::operator qv_int16U_space::qv_int16U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_int16U(*this); }
-inline qv_int16_space::qv_int16_::operator qv_int32pr_space::qv_int32pr_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_int32pr(*this); }
-inline qv_int16_space::qv_int16_::operator qv_f16_space::qv_f16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_f16(*this); }
+KASTARRI_ALWAYS_INLINE qv_int16_space::qv_int16_::qv_int16_(const qv_vecNx16_space::qv_vecNx16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_int16(from); }
+KASTARRI_ALWAYS_INLINE qv_int16_space::qv_int16_& qv_int16_space::qv_int16_::operator=(const qv_vecNx16_space::qv_vecNx16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16_rtor_qv_int16(from); }
+KASTARRI_ALWAYS_INLINE qv_int16_space::qv_int16_::qv_int16_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_int16(from); }
+KASTARRI_ALWAYS_INLINE qv_int16_space::qv_int16_& qv_int16_space::qv_int16_::operator=(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_int16(from); }
+KASTARRI_ALWAYS_INLINE qv_int16_space::qv_int16_::qv_int16_(const qv_vecN_2x16_space::qv_vecN_2x16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_qv_int16(from); }
+KASTARRI_ALWAYS_INLINE qv_int16_space::qv_int16_& qv_int16_space::qv_int16_::operator=(const qv_vecN_2x16_space::qv_vecN_2x16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16_rtor_qv_int16(from); }
+KASTARRI_ALWAYS_INLINE qv_int16_space::qv_int16_::qv_int16_(const qv_int8_space::qv_int8_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_int16(from); }
+KASTARRI_ALWAYS_INLINE qv_int16_space::qv_int16_& qv_int16_space::qv_int16_::operator=(const qv_int8_space::qv_int8_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_int16(from); }
+KASTARRI_ALWAYS_INLINE qv_int16_space::qv_int16_::qv_int16_(const qv_int8U_space::qv_int8U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int16(from); }
+KASTARRI_ALWAYS_INLINE qv_int16_space::qv_int16_& qv_int16_space::qv_int16_::operator=(const qv_int8U_space::qv_int8U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int16(from); }
+KASTARRI_ALWAYS_INLINE qv_int16_space::qv_int16_::qv_int16_(const qv_int16U_space::qv_int16U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_int16(from); }
+KASTARRI_ALWAYS_INLINE qv_int16_space::qv_int16_& qv_int16_space::qv_int16_::operator=(const qv_int16U_space::qv_int16U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_int16(from); }
+KASTARRI_ALWAYS_INLINE qv_int16_space::qv_int16_::qv_int16_(const qv_f16_space::qv_f16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int16(from); }
+KASTARRI_ALWAYS_INLINE qv_int16_space::qv_int16_& qv_int16_space::qv_int16_::operator=(const qv_f16_space::qv_f16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int16(from); }
+KASTARRI_ALWAYS_INLINE qv_int16_space::qv_int16_::operator qv_vecNx16_space::qv_vecNx16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_vecNx16(*this); }
+KASTARRI_ALWAYS_INLINE qv_int16_space::qv_int16_::operator qv_int8_space::qv_int8_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_int8(*this); }
+KASTARRI_ALWAYS_INLINE qv_int16_space::qv_int16_::operator qv_int16U_space::qv_int16U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_int16U(*this); }
+KASTARRI_ALWAYS_INLINE qv_int16_space::qv_int16_::operator qv_int32pr_space::qv_int32pr_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_int32pr(*this); }
+KASTARRI_ALWAYS_INLINE qv_int16_space::qv_int16_::operator qv_f16_space::qv_f16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_f16(*this); }
 KASTARRI_ALWAYS_INLINE qv_int16U_space::qv_int16U_::qv_int16U_(signed char from) { kastarri::replicate<16, 16, false>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_int16U_space::qv_int16U_& qv_int16U_space::qv_int16U_::operator=(signed char from) { kastarri::replicate<16, 16, false>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_int16U_space::qv_int16U_::qv_int16U_(unsigned char from) { kastarri::replicate<16, 16, false>(_, from); }
@@ -4147,72 +4147,72 @@ KASTARRI_ALWAYS_INLINE qv_int16U_space::qv_int16U_::qv_int16U_(int from) { kasta
 KASTARRI_ALWAYS_INLINE qv_int16U_space::qv_int16U_& qv_int16U_space::qv_int16U_::operator=(int from) { kastarri::replicate<16, 16, false>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_int16U_space::qv_int16U_::qv_int16U_(unsigned int from) { kastarri::replicate<16, 16, false>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_int16U_space::qv_int16U_& qv_int16U_space::qv_int16U_::operator=(unsigned int from) { kastarri::replicate<16, 16, false>(_, from); return *this; }
-inline qv_int16U_space::qv_int16U_::qv_int16U_(const qv_vecNx16U_space::qv_vecNx16U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_int16U(from); }
-inline qv_int16U_space::qv_int16U_& qv_int16U_space::qv_int16U_::operator=(const qv_vecNx16U_space::qv_vecNx16U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_int16U(from); }
-inline qv_int16U_space::qv_int16U_::qv_int16U_(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_int16U(from); }
-inline qv_int16U_space::qv_int16U_& qv_int16U_space::qv_int16U_::operator=(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_int16U(from); }
-inline qv_int16U_space::qv_int16U_::qv_int16U_(const qv_vecN_2x16U_space::qv_vecN_2x16U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_qv_int16U(from); }
-inline qv_int16U_space::qv_int16U_& qv_int16U_space::qv_int16U_::operator=(const qv_vecN_2x16U_space::qv_vecN_2x16U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_qv_int16U(from); }
-inline qv_int16U_space::qv_int16U_::qv_int16U_(const qv_int8U_space::qv_int8U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int16U(from); }
-inline qv_int16U_space::qv_int16U_& qv_int16U_space::qv_int16U_::operator=(const qv_int8U_space::qv_int8U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int16U(from); }
-inline qv_int16U_space::qv_int16U_::qv_int16U_(const qv_int16_space::qv_int16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_int16U(from); }
-inline qv_int16U_space::qv_int16U_& qv_int16U_space::qv_int16U_::operator=(const qv_int16_space::qv_int16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_int16U(from); }
-inline qv_int16U_space::qv_int16U_::qv_int16U_(const qv_int48_space::qv_int48_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int48_rtor_qv_int16U(from); }
-inline qv_int16U_space::qv_int16U_& qv_int16U_space::qv_int16U_::operator=(const qv_int48_space::qv_int48_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int48_rtor_qv_int16U(from); }
-inline qv_int16U_space::qv_int16U_::qv_int16U_(const qv_f16_space::qv_f16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int16U(from); }
-inline qv_int16U_space::qv_int16U_& qv_int16U_space::qv_int16U_::operator=(const qv_f16_space::qv_f16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int16U(from); }
-inline qv_int16U_space::qv_int16U_::operator qv_vecNx16U_space::qv_vecNx16U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_vecNx16U(*this); }
-inline qv_int16U_space::qv_int16U_::operator qv_vecN_2x16U_space::qv_vecN_2x16U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_vecN_2x16U(*this); }
-inline qv_int16U_space::qv_int16U_::operator qv_int8U_space::qv_int8U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_int8U(*this); }
-inline qv_int16U_space::qv_int16U_::operator qv_int16_space::qv_int16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_int16(*this); }
-inline qv_int16U_space::qv_int16U_::operator qv_int32pr_space::qv_int32pr_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_int32pr(*this); }
-inline qv_int16U_space::qv_int16U_::operator qv_f16_space::qv_f16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_f16(*this); }
-inline qv_f16_space::qv_f16_::qv_f16_(const qv_vecNxf16_space::qv_vecNxf16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_f16(from); }
-inline qv_f16_space::qv_f16_& qv_f16_space::qv_f16_::operator=(const qv_vecNxf16_space::qv_vecNxf16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_f16(from); }
-inline qv_f16_space::qv_f16_::qv_f16_(const qv_vecN_2xf16_space::qv_vecN_2xf16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_rtor_qv_f16(from); }
-inline qv_f16_space::qv_f16_& qv_f16_space::qv_f16_::operator=(const qv_vecN_2xf16_space::qv_vecN_2xf16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_rtor_qv_f16(from); }
-inline qv_f16_space::qv_f16_::qv_f16_(signed char from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_qv_f16(from); }
-inline qv_f16_space::qv_f16_& qv_f16_space::qv_f16_::operator=(signed char from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_qv_f16(from); }
-inline qv_f16_space::qv_f16_::qv_f16_(unsigned char from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_qv_f16(from); }
-inline qv_f16_space::qv_f16_& qv_f16_space::qv_f16_::operator=(unsigned char from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_qv_f16(from); }
-inline qv_f16_space::qv_f16_::qv_f16_(short from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_f16(from); }
-inline qv_f16_space::qv_f16_& qv_f16_space::qv_f16_::operator=(short from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_f16(from); }
-inline qv_f16_space::qv_f16_::qv_f16_(unsigned short from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_f16(from); }
-inline qv_f16_space::qv_f16_& qv_f16_space::qv_f16_::operator=(unsigned short from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_f16(from); }
-inline qv_f16_space::qv_f16_::qv_f16_(int from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_f16(from); }
-inline qv_f16_space::qv_f16_& qv_f16_space::qv_f16_::operator=(int from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_f16(from); }
-inline qv_f16_space::qv_f16_::qv_f16_(unsigned int from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_f16(from); }
-inline qv_f16_space::qv_f16_& qv_f16_space::qv_f16_::operator=(unsigned int from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_f16(from); }
-inline qv_f16_space::qv_f16_::qv_f16_(float from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_float_rtor_qv_f16(from); }
-inline qv_f16_space::qv_f16_& qv_f16_space::qv_f16_::operator=(float from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_float_rtor_qv_f16(from); }
-inline qv_f16_space::qv_f16_::qv_f16_(const qv_int16_space::qv_int16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_f16(from); }
-inline qv_f16_space::qv_f16_& qv_f16_space::qv_f16_::operator=(const qv_int16_space::qv_int16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_f16(from); }
-inline qv_f16_space::qv_f16_::qv_f16_(const qv_int16U_space::qv_int16U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_f16(from); }
-inline qv_f16_space::qv_f16_& qv_f16_space::qv_f16_::operator=(const qv_int16U_space::qv_int16U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_f16(from); }
-inline qv_f16_space::qv_f16_::qv_f16_(const rkfloat_space::rkfloat_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_rtor_qv_f16(from); }
-inline qv_f16_space::qv_f16_& qv_f16_space::qv_f16_::operator=(const rkfloat_space::rkfloat_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_rtor_qv_f16(from); }
-inline qv_f16_space::qv_f16_::qv_f16_(const qv_int32v_space::qv_int32v_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_f16(from); }
-inline qv_f16_space::qv_f16_& qv_f16_space::qv_f16_::operator=(const qv_int32v_space::qv_int32v_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_f16(from); }
-inline qv_f16_space::qv_f16_::qv_f16_(const qv_int32Uv_space::qv_int32Uv_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_f16(from); }
-inline qv_f16_space::qv_f16_& qv_f16_space::qv_f16_::operator=(const qv_int32Uv_space::qv_int32Uv_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_f16(from); }
-inline qv_f16_space::qv_f16_::operator qv_vecNxf16_space::qv_vecNxf16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_vecNxf16(*this); }
-inline qv_f16_space::qv_f16_::operator qv_vecN_2xf16_space::qv_vecN_2xf16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_vecN_2xf16(*this); }
-inline qv_f16_space::qv_f16_::operator qv_int16_space::qv_int16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int16(*this); }
-inline qv_f16_space::qv_f16_::operator qv_int16U_space::qv_int16U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int16U(*this); }
-inline qv_f16_space::qv_f16_::operator rkfloat_space::rkfloat_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_rkfloat(*this); }
-inline qv_f16_space::qv_f16_::operator qv_int32v_space::qv_int32v_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int32v(*this); }
-inline qv_f16_space::qv_f16_::operator qv_int32Uv_space::qv_int32Uv_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int32Uv(*this); }
+KASTARRI_ALWAYS_INLINE qv_int16U_space::qv_int16U_::qv_int16U_(const qv_vecNx16U_space::qv_vecNx16U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_int16U(from); }
+KASTARRI_ALWAYS_INLINE qv_int16U_space::qv_int16U_& qv_int16U_space::qv_int16U_::operator=(const qv_vecNx16U_space::qv_vecNx16U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNx16U_rtor_qv_int16U(from); }
+KASTARRI_ALWAYS_INLINE qv_int16U_space::qv_int16U_::qv_int16U_(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_int16U(from); }
+KASTARRI_ALWAYS_INLINE qv_int16U_space::qv_int16U_& qv_int16U_space::qv_int16U_::operator=(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_int16U(from); }
+KASTARRI_ALWAYS_INLINE qv_int16U_space::qv_int16U_::qv_int16U_(const qv_vecN_2x16U_space::qv_vecN_2x16U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_qv_int16U(from); }
+KASTARRI_ALWAYS_INLINE qv_int16U_space::qv_int16U_& qv_int16U_space::qv_int16U_::operator=(const qv_vecN_2x16U_space::qv_vecN_2x16U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x16U_rtor_qv_int16U(from); }
+KASTARRI_ALWAYS_INLINE qv_int16U_space::qv_int16U_::qv_int16U_(const qv_int8U_space::qv_int8U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int16U(from); }
+KASTARRI_ALWAYS_INLINE qv_int16U_space::qv_int16U_& qv_int16U_space::qv_int16U_::operator=(const qv_int8U_space::qv_int8U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int16U(from); }
+KASTARRI_ALWAYS_INLINE qv_int16U_space::qv_int16U_::qv_int16U_(const qv_int16_space::qv_int16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_int16U(from); }
+KASTARRI_ALWAYS_INLINE qv_int16U_space::qv_int16U_& qv_int16U_space::qv_int16U_::operator=(const qv_int16_space::qv_int16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_int16U(from); }
+KASTARRI_ALWAYS_INLINE qv_int16U_space::qv_int16U_::qv_int16U_(const qv_int48_space::qv_int48_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int48_rtor_qv_int16U(from); }
+KASTARRI_ALWAYS_INLINE qv_int16U_space::qv_int16U_& qv_int16U_space::qv_int16U_::operator=(const qv_int48_space::qv_int48_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int48_rtor_qv_int16U(from); }
+KASTARRI_ALWAYS_INLINE qv_int16U_space::qv_int16U_::qv_int16U_(const qv_f16_space::qv_f16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int16U(from); }
+KASTARRI_ALWAYS_INLINE qv_int16U_space::qv_int16U_& qv_int16U_space::qv_int16U_::operator=(const qv_f16_space::qv_f16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int16U(from); }
+KASTARRI_ALWAYS_INLINE qv_int16U_space::qv_int16U_::operator qv_vecNx16U_space::qv_vecNx16U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_vecNx16U(*this); }
+KASTARRI_ALWAYS_INLINE qv_int16U_space::qv_int16U_::operator qv_vecN_2x16U_space::qv_vecN_2x16U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_vecN_2x16U(*this); }
+KASTARRI_ALWAYS_INLINE qv_int16U_space::qv_int16U_::operator qv_int8U_space::qv_int8U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_int8U(*this); }
+KASTARRI_ALWAYS_INLINE qv_int16U_space::qv_int16U_::operator qv_int16_space::qv_int16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_int16(*this); }
+KASTARRI_ALWAYS_INLINE qv_int16U_space::qv_int16U_::operator qv_int32pr_space::qv_int32pr_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_int32pr(*this); }
+KASTARRI_ALWAYS_INLINE qv_int16U_space::qv_int16U_::operator qv_f16_space::qv_f16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_f16(*this); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_::qv_f16_(const qv_vecNxf16_space::qv_vecNxf16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_f16(from); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_& qv_f16_space::qv_f16_::operator=(const qv_vecNxf16_space::qv_vecNxf16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_qv_f16(from); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_::qv_f16_(const qv_vecN_2xf16_space::qv_vecN_2xf16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_rtor_qv_f16(from); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_& qv_f16_space::qv_f16_::operator=(const qv_vecN_2xf16_space::qv_vecN_2xf16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf16_rtor_qv_f16(from); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_::qv_f16_(signed char from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_qv_f16(from); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_& qv_f16_space::qv_f16_::operator=(signed char from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int8_rtor_qv_f16(from); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_::qv_f16_(unsigned char from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_qv_f16(from); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_& qv_f16_space::qv_f16_::operator=(unsigned char from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint8_rtor_qv_f16(from); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_::qv_f16_(short from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_f16(from); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_& qv_f16_space::qv_f16_::operator=(short from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int16_rtor_qv_f16(from); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_::qv_f16_(unsigned short from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_f16(from); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_& qv_f16_space::qv_f16_::operator=(unsigned short from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint16_rtor_qv_f16(from); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_::qv_f16_(int from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_f16(from); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_& qv_f16_space::qv_f16_::operator=(int from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_int32_rtor_qv_f16(from); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_::qv_f16_(unsigned int from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_f16(from); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_& qv_f16_space::qv_f16_::operator=(unsigned int from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_uint32_rtor_qv_f16(from); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_::qv_f16_(float from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_float_rtor_qv_f16(from); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_& qv_f16_space::qv_f16_::operator=(float from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_float_rtor_qv_f16(from); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_::qv_f16_(const qv_int16_space::qv_int16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_f16(from); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_& qv_f16_space::qv_f16_::operator=(const qv_int16_space::qv_int16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_f16(from); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_::qv_f16_(const qv_int16U_space::qv_int16U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_f16(from); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_& qv_f16_space::qv_f16_::operator=(const qv_int16U_space::qv_int16U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_f16(from); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_::qv_f16_(const rkfloat_space::rkfloat_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_rtor_qv_f16(from); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_& qv_f16_space::qv_f16_::operator=(const rkfloat_space::rkfloat_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_rtor_qv_f16(from); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_::qv_f16_(const qv_int32v_space::qv_int32v_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_f16(from); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_& qv_f16_space::qv_f16_::operator=(const qv_int32v_space::qv_int32v_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_f16(from); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_::qv_f16_(const qv_int32Uv_space::qv_int32Uv_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_f16(from); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_& qv_f16_space::qv_f16_::operator=(const qv_int32Uv_space::qv_int32Uv_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_f16(from); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_::operator qv_vecNxf16_space::qv_vecNxf16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_vecNxf16(*this); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_::operator qv_vecN_2xf16_space::qv_vecN_2xf16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_vecN_2xf16(*this); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_::operator qv_int16_space::qv_int16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int16(*this); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_::operator qv_int16U_space::qv_int16U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int16U(*this); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_::operator rkfloat_space::rkfloat_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_rkfloat(*this); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_::operator qv_int32v_space::qv_int32v_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int32v(*this); }
+KASTARRI_ALWAYS_INLINE qv_f16_space::qv_f16_::operator qv_int32Uv_space::qv_int32Uv_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int32Uv(*this); }
 KASTARRI_ALWAYS_INLINE rkfloat_space::rkfloat_::rkfloat_(float from) { kastarri::replicate<32, 32, false>(_, from); }
 KASTARRI_ALWAYS_INLINE rkfloat_space::rkfloat_& rkfloat_space::rkfloat_::operator=(float from) { kastarri::replicate<32, 32, false>(_, from); return *this; }
-inline rkfloat_space::rkfloat_::rkfloat_(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_rkfloat(from); }
-inline rkfloat_space::rkfloat_& rkfloat_space::rkfloat_::operator=(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_rkfloat(from); }
-inline rkfloat_space::rkfloat_::rkfloat_(const qv_vecNxf16_space::qv_vecNxf16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_rkfloat(from); }
-inline rkfloat_space::rkfloat_& rkfloat_space::rkfloat_::operator=(const qv_vecNxf16_space::qv_vecNxf16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_rkfloat(from); }
-inline rkfloat_space::rkfloat_::rkfloat_(const qv_f16_space::qv_f16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_rkfloat(from); }
-inline rkfloat_space::rkfloat_& rkfloat_space::rkfloat_::operator=(const qv_f16_space::qv_f16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_rkfloat(from); }
-inline rkfloat_space::rkfloat_::operator qv_vecN_2xf32_space::qv_vecN_2xf32_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_rtor_qv_vecN_2xf32(*this); }
-inline rkfloat_space::rkfloat_::operator qv_vecNxf16_space::qv_vecNxf16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_rtor_qv_vecNxf16(*this); }
-inline rkfloat_space::rkfloat_::operator qv_f16_space::qv_f16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_rtor_qv_f16(*this); }
+KASTARRI_ALWAYS_INLINE rkfloat_space::rkfloat_::rkfloat_(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_rkfloat(from); }
+KASTARRI_ALWAYS_INLINE rkfloat_space::rkfloat_& rkfloat_space::rkfloat_::operator=(const qv_vecN_2xf32_space::qv_vecN_2xf32_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2xf32_rtor_rkfloat(from); }
+KASTARRI_ALWAYS_INLINE rkfloat_space::rkfloat_::rkfloat_(const qv_vecNxf16_space::qv_vecNxf16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_rkfloat(from); }
+KASTARRI_ALWAYS_INLINE rkfloat_space::rkfloat_& rkfloat_space::rkfloat_::operator=(const qv_vecNxf16_space::qv_vecNxf16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecNxf16_rtor_rkfloat(from); }
+KASTARRI_ALWAYS_INLINE rkfloat_space::rkfloat_::rkfloat_(const qv_f16_space::qv_f16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_rkfloat(from); }
+KASTARRI_ALWAYS_INLINE rkfloat_space::rkfloat_& rkfloat_space::rkfloat_::operator=(const qv_f16_space::qv_f16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_rkfloat(from); }
+KASTARRI_ALWAYS_INLINE rkfloat_space::rkfloat_::operator qv_vecN_2xf32_space::qv_vecN_2xf32_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_rtor_qv_vecN_2xf32(*this); }
+KASTARRI_ALWAYS_INLINE rkfloat_space::rkfloat_::operator qv_vecNxf16_space::qv_vecNxf16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_rtor_qv_vecNxf16(*this); }
+KASTARRI_ALWAYS_INLINE rkfloat_space::rkfloat_::operator qv_f16_space::qv_f16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_rkfloat_rtor_qv_f16(*this); }
 KASTARRI_ALWAYS_INLINE qv_int24_space::qv_int24_::qv_int24_(short from) { kastarri::replicate<24, 32, true>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_int24_space::qv_int24_& qv_int24_space::qv_int24_::operator=(short from) { kastarri::replicate<24, 32, true>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_int24_space::qv_int24_::qv_int24_(unsigned short from) { kastarri::replicate<24, 32, true>(_, from); }
@@ -4225,30 +4225,30 @@ KASTARRI_ALWAYS_INLINE qv_int32v_space::qv_int32v_::qv_int32v_(int from) { kasta
 KASTARRI_ALWAYS_INLINE qv_int32v_space::qv_int32v_& qv_int32v_space::qv_int32v_::operator=(int from) { kastarri::replicate<32, 32, true>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_int32v_space::qv_int32v_::qv_int32v_(unsigned int from) { kastarri::replicate<32, 32, true>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_int32v_space::qv_int32v_& qv_int32v_space::qv_int32v_::operator=(unsigned int from) { kastarri::replicate<32, 32, true>(_, from); return *this; }
-inline qv_int32v_space::qv_int32v_::qv_int32v_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_int32v(from); }
-inline qv_int32v_space::qv_int32v_& qv_int32v_space::qv_int32v_::operator=(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_int32v(from); }
-inline qv_int32v_space::qv_int32v_::qv_int32v_(const qv_int32Uv_space::qv_int32Uv_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_int32v(from); }
-inline qv_int32v_space::qv_int32v_& qv_int32v_space::qv_int32v_::operator=(const qv_int32Uv_space::qv_int32Uv_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_int32v(from); }
-inline qv_int32v_space::qv_int32v_::qv_int32v_(const qv_f16_space::qv_f16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int32v(from); }
-inline qv_int32v_space::qv_int32v_& qv_int32v_space::qv_int32v_::operator=(const qv_f16_space::qv_f16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int32v(from); }
-inline qv_int32v_space::qv_int32v_::operator qv_vecN_2x32v_space::qv_vecN_2x32v_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_vecN_2x32v(*this); }
-inline qv_int32v_space::qv_int32v_::operator qv_int32Uv_space::qv_int32Uv_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_int32Uv(*this); }
-inline qv_int32v_space::qv_int32v_::operator qv_int32pr_space::qv_int32pr_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_int32pr(*this); }
-inline qv_int32v_space::qv_int32v_::operator qv_f16_space::qv_f16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_f16(*this); }
+KASTARRI_ALWAYS_INLINE qv_int32v_space::qv_int32v_::qv_int32v_(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_int32v(from); }
+KASTARRI_ALWAYS_INLINE qv_int32v_space::qv_int32v_& qv_int32v_space::qv_int32v_::operator=(const qv_vecN_2x32v_space::qv_vecN_2x32v_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32v_rtor_qv_int32v(from); }
+KASTARRI_ALWAYS_INLINE qv_int32v_space::qv_int32v_::qv_int32v_(const qv_int32Uv_space::qv_int32Uv_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_int32v(from); }
+KASTARRI_ALWAYS_INLINE qv_int32v_space::qv_int32v_& qv_int32v_space::qv_int32v_::operator=(const qv_int32Uv_space::qv_int32Uv_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_int32v(from); }
+KASTARRI_ALWAYS_INLINE qv_int32v_space::qv_int32v_::qv_int32v_(const qv_f16_space::qv_f16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int32v(from); }
+KASTARRI_ALWAYS_INLINE qv_int32v_space::qv_int32v_& qv_int32v_space::qv_int32v_::operator=(const qv_f16_space::qv_f16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int32v(from); }
+KASTARRI_ALWAYS_INLINE qv_int32v_space::qv_int32v_::operator qv_vecN_2x32v_space::qv_vecN_2x32v_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_vecN_2x32v(*this); }
+KASTARRI_ALWAYS_INLINE qv_int32v_space::qv_int32v_::operator qv_int32Uv_space::qv_int32Uv_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_int32Uv(*this); }
+KASTARRI_ALWAYS_INLINE qv_int32v_space::qv_int32v_::operator qv_int32pr_space::qv_int32pr_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_int32pr(*this); }
+KASTARRI_ALWAYS_INLINE qv_int32v_space::qv_int32v_::operator qv_f16_space::qv_f16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_f16(*this); }
 KASTARRI_ALWAYS_INLINE qv_int32Uv_space::qv_int32Uv_::qv_int32Uv_(int from) { kastarri::replicate<32, 32, false>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_int32Uv_space::qv_int32Uv_& qv_int32Uv_space::qv_int32Uv_::operator=(int from) { kastarri::replicate<32, 32, false>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_int32Uv_space::qv_int32Uv_::qv_int32Uv_(unsigned int from) { kastarri::replicate<32, 32, false>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_int32Uv_space::qv_int32Uv_& qv_int32Uv_space::qv_int32Uv_::operator=(unsigned int from) { kastarri::replicate<32, 32, false>(_, from); return *this; }
-inline qv_int32Uv_space::qv_int32Uv_::qv_int32Uv_(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_int32Uv(from); }
-inline qv_int32Uv_space::qv_int32Uv_& qv_int32Uv_space::qv_int32Uv_::operator=(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_int32Uv(from); }
-inline qv_int32Uv_space::qv_int32Uv_::qv_int32Uv_(const qv_int32v_space::qv_int32v_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_int32Uv(from); }
-inline qv_int32Uv_space::qv_int32Uv_& qv_int32Uv_space::qv_int32Uv_::operator=(const qv_int32v_space::qv_int32v_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_int32Uv(from); }
-inline qv_int32Uv_space::qv_int32Uv_::qv_int32Uv_(const qv_f16_space::qv_f16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int32Uv(from); }
-inline qv_int32Uv_space::qv_int32Uv_& qv_int32Uv_space::qv_int32Uv_::operator=(const qv_f16_space::qv_f16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int32Uv(from); }
-inline qv_int32Uv_space::qv_int32Uv_::operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_vecN_2x32Uv(*this); }
-inline qv_int32Uv_space::qv_int32Uv_::operator qv_int32v_space::qv_int32v_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_int32v(*this); }
-inline qv_int32Uv_space::qv_int32Uv_::operator qv_int32pr_space::qv_int32pr_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_int32pr(*this); }
-inline qv_int32Uv_space::qv_int32Uv_::operator qv_f16_space::qv_f16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_f16(*this); }
+KASTARRI_ALWAYS_INLINE qv_int32Uv_space::qv_int32Uv_::qv_int32Uv_(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_int32Uv(from); }
+KASTARRI_ALWAYS_INLINE qv_int32Uv_space::qv_int32Uv_& qv_int32Uv_space::qv_int32Uv_::operator=(const qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_2x32Uv_rtor_qv_int32Uv(from); }
+KASTARRI_ALWAYS_INLINE qv_int32Uv_space::qv_int32Uv_::qv_int32Uv_(const qv_int32v_space::qv_int32v_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_int32Uv(from); }
+KASTARRI_ALWAYS_INLINE qv_int32Uv_space::qv_int32Uv_& qv_int32Uv_space::qv_int32Uv_::operator=(const qv_int32v_space::qv_int32v_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_int32Uv(from); }
+KASTARRI_ALWAYS_INLINE qv_int32Uv_space::qv_int32Uv_::qv_int32Uv_(const qv_f16_space::qv_f16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int32Uv(from); }
+KASTARRI_ALWAYS_INLINE qv_int32Uv_space::qv_int32Uv_& qv_int32Uv_space::qv_int32Uv_::operator=(const qv_f16_space::qv_f16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_f16_rtor_qv_int32Uv(from); }
+KASTARRI_ALWAYS_INLINE qv_int32Uv_space::qv_int32Uv_::operator qv_vecN_2x32Uv_space::qv_vecN_2x32Uv_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_vecN_2x32Uv(*this); }
+KASTARRI_ALWAYS_INLINE qv_int32Uv_space::qv_int32Uv_::operator qv_int32v_space::qv_int32v_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_int32v(*this); }
+KASTARRI_ALWAYS_INLINE qv_int32Uv_space::qv_int32Uv_::operator qv_int32pr_space::qv_int32pr_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_int32pr(*this); }
+KASTARRI_ALWAYS_INLINE qv_int32Uv_space::qv_int32Uv_::operator qv_f16_space::qv_f16_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_f16(*this); }
 KASTARRI_ALWAYS_INLINE qv_int32pr_space::qv_int32pr_::qv_int32pr_(signed char from) { kastarri::replicate<32, 32, false>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_int32pr_space::qv_int32pr_& qv_int32pr_space::qv_int32pr_::operator=(signed char from) { kastarri::replicate<32, 32, false>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_int32pr_space::qv_int32pr_::qv_int32pr_(unsigned char from) { kastarri::replicate<32, 32, false>(_, from); }
@@ -4261,33 +4261,33 @@ KASTARRI_ALWAYS_INLINE qv_int32pr_space::qv_int32pr_::qv_int32pr_(int from) { ka
 KASTARRI_ALWAYS_INLINE qv_int32pr_space::qv_int32pr_& qv_int32pr_space::qv_int32pr_::operator=(int from) { kastarri::replicate<32, 32, false>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_int32pr_space::qv_int32pr_::qv_int32pr_(unsigned int from) { kastarri::replicate<32, 32, false>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_int32pr_space::qv_int32pr_& qv_int32pr_space::qv_int32pr_::operator=(unsigned int from) { kastarri::replicate<32, 32, false>(_, from); return *this; }
-inline qv_int32pr_space::qv_int32pr_::qv_int32pr_(const qv_int8_space::qv_int8_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_int32pr(from); }
-inline qv_int32pr_space::qv_int32pr_& qv_int32pr_space::qv_int32pr_::operator=(const qv_int8_space::qv_int8_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_int32pr(from); }
-inline qv_int32pr_space::qv_int32pr_::qv_int32pr_(const qv_int8U_space::qv_int8U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int32pr(from); }
-inline qv_int32pr_space::qv_int32pr_& qv_int32pr_space::qv_int32pr_::operator=(const qv_int8U_space::qv_int8U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int32pr(from); }
-inline qv_int32pr_space::qv_int32pr_::qv_int32pr_(const qv_int16_space::qv_int16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_int32pr(from); }
-inline qv_int32pr_space::qv_int32pr_& qv_int32pr_space::qv_int32pr_::operator=(const qv_int16_space::qv_int16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_int32pr(from); }
-inline qv_int32pr_space::qv_int32pr_::qv_int32pr_(const qv_int16U_space::qv_int16U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_int32pr(from); }
-inline qv_int32pr_space::qv_int32pr_& qv_int32pr_space::qv_int32pr_::operator=(const qv_int16U_space::qv_int16U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_int32pr(from); }
-inline qv_int32pr_space::qv_int32pr_::qv_int32pr_(const qv_int32v_space::qv_int32v_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_int32pr(from); }
-inline qv_int32pr_space::qv_int32pr_& qv_int32pr_space::qv_int32pr_::operator=(const qv_int32v_space::qv_int32v_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_int32pr(from); }
-inline qv_int32pr_space::qv_int32pr_::qv_int32pr_(const qv_int32Uv_space::qv_int32Uv_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_int32pr(from); }
-inline qv_int32pr_space::qv_int32pr_& qv_int32pr_space::qv_int32pr_::operator=(const qv_int32Uv_space::qv_int32Uv_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_int32pr(from); }
+KASTARRI_ALWAYS_INLINE qv_int32pr_space::qv_int32pr_::qv_int32pr_(const qv_int8_space::qv_int8_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_int32pr(from); }
+KASTARRI_ALWAYS_INLINE qv_int32pr_space::qv_int32pr_& qv_int32pr_space::qv_int32pr_::operator=(const qv_int8_space::qv_int8_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8_rtor_qv_int32pr(from); }
+KASTARRI_ALWAYS_INLINE qv_int32pr_space::qv_int32pr_::qv_int32pr_(const qv_int8U_space::qv_int8U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int32pr(from); }
+KASTARRI_ALWAYS_INLINE qv_int32pr_space::qv_int32pr_& qv_int32pr_space::qv_int32pr_::operator=(const qv_int8U_space::qv_int8U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int8U_rtor_qv_int32pr(from); }
+KASTARRI_ALWAYS_INLINE qv_int32pr_space::qv_int32pr_::qv_int32pr_(const qv_int16_space::qv_int16_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_int32pr(from); }
+KASTARRI_ALWAYS_INLINE qv_int32pr_space::qv_int32pr_& qv_int32pr_space::qv_int32pr_::operator=(const qv_int16_space::qv_int16_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16_rtor_qv_int32pr(from); }
+KASTARRI_ALWAYS_INLINE qv_int32pr_space::qv_int32pr_::qv_int32pr_(const qv_int16U_space::qv_int16U_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_int32pr(from); }
+KASTARRI_ALWAYS_INLINE qv_int32pr_space::qv_int32pr_& qv_int32pr_space::qv_int32pr_::operator=(const qv_int16U_space::qv_int16U_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int16U_rtor_qv_int32pr(from); }
+KASTARRI_ALWAYS_INLINE qv_int32pr_space::qv_int32pr_::qv_int32pr_(const qv_int32v_space::qv_int32v_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_int32pr(from); }
+KASTARRI_ALWAYS_INLINE qv_int32pr_space::qv_int32pr_& qv_int32pr_space::qv_int32pr_::operator=(const qv_int32v_space::qv_int32v_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32v_rtor_qv_int32pr(from); }
+KASTARRI_ALWAYS_INLINE qv_int32pr_space::qv_int32pr_::qv_int32pr_(const qv_int32Uv_space::qv_int32Uv_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_int32pr(from); }
+KASTARRI_ALWAYS_INLINE qv_int32pr_space::qv_int32pr_& qv_int32pr_space::qv_int32pr_::operator=(const qv_int32Uv_space::qv_int32Uv_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int32Uv_rtor_qv_int32pr(from); }
 KASTARRI_ALWAYS_INLINE qv_int48_space::qv_int48_::qv_int48_(int from) { kastarri::replicate<48, 64, true>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_int48_space::qv_int48_& qv_int48_space::qv_int48_::operator=(int from) { kastarri::replicate<48, 64, true>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_int48_space::qv_int48_::qv_int48_(unsigned int from) { kastarri::replicate<48, 64, true>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_int48_space::qv_int48_& qv_int48_space::qv_int48_::operator=(unsigned int from) { kastarri::replicate<48, 64, true>(_, from); return *this; }
 KASTARRI_ALWAYS_INLINE qv_int48_space::qv_int48_::qv_int48_(long long from) { kastarri::replicate<48, 64, true>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_int48_space::qv_int48_& qv_int48_space::qv_int48_::operator=(long long from) { kastarri::replicate<48, 64, true>(_, from); return *this; }
-inline qv_int48_space::qv_int48_::operator qv_int16U_space::qv_int16U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int48_rtor_qv_int16U(*this); }
+KASTARRI_ALWAYS_INLINE qv_int48_space::qv_int48_::operator qv_int16U_space::qv_int16U_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int48_rtor_qv_int16U(*this); }
 KASTARRI_ALWAYS_INLINE qv_int64_space::qv_int64_::qv_int64_(long long from) { kastarri::replicate<64, 64, true>(_, from); }
 KASTARRI_ALWAYS_INLINE qv_int64_space::qv_int64_& qv_int64_space::qv_int64_::operator=(long long from) { kastarri::replicate<64, 64, true>(_, from); return *this; }
-inline qv_int64_space::qv_int64_::qv_int64_(const qv_vecN_4x64_space::qv_vecN_4x64_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_rtor_qv_int64(from); }
-inline qv_int64_space::qv_int64_& qv_int64_space::qv_int64_::operator=(const qv_vecN_4x64_space::qv_vecN_4x64_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_rtor_qv_int64(from); }
-inline qv_int64_space::qv_int64_::operator qv_vecN_4x64_space::qv_vecN_4x64_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_rtor_qv_vecN_4x64(*this); }
-inline qv_int128_space::qv_int128_::qv_int128_(const qv_vecN_8x128_space::qv_vecN_8x128_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_rtor_qv_int128(from); }
-inline qv_int128_space::qv_int128_& qv_int128_space::qv_int128_::operator=(const qv_vecN_8x128_space::qv_vecN_8x128_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_rtor_qv_int128(from); }
-inline qv_int256_space::qv_int256_::qv_int256_(const qv_vecN_16x256_space::qv_vecN_16x256_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_rtor_qv_int256(from); }
-inline qv_int256_space::qv_int256_& qv_int256_space::qv_int256_::operator=(const qv_vecN_16x256_space::qv_vecN_16x256_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_rtor_qv_int256(from); }
+KASTARRI_ALWAYS_INLINE qv_int64_space::qv_int64_::qv_int64_(const qv_vecN_4x64_space::qv_vecN_4x64_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_rtor_qv_int64(from); }
+KASTARRI_ALWAYS_INLINE qv_int64_space::qv_int64_& qv_int64_space::qv_int64_::operator=(const qv_vecN_4x64_space::qv_vecN_4x64_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_4x64_rtor_qv_int64(from); }
+KASTARRI_ALWAYS_INLINE qv_int64_space::qv_int64_::operator qv_vecN_4x64_space::qv_vecN_4x64_() const { return cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_int64_rtor_qv_vecN_4x64(*this); }
+KASTARRI_ALWAYS_INLINE qv_int128_space::qv_int128_::qv_int128_(const qv_vecN_8x128_space::qv_vecN_8x128_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_rtor_qv_int128(from); }
+KASTARRI_ALWAYS_INLINE qv_int128_space::qv_int128_& qv_int128_space::qv_int128_::operator=(const qv_vecN_8x128_space::qv_vecN_8x128_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_8x128_rtor_qv_int128(from); }
+KASTARRI_ALWAYS_INLINE qv_int256_space::qv_int256_::qv_int256_(const qv_vecN_16x256_space::qv_vecN_16x256_& from) { *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_rtor_qv_int256(from); }
+KASTARRI_ALWAYS_INLINE qv_int256_space::qv_int256_& qv_int256_space::qv_int256_::operator=(const qv_vecN_16x256_space::qv_vecN_16x256_& from) { return *this = cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_zra32_qv_vecN_16x256_rtor_qv_int256(from); }
 
 #endif

@@ -13,6 +13,9 @@
 /// Lane 0 comes first, as everywhere. A lane is the smallest type of C++ that holds it: 24 bits are an std::int32_t, 48
 /// bits an std::int64_t, a bit of a predicate a bool, half and single floats a float. Lanes of 128 and 256 bits, which
 /// are no numbers, are arrays of words.
+///
+/// In a program whose parts are compiled for different instruction sets these functions, like those of print.h, are for
+/// parts that every processor runs: the linker takes one copy of each, from any part.
 #ifndef KASTARRI_LANES_H
 #define KASTARRI_LANES_H
 
@@ -22,6 +25,7 @@
 #include <cassert>
 #include <cstddef>
 #include <cstdint>
+#include <cstdlib>
 #include <cstring>
 #include <initializer_list>
 #include <iterator>
@@ -134,7 +138,7 @@ struct Numbers : Bytes<R, kind, bits, count> {
   }
   static void set_pattern(R& r, int i, Pattern p) {
     const Pattern whole = extended<bits, kind == 'i'>(p);
-    std::memcpy(at(r, i), &whole, sizeof(R) / count);
+    std::memcpy(at(r, i), &whole, sizeof(R) / static_cast<std::size_t>(count));
   }
   static Lane get(const R& r, int i) { return Meaning::of(pattern(r, i)); }
   static void set(R& r, int i, Lane value) { set_pattern(r, i, Meaning::pattern(value)); }
@@ -232,13 +236,18 @@ std::array<Lane<R>, static_cast<std::size_t>(lane_count<R>())> lanes(const R& r)
   return all;
 }
 
-/// The register whose lanes are the values of an array or a container, and 0 behind them.
+/// The register whose lanes are the values of an array or a container, and 0 behind them. The program ends where there
+/// are more values than lanes.
 template <class R, class Values>
 R from_lanes(const Values& values) {
   R r;
   std::memset(static_cast<void*>(&r), 0, sizeof r);
   int i = 0;
-  for (auto at = std::begin(values); at != std::end(values); ++at) set_lane(r, i++, static_cast<Lane<R>>(*at));
+  for (auto at = std::begin(values); at != std::end(values); ++at) {
+    assert(i < lane_count<R>() && "a register has fewer lanes");
+    if (i == lane_count<R>()) std::abort();
+    set_lane(r, i++, static_cast<Lane<R>>(*at));
+  }
   return r;
 }
 template <class R>

@@ -221,10 +221,10 @@ typedef struct cstub_Km_ZNB_Orbis_R5_64k_states {
   unsigned EXPSTATE;  ///< present value of the exported state
 } cstub_Km_ZNB_Orbis_R5_64k_states_t;
 
-/// Used by the general multiplies of wide vectors.
+/// What a program may register for the general multiplies of wide vectors.
 typedef void (*cstub_mulpp_inplace)(unsigned*, const unsigned*);
 
-/// Functions that the library may call.
+/// Functions of the program, kept for it: this library multiplies by itself and calls none.
 typedef struct cstub_callbacks {
   cstub_mulpp_inplace mulpp_inplace;
 } cstub_callbacks_t;

@@ -7,6 +7,7 @@
 #include <type_traits>
 
 #include "float/formats.h"
+#include "frame/arithmetic.h"
 
 namespace {
 
@@ -29,11 +30,6 @@ constexpr T sign_mask(T x) {
 template <class T>
 constexpr T mask_below(T x, T y) {
   return sign_mask(static_cast<T>(x - y));
-}
-
-template <class T>
-constexpr T chosen(T mask, T where_set, T elsewhere) {
-  return (mask & where_set) | (~mask & elsewhere);
 }
 
 constexpr word single_sign = Single::sign;

@@ -42,8 +42,7 @@ template <class From, class To, class Out, class Units>
     return convert_lane<From, To>(env, lane, scale);
   };
   if constexpr (From::count == 1 || To::count == 1) {
-    lanes<To::count>(
-        Write<To>(out), [](auto same) { return same; }, Same(exact(Read<From>(in)[0])));
+    lanes<To::count>(Write<To>(out), SAME, Same(exact(Read<From>(in)[0])));
   } else if constexpr (!is_float<To>) {
     store_truncated<To, From>(out, scale, exact, in);
   } else {

@@ -117,12 +117,11 @@ constexpr word all_of_rest = (word{1} << rest_bits) - 1, half_of_rest = word{1} 
 // The ways to round the bits of a number, as an integer: a carry out of the fraction is right in the exponent. Each has
 // two forms, for bits that are dropped from a word and for bits that are beside it:
 //
-//   increment<Count>(bits)       is added before the lowest Count bits are dropped. To nearest, of 2 bits beside an
-//   even
-//                                number, 1: binary 10.10, a tie, becomes 10.11 and is cut to 10; 10.11 becomes 11.00.
-//   greatest_down(kept, signs)   the greatest rest, of rest_bits bits, that is dropped without adding 1 to what is
-//   kept:
-//                                to nearest a half, or the number below it beside an odd number.
+//   increment<Count>(bits) is added before the lowest Count bits are dropped. To nearest, of 2 bits beside an even
+//   number, it is 1: binary 10.10, a tie, becomes 10.11 and is cut to 10; 10.11 becomes 11.00.
+//
+//   greatest_down(kept, signs) is the greatest rest, of rest_bits bits, that is dropped without adding 1 to what is
+//   kept: to nearest a half, or the number below it beside an odd number.
 //
 // (To nearest with ties away rounds to integers alone, which take the second form.)
 struct ToNearest {

@@ -1,4 +1,6 @@
 // Forms of semantic functions of the family (frame/stamp.h tells how they are used).
+#ifndef KASTARRI_FLOAT_KERNELS_H
+#define KASTARRI_FLOAT_KERNELS_H
 
 // Lane i of the result from lane i of the operands, with flags: operation, layout.
 #define KERNEL_float_a(OP, RULE, L)                                 \
@@ -40,3 +42,5 @@
   static inline void KASTARRI_SEMANTIC(OP)(const Units* a, Out* r) { \
     convert_register<FROM, TO>(r, a, 0);                             \
   }
+
+#endif

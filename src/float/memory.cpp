@@ -5,11 +5,12 @@
 
 namespace {
 
-constexpr auto SAME = [](auto lane) { return lane; };
-
+// Memory is loaded before a lane of the register is stored, which may lie in part of it, and the other way round.
 template <class Memory, class Unit>
 inline void load_halves(const Memory* from, Unit* r) {
-  convert_register<f16x16, f32x16>(r, from, 0);
+  alignas(64) std::uint16_t halves[16];
+  std::memcpy(halves, from, sizeof halves);
+  convert_register<f16x16, f32x16>(r, halves, 0);
 }
 
 // A lane that is not enabled is read as a zero half: no flag, and 0 in the register.
@@ -30,6 +31,13 @@ inline void load_halves(const Memory* from, UnitsUnder<Unit, PredicateUnit, true
   template <class Memory, class Out>                                    \
   static inline void KASTARRI_SEMANTIC(OP)(const Memory* from, Out r) { \
     load_halves(from, r);                                               \
+  }
+#define KERNEL_store_halves(OP, SINGLES, HALVES)                         \
+  template <class Units, class Memory>                                   \
+  static inline void KASTARRI_SEMANTIC(OP)(const Units* v, Memory* to) { \
+    alignas(64) Units all[64 / sizeof(Units)];                           \
+    copy_registers<64>(v, all);                                          \
+    convert_register<SINGLES, HALVES>(to, all, 0);                       \
   }
 #define KERNEL_store_halves_where(OP, SINGLES, HALVES)                                           \
   template <class Units, class PredicateUnit, class Memory>                                      \

@@ -29,7 +29,7 @@ using ProductSignificand = std::conditional_t<F::bits == 16, word, std::uint64_t
 
 inline int highest_bit(word x) { return 31 ^ __builtin_clz(x); }
 
-// x shifted right by s > 0, the last bit sticky: 1 when any bit was lost.
+// x shifted right by s >= 0, the last bit sticky: 1 when any bit was lost.
 template <class S>
 inline S shift_right_sticky(S x, int s) {
   if (s >= static_cast<int>(8 * sizeof(S))) return x != 0;

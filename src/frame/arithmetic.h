@@ -1,4 +1,4 @@
-// Integer arithmetic that the families share: bounds of lanes and saturation.
+// Integer arithmetic that the families share: bounds of lanes, saturation, choice.
 #ifndef KASTARRI_FRAME_ARITHMETIC_H
 #define KASTARRI_FRAME_ARITHMETIC_H
 
@@ -26,6 +26,12 @@ constexpr Lane saturate(V v) {
 template <class T>
 constexpr T sign_fill(T lane) {
   return static_cast<T>(lane < 0 ? -1 : 0);
+}
+
+// Bit by bit: one number where the mask has a 1, another elsewhere.
+template <class T>
+constexpr T chosen(T mask, T where_set, T elsewhere) {
+  return (mask & where_set) | (~mask & elsewhere);
 }
 
 }  // namespace

@@ -31,9 +31,6 @@ using host_layout = typename host_layout_of<H>::type;
 template <class L>
 constexpr bool is_predicate = std::is_same_v<typename L::number, predicate_bit>;
 
-// A value goes over as it is: wider lanes take its extension, narrower ones its low bits.
-constexpr auto same_value = [](auto value) { return value; };
-
 // Every lane the same value. A lane of two words is written as words: a 64-bit scalar would reach the
 // vector registers through memory, in halves, and wait there.
 template <class L, class V>
@@ -48,7 +45,7 @@ inline void replicate(const Write<L>& to, V value) {
       words[2 * i + 1] = high;
     }
   } else {
-    lanes<L::count>(to, same_value, Same(value));
+    lanes<L::count>(to, SAME, Same(value));
   }
 }
 
@@ -72,12 +69,12 @@ inline void extend_lanes(const void* from, void* to) {
     std::memcpy(&narrow, from, sizeof narrow);
     store_register(to, 0, __builtin_convertvector(narrow, Vector<Wide>));
   } else {
-    lanes<To::count>(Write<To>(to), same_value, Read<From>(from));
+    lanes<To::count>(Write<To>(to), SAME, ReadWhole<From>(from));
   }
 }
 
-template <class From, class To, class Rule>
-inline void convert_lanes(const Read<From>& from, const Write<To>& to, Rule rule) {
+template <class From, class To, template <class> class Operand, class Rule>
+inline void convert_lanes(const Operand<From>& from, const Write<To>& to, Rule rule) {
   static_assert(std::is_same_v<typename From::number, typename To::number> || From::bits == 1 || To::bits == 1,
                 "numbers of different kinds convert by value");
   if constexpr (From::count == To::count) {
@@ -110,7 +107,7 @@ inline void convert(const FromUnit* from, ToUnit* to) {
   } else if constexpr (From::count == To::count) {
     extend_lanes<From, To>(from, to);
   } else {
-    convert_lanes(Read<From>(from), Write<To>(to), same_value);
+    convert_lanes(Read<From>(from), Write<To>(to), SAME);
   }
 }
 
@@ -139,7 +136,7 @@ inline void convert_to_memory(const FromUnit* from, Memory* to) {
   using T = typename To::container;
   constexpr bool image = From::count > 1 && From::count == To::count && (From::bits == 24 || From::bits == 48);
   if constexpr (To::bits < From::bits && std::is_signed_v<T> && !image) {
-    convert_lanes(Read<From>(from), Write<To>(to), [](auto lane) { return saturate<T>(lane); });
+    convert_lanes(ReadWhole<From>(from), Write<To>(to), [](auto lane) { return saturate<T>(lane); });
   } else {
     convert<From, To>(from, to);
   }

@@ -2,6 +2,8 @@
 #ifndef KASTARRI_FRAME_LANES_H
 #define KASTARRI_FRAME_LANES_H
 
+#include <cstring>
+
 #include "frame/layouts.h"
 #include "frame/predicate.h"
 
@@ -26,6 +28,19 @@ class Read {
 
  private:
   const in_memory<typename L::container>* lanes_;
+};
+
+// The same of an operand that what is stored meanwhile may lie in part of, as memory may of a register: all lanes are
+// loaded before.
+template <class L>
+class ReadWhole {
+ public:
+  explicit ReadWhole(const void* image) { std::memcpy(image_, image, sizeof image_); }
+
+  auto operator[](int i) const { return Read<L>(image_)[i]; }
+
+ private:
+  alignas(64) unsigned char image_[L::count * sizeof(typename L::container)];
 };
 
 // One value that stands for a lane of every index: an immediate, a replicated element.
@@ -132,6 +147,9 @@ template <class L, class Unit, class PredicateUnit, bool Clear>
 inline Predicated<L, Clear> result(UnitsUnder<Unit, PredicateUnit, Clear> out) {
   return Predicated<L, Clear>(out.units, out.predicate);
 }
+
+// The rule of what goes over as it is: extended by the layout it is read from, cut to the one it is written to.
+constexpr auto SAME = [](auto lane) { return lane; };
 
 // result lane i = rule(operand lanes i ...), for i = 0 .. Count - 1.
 template <int Count, class Out, class Rule, class... Operands>

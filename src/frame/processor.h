@@ -16,8 +16,7 @@ namespace {
 
 [[maybe_unused]] bool runs_avx2() {
   __builtin_cpu_init();
-  // Every processor with AVX2 and FMA converts half precision (F16C) as well.
-  return __builtin_cpu_supports("avx2") && __builtin_cpu_supports("fma");
+  return __builtin_cpu_supports("avx2") && __builtin_cpu_supports("fma") && __builtin_cpu_supports("f16c");
 }
 
 [[maybe_unused]] bool runs_sse2() { return true; }

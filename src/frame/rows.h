@@ -3,7 +3,7 @@
 // mean something to it; rows_end.h closes the list.
 //
 //   DOC("...")                        the rule in words, for the rows that follow
-//   KERNEL(OP, form, layout, rule)    the semantic function of OP (stamp.h)
+//   KERNEL(OP, form, columns ...)     the semantic function of OP; its form says what the columns are (stamp.h)
 //   ROW(OP, shape, columns ...)       an instruction of the vector unit
 //   PROTO(name, shape, columns ...)   a move or conversion of the vector unit's registers
 //   SCALAR(package, name, result, (parameters), expression)   an instruction of the scalar core

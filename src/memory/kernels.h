@@ -8,8 +8,6 @@
 
 namespace {
 
-// Bits go over as they are: extended by the layout they are read from, cut to the one they are written to.
-constexpr auto SAME = [](auto lane) { return lane; };
 constexpr auto SATURATE8 = [](std::int16_t lane) { return saturate<std::int8_t>(lane); };
 // A lane fits if its upper 17 bits are alike: one comparison, where SSE2 has no 32-bit minimum and maximum.
 constexpr auto SATURATE16 = [](std::int32_t lane) {
@@ -26,7 +24,14 @@ constexpr auto SATURATE16 = [](std::int32_t lane) {
     if constexpr (std::is_pointer_v<Out>)                           \
       copy_registers<64>(a, r);                                     \
     else                                                            \
-      lanes<L::count>(result<L>(r), SAME, Read<L>(a));              \
+      lanes<L::count>(result<L>(r), SAME, ReadWhole<L>(a));         \
+  }
+
+// Lanes of a vector cut to narrower ones.
+#define KERNEL_cut(OP, R, A)                                             \
+  template <class Units, class Memory>                                   \
+  static inline void KASTARRI_SEMANTIC(OP)(const Units* v, Memory* to) { \
+    lanes<R::count>(Write<R>(to), SAME, ReadWhole<A>(v));                \
   }
 
 // A predicated store: layout in memory, rule, layout in the register.

@@ -23,10 +23,12 @@ inline void store_saturated(const void* vector, void* to) {
   // Packed within 128 bits: the quarters are put back in order.
   _mm256_storeu_si256(static_cast<__m256i*>(to), _mm256_permute4x64_epi64(packed, 0xD8));
 #else
-  const auto* quarter = static_cast<const __m128i*>(vector);
-  for (int k = 0; k < 2; ++k)
-    _mm_storeu_si128(static_cast<__m128i*>(to) + k,
-                     clamped(_mm_loadu_si128(quarter + 2 * k), _mm_loadu_si128(quarter + 2 * k + 1), Lane{}));
+  const auto clamped_half = [quarter = static_cast<const __m128i*>(vector)](int k) {
+    return clamped(_mm_loadu_si128(quarter + 2 * k), _mm_loadu_si128(quarter + 2 * k + 1), Lane{});
+  };
+  const __m128i low = clamped_half(0), high = clamped_half(1);  // both before a store, which may lie in the vector
+  _mm_storeu_si128(static_cast<__m128i*>(to), low);
+  _mm_storeu_si128(static_cast<__m128i*>(to) + 1, high);
 #endif
 }
 
@@ -41,7 +43,7 @@ inline void store_saturated(const void* vector, void* to) {
     if constexpr (std::is_pointer_v<Out>)                           \
       extend_lanes<A, R>(a, r);                                     \
     else                                                            \
-      lanes<R::count>(result<R>(r), SAME, Read<A>(a));              \
+      lanes<R::count>(result<R>(r), SAME, ReadWhole<A>(a));         \
   }
 
 // Lanes of a vector saturated to lanes L of half their width.

@@ -5,6 +5,7 @@
 
 #include <limits>
 
+#include "frame/arithmetic.h"
 #include "frame/layouts.h"
 #include "frame/registers.h"
 #include "multiply/register_products.h"
@@ -12,10 +13,6 @@
 #include "multiply/scaled.h"
 
 namespace {
-
-inline Integers either(Integers where, Integers there, Integers elsewhere) {
-  return (there & where) | (elsewhere & ~where);
-}
 
 // The lower halves of words, sign-extended.
 inline Integers lower_halves_extended(Integers v) {
@@ -29,7 +26,7 @@ inline Integers bound(Integers high) { return (high >> 31) ^ std::numeric_limits
 // By n, a word that all lanes share or a vector of words. With t = x >> (n - 1), x / 2^n rounded half up is (t + 1) >>
 // 1, and that is t - (t >> 1), which does not overflow.
 struct Rounded {
-  [[maybe_unused]] static constexpr double added = 0.5;
+  static constexpr bool half_up = true;
   template <class N>
   static Integers shifted(Integers x, N n) {
     const Integers twice = shifted_right<std::int32_t>(x, counts_of(n - 1));
@@ -37,7 +34,7 @@ struct Rounded {
   }
 };
 struct Truncated {
-  [[maybe_unused]] static constexpr double added = 0;
+  static constexpr bool half_up = false;
   template <class N>
   static Integers shifted(Integers x, N n) {
     return shifted_right<std::int32_t>(x, counts_of(n));
@@ -73,7 +70,7 @@ struct EveryOther24 {
 // which is 2^(n-1) or for n = 0 nothing, is added in the 8 bits of room above the sign-extended lane.
 template <class Rounding>
 inline Integers shifted24(Words lanes, word n) {
-  if constexpr (Rounding::added == 0) return Rounding::shifted(in_bits<Integers>(lanes << 8), n + 8);
+  if constexpr (!Rounding::half_up) return Rounding::shifted(in_bits<Integers>(lanes << 8), n + 8);
   const Integers half = Integers{} + static_cast<std::int32_t>(word{1} << n >> 1);
   return Truncated::shifted(in_bits<Integers>(extended_from_24(lanes)) + half, n);
 }
@@ -82,7 +79,7 @@ inline Integers shifted24(Words lanes, Words n) {
 #if defined __AVX2__
   return Rounding::shifted(in_bits<Integers>(lanes << 8), n + 8);
 #else
-  return in_bits<Integers>(four_scaled<Rounding>(in_bits<Register>(lanes << 8), in_bits<Register>(n + 8)));
+  return in_bits<Integers>(four_scaled<Rounding>(in_bits<Register>(extended_from_24(lanes)), in_bits<Register>(n)));
 #endif
 }
 
@@ -106,7 +103,7 @@ struct Windows {
   static Words from_16(Words lanes) { return in_bits<Words>(in_bits<LongWords>(lanes) >> 16); }
 
   Integers lane_fits_low() const { return lower_halves_extended(high) == high; }
-  Integers low_clamped() const { return either(lane_fits_low(), low, bound(high)); }
+  Integers low_clamped() const { return chosen(lane_fits_low(), low, bound(high)); }
 };
 
 template <class Rounding>
@@ -169,7 +166,7 @@ template <class Rounding, int Bits>
 inline __m512i eight_shifted(LongWords lanes, __m512i n) {
   const auto right = [n](__m512i v) { return _mm512_maskz_srav_epi64(0xFF, v, n); };
   const auto x = in_bits<Register>(Bits == 48 ? extended_from_48(lanes) : lanes);
-  if constexpr (Rounding::added == 0)
+  if constexpr (!Rounding::half_up)
     return right(x);
   else if constexpr (Bits == 48)
     return _mm512_maskz_srai_epi64(0xFF, right(x + x) + 1, 1);
@@ -218,10 +215,10 @@ inline Integers shifted_pairs(Words low_words, Words high_words, N n) {
   const Integers low = in_bits<Integers>(shifted_right<word>(low_words, counts_of(n)) |
                                          shifted_left<word>(in_bits<Words>(high), counts_of(32 - n)));
   const Integers fits = low >> 31 == shifted_right<std::int32_t>(high, counts_of(n));
-  if constexpr (Rounding::added == 0) return either(fits, low, bound(high));
+  if constexpr (!Rounding::half_up) return chosen(fits, low, bound(high));
   const Words raised = in_bits<Words>(low) + (shifted_right<word>(low_words, counts_of(n - 1)) & 1);
   const Integers wraps = low > in_bits<Integers>(raised);
-  return either(fits, in_bits<Integers>(raised + in_bits<Words>(wraps)), bound(high));
+  return chosen(fits, in_bits<Integers>(raised + in_bits<Words>(wraps)), bound(high));
 }
 
 template <class Rounding, class Lanes, class N>

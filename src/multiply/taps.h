@@ -259,7 +259,7 @@ template <class R, class Kind, class L, class C, class... Operands>
   sum_of_held<R, Kind, L, C>(acc, words, r, Held<Operands>(operands)...);
 }
 
-// Operands vectors of layout L, then the words of coefficients.
+// What a call multiplies: as many vectors of layout L as there are operands, then the words of coefficients.
 template <class R, class Kind, class L, class C, class Operands,
           class Coefficients = std::make_index_sequence<C::words>>
 struct Taps;

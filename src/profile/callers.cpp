@@ -6,12 +6,12 @@
 #include <dlfcn.h>
 #include <link.h>
 #include <pthread.h>
-#include <signal.h>
 
 #include <cstdint>
 #include <cstring>
 
 #include "files.h"
+#include "signals.h"
 
 namespace profile {
 namespace {
@@ -77,11 +77,8 @@ Site* find(std::uint32_t& chain, unsigned intrinsic, std::uint64_t address) {
   return nullptr;
 }
 
-// Signals wait: a handler that calls an intrinsic from a new site would wait for the lock for ever.
 Site* add(std::uint32_t& chain, unsigned intrinsic, std::uint64_t address, const link_map* loaded) {
-  sigset_t all, before;
-  sigfillset(&all);
-  pthread_sigmask(SIG_BLOCK, &all, &before);
+  const SignalsWait signals_wait;
   pthread_mutex_lock(&lock);
   Site* site = find(chain, intrinsic, address);
   if (!site && table->sites < max_sites) {
@@ -90,7 +87,6 @@ Site* add(std::uint32_t& chain, unsigned intrinsic, std::uint64_t address, const
     __atomic_store_n(&chain, table->sites++, __ATOMIC_RELEASE);
   }
   pthread_mutex_unlock(&lock);
-  pthread_sigmask(SIG_SETMASK, &before, nullptr);
   return site;
 }
 

@@ -12,6 +12,7 @@
 
 #include "callers.h"
 #include "files.h"
+#include "signals.h"
 
 namespace {
 
@@ -106,6 +107,7 @@ Counters* new_counters() {
 void give_back(void* counters) {
   kastarri_profile_counters = nullptr;
   if (counters == &uncounted) return;
+  const profile::SignalsWait signals_wait;
   pthread_mutex_lock(&lock);
   static_cast<Counters*>(counters)->next_free = free_counters;
   free_counters = static_cast<Counters*>(counters);
@@ -145,6 +147,8 @@ void set_up() {
 
 void kastarri_profile_begin_thread() {
   const int program_errno = errno;
+  const profile::SignalsWait signals_wait;
+  if (kastarri_profile_counters) return;  // a handler's first call came before
   find_targets();
   pthread_once(&once, set_up);
 

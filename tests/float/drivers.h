@@ -12,10 +12,10 @@
 #include <string>
 
 #include "float/cases.h"
-#include "float/host_state.h"
 #include "float/model.h"
 #include "kastarri/float.h"
 #include "support/drivers.h"
+#include "support/host_state.h"
 
 namespace testing_support {
 

@@ -111,9 +111,9 @@ void check_rounding(const std::string& name, F f) {
 
 #define KERNEL_load_halves(OP, HALVES) \
   constexpr auto model_##OP = testing_support::memory_model<f32x16, HALVES>(model::WIDENED);
-#define KERNEL_convert(OP, SINGLES, HALVES) \
+#define KERNEL_store_halves(OP, SINGLES, HALVES) \
   constexpr auto model_##OP = testing_support::memory_model<HALVES, SINGLES>(model::ROUNDED);
-#define KERNEL_store_halves_where KERNEL_convert
+#define KERNEL_store_halves_where KERNEL_store_halves
 
 #define TEST_load_I(NAME, F, V, M, K)                \
   testing_support::drive_load_I(NAME, model_##K, F); \

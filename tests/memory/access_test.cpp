@@ -23,6 +23,7 @@ constexpr auto SATURATE16 = SATURATE<16>;
 #define KERNEL_a(OP, R, RULE, A) constexpr auto model_##OP = testing_support::memory_model<R, A>(model::RULE);
 #define KERNEL_copy(OP, L) KERNEL_a(OP, L, SAME, L)
 #define KERNEL_extend(OP, R, A) KERNEL_a(OP, R, SAME, A)
+#define KERNEL_cut KERNEL_extend
 #define KERNEL_store_where KERNEL_a
 #define KERNEL_saturated(OP, R, A) KERNEL_a(OP, R, SATURATE<R::bits>, A)
 #define KERNEL_saturated_where KERNEL_saturated

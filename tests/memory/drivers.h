@@ -93,6 +93,18 @@ void drive_load_IP(const std::string& name, const Model& model, void (*f)(V&, co
   f(r, pointer, 68, filled<P>(0xFF)...);
   EXPECT_EQ(*pointer, moved<const M>(pointer, 68)) << name;
   expect_loaded(name, -1, model, before.data(), r, filled<P>(0xFF)...);
+  // So does part of the register: all is loaded before any of it changes.
+  for (int distance = -60; distance < 64; distance += 4) {
+    memory.fill(random);
+    const auto whole = memory.copy();
+    const auto* at = moved<const M>(memory.begin() + 256, 0);
+    V& part = *moved<V>(memory.begin() + 256, distance);
+    const auto check = [&](const P&... p) {
+      f(part, &at, 4, p...);
+      expect_loaded(name + " into " + std::to_string(distance), distance, model, &whole[256], part, p...);
+    };
+    check(predicate<P>(distance + 60, random)...);
+  }
 }
 
 // What a store leaves of an image in memory: the merge of bytes by the table, word after word, unless all
@@ -144,6 +156,24 @@ void expect_stores(const std::string& name, const Model<R, Rule, L>& model, unsi
   }
 }
 
+// A register part of which is stored to: all of it is loaded before.
+template <class V, class... P, class Model, class Store>
+void expect_stores_into_operand(const std::string& name, const Model& model, Store store) {
+  Memory memory;
+  std::mt19937 random(seed);
+  for (int distance = -60; distance < 64; distance += 4) {
+    memory.fill(random);
+    auto expected = memory.copy();
+    const V v = *moved<V>(memory.begin() + 256, 0);
+    const auto check = [&](const P&... p) {
+      model_store(model, v, &expected[static_cast<std::size_t>(256 + distance)], p...);
+      store(*moved<V>(memory.begin() + 256, 0), memory.begin() + 256 + distance, 4, p...);
+    };
+    check(predicate<P>(distance + 60, random)...);
+    memory.expect(expected, name + " at " + std::to_string(distance) + " of its operand");
+  }
+}
+
 // What only predicated stores do, store(v, at, step, p) with a predicate of the type of `none`.
 template <class V, class P, class Model, class Store>
 void expect_merges(const std::string& name, const Model& model, Store store, P p) {
@@ -167,6 +197,7 @@ void drive_store_I(const std::string& name, const Model& model, void (*f)(const 
     f(v, moved_back<const M>(at, offset), offset, p...);
   };
   expect_stores<V, P...>(name, model, alignment, store);
+  expect_stores_into_operand<V, P...>(name, model, store);
   (expect_merges<V, P>(name, model, store, filled<P>(0)), ...);
 }
 
@@ -179,6 +210,7 @@ void drive_store_IP(const std::string& name, const Model& model, void (*f)(const
     EXPECT_EQ(pointer, moved<M>(at, increment)) << name;
   };
   expect_stores<V, P...>(name, model, alignment, store);
+  expect_stores_into_operand<V, P...>(name, model, store);
   (expect_merges<V, P>(name, model, store, filled<P>(0)), ...);
 }
 

@@ -87,7 +87,7 @@ def whole_kernels(load, predicated, lanes):
     layout = lanes.layout
     if lanes.float_halves:
         yield (("load_halves", "f16x16") if load else
-               ("store_halves_where", "f32x16", "f16x16") if predicated else ("convert", "f32x16", "f16x16"))
+               ("store_halves_where", "f32x16", "f16x16") if predicated else ("store_halves", "f32x16", "f16x16"))
     elif lanes.halves:
         memory, register = lanes.bits(layout.lanes, 2), lanes.bits(layout.lanes)
         if load:
@@ -95,7 +95,7 @@ def whole_kernels(load, predicated, lanes):
         elif not lanes.unsigned:
             yield ("saturated_where" if predicated else "saturated"), memory, register
         else:
-            yield ("store_where" if predicated else "a"), memory, "SAME", register
+            yield ("store_where", memory, "SAME", register) if predicated else ("cut", memory, register)
     elif load:
         # 64-bit lanes have no predicated form and go as words.
         register = lanes.bits(layout.lanes) if layout.bits < 64 else "u32x16"

@@ -3,8 +3,7 @@ settle: pointers to register types, conversions, loads, stores and packs."""
 
 import collections
 
-# Of a type: the lines of get_T(name), which returns an operand, and of put_T(name, value), which takes a result; and what
-# these need of other types (their get and put), beside the intrinsics that they use.
+# Of a type: the lines of get_T(name), which returns an operand, and of put_T(name, value), which takes a result.
 Ways = collections.namedtuple("Ways", "get put")
 
 HOST = {"int": 32, "unsigned": 32, "unsigned int": 32, "immediate": 32, "short": 16, "unsigned short": 16, "char": 8,

@@ -1,6 +1,6 @@
 // A host program with its own floating-point state, and whether the library leaves it alone.
-#ifndef KASTARRI_TESTS_FLOAT_HOST_STATE_H
-#define KASTARRI_TESTS_FLOAT_HOST_STATE_H
+#ifndef KASTARRI_TESTS_HOST_STATE_H
+#define KASTARRI_TESTS_HOST_STATE_H
 
 #include <gtest/gtest.h>
 

@@ -1,6 +1,7 @@
 // Loads and stores that convert between singles in the register and halves in memory.
 #include "float/convert.h"
 #include "float/vectors.h"
+#include "memory/merge.h"
 
 namespace {
 
@@ -41,12 +42,11 @@ inline void load_halves(const Memory* from, UnitsUnder<Unit, PredicateUnit, true
 #define KERNEL_store_halves_where(OP, SINGLES, HALVES)                                           \
   template <class Units, class PredicateUnit, class Memory>                                      \
   static inline void KASTARRI_SEMANTIC(OP)(const Units* v, const PredicateUnit* p, Memory* to) { \
-    if (*p == 0) return;                                                                         \
     alignas(64) typename SINGLES::container enabled[SINGLES::count];                             \
     alignas(64) typename HALVES::container halves[HALVES::count];                                \
     lanes<SINGLES::count>(result<SINGLES>(clear(enabled, p)), SAME, Read<SINGLES>(v));           \
     convert_register<SINGLES, HALVES>(halves, enabled, 0);                                       \
-    lanes<HALVES::count>(result<HALVES>(where(to, p)), SAME, Read<HALVES>(halves));              \
+    store_where<HALVES, HALVES>(halves, SAME, p, to);                                            \
   }
 
 #include "float/memory.def"

@@ -32,7 +32,7 @@ CASES = {
     "ADD_S": {"row": "(ADD,", "kind of row": "#define SCALARFP_BOTH", "test": "float/scalars.def"},
     "int16_mtor_qv_vecNx16": {"row": "LOADED_HOST(int16,", "rule": "BODY_mtor", "shape": "SIG_mtor",
                               "test": "frame/memory_conversions.def"},
-    "RK_SRC": {"row": "SCALAR(core, SRC,", "shape": "SIG_scalar"},
+    "RK_SRC": {"row": "SCALAR(core, SRC,", "shape": "SIG_scalar", "test": "scalar/funnel.def"},
     "QUOU": {"row": "HELPER(QUOU,", "test": "scalar/scalar.def"},
 }
 

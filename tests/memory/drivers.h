@@ -108,14 +108,15 @@ void drive_load_IP(const std::string& name, const Model& model, void (*f)(V&, co
 }
 
 // What a store leaves of an image in memory: the merge of bytes by the table, word after word, unless all
-// are enabled or none.
+// are enabled or none. A float that is not enabled is not rounded, but taken as 0, for a table that has it stored.
 template <class R, class Rule, class L, class V, class... P>
 void model_store(const Model<R, Rule, L>& model, const V& v, unsigned char* image, const P&... p) {
   constexpr int lane_bytes = R::bits / 8, size = R::count * lane_bytes;
   unsigned char stored[size];
   int count = 0;
   for (int i = 0; i < R::count; ++i) {
-    set_lane<R>(stored, i, lane_of(model, v._, i));
+    const bool taken = std::is_same_v<typename R::number, integer> || enabled(i, p...);
+    set_lane<R>(stored, i, taken ? lane_of(model, v._, i) : 0);
     count += enabled(i, p...);
   }
   if (count == 0) return;

@@ -1,10 +1,54 @@
-// SAR and the shifts: every amount from 0 to 63 and every argument from -70 to 140, over the corners of the
-// values, against shifts made bit by bit.
+// SAR and the shifts: every row against a model that multiplies and divides by powers of two, from every SAR.
+#include <utility>
 
-#include "kastarri/scalar.h"
-#include "support/drivers.h"
+#include "scalar/drivers.h"
 
-#define CORE(OP) cstub_Km_ZNB_Orbis_R5_64k__KOR_rk_core_##OP
+namespace model {
+
+using testing_support::Int, testing_support::TWO32;
+
+// A model takes SAR, which it may change, and the operands as exact numbers; the result counts modulo the size of what
+// receives it.
+constexpr Int modulo(Int s, Int n) { return (s % n + n) % n; }
+constexpr Int times_power(Int v, Int n) { return modulo(v, TWO32) * (Int{1} << n); }
+
+// The low 32 bits of hi * 2^32 + lo over 2^right.
+constexpr Int funnel(Int hi, Int lo, Int right) {
+  const auto bits = static_cast<std::uint64_t>(hi) * static_cast<std::uint64_t>(TWO32) + static_cast<std::uint64_t>(lo);
+  return static_cast<Int>(bits / (std::uint64_t{1} << right) % static_cast<std::uint64_t>(TWO32));
+}
+constexpr Int funnel_signed(Int v, Int right) { return funnel(v < 0 ? TWO32 - 1 : 0, modulo(v, TWO32), right); }
+
+constexpr auto rk_core_SSR = [](Int& sar, Int s) { sar = modulo(s, 32); };
+constexpr auto rk_core_SSAI = rk_core_SSR;
+constexpr auto rk_core_SSL = [](Int& sar, Int s) { sar = 32 - modulo(s, 32); };
+constexpr auto rk_core_SSA8L = [](Int& sar, Int s) { sar = modulo(s, 4) * 8; };
+constexpr auto rk_core_SSA8B = [](Int& sar, Int s) { sar = 32 - modulo(s, 4) * 8; };
+
+constexpr auto rk_core_RSR_SAR = [](Int& sar) { return sar; };
+constexpr auto rk_core_WSR_SAR = [](Int& sar, Int v) { sar = v % 64; };
+constexpr auto rk_core_XSR_SAR = [](Int& sar, Int r) { return std::exchange(sar, r % 64); };
+
+constexpr auto rk_core_SRC = [](Int& sar, Int a, Int b) { return funnel(a, b, sar); };
+constexpr auto rk_core_SLL = [](Int& sar, Int v) { return funnel(v, 0, sar); };
+constexpr auto rk_core_SRA = [](Int& sar, Int v) { return funnel_signed(v, sar); };
+constexpr auto rk_core_SRL = [](Int& sar, Int v) { return funnel(0, v, sar); };
+
+constexpr auto rk_core_SSAI_SRC = [](Int& sar, Int a, Int b, Int s) { return funnel(a, b, sar = modulo(s, 32)); };
+constexpr auto rk_core_SSR_SRC = rk_core_SSAI_SRC;
+constexpr auto rk_core_SSR_SRA = [](Int& sar, Int v, Int s) { return funnel_signed(v, sar = modulo(s, 32)); };
+constexpr auto rk_core_SSR_SRL = [](Int& sar, Int v, Int s) { return funnel(0, v, sar = modulo(s, 32)); };
+constexpr auto rk_core_SSL_SLL = [](Int& sar, Int v, Int s) {
+  sar = 32 - modulo(s, 32);
+  return times_power(v, modulo(s, 32));
+};
+
+// By 0 it gives 0, as the funnel shift that it is.
+constexpr auto rk_core_SLLI = [](Int&, Int v, Int s) { return funnel(v, 0, modulo(-s, 32)); };
+constexpr auto rk_core_SRAI = [](Int&, Int v, Int s) { return funnel_signed(v, modulo(s, 32)); };
+constexpr auto rk_core_SRLI = [](Int&, Int v, Int s) { return funnel(0, v, modulo(s, 32)); };
+
+}  // namespace model
 
 namespace {
 
@@ -12,109 +56,54 @@ using namespace testing_support;
 
 unsigned& SAR = cstub_Km_ZNB_Orbis_R5_64k_proc.states.SAR;
 
-const std::vector<unsigned>& values() {
-  static const std::vector<unsigned> all = [] {
-    const auto corner = corners<u32x1>();
-    return std::vector<unsigned>(corner.begin(), corner.end());
-  }();
-  return all;
-}
-
-// Bits `from` to `from` + 31 of a value that has bit k where `bit(k)`.
-template <class Bit>
-unsigned gather(int from, const Bit& bit) {
-  unsigned result = 0;
-  for (int k = 31; k >= 0; --k) result = result * 2 + (bit(from + k) ? 1 : 0);
-  return result;
-}
-
-// hi above lo, zeros above and below both.
-unsigned shifted(unsigned hi, unsigned lo, int right) {
-  return gather(right, [=](int k) {
-    if (k < 0 || k > 63) return 0u;
-    return (k < 32 ? lo >> k : hi >> (k - 32)) & 1;
+// Calls check(SAR, operands ...) for all values of the operands and every SAR, of three operands one SAR after the
+// other.
+template <class... A, class Check>
+void for_states(const Check& check) {
+  Int next = 0;
+  for_values<A...>([&](auto... a) {
+    const Int first = sizeof...(A) < 3 ? 0 : next++ % 64, end = sizeof...(A) < 3 ? 64 : first + 1;
+    for (Int sar = first; sar < end; ++sar) {
+      SAR = static_cast<unsigned>(sar);
+      check(sar, a...);
+    }
   });
 }
 
-unsigned shifted_signed(unsigned v, int right) { return shifted(v > 0x7FFFFFFF ? ~0u : 0, v, right); }
-
-TEST(Funnel, EveryAmount) {
-  for (unsigned amount = 0; amount < 64; ++amount) {
-    const int right = static_cast<int>(amount);
-    CORE(WSR_SAR)(amount);
-    for (unsigned v : values()) {
-      ASSERT_EQ(CORE(SLL)(v), shifted(v, 0, right)) << "SLL " << v << " SAR " << amount;
-      ASSERT_EQ(CORE(SRL)(v), shifted(0, v, right)) << "SRL " << v << " SAR " << amount;
-      ASSERT_EQ(static_cast<unsigned>(CORE(SRA)(static_cast<int>(v))), shifted_signed(v, right))
-          << "SRA " << v << " SAR " << amount;
-      for (unsigned w : {0u, ~0u, 0x12345678u, ~v, v})
-        ASSERT_EQ(CORE(SRC)(v, w), shifted(v, w, right)) << "SRC " << v << ", " << w << " SAR " << amount;
+template <class R, class... A, class Model>
+void drive(const char* name, R (*f)(A...), Model model) {
+  for_states<A...>([=](Int sar, auto... a) {
+    const Int before = sar;
+    if constexpr (std::is_void_v<R>) {
+      f(operand<A>(a)...);
+      model(sar, a...);
+    } else {
+      ASSERT_EQ(f(operand<A>(a)...), operand<R>(model(sar, a...))) << name << list(a...) << " with SAR " << before;
     }
-    EXPECT_EQ(SAR, amount) << "a shift changed SAR";
-  }
+    ASSERT_EQ(Int{SAR}, sar) << name << list(a...) << " leaves SAR, which was " << before;
+  });
 }
 
-// Checks the result of a fused shift and the SAR that it leaves.
-template <class Result>
-void expect_shift(const char* name, unsigned v, int s, Result got, unsigned expected, int sar) {
-  ASSERT_EQ(static_cast<unsigned>(got), expected) << name << " of " << v << " by " << s;
-  ASSERT_EQ(SAR, static_cast<unsigned>(sar)) << name << " by " << s << " leaves SAR";
+// The result is the new value of the operand.
+template <class T, class Model>
+void drive(const char* name, void (*f)(T&), Model model) {
+  for_states<T>([=](Int sar, Int a) {
+    const Int before = sar;
+    T r = operand<T>(a);
+    f(r);
+    ASSERT_EQ(r, operand<T>(model(sar, a))) << name << list(a) << " with SAR " << before;
+    ASSERT_EQ(Int{SAR}, sar) << name << list(a) << " leaves SAR, which was " << before;
+  });
 }
 
-TEST(Funnel, EveryArgument) {
-  for (int s = -70; s <= 140; ++s) {
-    const int n = (s % 32 + 32) % 32;
-    for (unsigned v : values()) {
-      const int x = static_cast<int>(v);
-      for (unsigned w : {0u, ~0u, 0x12345678u}) {
-        expect_shift("SSAI_SRC", v, s, CORE(SSAI_SRC)(v, w, s), shifted(v, w, n), n);
-        SAR = 63;
-        expect_shift("SSR_SRC", v, s, CORE(SSR_SRC)(v, w, s), shifted(v, w, n), n);
-      }
-      SAR = 63;
-      expect_shift("SSR_SRA", v, s, CORE(SSR_SRA)(x, s), shifted_signed(v, n), n);
-      SAR = 63;
-      expect_shift("SSR_SRL", v, s, CORE(SSR_SRL)(v, s), shifted(0, v, n), n);
-      expect_shift("SSL_SLL", v, s, CORE(SSL_SLL)(v, s), shifted(0, v, -n), 32 - n);
-      SAR = 63;
-      expect_shift("SLLI", v, s, CORE(SLLI)(v, s), n == 0 ? 0 : shifted(0, v, -n), 63);
-      expect_shift("SRAI", v, s, CORE(SRAI)(x, s), shifted_signed(v, n), 63);
-      expect_shift("SRLI", v, s, CORE(SRLI)(v, s), shifted(0, v, n), 63);
-    }
-  }
-}
+#define ENTRY(SYMBOL, SHAPE, ...) \
+  const int tested_##SYMBOL =     \
+      add_test("Funnel", #SYMBOL, [] { drive(#SYMBOL, &KASTARRI_SYMBOL(SYMBOL), model::SYMBOL); });
 
-TEST(Funnel, ArgumentsSetSar) {
-  for (int s = -70; s <= 140; ++s) {
-    const int n = (s % 32 + 32) % 32, bytes = (s % 4 + 4) % 4 * 8;
-    const std::pair<void (*)(int), int> setters[] = {
-        {CORE(SSR), n}, {CORE(SSAI), n}, {CORE(SSL), 32 - n}, {CORE(SSA8L), bytes}, {CORE(SSA8B), 32 - bytes}};
-    for (const auto& [set, expected] : setters) {
-      SAR = 63;
-      set(s);
-      EXPECT_EQ(SAR, static_cast<unsigned>(expected)) << "argument " << s << ", setter " << &setters[0].first - &set;
-    }
-  }
-}
+#include "frame/rows.h"
 
-TEST(Funnel, WholeAmountsKeepSixBits) {
-  for (unsigned v : values()) {
-    CORE(WSR_SAR)(v);
-    ASSERT_EQ(CORE(RSR_SAR)(), v % 64);
-    unsigned r = ~v;
-    CORE(XSR_SAR)(r);
-    ASSERT_EQ(r, v % 64);
-    ASSERT_EQ(SAR, 63 - v % 64);
-  }
-}
+#include "scalar/funnel.def"
 
-TEST(Funnel, ShiftLeftByNothing) {
-  EXPECT_EQ(CORE(SLLI)(1, 0), 0u);
-  EXPECT_EQ(CORE(SSL_SLL)(1, 0), 1u);
-  CORE(SSL)(0);
-  EXPECT_EQ(CORE(SLL)(0x87654321), 0x87654321u);
-  CORE(SSR)(0);
-  EXPECT_EQ(CORE(SLL)(0x87654321), 0u);
-}
+#include "frame/rows_end.h"
 
 }  // namespace

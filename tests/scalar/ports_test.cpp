@@ -1,7 +1,6 @@
-// The ports: which handlers an intrinsic calls, in which order, with what; and how the program ends when
+// The ports, by their rows: which handlers an intrinsic calls, in which order, with what; and how the program ends when
 // one of them is missing.
-#include "kastarri/scalar.h"
-#include "support/drivers.h"
+#include "scalar/drivers.h"
 
 namespace {
 
@@ -19,6 +18,9 @@ struct Host {
   std::vector<unsigned> answers;
   unsigned delivered = 100;
 
+  Host();
+  Host(const Host&) = delete;
+  ~Host();
   void note(const std::string& call) { calls += (calls.empty() ? "" : " ") + call; }
   unsigned answer() {
     if (answers.empty()) {
@@ -62,146 +64,181 @@ void wire(const cstub_ImportWire_t* port, unsigned* value) {
   *value = ++host.delivered;
 }
 
-class Ports : public testing::Test {
- protected:
-  Ports() {
-    REGISTER_PORT(IPQ)(&host_, input_entry, input_data);
-    REGISTER_PORT(OPQ)(&host_, output_entry, output_data);
-    REGISTER_PORT(EXPSTATE)(&host_, exported);
-    REGISTER_PORT(IMPWIRE)(&host_, wire);
-  }
-  ~Ports() override {
-    REGISTER_PORT(IPQ)(nullptr, nullptr, nullptr);
-    REGISTER_PORT(OPQ)(nullptr, nullptr, nullptr);
-    REGISTER_PORT(EXPSTATE)(nullptr, nullptr);
-    REGISTER_PORT(IMPWIRE)(nullptr, nullptr);
-    core.states.EXPSTATE = 0;
-  }
+// The last host that was made has the ports, until it is gone.
+Host::Host() {
+  REGISTER_PORT(IPQ)(this, input_entry, input_data);
+  REGISTER_PORT(OPQ)(this, output_entry, output_data);
+  REGISTER_PORT(EXPSTATE)(this, exported);
+  REGISTER_PORT(IMPWIRE)(this, wire);
+}
+Host::~Host() {
+  REGISTER_PORT(IPQ)(nullptr, nullptr, nullptr);
+  REGISTER_PORT(OPQ)(nullptr, nullptr, nullptr);
+  REGISTER_PORT(EXPSTATE)(nullptr, nullptr);
+  REGISTER_PORT(IMPWIRE)(nullptr, nullptr);
+  core.states.EXPSTATE = 0;
+}
 
-  // The calls that the operation makes when entry handlers answer as listed, all of which it has to ask.
-  template <class Operation>
-  std::string calls(std::vector<unsigned> answers, Operation operation) {
-    host_ = Host();
-    host_.answers = std::move(answers);
-    operation();
-    EXPECT_TRUE(host_.answers.empty()) << "too few entry calls: " << host_.calls;
-    return host_.calls;
-  }
+const char NO_STATE[] = "Error: ExportState \"EXPSTATE\" is used but not registered\n";
+const char NO_INPUT[] = "Error: InputQueue \"IPQ\" is used but not registered\n";
+const char NO_OUTPUT[] = "Error: OutputQueue \"OPQ\" is used but not registered\n";
+const char NO_WIRE[] = "Error: ImportWire \"IMPWIRE\" is used but not registered\n";
 
-  Host host_;
+}  // namespace
+
+namespace model {
+
+// What a row does when entry handlers answer as listed, all of which it has to ask, and the exported state is 5.
+struct Case {
+  std::vector<unsigned> answers;
+  std::vector<testing_support::Int> operands;
+  const char* calls;
+  std::vector<testing_support::Int> left;  // its result, what it writes to operands, and the exported state
 };
-using PortsDeathTest = Ports;
 
-TEST_F(Ports, BlockingTransfersAskNoEntryHandler) {
-  EXPECT_EQ(calls({}, [] { EXPECT_EQ(PORT(READ_IPQ)(), 101u); }), "data0");
-  EXPECT_EQ(calls({}, [] { PORT(WRITE_OPQ)(7); }), "data0=7");
-}
+// A row's cases; the handler that it cannot do without, missing, and how the program then ends.
+struct Protocol {
+  std::vector<Case> cases;
+  void (*remove)(void* host) = nullptr;
+  const char* message = "";
+};
 
-TEST_F(Ports, ChecksSayWhenATransferWouldWait) {
-  for (unsigned answer : {0u, 1u, 5u, 0x80000000u}) {
-    const std::string call = "entry=" + std::to_string(answer);
-    EXPECT_EQ(calls({answer}, [=] { EXPECT_EQ(PORT(CHECK_IPQ)(), answer == 0); }), call);
-    EXPECT_EQ(calls({answer}, [=] { EXPECT_EQ(PORT(CHECK_OPQ)(), answer == 0); }), call);
-  }
-}
+void no_input_entry(void* host) { REGISTER_PORT(IPQ)(host, nullptr, input_data); }
+void no_input_data(void* host) { REGISTER_PORT(IPQ)(host, input_entry, nullptr); }
+void no_output_entry(void* host) { REGISTER_PORT(OPQ)(host, nullptr, output_data); }
+void no_output_data(void* host) { REGISTER_PORT(OPQ)(host, output_entry, nullptr); }
+void no_state(void* host) { REGISTER_PORT(EXPSTATE)(host, nullptr); }
+void no_wire(void* host) { REGISTER_PORT(IMPWIRE)(host, nullptr); }
 
-TEST_F(Ports, NonBlockingRead) {
-  struct {
-    std::vector<unsigned> answers;
-    const char* calls;
-    unsigned value, ok;
-  } const cases[] = {
-      {{1, 1}, "entry=1 data1 entry=1 data0", 102, 1},     {{0, 6}, "entry=0 entry=6 data0", 101, 1},
-      {{0, 0, 0}, "entry=0 entry=0 entry=0", 42, 0},       {{0, 0, 2}, "entry=0 entry=0 entry=2 data1", 42, 0},
-      {{3, 0, 0}, "entry=3 data1 entry=0 entry=0", 42, 0}, {{1, 0, 1}, "entry=1 data1 entry=0 entry=1 data1", 42, 0},
-  };
-  for (const auto& one : cases) {
-    unsigned value = 42;
-    auto ok = filled<cstub_Km_ZNB_Orbis_R5_64k_rkbool>(0xFF);
-    EXPECT_EQ(calls(one.answers, [&] { PORT(READ_IPQ_NBLK)(value, ok); }), one.calls);
-    EXPECT_EQ(value, one.value) << one.calls;
-    EXPECT_EQ(ok._[0], one.ok) << one.calls;
-  }
-}
+const Protocol rk_ioports_READ_IPQ{{{{}, {}, "data0", {101, 5}}}, no_input_data, NO_INPUT};
+const Protocol rk_ioports_WRITE_OPQ{{{{}, {7}, "data0=7", {5}}}, no_output_data, NO_OUTPUT};
 
-TEST_F(Ports, NonBlockingWrite) {
-  struct {
-    std::vector<unsigned> answers;
-    const char* calls;
-    unsigned sent;
-  } const cases[] = {
-      {{1, 1}, "entry=1 data1=null entry=1 data0=7", 1},
-      {{0, 9}, "entry=0 entry=9 data0=7", 1},
-      {{4, 0}, "entry=4 data1=null entry=0", 0},
-      {{0, 0}, "entry=0 entry=0", 0},
-  };
-  for (const auto& one : cases) {
-    unsigned sent = 42;
-    EXPECT_EQ(calls(one.answers, [&] { sent = PORT(WRITE_OPQ_NBLK)(7)._[0]; }), one.calls);
-    EXPECT_EQ(sent, one.sent) << one.calls;
-  }
-}
+// A check says when a transfer would wait.
+const std::vector<Case> CHECK = {{{0}, {}, "entry=0", {1, 5}},
+                                 {{1}, {}, "entry=1", {0, 5}},
+                                 {{5}, {}, "entry=5", {0, 5}},
+                                 {{0x80000000}, {}, "entry=2147483648", {0, 5}}};
+const Protocol rk_ioports_CHECK_IPQ{CHECK, no_input_entry, NO_INPUT};
+const Protocol rk_ioports_CHECK_OPQ{CHECK, no_output_entry, NO_OUTPUT};
 
-TEST_F(Ports, TheExportedStateIsToldBeforeItChangesButForMaskedWrites) {
+const Protocol rk_ioports_READ_IPQ_NBLK{{{{1, 1}, {42, 0xFF}, "entry=1 data1 entry=1 data0", {102, 1, 5}},
+                                         {{0, 6}, {42, 0xFF}, "entry=0 entry=6 data0", {101, 1, 5}},
+                                         {{0, 0, 0}, {42, 0xFF}, "entry=0 entry=0 entry=0", {42, 0, 5}},
+                                         {{0, 0, 2}, {42, 0xFF}, "entry=0 entry=0 entry=2 data1", {42, 0, 5}},
+                                         {{3, 0, 0}, {42, 0xFF}, "entry=3 data1 entry=0 entry=0", {42, 0, 5}},
+                                         {{1, 0, 1}, {42, 0xFF}, "entry=1 data1 entry=0 entry=1 data1", {42, 0, 5}}},
+                                        no_input_entry,
+                                        NO_INPUT};
+const Protocol rk_ioports_WRITE_OPQ_NBLK{{{{1, 1}, {7}, "entry=1 data1=null entry=1 data0=7", {1, 5}},
+                                          {{0, 9}, {7}, "entry=0 entry=9 data0=7", {1, 5}},
+                                          {{4, 0}, {7}, "entry=4 data1=null entry=0", {0, 5}},
+                                          {{0, 0}, {7}, "entry=0 entry=0", {0, 5}}},
+                                         no_output_entry,
+                                         NO_OUTPUT};
+
+// The handler is told before the state changes, but of a masked write.
+const Protocol rk_ioports_RUR_EXPSTATE{{{{}, {}, "", {5, 5}}}};
+const Protocol rk_ioports_WUR_EXPSTATE{
+    {{{}, {8}, "new=8,state=5", {8}}, {{}, {-1}, "new=4294967295,state=5", {0xFFFFFFFF}}}, no_state, NO_STATE};
+const Protocol rk_ioports_SETB_EXPSTATE{{{{}, {33}, "new=7,state=5", {7}},
+                                         {{}, {31}, "new=2147483653,state=5", {0x80000005}},
+                                         {{}, {-32}, "new=5,state=5", {5}}},
+                                        no_state,
+                                        NO_STATE};
+const Protocol rk_ioports_CLRB_EXPSTATE{
+    {{{}, {-30}, "new=1,state=5", {1}}, {{}, {32}, "new=4,state=5", {4}}, {{}, {1}, "new=5,state=5", {5}}},
+    no_state,
+    NO_STATE};
+const Protocol rk_ioports_WRMSK_EXPSTATE{{{{}, {12, 10}, "new=13,state=13", {13}},
+                                          {{}, {0xFFFF0000, 0x00FF00FF}, "new=16711680,state=16711680", {0xFF0000}}},
+                                         no_state,
+                                         NO_STATE};
+
+const Protocol rk_ioports_READ_IMPWIRE{{{{}, {}, "", {101, 5}}}, no_wire, NO_WIRE};
+
+}  // namespace model
+
+namespace {
+
+// Calls f. What it leaves: its result, then the operands to which it writes, then the exported state.
+template <class R, class... A, std::size_t... I>
+std::vector<Int> left_by(R (*f)(A...), const std::vector<Int>& given, std::index_sequence<I...>) {
   core.states.EXPSTATE = 5;
-  EXPECT_EQ(calls({}, [] { PORT(WUR_EXPSTATE)(8); }), "new=8,state=5");
-  EXPECT_EQ(calls({}, [] { PORT(SETB_EXPSTATE)(33); }), "new=10,state=8");
-  EXPECT_EQ(calls({}, [] { PORT(CLRB_EXPSTATE)(-29); }), "new=2,state=10");
-  EXPECT_EQ(calls({}, [] { PORT(SETB_EXPSTATE)(31); }), "new=2147483650,state=2");
-  EXPECT_EQ(calls({}, [] { PORT(WRMSK_EXPSTATE)(12, 10); }), "new=2147483656,state=2147483656");
-  core.states.EXPSTATE = 0x12345678;
-  PORT(WRMSK_EXPSTATE)(0xFFFF0000, 0x00FF00FF);
-  EXPECT_EQ(core.states.EXPSTATE, 0x12FF5600u);
-  EXPECT_EQ(calls({}, [] { EXPECT_EQ(PORT(RUR_EXPSTATE)(), 0x12FF5600u); }), "");
+  std::tuple<bare<A>...> operands{operand<bare<A>>(given.at(I))...};
+  std::vector<Int> all;
+  if constexpr (std::is_void_v<R>) {
+    f(std::get<I>(operands)...);
+  } else {
+    all.push_back(number(f(std::get<I>(operands)...)));
+  }
+  ((std::is_reference_v<A> ? all.push_back(number(std::get<I>(operands))) : void()), ...);
+  all.push_back(core.states.EXPSTATE);
+  return all;
 }
-
-TEST_F(Ports, TheWireIsReadAnewEachTime) {
-  EXPECT_EQ(PORT(READ_IMPWIRE)(), 101u);
-  EXPECT_EQ(PORT(READ_IMPWIRE)(), 102u);
-}
-
-TEST_F(Ports, TheLastRegistrationCounts) {
-  Host other;
-  REGISTER_PORT(IPQ)(&other, input_entry, input_data);
-  PORT(READ_IPQ)();
-  EXPECT_EQ(other.calls, "data0");
-  EXPECT_EQ(host_.calls, "");
-}
-
-// --- Missing handlers -----------------------------------------------------------------------------------
-
-const std::string NO_STATE = "Error: ExportState \"EXPSTATE\" is used but not registered\n";
-const std::string NO_INPUT = "Error: InputQueue \"IPQ\" is used but not registered\n";
-const std::string NO_OUTPUT = "Error: OutputQueue \"OPQ\" is used but not registered\n";
-const std::string NO_WIRE = "Error: ImportWire \"IMPWIRE\" is used but not registered\n";
 
 #define EXPECT_FAILURE(STATEMENT, MESSAGE) \
   EXPECT_EXIT(STATEMENT, testing::ExitedWithCode(1), testing::Eq(std::string(MESSAGE)))
 
-TEST_F(PortsDeathTest, UnregisteredQueues) {
-  unsigned value = 0;
-  cstub_Km_ZNB_Orbis_R5_64k_rkbool ok;
-  REGISTER_PORT(IPQ)(&host_, nullptr, input_data);
-  REGISTER_PORT(OPQ)(&host_, nullptr, output_data);
-  EXPECT_FAILURE(PORT(CHECK_IPQ)(), NO_INPUT);
-  EXPECT_FAILURE(PORT(READ_IPQ_NBLK)(value, ok), NO_INPUT);
-  EXPECT_FAILURE(PORT(CHECK_OPQ)(), NO_OUTPUT);
-  EXPECT_FAILURE(PORT(WRITE_OPQ_NBLK)(1), NO_OUTPUT);
-  REGISTER_PORT(IPQ)(&host_, input_entry, nullptr);
-  REGISTER_PORT(OPQ)(&host_, output_entry, nullptr);
-  EXPECT_FAILURE(PORT(READ_IPQ)(), NO_INPUT);
-  EXPECT_FAILURE(PORT(WRITE_OPQ)(1), NO_OUTPUT);
+// Ends the program after it has said whom the last call reached, and the exported state.
+template <class Call>
+void failing(Host& host, Call call) {
+  static Host& asked = host;
+  std::atexit([] { std::fprintf(stderr, "%s state=%u", asked.calls.c_str(), core.states.EXPSTATE); });
+  call();
+}
+
+template <class R, class... A>
+void drive(const char* name, const model::Protocol& protocol, R (*f)(A...)) {
+  const std::index_sequence_for<A...> every{};
+  for (const auto& one : protocol.cases) {
+    Host host;
+    host.answers = one.answers;
+    EXPECT_EQ(left_by(f, one.operands, every), one.left) << name << ": " << one.calls;
+    EXPECT_EQ(host.calls, one.calls) << name;
+    EXPECT_TRUE(host.answers.empty()) << name << ", too few entry calls: " << host.calls;
+  }
+  const auto& operands = protocol.cases[0].operands;
+  if (protocol.remove) {
+    Host host;
+    protocol.remove(&host);
+    EXPECT_FAILURE(failing(host, [&] { left_by(f, operands, every); }), protocol.message + std::string(" state=5"))
+        << name;
+  } else {
+    left_by(f, operands, every);
+  }
+}
+
+#define ENTRY(SYMBOL, SHAPE, ...) \
+  const int tested_##SYMBOL =     \
+      add_test("PortsDeathTest", #SYMBOL, [] { drive(#SYMBOL, model::SYMBOL, &KASTARRI_SYMBOL(SYMBOL)); });
+
+#include "frame/rows.h"
+
+#include "scalar/ports.def"
+
+#include "frame/rows_end.h"
+
+TEST(PortHandlers, TheWireIsReadAnewEachTime) {
+  const Host host;
+  EXPECT_EQ(PORT(READ_IMPWIRE)(), 101u);
+  EXPECT_EQ(PORT(READ_IMPWIRE)(), 102u);
+}
+
+TEST(PortHandlers, TheLastRegistrationCounts) {
+  const Host first, last;
+  PORT(READ_IPQ)();
+  EXPECT_EQ(last.calls, "data0");
+  EXPECT_EQ(first.calls, "");
 }
 
 // The data handler is missed after the entry handler has been asked: once when it says yes, twice when no.
-TEST_F(PortsDeathTest, NonBlockingTransfersWithoutDataHandler) {
-  REGISTER_PORT(IPQ)(&host_, input_entry, nullptr);
-  REGISTER_PORT(OPQ)(&host_, output_entry, nullptr);
-  const auto attempt = [this](std::vector<unsigned> answers, auto transfer) {
-    static Host& host = host_;
+TEST(PortHandlersDeathTest, NonBlockingTransfersWithoutDataHandler) {
+  Host host;
+  model::no_input_data(&host);
+  model::no_output_data(&host);
+  const auto attempt = [&host](std::vector<unsigned> answers, auto transfer) {
     host.answers = std::move(answers);
-    std::atexit([] { std::fputs(host.calls.c_str(), stderr); });
-    transfer();
+    failing(host, transfer);
   };
   const auto read = [] {
     unsigned value = 0;
@@ -209,33 +246,13 @@ TEST_F(PortsDeathTest, NonBlockingTransfersWithoutDataHandler) {
     PORT(READ_IPQ_NBLK)(value, ok);
   };
   const auto write = [] { PORT(WRITE_OPQ_NBLK)(1); };
-  EXPECT_FAILURE(attempt({1}, read), NO_INPUT + "entry=1");
-  EXPECT_FAILURE(attempt({0, 0}, read), NO_INPUT + "entry=0 entry=0");
-  EXPECT_FAILURE(attempt({0, 1}, read), NO_INPUT + "entry=0 entry=1");
-  EXPECT_FAILURE(attempt({1}, write), NO_OUTPUT + "entry=1");
-  EXPECT_FAILURE(attempt({0, 1}, write), NO_OUTPUT + "entry=0 entry=1");
-  host_.answers = {0, 0};
+  EXPECT_FAILURE(attempt({1}, read), std::string(NO_INPUT) + "entry=1 state=0");
+  EXPECT_FAILURE(attempt({0, 0}, read), std::string(NO_INPUT) + "entry=0 entry=0 state=0");
+  EXPECT_FAILURE(attempt({0, 1}, read), std::string(NO_INPUT) + "entry=0 entry=1 state=0");
+  EXPECT_FAILURE(attempt({1}, write), std::string(NO_OUTPUT) + "entry=1 state=0");
+  EXPECT_FAILURE(attempt({0, 1}, write), std::string(NO_OUTPUT) + "entry=0 entry=1 state=0");
+  host.answers = {0, 0};
   EXPECT_EQ(PORT(WRITE_OPQ_NBLK)(1)._[0], 0) << "nothing is sent, so nothing is missed";
-}
-
-TEST_F(PortsDeathTest, AnUnregisteredExportedStateStays) {
-  REGISTER_PORT(EXPSTATE)(nullptr, nullptr);
-  const auto attempt = [](auto change) {
-    core.states.EXPSTATE = 41;
-    std::atexit([] { std::fprintf(stderr, "%u", core.states.EXPSTATE); });
-    change();
-  };
-  EXPECT_FAILURE(attempt([] { PORT(WUR_EXPSTATE)(1); }), NO_STATE + "41");
-  EXPECT_FAILURE(attempt([] { PORT(SETB_EXPSTATE)(1); }), NO_STATE + "41");
-  EXPECT_FAILURE(attempt([] { PORT(CLRB_EXPSTATE)(0); }), NO_STATE + "41");
-  EXPECT_FAILURE(attempt([] { PORT(WRMSK_EXPSTATE)(1, 1); }), NO_STATE + "41");
-  core.states.EXPSTATE = 9;
-  EXPECT_EQ(PORT(RUR_EXPSTATE)(), 9u) << "reading needs no handler";
-}
-
-TEST_F(PortsDeathTest, UnregisteredWire) {
-  REGISTER_PORT(IMPWIRE)(nullptr, nullptr);
-  EXPECT_FAILURE(PORT(READ_IMPWIRE)(), NO_WIRE);
 }
 
 }  // namespace

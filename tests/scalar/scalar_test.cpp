@@ -2,17 +2,14 @@
 // integers, over the crossed corners of its operands.
 #include <csignal>
 
-#include "kastarri/scalar.h"
-#include "scalar/shapes.h"
-#include "support/drivers.h"
+#include "scalar/drivers.h"
 
 namespace model {
 
-using testing_support::Int;
+using testing_support::Int, testing_support::TWO32;
 
 // A model takes operands as exact numbers, the old value of a register that is read and written first; the
 // result counts modulo the size of what receives it.
-constexpr Int TWO32 = Int{1} << 32;
 
 constexpr auto rk_core_ADD = [](Int a, Int b) { return a + b; };
 constexpr auto rk_core_ADDI = rk_core_ADD, rk_core_ADDMI = rk_core_ADD, rk_density_ADD_N = rk_core_ADD,
@@ -125,64 +122,23 @@ constexpr auto rk_core_NOP = [] {};
 constexpr auto rk_density_NOP_N = rk_core_NOP;
 constexpr auto rk_core_RSR_PRID = [] { return Int{cstub_Km_ZNB_Orbis_R5_64k_proc.PRID}; };
 
+// By magnitudes: the quotient is negative when the signs differ, the remainder when the dividend is.
+constexpr Int signed_by(bool negative, Int magnitude) { return negative ? 0 - magnitude : magnitude; }
+constexpr auto QUOU = [](Int a, Int b) { return signed_by((a < 0) != (b < 0), rk_core_ABS(a) / rk_core_ABS(b)); };
+constexpr auto QUOS = QUOU;
+constexpr auto REMU = [](Int a, Int b) { return signed_by(a < 0, rk_core_ABS(a) % rk_core_ABS(b)); };
+constexpr auto REMS = REMU;
+
 }  // namespace model
 
 namespace {
 
 using namespace testing_support;
 
-template <class T>
-using bare = std::remove_cv_t<std::remove_reference_t<T>>;
-
-// The operands of scalar rows as numbers, and back.
-template <class T>
-Int number(const T& v) {
-  if constexpr (std::is_integral_v<T>) {
-    return Int{v};
-  } else {
-    return Int{v._[0]};
-  }
-}
-template <class T>
-T operand(Int v) {
-  if constexpr (std::is_integral_v<T>) {
-    return static_cast<T>(v);
-  } else {
-    T boolean;
-    boolean._[0] = static_cast<unsigned char>(v);
-    return boolean;
-  }
-}
-template <class T>
-const std::vector<Int>& values_of() {
-  using unit = std::conditional_t<std::is_integral_v<T>, T, unsigned char>;
-  static const std::vector<Int> values = corners<Layout<unit, 8 * sizeof(unit), 1>>();
-  return values;
-}
-
-// Calls check(a, ...) for all corners of the parameters A; further ones before them are given.
-template <class... A, class Check, class... Given>
-void for_corners(const Check& check, Given... given) {
-  constexpr std::size_t left = sizeof...(A) - sizeof...(Given);
-  if constexpr (left == 0) {
-    check(given...);
-  } else {
-    using Next = std::tuple_element_t<sizeof...(Given), std::tuple<A...>>;
-    for (Int value : values_of<Next>()) for_corners<A...>(check, given..., value);
-  }
-}
-
-template <class... Values>
-std::string list(Values... values) {
-  std::string text;
-  ((text += (text.empty() ? "(" : ", ") + std::to_string(values)), ...);
-  return text + ")";
-}
-
 // The result is returned.
 template <class R, class... A, class Model>
 void drive(const char* name, R (*f)(A...), Model model) {
-  for_corners<bare<A>...>([=](auto... a) {
+  for_values<bare<A>...>([=](auto... a) {
     const R got = f(operand<bare<A>>(a)...), expected = operand<R>(model(a...));
     ASSERT_EQ(number(got), number(expected)) << name << list(a...);
   });
@@ -192,7 +148,7 @@ void drive(const char* name, R (*f)(A...), Model model) {
 template <class T, class... A, class Model>
 void drive(const char* name, void (*f)(T&, A...), Model model) {
   std::mt19937 random(seed);
-  for_corners<bare<A>...>([=, &random](auto... a) {
+  for_values<bare<A>...>([=, &random](auto... a) {
     const T old = operand<T>(static_cast<Int>(random()));
     T r = old;
     f(r, operand<bare<A>>(a)...);
@@ -217,47 +173,39 @@ void drive_stateless(const char* name, F f, Model model) {
   processor.PRID = 0;
 }
 
+// The host's fault, and no message of the library's.
+template <class T>
+void expect_division_fault(const char* name, T (*divide)(T, T), T a, T b) {
+  const auto attempt = [=] {
+    std::signal(SIGFPE, SIG_DFL);  // a sanitizer's handler would report it
+    divide(a, b);
+  };
+  EXPECT_EXIT(attempt(), testing::KilledBySignal(SIGFPE), testing::Eq(std::string())) << name << list(a, b);
+}
+
+template <class T, class Model>
+void drive_division(const char* name, T (*divide)(T, T), Model model) {
+  const Int least = std::numeric_limits<T>::min();
+  for_values<T, T>([=](Int a, Int b) {
+    if (b == 0 || (b == -1 && a == least)) return;
+    ASSERT_EQ(number(divide(operand<T>(a), operand<T>(b))), model(a, b)) << name << list(a, b);
+  });
+  expect_division_fault(name, divide, T{7}, T{0});
+  expect_division_fault(name, divide, T{0}, T{0});
+  if (least < 0) expect_division_fault(name, divide, static_cast<T>(least), static_cast<T>(-1));
+}
+
 #define ENTRY(SYMBOL, SHAPE, ...)              \
   [[maybe_unused]] const int tested_##SYMBOL = \
       add_test("Scalar", #SYMBOL, [] { drive_stateless(#SYMBOL, &KASTARRI_SYMBOL(SYMBOL), model::SYMBOL); });
+#define HELPER(NAME, SHAPE, ...)                       \
+  [[maybe_unused]] const int tested_##NAME = add_test( \
+      "ScalarDeathTest", #NAME, [] { drive_division(#NAME, &cstub_Km_ZNB_Orbis_R5_64k_##NAME, model::NAME); });
 
 #include "frame/rows.h"
 
 #include "scalar/scalar.def"
 
 #include "frame/rows_end.h"
-
-TEST(ScalarDivision, TruncatesTowardZero) {
-  for (Int a : values_of<int>()) {
-    for (Int b : values_of<int>()) {
-      const auto x = static_cast<unsigned>(a), y = static_cast<unsigned>(b);
-      if (b == 0) continue;
-      EXPECT_EQ(cstub_Km_ZNB_Orbis_R5_64k_QUOU(x, y), Int{x} / Int{y}) << x << " / " << y;
-      EXPECT_EQ(cstub_Km_ZNB_Orbis_R5_64k_REMU(x, y), Int{x} % Int{y}) << x << " % " << y;
-      if (a / b > INT32_MAX) continue;
-      EXPECT_EQ(cstub_Km_ZNB_Orbis_R5_64k_QUOS(operand<int>(a), operand<int>(b)), a / b) << a << " / " << b;
-      EXPECT_EQ(cstub_Km_ZNB_Orbis_R5_64k_REMS(operand<int>(a), operand<int>(b)), a % b) << a << " % " << b;
-    }
-  }
-}
-
-// The host's fault, and no message of the library's.
-template <class T>
-void expect_division_fault(T (*divide)(T, T), T a, T b) {
-  const auto attempt = [=] {
-    std::signal(SIGFPE, SIG_DFL);  // a sanitizer's handler would report it
-    divide(a, b);
-  };
-  EXPECT_EXIT(attempt(), testing::KilledBySignal(SIGFPE), testing::Eq(std::string()));
-}
-
-TEST(ScalarDivisionDeathTest, ImpossibleDivisionsAreTheHostsFault) {
-  expect_division_fault(&cstub_Km_ZNB_Orbis_R5_64k_QUOU, 7u, 0u);
-  expect_division_fault(&cstub_Km_ZNB_Orbis_R5_64k_REMU, 0u, 0u);
-  expect_division_fault(&cstub_Km_ZNB_Orbis_R5_64k_QUOS, 7, 0);
-  expect_division_fault(&cstub_Km_ZNB_Orbis_R5_64k_REMS, 0, 0);
-  expect_division_fault(&cstub_Km_ZNB_Orbis_R5_64k_QUOS, INT32_MIN, -1);
-  expect_division_fault(&cstub_Km_ZNB_Orbis_R5_64k_REMS, INT32_MIN, -1);
-}
 
 }  // namespace

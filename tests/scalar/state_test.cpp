@@ -96,11 +96,4 @@ TEST(State, PortsStartWithoutHandlers) {
   expect_port(at_load.IMPWIRE, "IMPWIRE", 4);
 }
 
-TEST(State, TheMaskKeepsBytesWhoseBitIsZero) {
-  for (unsigned k = 0; k < 16; ++k) {
-    for (unsigned j = 0; j < 4; ++j)
-      EXPECT_EQ(cstub_Km_ZNB_Orbis_R5_64k_mask[k] >> 8 * j & 0xFF, k >> j & 1 ? 0u : 0xFFu) << k << ", byte " << j;
-  }
-}
-
 }  // namespace

@@ -58,7 +58,7 @@ constexpr bool are_different_numbers =
 
 // Lanes extended to twice their bits. Where they make one register of 64 bytes it is stored at once: a loop over lanes
 // would store two halves, and a load of the whole is not forwarded from those.
-template <class From, class To>
+template <class From, class To, template <class> class Operand = Read>
 inline void extend_lanes(const void* from, void* to) {
   using Narrow = typename From::container;
   using Wide = typename To::container;
@@ -69,7 +69,7 @@ inline void extend_lanes(const void* from, void* to) {
     std::memcpy(&narrow, from, sizeof narrow);
     store_register(to, 0, __builtin_convertvector(narrow, Vector<Wide>));
   } else {
-    lanes<To::count>(Write<To>(to), SAME, ReadWhole<From>(from));
+    lanes<To::count>(Write<To>(to), SAME, Operand<From>(from));
   }
 }
 
@@ -94,7 +94,7 @@ inline void replicate_bit(const FromUnit* from, ToUnit* to) {
   for (int i = 0; i < units; ++i) to[i] = static_cast<ToUnit>(*from & 1 ? -1 : 0);
 }
 
-template <class From, class To, class FromUnit, class ToUnit>
+template <class From, class To, template <class> class Operand = Read, class FromUnit, class ToUnit>
 inline void convert(const FromUnit* from, ToUnit* to) {
   if constexpr (std::is_same_v<To, packed1536>) {
     spill<From>(from, to);
@@ -105,7 +105,7 @@ inline void convert(const FromUnit* from, ToUnit* to) {
   } else if constexpr (is_predicate<To> && To::count > 1) {
     replicate_bit<To>(from, to);
   } else if constexpr (From::count == To::count) {
-    extend_lanes<From, To>(from, to);
+    extend_lanes<From, To, Operand>(from, to);
   } else {
     convert_lanes(Read<From>(from), Write<To>(to), SAME);
   }
@@ -130,7 +130,8 @@ inline const M* element_address(const M* address) {
   return reinterpret_cast<const M*>(reinterpret_cast<std::uintptr_t>(address) & ~(sizeof(M) - 1));
 }
 
-// To memory, narrower signed lanes saturate. The images of accumulators hold their low bits instead.
+// To memory, which may lie in part of the register, narrower signed lanes saturate. The images of accumulators hold
+// their low bits instead.
 template <class From, class To, class FromUnit, class Memory>
 inline void convert_to_memory(const FromUnit* from, Memory* to) {
   using T = typename To::container;
@@ -138,7 +139,7 @@ inline void convert_to_memory(const FromUnit* from, Memory* to) {
   if constexpr (To::bits < From::bits && std::is_signed_v<T> && !image) {
     convert_lanes(ReadWhole<From>(from), Write<To>(to), [](auto lane) { return saturate<T>(lane); });
   } else {
-    convert<From, To>(from, to);
+    convert<From, To, ReadWhole>(from, to);
   }
 }
 

@@ -15,16 +15,28 @@ constexpr auto SATURATE16 = [](std::int32_t lane) {
   return static_cast<std::int16_t>((lane >> 15) == sign ? lane : sign ^ 0x7FFF);
 };
 
+// A register from memory, its lanes, of layout L, 0 where they are not enabled. All is loaded before any is stored:
+// memory may lie in part of the register.
+template <class L, class Unit, class PredicateUnit>
+inline void load_where(const void* from, UnitsUnder<Unit, PredicateUnit, true> r) {
+  constexpr int registers = 64 / register_bytes;
+  LaneMask<L::bits, L::count> enabled;
+  enabled.expand(r.predicate);
+  Words all[registers];
+  for (int k = 0; k < registers; ++k) all[k] = load_register<word>(from, k) & load_register<word>(enabled.lane, k);
+  for (int k = 0; k < registers; ++k) store_register(r.units, k, all[k]);
+}
+
 }  // namespace
 
-// A whole register as it is; under a predicate lane by lane, of layout L.
+// A whole register as it is; under a predicate lanes of layout L.
 #define KERNEL_copy(OP, L)                                          \
   template <class Units, class Out>                                 \
   static inline void KASTARRI_SEMANTIC(OP)(const Units* a, Out r) { \
     if constexpr (std::is_pointer_v<Out>)                           \
       copy_registers<64>(a, r);                                     \
     else                                                            \
-      lanes<L::count>(result<L>(r), SAME, ReadWhole<L>(a));         \
+      load_where<L>(a, r);                                          \
   }
 
 // Lanes of a vector cut to narrower ones.

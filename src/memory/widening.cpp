@@ -41,7 +41,7 @@ inline void store_saturated(const void* vector, void* to) {
   template <class Units, class Out>                                 \
   static inline void KASTARRI_SEMANTIC(OP)(const Units* a, Out r) { \
     if constexpr (std::is_pointer_v<Out>)                           \
-      extend_lanes<A, R>(a, r);                                     \
+      extend_lanes<A, R, ReadWhole>(a, r);                          \
     else                                                            \
       lanes<R::count>(result<R>(r), SAME, ReadWhole<A>(a));         \
   }

@@ -21,6 +21,12 @@ file(GLOB KASTARRI_VECTOR_SOURCES CONFIGURE_DEPENDS
   ${PROJECT_SOURCE_DIR}/src/integer/*.cpp ${PROJECT_SOURCE_DIR}/src/memory/*.cpp
   ${PROJECT_SOURCE_DIR}/src/multiply/*.cpp ${PROJECT_SOURCE_DIR}/src/float/*.cpp)
 list(APPEND KASTARRI_VECTOR_SOURCES ${PROJECT_SOURCE_DIR}/src/frame/conversions.cpp)
+# Floats are written in registers already. g++ would join two pointers that are kept side by side to one vector, stored
+# in halves and loaded whole, which is not forwarded: in 64-bit programs a predicated operation waited for it.
+if(CMAKE_CXX_COMPILER_ID STREQUAL GNU)
+  file(GLOB float_sources ${PROJECT_SOURCE_DIR}/src/float/*.cpp)
+  set_source_files_properties(${float_sources} PROPERTIES COMPILE_OPTIONS -fno-tree-slp-vectorize)
+endif()
 # Tables, and what families export beside their intrinsics, once too.
 file(GLOB KASTARRI_SCALAR_SOURCES CONFIGURE_DEPENDS ${PROJECT_SOURCE_DIR}/src/scalar/*.cpp
   ${PROJECT_SOURCE_DIR}/src/tables/*.cpp ${PROJECT_SOURCE_DIR}/src/*/helpers/*.cpp)

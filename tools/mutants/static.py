@@ -46,8 +46,8 @@ class Tree:
 
     def write(self, path, lines):
         for number in self.marked[path]:
-            code, continued = re.match(r"(.*?)(\s*\\)?$", lines[number - 1]).groups()
-            lines[number - 1] = f'@begin{{"{path}:{number}"}}@ {code} @end{{}}@{continued or ""}'
+            head, code, continued = re.match(r"(#define \w+\([^)]*\) )?(.*?)(\s*\\)?$", lines[number - 1]).groups()
+            lines[number - 1] = f'{head or ""}@begin{{"{path}:{number}"}}@ {code} @end{{}}@{continued or ""}'
         with open(os.path.join(self.directory, "src", path), "w", encoding="utf-8") as file:
             file.write("\n".join(lines))
 
